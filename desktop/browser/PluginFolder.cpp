@@ -19,7 +19,8 @@ QStringList mimeTypesOf(const char* mimeDescription) {
 
 } // namespace
 
-PluginFolder::PluginFolder(const QString& file) {
+PluginFolder::PluginFolder(const QString& file)
+    : m_folder(QDir::temp().filePath(QStringLiteral("telix-tv-XXXXXX"))) {
     const QFileInfo info(file);
     if (!info.isFile()) {
         m_failure = QStringLiteral("there is no such file");

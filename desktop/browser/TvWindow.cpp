@@ -69,8 +69,9 @@ void TvWindow::inspect() {
     m_inspector->setAttribute(Qt::WA_QuitOnClose, false);
     m_inspector->setWindowTitle(QStringLiteral("telix-tv inspector"));
     m_inspector->resize(m_pageSize);
-    m_inspector->show();
+    // It stays empty when it is shown before it has a page.
     bringUpTop();
+    m_inspector->show();
 }
 
 void TvWindow::resizeEvent(QResizeEvent*) {
