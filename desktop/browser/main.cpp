@@ -84,6 +84,9 @@ int main(int argc, char* argv[]) {
         return exitUnusable;
     }
 
+    // Plug-ins live in X windows only.
+    if (!qEnvironmentVariableIsSet("QT_QPA_PLATFORM"))
+        qputenv("QT_QPA_PLATFORM", "xcb");
     // The command line is ours alone.
     int qtArgumentCount = 1;
     QApplication application(qtArgumentCount, argv);

@@ -1,0 +1,145 @@
+// How a wrapper class states its script interface: a table with one row a name, in the order in which the
+// names are interned. A row leads to an operation of the model; which arguments a method takes and what
+// script gets back follow from the operation's C++ signature.
+#ifndef TELIX_COMMON_SCRIPTINTERFACE_H
+#define TELIX_COMMON_SCRIPTINTERFACE_H
+
+#include <tuple>
+#include <type_traits>
+#include <utility>
+
+#include "common/Log.h"
+#include "common/PluginBase.h"
+#include "common/ScriptValues.h"
+
+// Each of these does its work on the model behind the wrapper and tells whether it took place: false from a
+// writer or an invoker is a value or arguments that do not fit.
+using ScriptReader = bool (*)(PluginBase& model, NPVariant& result);
+using ScriptWriter = bool (*)(PluginBase& model, const NPVariant& value);
+using ScriptInvoker = bool (*)(PluginBase& model, const NPVariant* args, unsigned int argCount,
+                               NPVariant& result);
+
+struct ScriptMember {
+    const char* name;
+    const char* logPrefix;
+    const char* logName;
+    ScriptReader read;     // of a property
+    ScriptWriter write;    // of a property that script may write
+    ScriptInvoker invoke;  // of a method
+    int32_t constantValue; // of a constant, which is a property without a reader
+
+    constexpr bool isMethod() const { return invoke != nullptr; }
+
+    // The row with another spelling of the name in the log.
+    constexpr ScriptMember logged(const char* spelling) const {
+        ScriptMember row = *this;
+        row.logName = spelling;
+        return row;
+    }
+};
+
+constexpr ScriptMember property(const char* name, ScriptReader read, ScriptWriter write = nullptr) {
+    return {name, "pId_", name, read, write, nullptr, 0};
+}
+
+constexpr ScriptMember constant(const char* name, int32_t value) {
+    return {name, "cId_", name, nullptr, nullptr, nullptr, value};
+}
+
+constexpr ScriptMember method(const char* name, ScriptInvoker invoke) {
+    return {name, "mId_", name, nullptr, nullptr, invoke, 0};
+}
+
+namespace script_detail {
+
+template <class Operation>
+struct Signature;
+
+template <class Model_, class Result_, class... Arguments_>
+struct Signature<Result_ (Model_::*)(Arguments_...)> {
+    using Model = Model_;
+    using Result = Result_;
+    using Arguments = std::tuple<std::decay_t<Arguments_>...>;
+};
+
+template <class Model_, class Result_, class... Arguments_>
+struct Signature<Result_ (Model_::*)(Arguments_...) const> : Signature<Result_ (Model_::*)(Arguments_...)> {};
+
+template <auto Operation, class... Arguments, size_t... Index>
+bool invokeWith(PluginBase& model, const NPVariant* args, NPVariant& result, const std::tuple<Arguments...>*,
+                std::index_sequence<Index...>) {
+    using Call = Signature<decltype(Operation)>;
+    // The array is read as it stands: its length is not looked at.
+    if (!(ScriptArgument<Arguments>::fits(args[Index]) && ...)) {
+        return false;
+    }
+    auto& target = static_cast<typename Call::Model&>(model);
+    if constexpr (std::is_void_v<typename Call::Result>) {
+        (target.*Operation)(ScriptArgument<Arguments>::read(args[Index])...);
+    } else {
+        setResult(result, (target.*Operation)(ScriptArgument<Arguments>::read(args[Index])...));
+    }
+    return true;
+}
+
+} // namespace script_detail
+
+// A property read through a getter of the model.
+template <auto Getter>
+bool read(PluginBase& model, NPVariant& result) {
+    using Call = script_detail::Signature<decltype(Getter)>;
+    setResult(result, (static_cast<typename Call::Model&>(model).*Getter)());
+    return true;
+}
+
+// A property written through a setter of the model; a value that is not of the setter's type is refused.
+template <auto Setter>
+bool write(PluginBase& model, const NPVariant& value) {
+    using Call = script_detail::Signature<decltype(Setter)>;
+    using Argument = ScriptArgument<std::tuple_element_t<0, typename Call::Arguments>>;
+    if (!Argument::fits(value)) {
+        return false;
+    }
+    (static_cast<typename Call::Model&>(model).*Setter)(Argument::read(value));
+    return true;
+}
+
+// A property that holds a script function: an object replaces it, null clears it, anything else changes
+// nothing; the write succeeds in all three cases.
+template <auto Setter>
+bool writeListener(PluginBase& model, const NPVariant& value) {
+    using Call = script_detail::Signature<decltype(Setter)>;
+    if (value.type == NPVariantType_Object) {
+        (static_cast<typename Call::Model&>(model).*Setter)(value.value.objectValue);
+    } else if (value.type == NPVariantType_Null) {
+        (static_cast<typename Call::Model&>(model).*Setter)(nullptr);
+    }
+    return true;
+}
+
+// A method that is one operation of the model. The operation's result is script's; without one the browser's
+// result is left as it was.
+template <auto Operation>
+bool invoke(PluginBase& model, const NPVariant* args, unsigned int, NPVariant& result) {
+    using Arguments = typename script_detail::Signature<decltype(Operation)>::Arguments;
+    return script_detail::invokeWith<Operation>(model, args, result, static_cast<const Arguments*>(nullptr),
+                                                std::make_index_sequence<std::tuple_size_v<Arguments>>{});
+}
+
+// Array notation of the list classes: decimal names below `length` read `item`.
+struct ScriptArray {
+    uint32_t (*length)(PluginBase& model);
+    NPObject* (*item)(PluginBase& model, uint32_t index);
+    LogModule logModule;
+    const char* logIndent; // what the log line begins with: some classes set it off by a blank
+};
+
+template <auto Length, auto Item>
+constexpr ScriptArray scriptArray(LogModule logModule, const char* logIndent) {
+    using List = typename script_detail::Signature<decltype(Length)>::Model;
+    return {[](PluginBase& model) -> uint32_t { return (static_cast<List&>(model).*Length)(); },
+            [](PluginBase& model, uint32_t index) { return (static_cast<List&>(model).*Item)(index); },
+            logModule, logIndent};
+}
+
+#endif
