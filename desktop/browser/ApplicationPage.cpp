@@ -30,7 +30,8 @@ bool ApplicationPage::extension(Extension extension, const ExtensionOption* opti
 }
 
 void ApplicationPage::javaScriptConsoleMessage(const QString& message, int line, const QString& source) {
-    printConsoleMessage(source, line, message);
+    // The engine does not always say which script a message comes from.
+    printConsoleMessage(source.isEmpty() ? mainFrame()->url().toString() : source, line, message);
 }
 
 void ApplicationPage::javaScriptAlert(QWebFrame*, const QString& message) {

@@ -42,11 +42,13 @@ void ScriptedRun::step() {
         giveUp();
 }
 
-// One key at a step, so that what a key sets off gets its turn before the next.
+// One key at a step and nothing else, so that what a key sets off gets its turn before what comes next.
 bool ScriptedRun::pressKeys() {
-    if (m_keysPressed < m_commandLine.keys.size() && m_window.topApplication())
-        m_window.topApplication()->press(*m_commandLine.keys[m_keysPressed++]);
-    return m_keysPressed == m_commandLine.keys.size();
+    if (m_keysPressed == m_commandLine.keys.size())
+        return true;
+    if (ApplicationView* top = m_window.topApplication())
+        top->press(*m_commandLine.keys[m_keysPressed++]);
+    return false;
 }
 
 bool ScriptedRun::waitForExpression() {
@@ -94,7 +96,7 @@ void ScriptedRun::giveUp() {
 
 void ScriptedRun::onLoadFailed(const QUrl& url, const QString& reason) {
     printError(QStringLiteral("can't load %1: %2").arg(url.toDisplayString(), reason));
-    if (!m_pageLoaded)
+    if (!m_window.topApplication())
         end(exitUnusable);
 }
 

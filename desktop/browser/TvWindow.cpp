@@ -30,17 +30,15 @@ void TvWindow::openApplication(const QUrl& url) {
     auto* application = new ApplicationView(this);
     auto* page = &application->applicationPage();
     page->setNetworkAccessManager(&m_network);
-    // The page takes over every manager that has no owner.
-    m_network.setParent(nullptr);
     const auto addFunctions = [this, application](QWebFrame* frame) {
         new PageFunctions(*frame, *application, *this);
     };
     addFunctions(page->mainFrame());
     connect(page, &QWebPage::frameCreated, this, addFunctions);
     connect(application, &ApplicationView::loadFailed, this, [this, application](const QString& reason) {
-        emit loadFailed(application->applicationPage().failedUrl(), reason);
         if (!application->hasDocument())
             remove(application);
+        emit loadFailed(application->applicationPage().failedUrl(), reason);
     });
     m_applications.append(application);
     bringUpTop();

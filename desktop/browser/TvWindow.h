@@ -35,7 +35,7 @@ public:
     void inspect();
 
 signals:
-    // A document of an application could not be loaded. An application without any leaves the stack.
+    // A document of an application could not be loaded. An application without any has left the stack.
     void loadFailed(const QUrl& url, const QString& reason);
 
 protected:
