@@ -22,8 +22,8 @@ TvWindow::TvWindow(const QSize& pageSize) : m_pageSize(pageSize) {
 
 TvWindow::~TvWindow() {
     delete m_inspector;
-    // Before the members that the pages use.
-    qDeleteAll(m_applications);
+    // Before the members that the pages use; those that have left the stack and wait for their end as well.
+    qDeleteAll(findChildren<ApplicationView*>());
 }
 
 void TvWindow::openApplication(const QUrl& url) {
