@@ -54,7 +54,7 @@
     function clearHandlers() {
         applicationHandlers.forEach(function (name) { application[name] = null; });
         managerHandlers.forEach(function (name) { manager[name] = null; });
-        log('all handlers = null: the manager clears them, the application keeps them');
+        log('null clears the manager\'s handlers, not the application\'s');
     }
 
     function switchHandlers() {
@@ -69,7 +69,7 @@
 
     function openSecond() {
         created = application.createApplication('second.html', true);
-        log('createApplication("second.html", true) gives ' + tv.describe(created));
+        log('createApplication("second.html", true) gives ' + tv.describeApplication(created));
     }
 
     function preview() {
@@ -104,7 +104,7 @@
             },
             ok: function () {
                 application = manager.getOwnerApplication(document);
-                log('getOwnerApplication(document) gives a new ' + tv.describe(application));
+                log('getOwnerApplication(document) gives another one');
             }
         },
         {
@@ -116,12 +116,12 @@
             ok: switchHandlers
         },
         {
-            title: 'Second one',
+            title: 'Second page',
             panel: function () {
                 return [tv.element('h2', 'An application on top of this one'),
                         tv.element('p', 'OK or green opens it; it closes itself at BACK.'),
                         tv.element('p', 'Blue opens it for three seconds; then this page closes it.'),
-                        table([['Last one opened', tv.describe(created)]])];
+                        table([['Last one opened', tv.describeApplication(created)]])];
             },
             ok: openSecond
         },
@@ -202,6 +202,6 @@
     actions[VK_YELLOW] = thenShow(switchHandlers);
     actions[VK_BLUE] = thenShow(preview);
     tv.onKeys(actions);
-    log('getOwnerApplication(document) gives ' + tv.describe(application));
+    log('getOwnerApplication(document) gives ' + tv.describeApplication(application));
     show();
 }());

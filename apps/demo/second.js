@@ -4,7 +4,7 @@
 
     var application = tv.ownerApplication(document.getElementById('manager'));
     var state = document.getElementById('state');
-    state.textContent = 'getOwnerApplication(document): ' + tv.describe(application);
+    state.textContent = 'getOwnerApplication(document) gave ' + tv.describeApplication(application) + '.';
 
     function leave() {
         if (application) {

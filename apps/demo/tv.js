@@ -15,18 +15,17 @@ var tv = (function () {
         children.forEach(function (child) { parent.appendChild(child); });
     }
 
-    // A value as a viewer reads it.
+    // The value of a property as a viewer reads it.
     function describe(value) {
         if (value === undefined) {
             return 'not there';
         }
-        if (value === null) {
-            return 'null';
-        }
-        if (typeof value === 'object' || typeof value === 'function') {
-            return typeof value;
-        }
-        return String(value);
+        return value === null ? 'null' : typeof value;
+    }
+
+    // What a method that hands out applications gave. Browsers differ in what they call the type of such an object.
+    function describeApplication(value) {
+        return value ? 'an application' : describe(value);
     }
 
     // The application that the page is, or null when there is no plug-in.
@@ -44,5 +43,6 @@ var tv = (function () {
         }, false);
     }
 
-    return { element: element, fill: fill, describe: describe, ownerApplication: ownerApplication, onKeys: onKeys };
+    return { element: element, fill: fill, describe: describe, describeApplication: describeApplication,
+             ownerApplication: ownerApplication, onKeys: onKeys };
 }());

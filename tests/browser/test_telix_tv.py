@@ -12,6 +12,7 @@ from television import Picture, Television, temporary_folder
 
 PAGES = os.path.join(os.path.dirname(os.path.abspath(__file__)), 'pages')
 PLUGIN = os.environ['TELIX_PLUGIN']
+STRANGER = os.environ['TELIX_STRANGER']
 BLACK, GREEN, BLUE = (0, 0, 0), (0, 128, 0), (0, 0, 255)
 
 # Every key of the remote control with the code that a page sees.
@@ -354,17 +355,22 @@ class Plugins(TelixTv):
         self.assert_refused(self.run_with(c_library), 'NP_Initialize')
 
     def test_only_the_given_plug_in_is_seen(self):
-        shutil.copy(PLUGIN, os.path.join(self.folder, 'beside.so'))
+        shutil.copy(STRANGER, os.path.join(self.folder, 'npstranger.so'))
         plugin = shutil.copy(PLUGIN, os.path.join(self.folder, 'npown.so'))
         run = self.television.run('--plugin', plugin, shipped('first.html'), '--eval',
                                   '[navigator.plugins.length, navigator.plugins[0].name]')
         self.assertEqual(run.value, [1, 'TELIX Scriptable Plugin'], run)
 
     def test_the_environment_adds_no_plug_ins(self):
-        shutil.copy(PLUGIN, os.path.join(self.folder, 'other.so'))
+        shutil.copy(STRANGER, os.path.join(self.folder, 'npstranger.so'))
         run = self.run_tv(shipped('first.html'), '--eval', 'navigator.plugins.length',
                           environment={'QTWEBKIT_PLUGIN_PATH': self.folder, 'MOZ_PLUGIN_PATH': self.folder})
         self.assertEqual(run.value, 1, run)
+
+    def test_another_plug_in_is_seen_when_it_is_the_given_one(self):
+        run = self.television.run('--plugin', STRANGER, shipped('first.html'), '--eval',
+                                  '[navigator.plugins.length, navigator.plugins[0].name]')
+        self.assertEqual(run.value, [1, 'Stranger'], run)
 
     def test_the_desktop_plug_in_is_the_default(self):
         run = self.television.run(shipped('first.html'), '--eval', 'navigator.plugins[0].name')

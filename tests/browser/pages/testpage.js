@@ -21,7 +21,7 @@ function check(condition, text) {
 
 // Fails the test unless both values are the same, arrays element by element.
 function same(actual, expected) {
-    var bothArrays = actual instanceof Array && expected instanceof Array;
+    var bothArrays = Array.isArray(actual) && Array.isArray(expected);
     check(bothArrays ? JSON.stringify(actual) === JSON.stringify(expected) : actual === expected,
           'is ' + JSON.stringify(actual) + ' (' + typeof actual + '), should be ' + JSON.stringify(expected));
 }
