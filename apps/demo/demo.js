@@ -76,9 +76,12 @@
         openSecond();
         if (created) {
             setTimeout(function () {
-                created.destroyApplication();
-                log('destroyApplication() brings this page back');
-                show();
+                // The viewer may have closed it; then this page would close itself.
+                if (document.hidden) {
+                    created.destroyApplication();
+                    log('destroyApplication() brings this page back');
+                    show();
+                }
             }, previewMilliseconds);
         }
     }

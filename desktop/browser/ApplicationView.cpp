@@ -53,6 +53,7 @@ void ApplicationView::onLoadFinished(bool ok) {
 
 void ApplicationView::setShown(bool shown) {
     m_shown = shown;
+    tellVisibility();
     update();
 }
 
@@ -67,6 +68,16 @@ void ApplicationView::press(const RemoteKey& key) {
 void ApplicationView::paintEvent(QPaintEvent* event) {
     if (m_shown)
         QWebView::paintEvent(event);
+}
+
+void ApplicationView::showEvent(QShowEvent* event) {
+    QWebView::showEvent(event);
+    tellVisibility();
+}
+
+void ApplicationView::hideEvent(QHideEvent* event) {
+    QWebView::hideEvent(event);
+    tellVisibility();
 }
 
 void ApplicationView::keyPressEvent(QKeyEvent* event) {
@@ -85,6 +96,11 @@ void ApplicationView::keyReleaseEvent(QKeyEvent* event) {
         QWebView::keyReleaseEvent(event);
     else if (!event->isAutoRepeat())
         dispatch("keyup", *key);
+}
+
+void ApplicationView::tellVisibility() {
+    m_page->setVisibilityState(isVisible() && m_shown ? QWebPage::VisibilityStateVisible
+                                                      : QWebPage::VisibilityStateHidden);
 }
 
 // False when the page prevented the default action.

@@ -30,11 +30,14 @@ signals:
 
 protected:
     void paintEvent(QPaintEvent* event) override;
+    void showEvent(QShowEvent* event) override;
+    void hideEvent(QHideEvent* event) override;
     void keyPressEvent(QKeyEvent* event) override;
     void keyReleaseEvent(QKeyEvent* event) override;
 
 private:
     void onLoadFinished(bool ok);
+    void tellVisibility();
     bool dispatch(const char* type, const RemoteKey& key);
 
     ApplicationPage* m_page;

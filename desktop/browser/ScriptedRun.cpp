@@ -8,7 +8,7 @@
 #include "desktop/browser/PageScript.h"
 #include "desktop/browser/TvWindow.h"
 
-#include <QCoreApplication>
+#include <QGuiApplication>
 #include <QPixmap>
 #include <QWebFrame>
 
@@ -28,6 +28,10 @@ struct ScriptedRun::Evaluation {
 ScriptedRun::ScriptedRun(TvWindow& window, const CommandLine& commandLine)
     : m_window(window), m_commandLine(commandLine) {
     connect(&window, &TvWindow::loadFailed, this, &ScriptedRun::onLoadFailed);
+    connect(qGuiApp, &QGuiApplication::lastWindowClosed, this, &ScriptedRun::onWindowClosed);
+    // A page that is only looked at may take its time.
+    if (commandLine.keys.isEmpty() && !commandLine.quitsWhenDone())
+        return;
     connect(&m_timer, &QTimer::timeout, this, &ScriptedRun::step);
     m_timer.start(stepMilliseconds);
     m_sinceStart.start();
@@ -92,6 +96,10 @@ void ScriptedRun::giveUp() {
     }
     writeScreenshot();
     end(exitNotReached);
+}
+
+void ScriptedRun::onWindowClosed() {
+    end(m_commandLine.quitsWhenDone() ? exitNotReached : exitSuccess);
 }
 
 void ScriptedRun::onLoadFailed(const QUrl& url, const QString& reason) {

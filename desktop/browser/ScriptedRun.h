@@ -32,6 +32,7 @@ private:
     bool waitForExpression();
     void finish();
     void giveUp();
+    void onWindowClosed();
     void onLoadFailed(const QUrl& url, const QString& reason);
     Evaluation evaluate(const QString& expression) const;
     bool topIsLoaded() const;

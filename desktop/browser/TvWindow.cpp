@@ -22,6 +22,8 @@ TvWindow::TvWindow(const QSize& pageSize) : m_pageSize(pageSize) {
 
 TvWindow::~TvWindow() {
     delete m_inspector;
+    // What pages ask for while they end is no longer done.
+    m_applications.clear();
     // Before the members that the pages use; those that have left the stack and wait for their end as well.
     qDeleteAll(findChildren<ApplicationView*>());
 }

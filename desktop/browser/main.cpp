@@ -90,6 +90,7 @@ int main(int argc, char* argv[]) {
     // The command line is ours alone.
     int qtArgumentCount = 1;
     QApplication application(qtArgumentCount, argv);
+    QApplication::setQuitOnLastWindowClosed(false); // the run does, with its own exit status
     if (!QAbstractEventDispatcher::instance()->inherits("QEventDispatcherGlib")) {
         printError(
             QStringLiteral("Qt does not run on GLib's main loop, so the plug-in's events would never arrive; "

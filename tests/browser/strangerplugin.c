@@ -1,5 +1,5 @@
-/* A browser plug-in that has nothing to do with television: it loads, offers one type of its own, and refuses every
- * instance. */
+/* A browser plug-in that has nothing to do with television: it loads, offers one type of its own, and refuses
+ * every instance. */
 #include "npapi/npfunctions.h"
 
 #define EXPORT __attribute__((visibility("default")))
@@ -22,7 +22,9 @@ NPError NP_Initialize(NPNetscapeFuncs* browser, NPPluginFuncs* plugin) {
     return NPERR_NO_ERROR;
 }
 
-NPError NP_Shutdown(void) { return NPERR_NO_ERROR; }
+NPError NP_Shutdown(void) {
+    return NPERR_NO_ERROR;
+}
 
 NPError NP_GetValue(void* future, NPPVariable variable, void* value) {
     (void)future;
@@ -36,4 +38,6 @@ NPError NP_GetValue(void* future, NPPVariable variable, void* value) {
     }
 }
 
-const char* NP_GetMIMEDescription(void) { return "application/x-telix-stranger::Nothing;"; }
+const char* NP_GetMIMEDescription(void) {
+    return "application/x-telix-stranger::Nothing;";
+}

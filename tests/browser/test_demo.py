@@ -79,6 +79,11 @@ class Demo(unittest.TestCase):
         self.assertIn('destroyApplication() brings this page back', self.text(
             'log', '--keys', 'blue', '--wait-for', 'document.title !== "A second application"'))
 
+    def test_a_preview_that_the_viewer_has_closed_takes_nothing_else_away(self):
+        waited = '(window.start = window.start || Date.now()) + 4000 < Date.now()'
+        self.assertIn('telix', self.run_demo('--keys', 'blue,back', '--wait-for', waited, '--eval',
+                                             'document.body.innerText').value)
+
     def test_red_hides_the_page_and_brings_it_back(self):
         self.assertEqual(len(self.screenshot('hidden', '--keys', 'red').colours()), 1)
         self.assertGreater(len(self.screenshot('shown', '--keys', 'red,red').colours()), COLOURS_OF_A_PAGE)

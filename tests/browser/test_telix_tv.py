@@ -246,6 +246,16 @@ class Pages(TelixTv):
             page = self.write(f'<img src="{address}/silence">')
             self.assert_refused(self.run_tv(page, '--timeout', '1', '--eval', '1'), 'page.html', 'within 1 s')
 
+    def test_a_page_that_is_only_looked_at_may_load_as_long_as_it_likes(self):
+        with server() as address:
+            page = self.write(f'<img src="{address}/silence"><script>setTimeout(function () {{ console.log("on"); }}, 1500)'
+                              '</script>')
+            with self.television.start('--plugin', PLUGIN, '--timeout', '0.1', page) as process:
+                self.assertIn('on', process.stderr.readline())
+                self.assertIsNone(process.poll())
+                process.send_signal(signal.SIGTERM)
+                process.communicate(timeout=60)
+
     def test_an_address_that_a_loaded_page_fails_to_go_to_leaves_the_page(self):
         page = self.write('<title>stays</title><script>onload = function () { location.href = "missing.html"; }</script>')
         run = self.run_tv(page, '--wait-for', '(window.count = (window.count || 0) + 1) > 20',
@@ -495,6 +505,14 @@ class Applications(TelixTv):
     def test_an_application_beneath_stays_hidden_when_it_comes_back(self):
         self.assertEqual(self.picture(shipped('first.html'), '--keys', 'yellow,green').colours(), {bytes(BLUE)})
         self.assertEqual(self.picture(shipped('first.html'), '--keys', 'yellow,green,back').colours(), {bytes(BLACK)})
+
+    def test_a_page_knows_whether_it_is_on_the_screen(self):
+        page = self.write(f'''<script>seen = [document.hidden];
+            document.addEventListener('visibilitychange', function () {{ seen.push(document.hidden); }}, false);
+            onload = function () {{
+                hideHbbTVApplication(); showHbbTVApplication();
+                createHbbTVApplication('file://{shipped("second.html")}'); destroyHbbTVApplication(); }}</script>''')
+        self.assertEqual(self.value(page, '--eval', 'seen'), [False, True, False, True, False])
 
     def test_an_application_of_a_server_opens_if_the_server_has_it(self):
         with server() as address:
