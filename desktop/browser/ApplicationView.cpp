@@ -92,10 +92,11 @@ void ApplicationView::keyPressEvent(QKeyEvent* event) {
 
 void ApplicationView::keyReleaseEvent(QKeyEvent* event) {
     const RemoteKey* key = keyUnknownToEngine(*event);
-    if (!key)
+    if (!key) {
         QWebView::keyReleaseEvent(event);
-    else if (!event->isAutoRepeat())
+    } else if (!event->isAutoRepeat()) {
         dispatch("keyup", *key);
+    }
 }
 
 void ApplicationView::tellVisibility() {

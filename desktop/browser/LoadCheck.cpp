@@ -30,7 +30,9 @@ QString askServer(const QUrl& url) {
     QEventLoop loop;
     QObject::connect(reply.get(), &QNetworkReply::finished, &loop, &QEventLoop::quit);
     QObject::connect(reply.get(), &QNetworkReply::readyRead, &loop, &QEventLoop::quit);
-    QTimer::singleShot(serverLimitMilliseconds, &loop, &QEventLoop::quit);
+    QTimer limit;
+    QObject::connect(&limit, &QTimer::timeout, &loop, &QEventLoop::quit);
+    limit.start(serverLimitMilliseconds);
     loop.exec();
 
     if (httpStatus(*reply) >= firstHttpError)

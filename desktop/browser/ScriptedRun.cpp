@@ -40,10 +40,11 @@ ScriptedRun::ScriptedRun(TvWindow& window, const CommandLine& commandLine)
 void ScriptedRun::step() {
     m_pageLoaded = m_pageLoaded || topIsLoaded();
     const bool settled = topIsLoaded() || !m_window.topApplication();
-    if (m_pageLoaded && settled && pressKeys() && waitForExpression())
+    if (m_pageLoaded && settled && pressKeys() && waitForExpression()) {
         finish();
-    else if (m_sinceStart.elapsed() > m_commandLine.timeoutSeconds * 1000)
+    } else if (m_sinceStart.elapsed() > m_commandLine.timeoutSeconds * 1000) {
         giveUp();
+    }
 }
 
 // One key at a step and nothing else, so that what a key sets off gets its turn before what comes next.

@@ -57,7 +57,7 @@ bool TvWindow::createApplication(const ApplicationView& caller, const QUrl& url)
 void TvWindow::destroyTopApplication(const ApplicationView& caller) {
     // An application that has left the stack may run to the end of its script.
     if (has(caller))
-        remove(topApplication());
+        remove(m_applications.last());
 }
 
 ApplicationView* TvWindow::topApplication() const {

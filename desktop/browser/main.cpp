@@ -22,9 +22,10 @@ namespace {
 // beneath.
 QUrl styleSheetThatHides(const QStringList& mimeTypes) {
     QString style;
-    for (const auto& type : mimeTypes)
+    for (const auto& type : mimeTypes) {
         style += QStringLiteral("object[type=\"%1\" i], embed[type=\"%1\" i] { opacity: 0 !important; }\n")
                      .arg(type);
+    }
     return QUrl(QLatin1String("data:text/css;charset=utf-8;base64,") +
                 QLatin1String(style.toUtf8().toBase64()));
 }
