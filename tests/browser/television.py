@@ -10,8 +10,18 @@ import subprocess
 import tempfile
 import zlib
 
-# Seconds that a run of telix-tv may last before it is taken for hung. Its own limits are shorter.
+# Seconds that a run of telix-tv, and a whole test program, may last before they are taken for hung. CTest's own limit
+# is longer: it would leave display and browser behind.
 RUN_LIMIT = 120
+PROGRAM_LIMIT = 270
+
+
+def give_up(*_):
+    raise TimeoutError(f'not done within {PROGRAM_LIMIT} s')
+
+
+signal.signal(signal.SIGALRM, give_up)
+signal.alarm(PROGRAM_LIMIT)
 
 
 class Television:
