@@ -2,8 +2,14 @@
 #include "common/ObjectKind.h"
 
 #include "src/application/ApplicationManager.h"
+#include "src/capabilities/Capabilities.h"
+#include "src/config/OipfConfiguration.h"
+#include "src/drm/DRMAgent.h"
 
 const ObjectKind* const objectKinds[] = {
     &applicationManagerKind,
+    &oipfConfigurationKind,
+    &capabilitiesKind,
+    &drmAgentKind,
     nullptr,
 };
