@@ -2,10 +2,12 @@
 #include "common/ObjectKind.h"
 
 #include "src/application/ApplicationManager.h"
+#include "src/capabilities/Capabilities.h"
+#include "src/config/OipfConfiguration.h"
+#include "src/drm/DRMAgent.h"
 #include "src/parental/ParentalControlManager.h"
 
 const ObjectKind* const objectKinds[] = {
-    &applicationManagerKind,
-    &parentalControlManagerKind,
-    nullptr,
+    &applicationManagerKind, &oipfConfigurationKind, &parentalControlManagerKind,
+    &capabilitiesKind,       &drmAgentKind,          nullptr,
 };
