@@ -1,6 +1,8 @@
 // The script interface of the video/broadcast object.
 #include "src/videobroadcast/JSVideoBroadcast.h"
 
+#include <cstdlib>
+
 #include "src/videobroadcast/VideoBroadcast.h"
 
 namespace {

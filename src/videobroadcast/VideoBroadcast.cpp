@@ -7,11 +7,13 @@
 #include <cassert>
 #include <cstdio>
 #include <cstdlib>
+#include <cstring>
 
 #include "common/Log.h"
 #include "common/ObjectKind.h"
 #include "common/PluginUtils.h"
 #include "common/ScriptReferences.h"
+#include "common/ScriptValues.h"
 #include "src/videobroadcast/JSVideoBroadcast.h"
 #include "src/videobroadcast/VideoBroadcastUtils.h"
 #include "telix/telix_platform.h"
@@ -194,44 +196,35 @@ void VideoBroadcast::setHeight(int height) {
 
 int VideoBroadcast::shouldChangeWidth(void* object) {
     auto* self = static_cast<VideoBroadcast*>(object);
-    if (!isListed(self)) {
-        return G_SOURCE_REMOVE;
-    }
-    if (!self->m_vbHandle) {
-        // Meant: despite its words the step goes on without a handle.
-        PLUGIN_LOG(VIDEOBCAST, "m_vbHandle is NULL. Nothing to do, return. \n");
-    }
-    if (self->m_nWidth == self->m_pWidth) {
-        return G_SOURCE_REMOVE;
-    }
-    if (TELIX_JS_VB_SetWidth(self->m_vbHandle, self->m_nWidth) == 0) {
-        self->m_pWidth = self->m_nWidth;
-        PLUGIN_LOG(VIDEOBCAST, "TELIX_JS_VB_SetWidth Succeeded \n");
-    } else {
-        PLUGIN_LOG(VIDEOBCAST, "TELIX_JS_VB_SetWidth Failed \n");
+    if (isListed(self)) {
+        self->applySize(__func__, "TELIX_JS_VB_SetWidth", TELIX_JS_VB_SetWidth, self->m_nWidth, self->m_pWidth);
     }
     return G_SOURCE_REMOVE;
 }
 
 int VideoBroadcast::shouldChangeHeight(void* object) {
     auto* self = static_cast<VideoBroadcast*>(object);
-    if (!isListed(self)) {
-        return G_SOURCE_REMOVE;
-    }
-    if (!self->m_vbHandle) {
-        // Meant: despite its words the step goes on without a handle.
-        PLUGIN_LOG(VIDEOBCAST, "m_vbHandle is NULL. Nothing to do, return. \n");
-    }
-    if (self->m_nHeight == self->m_pHeight) {
-        return G_SOURCE_REMOVE;
-    }
-    if (TELIX_JS_VB_SetHeight(self->m_vbHandle, self->m_nHeight) == 0) {
-        self->m_pHeight = self->m_nHeight;
-        PLUGIN_LOG(VIDEOBCAST, "TELIX_JS_VB_SetHeight Succeeded \n");
-    } else {
-        PLUGIN_LOG(VIDEOBCAST, "TELIX_JS_VB_SetHeight Failed \n");
+    if (isListed(self)) {
+        self->applySize(__func__, "TELIX_JS_VB_SetHeight", TELIX_JS_VB_SetHeight, self->m_nHeight,
+                        self->m_pHeight);
     }
     return G_SOURCE_REMOVE;
+}
+
+void VideoBroadcast::applySize(const char* step, const char* callName, SetSize call, int wanted, int& applied) {
+    if (!m_vbHandle) {
+        // Meant: despite its words the step goes on without a handle.
+        PLUGIN_LOG_FOR(LogModule::VIDEOBCAST, step, "m_vbHandle is NULL. Nothing to do, return. \n");
+    }
+    if (wanted == applied) {
+        return;
+    }
+    if (call(m_vbHandle, wanted) == 0) {
+        applied = wanted;
+        PLUGIN_LOG_FOR(LogModule::VIDEOBCAST, step, "%s Succeeded \n", callName);
+    } else {
+        PLUGIN_LOG_FOR(LogModule::VIDEOBCAST, step, "%s Failed \n", callName);
+    }
 }
 
 int VideoBroadcast::getWidth() {

@@ -10,6 +10,7 @@
 
 #include "common/PluginBase.h"
 #include "src/videobroadcast/InstanceList.h"
+#include "telix/telix_platform.h"
 
 struct ObjectKind;
 
@@ -147,9 +148,12 @@ private:
         }
     };
 
+    using SetSize = TELIX_RETCODE_ENUM_T (*)(TELIX_JS_VB_HANDLE object, int32_t size);
+
     VideoBroadcast(NPP npp, unsigned short objectId);
 
-    NPObject* createChannel(unsigned int channelHandle);
+    void applySize(const char* step, const char* callName, SetSize call, int wanted, int& applied);
+
     void resetCurrentChannel(unsigned int channelHandle);
 
     static InstanceList VBInstanceList;
