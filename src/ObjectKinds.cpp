@@ -3,9 +3,11 @@
 
 #include "src/application/ApplicationManager.h"
 #include "src/parental/ParentalControlManager.h"
+#include "src/videobroadcast/VideoBroadcast.h"
 
 const ObjectKind* const objectKinds[] = {
     &applicationManagerKind,
+    &videoBroadcastKind,
     &parentalControlManagerKind,
     nullptr,
 };

@@ -1,5 +1,6 @@
-// The live video/broadcast objects and the platform handle of each. The browser thread owns the list; platform
-// threads look handles up in an immutable copy that is published at every change, so that no side ever waits.
+// The live video/broadcast objects and the platform handle of each. The browser thread owns the list;
+// platform threads look handles up in an immutable copy that is published at every change, so that no side
+// ever waits.
 #ifndef TELIX_SRC_VIDEOBROADCAST_INSTANCELIST_H
 #define TELIX_SRC_VIDEOBROADCAST_INSTANCELIST_H
 
@@ -15,7 +16,8 @@ public:
     // Ordered by the object's address, which is its identity.
     using Handles = std::map<VideoBroadcast*, unsigned int>;
 
-    // A replaced copy is freed on the main loop once it is `graceMilliseconds` old and no look-up is under way.
+    // A replaced copy is freed on the main loop once it is `graceMilliseconds` old and no look-up is under
+    // way.
     explicit InstanceList(unsigned int graceMilliseconds = 5000) : m_grace(graceMilliseconds) {}
     InstanceList(const InstanceList&) = delete;
     InstanceList& operator=(const InstanceList&) = delete;

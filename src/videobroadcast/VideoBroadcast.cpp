@@ -197,7 +197,8 @@ void VideoBroadcast::setHeight(int height) {
 int VideoBroadcast::shouldChangeWidth(void* object) {
     auto* self = static_cast<VideoBroadcast*>(object);
     if (isListed(self)) {
-        self->applySize(__func__, "TELIX_JS_VB_SetWidth", TELIX_JS_VB_SetWidth, self->m_nWidth, self->m_pWidth);
+        self->applySize(__func__, "TELIX_JS_VB_SetWidth", TELIX_JS_VB_SetWidth, self->m_nWidth,
+                        self->m_pWidth);
     }
     return G_SOURCE_REMOVE;
 }
@@ -211,7 +212,8 @@ int VideoBroadcast::shouldChangeHeight(void* object) {
     return G_SOURCE_REMOVE;
 }
 
-void VideoBroadcast::applySize(const char* step, const char* callName, SetSize call, int wanted, int& applied) {
+void VideoBroadcast::applySize(const char* step, const char* callName, SetSize call, int wanted,
+                               int& applied) {
     if (!m_vbHandle) {
         // Meant: despite its words the step goes on without a handle.
         PLUGIN_LOG_FOR(LogModule::VIDEOBCAST, step, "m_vbHandle is NULL. Nothing to do, return. \n");

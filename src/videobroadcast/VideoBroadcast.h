@@ -24,7 +24,7 @@ struct StreamEventInfo {
     std::string eventName;
 };
 
-class VideoBroadcast : public PluginBase {
+class VideoBroadcast final : public PluginBase {
 public:
     // A new object at every call, listed and with the platform handle if there is one to be had.
     static VideoBroadcast* getInstance(NPP npp, unsigned short objectId);
@@ -157,7 +157,8 @@ private:
     void resetCurrentChannel(unsigned int channelHandle);
 
     static InstanceList VBInstanceList;
-    static std::atomic<bool> bCallbacksRegistered; // read where events are delivered, whichever thread that is
+    static std::atomic<bool>
+        bCallbacksRegistered; // read where events are delivered, whichever thread that is
 
     // One reference held of each.
     NPObject* m_jsObject = nullptr;

@@ -138,7 +138,8 @@ TELIX_RETCODE_ENUM_T streamEventHandler(TELIX_JS_VB_HANDLE vbHandle, ___UINT8*, 
     auto* event = new VideoBcastEvent;
     event->eventType = VBEvent_StreamEvent;
     event->vbInstance = videoBroadcast;
-    event->eventData = new (std::nothrow) StreamEventData(szEventName, szEventData, dataLength, szEventStatus);
+    event->eventData =
+        new (std::nothrow) StreamEventData(szEventName, szEventData, dataLength, szEventStatus);
     if (event->eventData) {
         queueEvent(__func__, vbHandle, event);
     }
@@ -190,7 +191,7 @@ struct ChannelChangeEvent {
 
 void deliverChannelChangeError(VideoBroadcast& videoBroadcast, const std::string&, void* payload) {
     const auto* event = static_cast<const ChannelChangeEvent*>(payload);
-    NPObject* handler = videoBroadcast.getOnChannelChangeError();             // left behind
+    NPObject* handler = videoBroadcast.getOnChannelChangeError();        // left behind
     NPObject* channel = videoBroadcast.getChannel(event->channelHandle); // left behind
     if (handler && channel) {
         NPVariant args[2]{};
@@ -247,7 +248,7 @@ struct ParentalRatingEvent {
 // Meant: both events call the handler of the change; the handler of the error is never called.
 void deliverParentalRating(VideoBroadcast& videoBroadcast, const std::string&, void* payload) {
     const auto* event = static_cast<const ParentalRatingEvent*>(payload);
-    NPObject* handler = videoBroadcast.getOnParentalRatingChange();                // left behind
+    NPObject* handler = videoBroadcast.getOnParentalRatingChange();              // left behind
     NPObject* rating = videoBroadcast.getParentalRatingObj(event->ratingHandle); // left behind
     if (!handler || !rating) {
         return;
@@ -399,9 +400,10 @@ int handleVideoBroadcastEvent(void* eventData) {
     const std::string id = isValidInst ? instance->getId() : std::string();
     // Meant: an element without an id gets neither DOM events nor calls of its handlers.
     if (id.empty()) {
-        PLUGIN_LOG(VIDEOBCAST,
-                   "Invalid VB Instance received or Id attribute is not present with object. isValidInst: %d\n",
-                   isValidInst);
+        PLUGIN_LOG(
+            VIDEOBCAST,
+            "Invalid VB Instance received or Id attribute is not present with object. isValidInst: %d\n",
+            isValidInst);
         delete event;
         return G_SOURCE_REMOVE; // left behind: the payload
     }
