@@ -3,11 +3,18 @@
 
 #include <glib.h>
 
+#include <thread>
+
 InstanceList::~InstanceList() {
     if (m_sweepSource) {
         g_source_remove(m_sweepSource);
     }
-    // Left behind: the published copy, which a platform thread may read to the very end.
+    m_replaced.emplace_back(m_published.exchange(nullptr));
+    // Whoever looks something up from here on finds an empty list; the last look-up before is over in no
+    // time.
+    while (m_readers.load() != 0) {
+        std::this_thread::yield();
+    }
 }
 
 VideoBroadcast* InstanceList::find(unsigned int handle) const {
