@@ -265,7 +265,8 @@ void AsxScanner::readParam() {
         std::vector<AsxParam>& params = m_entry ? m_entry->params : s_asxData.params;
         param = &params.emplace_back(AsxParam{std::string(text), {}});
     }
-    // Past the closing quote; a tag without a name loses a character here, which changes nothing.
+    // Past the closing quote. A tag without a name loses a character of its own, so "<PARAM />" isn't closed by
+    // itself: meant.
     if (*m_p) {
         ++m_p;
     }
