@@ -2,8 +2,10 @@
 #include "common/ObjectKind.h"
 
 #include "src/application/ApplicationManager.h"
+#include "src/parental/ParentalControlManager.h"
 
 const ObjectKind* const objectKinds[] = {
     &applicationManagerKind,
+    &parentalControlManagerKind,
     nullptr,
 };

@@ -5,7 +5,7 @@
 
 #include "common/PluginBase.h"
 
-class Application : public PluginBase {
+class Application final : public PluginBase {
 public:
     explicit Application(NPP npp);
     ~Application();

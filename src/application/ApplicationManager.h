@@ -14,7 +14,7 @@ struct ObjectKind;
 
 extern const ObjectKind applicationManagerKind;
 
-class ApplicationManager : public PluginBase {
+class ApplicationManager final : public PluginBase {
 public:
     // The manager of an instance; null if there is none.
     static ApplicationManager* sharedInstance(NPP npp);
