@@ -2,10 +2,12 @@
 #include "common/ObjectKind.h"
 
 #include "src/application/ApplicationManager.h"
+#include "src/avcontrol/AVControl.h"
 #include "src/parental/ParentalControlManager.h"
 
 const ObjectKind* const objectKinds[] = {
     &applicationManagerKind,
+    &avControlKind,
     &parentalControlManagerKind,
     nullptr,
 };

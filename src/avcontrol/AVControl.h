@@ -66,7 +66,7 @@ extern std::atomic<AVControl*> g_lastPlayedInstance;
 // The platform's last message, for telling a repeated one. Any thread.
 extern std::atomic<uint32_t> g_lastReceivedMessage;
 
-class AVControl : public PluginBase {
+class AVControl final : public PluginBase {
 public:
     // The platform's code of the one container whose streams have to be started anew to seek.
     static constexpr int32_t CONTAINER_MP3 = 2;
@@ -176,7 +176,12 @@ public:
 
 private:
     // What the player was told that it plays: `source` of the platform's codes.
-    enum source_code { SOURCE_ORDINARY = 6, SOURCE_ONE_SHOT = 7, SOURCE_SMOOTH_STREAMING = 23, SOURCE_HLS = 25 };
+    enum source_code {
+        SOURCE_ORDINARY = 6,
+        SOURCE_ONE_SHOT = 7,
+        SOURCE_SMOOTH_STREAMING = 23,
+        SOURCE_HLS = 25
+    };
 
     // Whether the browser has to deliver a stream before a clip from the network may play.
     enum stream_state { STREAM_NOT_REQUESTED = 0, STREAM_REQUESTED = 1, STREAM_READY = 2 };
@@ -256,14 +261,14 @@ private:
     int32_t m_audioCodecCode = 0;
     source_code m_sourceCode = SOURCE_ORDINARY;
     std::atomic<play_state> m_playState{PLAY_STATE_STOPPED};
-    std::string m_mimeType; // after the first bytes of a stream: its whole header text
+    std::string m_mimeType;      // after the first bytes of a stream: its whole header text
     bool m_downloadable = false; // stored; nothing reads it
     bool m_buffering = true;
-    bool m_playPending = false; // stored; nothing reads it
-    std::atomic<int32_t> m_workingAsyncCalls{0}; // state changes posted and not yet run
+    bool m_playPending = false;                     // stored; nothing reads it
+    std::atomic<int32_t> m_workingAsyncCalls{0};    // state changes posted and not yet run
     std::atomic<uint32_t> m_durationLast{0};        // milliseconds
     std::atomic<uint32_t> m_currentPositionLast{0}; // milliseconds
-    Area m_acceptedArea{}; // what the platform took last
+    Area m_acceptedArea{};                          // what the platform took last
     // Seconds of buffered media.
     uint32_t m_lowerLimit = 4;
     uint32_t m_upperLimit = 10;
