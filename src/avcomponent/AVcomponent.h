@@ -28,7 +28,6 @@ public:
     void setType(AVcompType_T type) { m_type = type; }
     void setObjType(AVcompObjType_T objType) { m_objType = objType; }
 
-    uint32_t getHandle() const { return m_handle; }
     AVcompType_T getType() const { return m_type; }
 
     // Each is the platform's first successful answer, for a text the first that isn't empty. Until then they
