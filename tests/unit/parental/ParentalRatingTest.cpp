@@ -291,6 +291,26 @@ TEST_F(ParentalRatingCollectionTest, EachRatingHasTwoReferencesAtTheOutsetAndOne
         << "from the last to the first";
 }
 
+TEST_F(ParentalRatingCollectionTest, HasItsFullLengthBeforeItsRatingsAreThere) {
+    const ObjectRef collection = make<JSParentalRatingCollection>();
+    static ParentalRatingCollection* filling;
+    static NPN_CreateObjectProcPtr create;
+    static std::vector<uint32_t> lengths;
+    filling = &modelOf<JSParentalRatingCollection>(collection);
+    create = browser.table().createobject;
+    lengths.clear();
+    browser.table().createobject = [](NPP npp, NPClass* objectClass) {
+        lengths.push_back(filling->getLength());
+        EXPECT_EQ(filling->getitem(1), nullptr);
+        return create(npp, objectClass);
+    };
+    const uint32_t handles[] = {8, 6};
+    filling->initializeParentalRatting(2, handles);
+    browser.table().createobject = create;
+    EXPECT_THAT(lengths, ElementsAre(2U, 2U));
+    ratingsLeftBehind += 2;
+}
+
 TEST_F(ParentalRatingCollectionTest, CreatesUntilTheBrowserMakesEveryRating) {
     browser.refuse("NPN_CreateObject", 3, 2); // after the collection and the first rating
     const ObjectRef collection = collectionOf({8, 6});
