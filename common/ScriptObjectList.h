@@ -52,6 +52,9 @@ public:
     // The entry with one reference added for the caller; null beyond the end.
     NPObject* item(uint32_t index) const { return index < reach() ? handOut(m_objects[index]) : nullptr; }
 
+    // The wrapper of an entry, which stays the list's; `index` is below the length.
+    Wrapper& wrapperAt(uint32_t index) const { return *wrapperOf<Wrapper>(m_objects[index]); }
+
     // The first entry whose model passes `test`, with one reference added for the caller; null if none does.
     template <class Test>
     NPObject* find(Test test) const {

@@ -23,6 +23,7 @@ public:
     explicit AVcomponent(NPP npp);
 
     // 0 means no handle: the platform is never asked.
+    uint32_t getHandle() const { return m_handle; }
     void setHandle(uint32_t handle) { m_handle = handle; }
     void setType(AVcompType_T type) { m_type = type; }
     void setObjType(AVcompObjType_T objType) { m_objType = objType; }

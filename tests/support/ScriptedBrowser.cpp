@@ -180,8 +180,9 @@ struct BrowserTable {
     }
 
     static void* memAlloc(uint32_t size) {
-        return browser().enter("NPN_MemAlloc", [&] { return std::to_string(size); }) ? browser().newBlock(size)
-                                                                                     : nullptr;
+        return browser().enter("NPN_MemAlloc", [&] { return std::to_string(size); })
+                   ? browser().newBlock(size)
+                   : nullptr;
     }
 
     static void memFree(void* block) {
@@ -213,7 +214,8 @@ struct BrowserTable {
                    : NPERR_GENERIC_ERROR;
     }
 
-    static NPError postUrlNotify(NPP, const char* url, const char* target, uint32_t, const char*, NPBool, void*) {
+    static NPError postUrlNotify(NPP, const char* url, const char* target, uint32_t, const char*, NPBool,
+                                 void*) {
         return browser().enter("NPN_PostURLNotify", [&] { return quoted(url) + " " + quoted(target); })
                    ? NPERR_NO_ERROR
                    : NPERR_GENERIC_ERROR;
@@ -300,7 +302,8 @@ struct BrowserTable {
     // Null for an integer. The block is the plug-in's, to be freed with free().
     static char* utf8FromIdentifier(NPIdentifier identifier) {
         const auto& known = *static_cast<Identifier*>(identifier);
-        const bool allowed = browser().enter("NPN_UTF8FromIdentifier", [&] { return ScriptedBrowser::textOf(identifier); });
+        const bool allowed =
+            browser().enter("NPN_UTF8FromIdentifier", [&] { return ScriptedBrowser::textOf(identifier); });
         return allowed && known.isString ? strdup(known.text.c_str()) : nullptr;
     }
 
@@ -368,7 +371,8 @@ struct BrowserTable {
         return object->_class->invoke(object, method, args, argCount, result);
     }
 
-    static bool invokeDefault(NPP, NPObject* object, const NPVariant* args, uint32_t argCount, NPVariant* result) {
+    static bool invokeDefault(NPP, NPObject* object, const NPVariant* args, uint32_t argCount,
+                              NPVariant* result) {
         Value().giveTo(*result);
         if (!browser().enter("NPN_InvokeDefault", [&] { return name(object) + list(args, argCount); })) {
             return false;
@@ -401,7 +405,8 @@ struct BrowserTable {
 
     static bool setProperty(NPP, NPObject* object, NPIdentifier property, const NPVariant* value) {
         if (!browser().enter("NPN_SetProperty", [&] {
-                return name(object) + "." + ScriptedBrowser::textOf(property) + " = " + listOf({Value::copyOf(*value)});
+                return name(object) + "." + ScriptedBrowser::textOf(property) + " = " +
+                       listOf({Value::copyOf(*value)});
             })) {
             return false;
         }
@@ -469,7 +474,8 @@ struct BrowserTable {
         target.m_asyncCalls.push_back({function, data});
     }
 
-    static bool construct(NPP, NPObject* object, const NPVariant* args, uint32_t argCount, NPVariant* result) {
+    static bool construct(NPP, NPObject* object, const NPVariant* args, uint32_t argCount,
+                          NPVariant* result) {
         Value().giveTo(*result);
         return browser().enter("NPN_Construct", [&] { return name(object) + list(args, argCount); }) &&
                browser().isLive(object, "NPN_Construct") && object->_class->construct &&
@@ -486,8 +492,8 @@ struct BrowserTable {
         return NPERR_GENERIC_ERROR;
     }
 
-    static NPError getAuthenticationInfo(NPP, const char*, const char*, int32_t, const char*, const char*, char**,
-                                         uint32_t*, char**, uint32_t*) {
+    static NPError getAuthenticationInfo(NPP, const char*, const char*, int32_t, const char*, const char*,
+                                         char**, uint32_t*, char**, uint32_t*) {
         browser().enter("NPN_GetAuthenticationInfo");
         return NPERR_GENERIC_ERROR;
     }
@@ -646,7 +652,8 @@ NPError ScriptedBrowser::shutdown() {
     return NP_Shutdown();
 }
 
-EmbeddedObject ScriptedBrowser::embed(const std::string& mimeType, const Attributes& attributes, uint16_t mode) {
+EmbeddedObject ScriptedBrowser::embed(const std::string& mimeType, const Attributes& attributes,
+                                      uint16_t mode) {
     const EmbeddedObject object(std::make_shared<EmbeddedObject::Record>());
     m_instances.push_back(object.m_record);
 
@@ -669,8 +676,9 @@ EmbeddedObject ScriptedBrowser::embed(const std::string& mimeType, const Attribu
     element.method("removeEventListener", [](const Values&) { return Value(); });
 
     std::string type = mimeType;
-    object.m_record->error = m_plugin.newp(type.data(), object.npp(), mode, static_cast<int16_t>(attributes.size()),
-                                           names.data(), values.data(), nullptr);
+    object.m_record->error =
+        m_plugin.newp(type.data(), object.npp(), mode, static_cast<int16_t>(attributes.size()), names.data(),
+                      values.data(), nullptr);
     return object;
 }
 
@@ -767,8 +775,8 @@ std::vector<LiveObject> ScriptedBrowser::liveObjects() const {
     std::vector<std::pair<unsigned, LiveObject>> numbered;
     for (const auto& [object, account] : m_accounts) {
         numbered.push_back({account.serial,
-                            {object, account.name, account.className, static_cast<int>(object->referenceCount),
-                             pluginReferences(object)}});
+                            {object, account.name, account.className,
+                             static_cast<int>(object->referenceCount), pluginReferences(object)}});
     }
     std::sort(numbered.begin(), numbered.end(),
               [](const auto& left, const auto& right) { return left.first < right.first; });

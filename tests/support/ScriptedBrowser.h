@@ -86,7 +86,8 @@ public:
     NPPluginFuncs& plugin() { return m_plugin; }
 
     // NPP_New for an element with these attributes. Its id, if it has one, is in the attributes.
-    EmbeddedObject embed(const std::string& mimeType, const Attributes& attributes = {}, uint16_t mode = NP_EMBED);
+    EmbeddedObject embed(const std::string& mimeType, const Attributes& attributes = {},
+                         uint16_t mode = NP_EMBED);
 
     // The page.
     ScriptObject window() const { return m_window; }

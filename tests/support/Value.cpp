@@ -75,7 +75,8 @@ bool ObjectRef::hasProperty(const Name& name) const {
 }
 
 bool ObjectRef::hasMethod(const Name& name) const {
-    return m_object && m_object->_class->hasMethod && m_object->_class->hasMethod(m_object, name.identifier());
+    return m_object && m_object->_class->hasMethod &&
+           m_object->_class->hasMethod(m_object, name.identifier());
 }
 
 namespace {
@@ -103,8 +104,8 @@ Outcome ObjectRef::get(const Name& name) const {
     const ObjectRef kept = *this;
     const bool exists = hasProperty(name);
     NPVariant result = voidVariant;
-    const bool succeeded = m_object->_class->getProperty &&
-                           m_object->_class->getProperty(m_object, name.identifier(), &result);
+    const bool succeeded =
+        m_object->_class->getProperty && m_object->_class->getProperty(m_object, name.identifier(), &result);
     return finish(exists, succeeded, result);
 }
 
@@ -131,8 +132,9 @@ Outcome ObjectRef::callWith(const Name& name, const Values& arguments) const {
     const bool exists = hasMethod(name);
     const ArgumentArray array(arguments);
     NPVariant result = voidVariant;
-    const bool succeeded = m_object->_class->invoke && m_object->_class->invoke(m_object, name.identifier(), array.data(),
-                                                                                array.count(), &result);
+    const bool succeeded =
+        m_object->_class->invoke &&
+        m_object->_class->invoke(m_object, name.identifier(), array.data(), array.count(), &result);
     return finish(exists, succeeded, result);
 }
 
@@ -230,7 +232,8 @@ void Value::giveTo(NPVariant& variant) const {
         break;
     case NPVariantType_String: {
         const std::string text = string();
-        variant.value.stringValue = {ScriptedBrowser::current().newBlockOf(text), static_cast<uint32_t>(text.size())};
+        variant.value.stringValue = {ScriptedBrowser::current().newBlockOf(text),
+                                     static_cast<uint32_t>(text.size())};
         break;
     }
     case NPVariantType_Object:
@@ -316,7 +319,8 @@ std::ostream& operator<<(std::ostream& stream, const Outcome& outcome) {
 }
 
 ArgumentArray::ArgumentArray(const Values& values)
-    : m_variants(values.size() + paddingVariants, voidVariant), m_count(static_cast<uint32_t>(values.size())) {
+    : m_variants(values.size() + paddingVariants, voidVariant),
+      m_count(static_cast<uint32_t>(values.size())) {
     for (size_t i = 0; i < values.size(); ++i) {
         NPVariant& variant = m_variants[i];
         variant.type = values[i].type();
