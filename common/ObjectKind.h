@@ -1,5 +1,6 @@
 // What the plug-in shell has to know of a kind of embedded object: which MIME types make it, how it is made
-// and unmade, and which calls of the browser it sees. Each kind is described beside its model.
+// and unmade, and which calls of the browser it sees. Each kind is described beside its model; a null means
+// that the kind has no such thing.
 #ifndef TELIX_COMMON_OBJECTKIND_H
 #define TELIX_COMMON_OBJECTKIND_H
 
@@ -31,7 +32,6 @@ struct ObjectKind {
     PluginBase* (*create)(NPP npp, unsigned short id);
     // Deletes the model through its concrete class.
     void (*dispose)(PluginBase* model);
-    // The rest may be null.
     NPError (*init)(PluginBase& model, const InstanceArguments& arguments); // PluginBase::init if null
     bool (*deferDestruction)(PluginBase& model); // true: the model sees to its own end, on a later turn
     NPError (*setWindow)(PluginBase& model, const NPWindow* window);

@@ -1,0 +1,16 @@
+#!/usr/bin/env bash
+# Runs all tests: the unit tests with AddressSanitizer and UndefinedBehaviorSanitizer, then everything as shipped.
+# Installs what is missing and builds what has changed.
+set -euo pipefail
+cd "$(dirname "${BASH_SOURCE[0]}")"
+
+tools/install-packages.sh run test
+jobs=$(nproc)
+
+cmake --preset asan >/dev/null
+cmake --build --preset asan -- -k 0
+cmake --preset release -DTELIX_BUILD_TESTS=ON -DTELIX_BUILD_BENCH=ON -DTELIX_BUILD_DESKTOP=ON >/dev/null
+cmake --build --preset release -- -k 0
+
+ctest --preset asan -j "$jobs" --output-on-failure
+ctest --preset release -j "$jobs" --output-on-failure

@@ -1,0 +1,44 @@
+#!/usr/bin/env bash
+# Installs the Debian packages that the named purposes need and that are not there yet.
+# Usage: tools/install-packages.sh run|test ...
+set -euo pipefail
+
+packages=(build-essential cmake ninja-build pkg-config libglib2.0-dev)
+for purpose in "$@"; do
+    case "$purpose" in
+    run)
+        packages+=(qtbase5-dev libqt5webkit5-dev fonts-dejavu-core xvfb xauth)
+        ;;
+    test)
+        packages+=(libgtest-dev libgmock-dev libbenchmark-dev libexpat1-dev clang-14 libclang-rt-14-dev
+            clang-format-14 clang-tidy-14 python3 binutils util-linux)
+        ;;
+    *)
+        echo "$0: unknown purpose '$purpose' (run, test)" >&2
+        exit 2
+        ;;
+    esac
+done
+
+missing=()
+for package in "${packages[@]}"; do
+    if [ "$(dpkg-query -W -f '${db:Status-Status}' "$package" 2>/dev/null)" != installed ]; then
+        missing+=("$package")
+    fi
+done
+[ ${#missing[@]} -gt 0 ] || exit 0
+
+if ! command -v apt-get >/dev/null; then
+    echo "These packages are missing, and this is no Debian machine: ${missing[*]}" >&2
+    exit 2
+elif [ "$(id -u)" -eq 0 ]; then
+    as_root=()
+elif command -v sudo >/dev/null; then
+    as_root=(sudo)
+else
+    echo "These packages are missing, and neither root nor sudo is at hand: ${missing[*]}" >&2
+    exit 2
+fi
+echo "Installing: ${missing[*]}"
+"${as_root[@]}" apt-get update -q
+"${as_root[@]}" env DEBIAN_FRONTEND=noninteractive apt-get install -q -y --no-install-recommends "${missing[@]}"
