@@ -1,0 +1,35 @@
+// The script interface of an A/V component.
+#include "src/avcomponent/JSAVcomponent.h"
+
+namespace {
+
+// Meant: texts come from the C heap, and an empty one is a text of length 0, not null.
+template <std::string (AVcomponent::*Getter)()>
+bool readText(PluginBase& model, NPVariant& result) {
+    setDuplicatedText(result, (static_cast<AVcomponent&>(model).*Getter)());
+    return true;
+}
+
+// Two decimals.
+bool readAspectRatio(PluginBase& model, NPVariant& result) {
+    const double ratio = static_cast<AVcomponent&>(model).getAspectRatio();
+    setResult(result, toUint32(ratio * 100.0 + 0.5) / 100.0);
+    return true;
+}
+
+constexpr ScriptMember kMembers[] = {
+    property("type", read<&AVcomponent::getType>),
+    property("encoding", readText<&AVcomponent::getEncoding>),
+    property("encrypted", read<&AVcomponent::getEncrypted>),
+    property("aspectRatio", readAspectRatio),
+    property("language", readText<&AVcomponent::getLanguage>),
+    property("audioDescription", read<&AVcomponent::getAudioDescription>),
+    property("audioChannels", read<&AVcomponent::getAudioChannels>),
+    property("hearingImpaired", read<&AVcomponent::getHearingImpaired>),
+};
+
+constexpr ScriptClass kClass("JSAVcomponent", LogModule::AV_COMP, kMembers);
+
+} // namespace
+
+JSAVcomponent::JSAVcomponent(NPP npp) : SubObjectWrapper(npp, kClass) {}

@@ -1,0 +1,329 @@
+// The A/V control object: its kind, its creation and its end, the display area and the play report.
+#include "src/avcontrol/AVControl.h"
+
+#include <strings.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <cstdlib>
+#include <vector>
+
+#include "common/Log.h"
+#include "common/ObjectKind.h"
+#include "common/PluginUtils.h"
+#include "common/ScriptReferences.h"
+#include "src/avcontrol/JSAVControl.h"
+
+namespace {
+
+const char* const kMimeTypes[] = {"audio/mpeg",
+                                  "video/mp4",
+                                  "video/mpeg",
+                                  "audio/mp4",
+                                  "video/mpeg4",
+                                  "video/x-ms-ism",
+                                  "application/vnd.ms-sstr+xml",
+                                  "application/vnd.apple.mpegurl",
+                                  "audio/mpegurl",
+                                  nullptr};
+
+constexpr int kScreenWidth = 1280;
+constexpr int kScreenHeight = 720;
+constexpr int kMaxDestructionWaits = 3;
+constexpr uint32_t kLeastReportedDuration = 1000; // milliseconds
+
+// Every object there is, for the steps that arrive late. Browser thread only.
+std::vector<const AVControl*> liveObjects;
+
+AVControl& controlOf(PluginBase& model) {
+    return static_cast<AVControl&>(model);
+}
+
+const StreamOperations kStreamOperations = {
+    [](PluginBase& model, NPMIMEType type, NPStream* stream, NPBool seekable, uint16_t* stype) {
+        return controlOf(model).newStream(type, stream, seekable, stype);
+    },
+    [](PluginBase& model, NPStream* stream, NPReason reason) {
+        return controlOf(model).destroyStream(stream, reason);
+    },
+    [](PluginBase& model, NPStream* stream) { return controlOf(model).writeReady(stream); },
+    [](PluginBase& model, NPStream* stream, int32_t offset, int32_t length, void* buffer) {
+        return controlOf(model).write(stream, offset, length, buffer);
+    },
+    [](PluginBase& model, const char* url, NPReason reason, void* notifyData) {
+        controlOf(model).urlNotify(url, reason, notifyData);
+    }};
+
+// From one edge to the other, whatever a page gives for them.
+int32_t distance(int32_t from, int32_t to) {
+    return static_cast<int32_t>(static_cast<uint32_t>(to) - static_cast<uint32_t>(from));
+}
+
+// The length of a clip. Meant: a clip of less than an hour leaves the hours of an earlier one, and one that
+// is not longer than a second leaves all three.
+struct ReportedLength {
+    std::atomic<int> hours{0};
+    std::atomic<int> minutes{0};
+    std::atomic<int> seconds{0};
+
+    void take(uint32_t milliseconds) {
+        if (milliseconds <= kLeastReportedDuration) {
+            return;
+        }
+        const div_t bySeconds = std::div(static_cast<int>(milliseconds / 1000), 60);
+        seconds = bySeconds.rem;
+        if (bySeconds.quot < 60) {
+            minutes = bySeconds.quot;
+            return;
+        }
+        const div_t byMinutes = std::div(bySeconds.quot, 60);
+        minutes = byMinutes.rem;
+        hours = byMinutes.quot;
+    }
+};
+
+ReportedLength reportedLength;
+
+} // namespace
+
+const ObjectKind avControlKind = [] {
+    ObjectKind kind{};
+    kind.id = 300;
+    kind.destroyText = "AVCONTROL_OBJ_ID delete :: %p \n";
+    kind.mimeTypes = kMimeTypes;
+    kind.create = [](NPP npp, unsigned short id) -> PluginBase* { return new AVControl(npp, id); };
+    kind.dispose = disposeOf<AVControl>;
+    kind.init = [](PluginBase& model, const InstanceArguments& given) {
+        return controlOf(model).initAV(given.mode, given.argc, given.argn, given.argv, given.mimeType);
+    };
+    kind.deferDestruction = [](PluginBase& model) { return controlOf(model).destroyAV() != 0; };
+    kind.setWindow = [](PluginBase& model, const NPWindow* window) {
+        return controlOf(model).setWindow(window, false);
+    };
+    kind.streams = &kStreamOperations;
+    return kind;
+}();
+
+std::atomic<AVControl*> g_lastPlayedInstance{nullptr};
+
+AVControl::AVControl(NPP npp, unsigned short objectKind)
+    : PluginBase(npp, objectKind), m_mainThread(pthread_self()) {
+    liveObjects.push_back(this);
+    if (const char* limit = std::getenv("PLUGIN_BUFFERING_LOWER_LIMIT")) {
+        m_lowerLimit = static_cast<uint32_t>(std::atoi(limit));
+        PLUGIN_LOG(AVCONTROL, "Lower limit obtained from system: %u", m_lowerLimit);
+    } else {
+        PLUGIN_LOG(AVCONTROL, "Lower limit obtained from default value %u", m_lowerLimit);
+    }
+    if (const char* limit = std::getenv("PLUGIN_BUFFERING_UPPER_LIMIT")) {
+        m_upperLimit = static_cast<uint32_t>(std::atoi(limit));
+        PLUGIN_LOG(AVCONTROL, "Upper limit obtained from system: %u", m_upperLimit);
+    } else {
+        PLUGIN_LOG(AVCONTROL, "Upper limit obtained from default value %u", m_upperLimit);
+    }
+}
+
+AVControl::~AVControl() {
+    PLUGIN_LOG(AVCONTROL, " Exiting\n");
+    TELIX_JS_AV_UnregisterOnPlayStateChange(onPlayStateChangeCb);
+    TELIX_JS_AV_UnregisterOnDRMRightsError(onDRMRightsErrorCb);
+    for (int i = 0; i < kMaxDestructionWaits && m_workingAsyncCalls != 0; ++i) {
+        sleep(1);
+    }
+    endMonitors();
+    // A clip that began after destroyAV() was a change of state already posted then.
+    AVControl* self = this;
+    g_lastPlayedInstance.compare_exchange_strong(self, nullptr);
+    releaseHeld(m_onPlayStateChange);
+    releaseHeld(m_onPlaySpeedChanged);
+    releaseHeld(m_onPlayPositionChanged);
+    releaseHeld(m_jsObject);
+    releaseHeld(m_videoComponents);
+    releaseHeld(m_audioComponents);
+    releaseHeld(m_subtitleComponents);
+    releaseHeld(m_onDRMRightsError);
+    std::free(m_bodyData);
+    liveObjects.erase(std::remove(liveObjects.begin(), liveObjects.end(), this), liveObjects.end());
+}
+
+NPError AVControl::initAV(unsigned short mode, int argc, char** argn, char** argv, char* mimeType) {
+    const NPError rv = init(mode, argc, argn, argv);
+    setObjectStyle("url(tv:)");
+    if (rv == NPERR_NO_ERROR) {
+        m_mimeType = mimeType;
+        for (int i = 0; i < argc; ++i) {
+            if (argn[i]) {
+                readAttribute(argn[i], argv[i] ? argv[i] : "");
+            }
+        }
+        if (getPluginMode() == NP_FULL) {
+            openPlayerPage();
+            return NPERR_NO_ERROR;
+        }
+        lookAtMedia(mimeType);
+    }
+    if (TELIX_JS_AV_CreatePlayer(&m_playerHandle, m_containerCode, m_audioCodecCode, m_memoryAudio) != 0) {
+        return NPERR_GENERIC_ERROR;
+    }
+    PLUGIN_LOG(AVCONTROL, "TELIX_JS_AV_CreatePlayer returned the PlayerHandle:: %d ", m_playerHandle);
+    TELIX_JS_AV_RegisterOnPlayStateChange(m_playerHandle, onPlayStateChangeCb);
+    TELIX_JS_AV_RegisterOnDRMRightsError(m_playerHandle, onDRMRightsErrorCb);
+    return rv;
+}
+
+void AVControl::readAttribute(const char* name, const char* value) {
+    const auto named = [name](const char* wanted) { return strcasecmp(name, wanted) == 0; };
+    const auto saying = [value](const char* wanted) { return strcasecmp(value, wanted) == 0; };
+    if (named("downloadable") && saying("true")) {
+        m_downloadable = true;
+    } else if (named("buffering") && saying("false")) {
+        m_buffering = false;
+    } else if (named("bufferingLowerLimit")) {
+        m_lowerLimit = static_cast<uint32_t>(std::atoi(value));
+    } else if (named("bufferingUpperLimit")) {
+        m_upperLimit = static_cast<uint32_t>(std::atoi(value));
+    } else if (named("playCount")) {
+        m_playCount = static_cast<uint32_t>(std::atoi(value));
+    } else if (named("data")) {
+        m_fetchStream = false;
+        setData(value);
+    } else if (named("src1") || (named("oneshot_url") && saying("true"))) {
+        m_sourceCode = SOURCE_ONE_SHOT;
+        m_fetchStream = false;
+        m_streamState = STREAM_READY;
+    }
+}
+
+void AVControl::openPlayerPage() {
+    const char* page = std::getenv("PLUGIN_PLAYER_URL");
+    // The address goes in as it is, without escaping.
+    const std::string url = std::string(page ? page : "file:///mnt/browser/pages/player/index.html") +
+                            "?qv_media_url=" + getURL();
+    if (NPN_GetURL(m_npp, url.c_str(), "_self") != NPERR_NO_ERROR) {
+        PLUGIN_LOG_FOR(LogModule::AVCONTROL, "initAV", "NPN_GetURL failed for URL:: %s ", url.c_str());
+    }
+}
+
+void AVControl::lookAtMedia(const std::string& mimeType) {
+    detectMediaType(mimeType);
+    if (m_mediaType == 0) {
+        return;
+    }
+    const std::string url = getURL();
+    if (m_fetchStream && url.rfind("http://", 0) == 0) {
+        getURLValue(url);
+    } else {
+        NPN_PluginThreadAsyncCall(m_npp, startMediaCb, this);
+    }
+}
+
+// Playback itself starts from script only, or from the end of a playlist's stream.
+void AVControl::startMediaCb(void* object) {
+    PLUGIN_LOG(AVCONTROL, "Instance: %p \n", object);
+}
+
+int AVControl::destroyAV() {
+    PLUGIN_LOG(AVCONTROL, "Data: %s, PlayerHandle: %u, g_lastPlayedInstance: %p, This: %p \n", m_data.c_str(),
+               m_playerHandle, static_cast<void*>(g_lastPlayedInstance), static_cast<void*>(this));
+    setPluginState(PLUGIN_STATE_DESTROYING);
+    destroyBufferingThread();
+    if (m_playerHandle && m_mediaType != 0) {
+        TELIX_JS_AV_Stop(m_playerHandle);
+        TELIX_JS_AV_DestroyPlayer(m_playerHandle);
+        if (g_lastPlayedInstance == this) {
+            g_lastPlayedInstance = nullptr;
+        }
+    }
+    NPN_PluginThreadAsyncCall(m_npp, destroyMediaCB, this);
+    return 1;
+}
+
+void AVControl::destroyMediaCB(void* object) {
+    delete static_cast<AVControl*>(object);
+}
+
+bool AVControl::isAlive(const AVControl* object) {
+    return std::find(liveObjects.begin(), liveObjects.end(), object) != liveObjects.end();
+}
+
+bool AVControl::isBrowserThread() const {
+    return pthread_self() == m_mainThread;
+}
+
+NPObject* AVControl::getJSObject() {
+    return handOutOnce<JSAVControl>(m_npp, m_jsObject);
+}
+
+NPError AVControl::setWindow(const NPWindow*, bool forceReset) {
+    setPluginRegionFromDOM();
+    if (m_mediaType == 0) {
+        return NPERR_NO_ERROR;
+    }
+    const auto region = [this] { return Area{m_regionX, m_regionY, m_width, m_height}; };
+    // Full screen is 1280 by 720 whatever the screen.
+    Area area = isFullScreen() ? Area{0, 0, kScreenWidth, kScreenHeight} : region();
+    if (area == Area{}) {
+        setPluginRegionFromDOM();
+        area = region();
+        if (area.width == kScreenWidth && area.height == kScreenHeight) {
+            area.x = 0;
+            area.y = 0;
+        }
+    }
+    if (!m_playerHandle || (!forceReset && area == m_acceptedArea)) {
+        return NPERR_NO_ERROR;
+    }
+    NPRect rectangle{};
+    rectangle.top = static_cast<uint16_t>(area.y);
+    rectangle.left = static_cast<uint16_t>(area.x);
+    rectangle.bottom = static_cast<uint16_t>(area.y + area.height);
+    rectangle.right = static_cast<uint16_t>(area.x + area.width);
+    NPN_InvalidateRect(m_npp, &rectangle);
+    const TELIX_JS_DISPLAY_AREA shown{static_cast<uint16_t>(area.x), static_cast<uint16_t>(area.y),
+                                      static_cast<uint16_t>(area.width), static_cast<uint16_t>(area.height)};
+    if (TELIX_JS_AV_SetDisplayArea(m_playerHandle, &shown) == 0) {
+        m_acceptedArea = area;
+    }
+    return NPERR_NO_ERROR;
+}
+
+void AVControl::setPluginRegionFromDOM() {
+    NPVariant rectangle{};
+    if (!NPN_Invoke(m_npp, getNPPluginObj(), NPN_GetStringIdentifier("getBoundingClientRect"), nullptr, 0,
+                    &rectangle)) {
+        return;
+    }
+    if (rectangle.type == NPVariantType_Object) {
+        // An edge that can't be read leaves what depends on it as it was.
+        const auto readEdge = [&](const char* name, auto store) {
+            NPVariant edge{};
+            if (NPN_GetProperty(m_npp, rectangle.value.objectValue, NPN_GetStringIdentifier(name), &edge)) {
+                store(toInt32(numberValue(edge)));
+                NPN_ReleaseVariantValue(&edge);
+            }
+        };
+        readEdge("left", [this](int32_t left) { m_regionX = left; });
+        readEdge("top", [this](int32_t top) { m_regionY = top; });
+        readEdge("right", [this](int32_t right) { m_width = distance(m_regionX, right); });
+        readEdge("bottom", [this](int32_t bottom) { m_height = distance(m_regionY, bottom); });
+    }
+    NPN_ReleaseVariantValue(&rectangle);
+}
+
+void AVControl::printMonitoringInfo(int kind) {
+    if (kind == 1 && m_playerHandle) {
+        TELIX_JS_AV_PLAY_INFO* info = nullptr; // stays the platform's
+        if (TELIX_JS_AV_GetPlayInfo(m_playerHandle, &info) == 0 && info) {
+            PLUGIN_LOG(AVCONTROL, "TELIX_JS_AV_GetPlayInfo -(state:%d, duration:%d, playPosition:%d)",
+                       info->state, info->duration, info->playPosition);
+            reportedLength.take(info->duration);
+        }
+        PLUGIN_LOG(AVCONTROL, "<Play><Status>Start</Status><File>%s,%02d:%02d:%02d</File></Play>",
+                   currentMedia().c_str(), reportedLength.hours.load(), reportedLength.minutes.load(),
+                   reportedLength.seconds.load());
+    } else if (kind == 2) {
+        PLUGIN_LOG(AVCONTROL, "<Play><Status>End</Status><File>%s,%02d:%02d:%02d</File></Play>",
+                   currentMedia().c_str(), reportedLength.hours.load(), reportedLength.minutes.load(),
+                   reportedLength.seconds.load());
+    }
+}

@@ -1,0 +1,154 @@
+// The script listeners, the notices of a new speed and position, and the way of a DRM rights error from the
+// platform to the page.
+#include <glib.h>
+
+#include <cstdlib>
+#include <cstring>
+
+#include "common/Log.h"
+#include "common/PluginUtils.h"
+#include "common/ScriptReferences.h"
+#include "common/ScriptValues.h"
+#include "src/avcontrol/AVControl.h"
+
+namespace {
+
+// A rights error on its way to the browser thread, with copies of the platform's texts.
+class DRMRgtsErrEvtData {
+public:
+    // The texts must not be null. Without memory a text and those after it stay null.
+    DRMRgtsErrEvtData(unsigned int handle, TELIX_AV_DRM_ERR_STATE_ENUM_T state, const char* contentId,
+                      const char* drmSystemId, const char* rightsIssuerUrl)
+        : m_playerHandle(handle), m_errorState(state) {
+        const char* const texts[] = {contentId, drmSystemId, rightsIssuerUrl};
+        for (size_t i = 0; i < kTexts && (m_texts[i] = strdup(texts[i])); ++i) {
+        }
+    }
+    DRMRgtsErrEvtData(const DRMRgtsErrEvtData&) = delete;
+    DRMRgtsErrEvtData& operator=(const DRMRgtsErrEvtData&) = delete;
+    ~DRMRgtsErrEvtData() {
+        for (char*& text : m_texts) {
+            std::free(text);
+            text = nullptr;
+        }
+    }
+
+    static constexpr size_t kTexts = 3;
+
+    TELIX_AV_DRM_ERR_STATE_ENUM_T errorState() const { return m_errorState; }
+    // Content id, DRM system id, rights issuer URL.
+    const char* text(size_t index) const { return m_texts[index]; }
+
+private:
+    const unsigned int m_playerHandle; // selects nothing: the event is the last played object's
+    const TELIX_AV_DRM_ERR_STATE_ENUM_T m_errorState;
+    char* m_texts[kTexts] = {};
+};
+
+int handleDRMRightsErrorEvent(void* record) {
+    PLUGIN_LOG(DRMAGENT, " handleDRMRightsErrorEvent \n");
+    AVControl* instance = g_lastPlayedInstance;
+    auto* event = static_cast<DRMRgtsErrEvtData*>(record);
+    if (!instance || !event) {
+        return G_SOURCE_REMOVE; // meant: the record is left behind
+    }
+    // A control that plays must have an id for this.
+    instance->invokeJScript(domEventScript(instance->getId(), "DRMRightsError", false, false));
+    // Meant: the getter's reference is left behind, and the texts stay with whoever took the arguments.
+    if (NPObject* listener = instance->getOnDRMRightsError()) {
+        NPVariant arguments[1 + DRMRgtsErrEvtData::kTexts] = {};
+        setResult(arguments[0], event->errorState());
+        for (size_t i = 0; i < DRMRgtsErrEvtData::kTexts; ++i) {
+            const char* text = event->text(i);
+            NPVariant& argument = arguments[1 + i];
+            if (!text || !setText(argument, text, std::strlen(text))) {
+                setNull(argument);
+            }
+        }
+        instance->invokeJScriptFunc(listener, arguments, 1 + DRMRgtsErrEvtData::kTexts);
+    }
+    delete event;
+    return G_SOURCE_REMOVE;
+}
+
+const char* textOf(const unsigned char* bytes) {
+    return reinterpret_cast<const char*>(bytes);
+}
+
+} // namespace
+
+int AVControl::onDRMRightsErrorCb(unsigned int handle, TELIX_AV_DRM_ERR_STATE_ENUM_T state,
+                                  unsigned char* contentId, unsigned char* drmSystemId,
+                                  unsigned char* rightsIssuerUrl) {
+    PLUGIN_LOG(DRMAGENT,
+               " Received Callback from system. Player Handle: %u, Error State: (%u), Content Id: (%s), DRM "
+               "System Id: (%s),  RightsIssuerURL: (%s) \n",
+               handle, state, textOf(contentId), textOf(drmSystemId), textOf(rightsIssuerUrl));
+    g_idle_add(handleDRMRightsErrorEvent,
+               new DRMRgtsErrEvtData(handle, state, textOf(contentId), textOf(drmSystemId),
+                                     textOf(rightsIssuerUrl)));
+    return 0;
+}
+
+void AVControl::setOnPlayStateChange(NPObject* listener) {
+    replaceListener(m_onPlayStateChange, listener);
+}
+
+void AVControl::setOnFullScreenChange(NPObject* listener) {
+    replaceListener(m_onFullScreenChange, listener);
+}
+
+void AVControl::setOnPlaySpeedChanged(NPObject* listener) {
+    replaceListener(m_onPlaySpeedChanged, listener);
+}
+
+void AVControl::setOnPlayPositionChanged(NPObject* listener) {
+    replaceListener(m_onPlayPositionChanged, listener);
+}
+
+void AVControl::setOnDRMRightsError(NPObject* listener) {
+    replaceListener(m_onDRMRightsError, listener);
+}
+
+NPObject* AVControl::getOnPlayStateChange() {
+    return handOut(m_onPlayStateChange);
+}
+
+NPObject* AVControl::getOnFullScreenChange() {
+    return handOut(m_onFullScreenChange);
+}
+
+NPObject* AVControl::getOnPlaySpeedChanged() {
+    return handOut(m_onPlaySpeedChanged);
+}
+
+NPObject* AVControl::getOnPlayPositionChanged() {
+    return handOut(m_onPlayPositionChanged);
+}
+
+NPObject* AVControl::getOnDRMRightsError() {
+    return handOut(m_onDRMRightsError);
+}
+
+void AVControl::handlePlaySpeedChanged() {
+    if (m_onPlaySpeedChanged) {
+        invokeJScriptFunc(m_onPlaySpeedChanged, nullptr, 0);
+    }
+}
+
+void AVControl::handlePlayPositionChanged() {
+    if (!isBrowserThread()) {
+        NPN_PluginThreadAsyncCall(m_npp, playPositionChangedCb, this);
+        return;
+    }
+    if (m_onPlayPositionChanged) {
+        invokeJScriptFunc(m_onPlayPositionChanged, nullptr, 0);
+    }
+}
+
+void AVControl::playPositionChangedCb(void* object) {
+    auto* control = static_cast<AVControl*>(object);
+    if (isAlive(control)) {
+        control->handlePlayPositionChanged();
+    }
+}

@@ -1,0 +1,253 @@
+// Play state and ready state: the way of a platform message to the browser thread, what it means, and how a
+// change of state reaches the page.
+#include <glib.h>
+
+#include <cstdlib>
+
+#include "common/BrowserGates.h"
+#include "common/Log.h"
+#include "common/PluginUtils.h"
+#include "src/avcontrol/AVControl.h"
+#include "src/avcontrol/Asx.h"
+
+std::atomic<uint32_t> g_lastReceivedMessage{0};
+
+namespace {
+
+// A platform message on its way to the browser thread.
+struct AVPlayStateEvent {
+    unsigned int playerHandle = 0;
+    TELIX_AV_CB_MSG message = 0;
+};
+
+// A change of state on its way to the browser thread; a block of malloc.
+struct PlayStateChange {
+    AVControl* object;
+    play_state from;
+    play_state to;
+};
+
+} // namespace
+
+// The message selects its object by no handle: whatever player has sent it, it is for the one pipeline.
+int AVControl::onPlayStateChangeCb(unsigned int handle, TELIX_AV_CB_MSG msg) {
+    PLUGIN_LOG(AVCONTROL, "Received message from tv : (%x)\n", msg);
+    auto* event = new AVPlayStateEvent;
+    event->playerHandle = handle;
+    event->message = msg;
+    // The overload for the idle step is the one with a single argument.
+    int (*idleStep)(void*) = onPlayStateChangeCb;
+    g_idle_add(idleStep, event);
+    return 0;
+}
+
+int AVControl::onPlayStateChangeCb(void* record) {
+    auto* event = static_cast<AVPlayStateEvent*>(record);
+    AVControl* instance = g_lastPlayedInstance;
+    if (!event || !instance) {
+        // Meant: the small record of a message after the last player has gone is left behind.
+        return G_SOURCE_REMOVE;
+    }
+    instance->handlePlayStateChange(event->playerHandle, event->message);
+    delete event;
+    return G_SOURCE_REMOVE;
+}
+
+void AVControl::handlePlayStateChange(unsigned int handle, TELIX_AV_CB_MSG msg) {
+    AVControl* instance = g_lastPlayedInstance;
+    if (!instance) {
+        PLUGIN_LOG(AVCONTROL, "g_lastPlayedInstance not found\n");
+        return;
+    }
+    if (instance != this && !isBrowserThread()) {
+        // Another object can be on the point of dying: its message takes the platform's road.
+        onPlayStateChangeCb(handle, msg);
+        return;
+    }
+    if (instance->getPluginState() == PLUGIN_STATE_DESTROYING) {
+        PLUGIN_LOG(AVCONTROL, "Ignore message while destroying plugin \n");
+        return;
+    }
+    if (msg == g_lastReceivedMessage && msg != TELIX_AV_CB_MSG_PLAYSTART) {
+        PLUGIN_LOG(AVCONTROL, "Ignored duplicated message(%d)\n", msg);
+        return;
+    }
+    g_lastReceivedMessage = msg;
+    switch (msg) {
+    case TELIX_AV_CB_MSG_PLAYEND:
+        instance->endOfClip();
+        break;
+    case TELIX_AV_CB_MSG_PLAYSTART:
+        takeQueuedURL();
+        instance->changePlayState(PLAY_STATE_PLAYING);
+        break;
+    case TELIX_AV_CB_MSG_ERR_PLAYING:
+        instance->processError(AVCONTROL_ERROR_UNIDENTIFIED);
+        break;
+    case TELIX_AV_CB_MSG_ERR_NOT_FOUND:
+        instance->processError(AVCONTROL_ERROR_CONTENT_NOT_AVAILABLE);
+        break;
+    case TELIX_AV_CB_MSG_ERR_CODEC_NOT_SUPPORTED:
+        instance->processError(AVCONTROL_ERROR_FORMAT);
+        break;
+    case TELIX_AV_CB_MSG_ERR_NET_DISCONNECTED:
+    case TELIX_AV_CB_MSG_ERR_NET_CANNOT_CONNECT:
+        instance->processError(AVCONTROL_ERROR_CONNECTION);
+        break;
+    case TELIX_AV_CB_MSG_ERR_NET_BUSY:
+    case TELIX_AV_CB_MSG_ERR_NET_CANNOT_PROCESS:
+        PLUGIN_LOG(AVCONTROL, "Network message (%x)\n", msg);
+        break;
+    case TELIX_AV_CB_MSG_ERR_WMDRM_CANNOT_PROCESS:
+        instance->processError(AVCONTROL_ERROR_DRM_CANNOT_PROCESS);
+        break;
+    case TELIX_AV_CB_MSG_ERR_WMDRM_LIC_FAILLOCAL:
+        instance->processError(AVCONTROL_ERROR_DRM_LICENCE_LOCAL);
+        break;
+    case TELIX_AV_CB_MSG_ERR_WMDRM_LIC_FAILTRANSFER:
+        instance->processError(AVCONTROL_ERROR_DRM_LICENCE_TRANSFER);
+        break;
+    case TELIX_AV_CB_MSG_ERR_WMDRM_LIC_EXPIRED:
+        instance->processError(AVCONTROL_ERROR_DRM_LICENCE_EXPIRED);
+        break;
+    default:
+        break;
+    }
+}
+
+void AVControl::takeQueuedURL() {
+    if (!m_urlQueue.empty()) {
+        m_data = m_urlQueue.front();
+        PLUGIN_LOG_FOR(LogModule::AVCONTROL, "handlePlayStateChange", "Queued URL is (%s)\n", m_data.c_str());
+        m_urlQueue.pop();
+    }
+}
+
+void AVControl::endOfClip() {
+    m_durationLast = 0;
+    m_currentPositionLast = 0;
+    handlePlayPositionChanged();
+    printMonitoringInfo(2);
+    if (!m_isPlayList) {
+        destroyBufferingThread();
+        changePlayState(PLAY_STATE_FINISHED);
+        PLUGIN_LOG_FOR(LogModule::AVCONTROL, "handlePlayStateChange",
+                       "Normal Mode :: TELIX_AV_CB_MSG_PLAYEND :: destroyBufferingThread :: "
+                       "changePlayState(Finished)\n");
+        return;
+    }
+    if (asxIsEndofRepeat()) {
+        asxGotoStartofRepeat();
+    } else if (!asxNextClip()) {
+        // Meant: the other way round than for a single clip.
+        changePlayState(PLAY_STATE_FINISHED);
+        destroyBufferingThread();
+        return;
+    }
+    setCurrentMedia(asxShowClipFileName());
+    changePlayState(PLAY_STATE_NEXT_CLIP);
+}
+
+void AVControl::processError(avcontrol_ce_error code) {
+    PLUGIN_LOG(AVCONTROL, "Error Number = %d \n", code);
+    if (code == AVCONTROL_ERROR_NONE) {
+        return;
+    }
+    if (code == AVCONTROL_ERROR_FORMAT) {
+        PLUGIN_LOG(AVCONTROL, "error : AVControl_Format_Error\n");
+        m_error = 0;
+    } else if (code == AVCONTROL_ERROR_CONNECTION) {
+        PLUGIN_LOG(AVCONTROL, "error : AVControl_Connection_Error\n");
+        m_error = 1;
+    } else if (code == AVCONTROL_ERROR_CONTENT_NOT_AVAILABLE) {
+        PLUGIN_LOG(AVCONTROL, "error : AVControl_Content_NotAvailable\n");
+        m_error = 5;
+    } else if (code == AVCONTROL_ERROR_UNIDENTIFIED ||
+               (code >= AVCONTROL_ERROR_CONTENT_FIRST && code <= AVCONTROL_ERROR_CONTENT_LAST) ||
+               (code >= AVCONTROL_ERROR_DRM_CANNOT_PROCESS && code <= AVCONTROL_ERROR_DRM_LICENCE_EXPIRED)) {
+        PLUGIN_LOG(AVCONTROL, "error : AVControl_UnIdentified_Error\n");
+        m_error = 2;
+    }
+    changePlayState(PLAY_STATE_ERROR);
+}
+
+void AVControl::changePlayState(play_state to) {
+    PLUGIN_LOG(AVCONTROL, " called with playstate %d", to);
+    if (getPluginState() == PLUGIN_STATE_DESTROYING) {
+        PLUGIN_LOG(AVCONTROL, "ignore this function while plugin is destroying\n");
+        return;
+    }
+    changePlayState(m_playState, to);
+}
+
+void AVControl::changePlayState(play_state from, play_state to) {
+    if (from == to) {
+        return;
+    }
+    if (!isBrowserThread()) {
+        PLUGIN_LOG(AVCONTROL, "(Not Main Thread) called(%d->%d)", from, to);
+        auto* change = static_cast<PlayStateChange*>(std::malloc(sizeof(PlayStateChange)));
+        if (!change) {
+            PLUGIN_LOG(AVCONTROL, "malloc failed\n");
+            return;
+        }
+        *change = {this, from, to};
+        ++m_workingAsyncCalls;
+        NPN_PluginThreadAsyncCall(m_npp, changePlayStateCb, change);
+        return;
+    }
+    PLUGIN_LOG(AVCONTROL, "(Main Thread) called(%d->%d \n)", from, to);
+    m_playState = to;
+    if (to == PLAY_STATE_NEXT_CLIP) {
+        play(m_playSpeed);
+        return;
+    }
+    if (getId().empty()) {
+        return;
+    }
+    if (to == PLAY_STATE_ERROR) {
+        dispatchDomEvent("Error", false);
+    }
+    if (to == PLAY_STATE_BUFFERING) {
+        dispatchDomEvent("Buffering", true);
+    } else if (from == PLAY_STATE_BUFFERING) {
+        dispatchDomEvent("Buffering", false);
+    }
+    dispatchDomEvent("PlayStateChange", false);
+    if (m_onPlayStateChange) {
+        invokeJScriptFunc(m_onPlayStateChange, nullptr, 0);
+    }
+}
+
+// Meant: a change that was posted before the object began to go still runs.
+void AVControl::changePlayStateCb(void* record) {
+    auto* change = static_cast<PlayStateChange*>(record);
+    if (isAlive(change->object)) {
+        change->object->changePlayState(change->from, change->to);
+        change->object->decrementWorkingAsyncCall();
+    }
+    std::free(change);
+}
+
+void AVControl::changeReadyState(int value) {
+    m_readyState = value;
+    if (!isBrowserThread()) {
+        NPN_PluginThreadAsyncCall(m_npp, changeReadyStateCb, this);
+        return;
+    }
+    if (!getId().empty()) {
+        dispatchDomEvent("ReadyStateChange", true);
+        dispatchDomEvent("onReadyStateChange", true);
+    }
+}
+
+void AVControl::changeReadyStateCb(void* object) {
+    auto* control = static_cast<AVControl*>(object);
+    if (isAlive(control)) {
+        control->changeReadyState(control->getReadyState());
+    }
+}
+
+void AVControl::dispatchDomEvent(const char* event, bool bubbles) {
+    invokeJScript(domEventScript(getId(), event, bubbles, false));
+}

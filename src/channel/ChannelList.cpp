@@ -1,0 +1,55 @@
+// The channel list: built from handles, searched from the front.
+#include "src/channel/ChannelList.h"
+
+#include <strings.h>
+
+#include "common/Log.h"
+#include "src/channel/JSChannel.h"
+#include "telix/telix_platform.h"
+
+ChannelList::ChannelList(NPP npp) : PluginBase(npp) {}
+
+void ChannelList::initialize(const uint32_t* handles, unsigned int count) {
+    m_channels.setLength(0);
+    if (!handles) {
+        return;
+    }
+    m_channels.fillUpTo(count, m_npp, [handles](JSChannel& wrapper, uint32_t index) {
+        wrapper.impl()->setChannelHandle(handles[index]);
+        PLUGIN_LOG_FOR(LogModule::CHANNEL, "initialize", "Channel Object =( %p ), ChannelHandle = (%u) \n",
+                       static_cast<void*>(static_cast<NPObject*>(&wrapper)), handles[index]);
+    });
+}
+
+NPObject* ChannelList::getitem(unsigned int index) {
+    PLUGIN_LOG(CHANNEL, " getitem\n");
+    NPObject* channel = m_channels.item(index);
+    if (channel) {
+        PLUGIN_LOG(CHANNEL, " Channel Obj = %p \n", static_cast<void*>(channel));
+    }
+    return channel;
+}
+
+NPObject* ChannelList::getChannel(unsigned int handle) {
+    return m_channels.find([handle](const Channel& channel) { return channel.getChannelHandle() == handle; });
+}
+
+NPObject* ChannelList::getChannel(const std::string& ccid) {
+    PLUGIN_LOG(CHANNEL, "Channel Id =( %s )\n", ccid.c_str());
+    NPObject* found = m_channels.find(
+        [&ccid](Channel& channel) { return strcasecmp(channel.getCcid().c_str(), ccid.c_str()) == 0; });
+    if (found) {
+        PLUGIN_LOG(CHANNEL, "getChannel() succeeded. ccid string: %s \n", ccid.c_str());
+    }
+    return found;
+}
+
+NPObject* ChannelList::getChannelByTriplet(unsigned int onid, unsigned int tsid, unsigned int sid) {
+    PLUGIN_LOG(CHANNEL, "called. onid: %u, tsid: %u, sid: %u \n", onid, tsid, sid);
+    TELIX_JS_CM_HANDLE handle = 0;
+    if (TELIX_JS_CM_GetChannelByTriplet(onid, tsid, sid, &handle) != 0) {
+        return nullptr;
+    }
+    PLUGIN_LOG(CHANNEL, "ChannelHandle = %u \n", handle);
+    return getChannel(handle);
+}

@@ -1,0 +1,22 @@
+// The script interface of a collection of parental ratings.
+#include "src/parental/JSParentalRatingCollection.h"
+
+namespace {
+
+using Model = ParentalRatingCollection;
+
+constexpr ScriptMember kMembers[] = {
+    method("item", invoke<&Model::getitem>),
+    property("length", read<&Model::getLength>),
+};
+
+// Meant: this one line belongs to the channels' module.
+constexpr ScriptArray kArray = scriptArray<&Model::getLength, &Model::getitem>(LogModule::CHANNEL, " ");
+
+constexpr ScriptClass kClass = ScriptClass("JSParentalRatingCollection", LogModule::PARENTAL, kMembers)
+                                   .withArray(&kArray)
+                                   .refusingWith("JSParentalRatingCollection class\n");
+
+} // namespace
+
+JSParentalRatingCollection::JSParentalRatingCollection(NPP npp) : SubObjectWrapper(npp, kClass) {}

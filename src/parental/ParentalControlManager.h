@@ -1,0 +1,28 @@
+// The model of the embedded parental control manager: gives a page the rating schemes that the platform
+// knows. There is no PIN and no blocking here. Browser thread only.
+#ifndef TELIX_SRC_PARENTAL_PARENTALCONTROLMANAGER_H
+#define TELIX_SRC_PARENTAL_PARENTALCONTROLMANAGER_H
+
+#include "common/PluginBase.h"
+
+struct ObjectKind;
+
+extern const ObjectKind parentalControlManagerKind;
+
+class ParentalControlManager final : public PluginBase {
+public:
+    ParentalControlManager(NPP npp, unsigned short objectId);
+    ~ParentalControlManager();
+
+    NPObject* getJSObject() override;
+
+    // The collection of schemes with one reference added for the caller. It is read from the platform at the
+    // first call that it answers and never again; null until then.
+    NPObject* getParentalRatingSchemes();
+
+private:
+    NPObject* m_jsObject = nullptr;
+    NPObject* m_parentalRatingSchemes = nullptr;
+};
+
+#endif

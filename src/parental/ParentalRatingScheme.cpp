@@ -1,0 +1,63 @@
+// A rating scheme: a copy of the platform's record, and the way to its threshold.
+#include "src/parental/ParentalRatingScheme.h"
+
+#include <algorithm>
+
+#include "common/Log.h"
+#include "common/ScriptReferences.h"
+#include "src/parental/JSParentalRating.h"
+
+ParentalRatingScheme::ParentalRatingScheme(NPP npp) : PluginBase(npp) {}
+
+void ParentalRatingScheme::setHandle(PARENTALRATTINGSCHEME_STRUCT_T_TAG record) {
+    if (!record.szName) {
+        return;
+    }
+    m_count = record.count;
+    PLUGIN_LOG(PARENTAL, " parentalRatingScheme.szName is:: ( %s )\n", record.szName);
+    m_name = record.szName;
+    m_handle = record.handle;
+    m_ratingNames.insert(m_ratingNames.end(), record.ratingNames, record.ratingNames + record.count);
+    m_iconUris.insert(m_iconUris.end(), record.iconUris, record.iconUris + record.count);
+}
+
+uint32_t ParentalRatingScheme::getLength() const {
+    // Meant: this scheme tells of no named ratings, though its items can be had.
+    return m_name == "dvb-si" ? 0 : m_count;
+}
+
+std::string ParentalRatingScheme::getitem(unsigned int index) const {
+    return index < m_count ? m_ratingNames[index] : std::string();
+}
+
+std::string ParentalRatingScheme::getIconUri(unsigned int index) const {
+    return index < m_count ? m_iconUris[index] : std::string();
+}
+
+uint32_t ParentalRatingScheme::getIndexOf(const std::string& name) const {
+    constexpr auto kAbsent = static_cast<uint32_t>(-1);
+    if (name.empty()) {
+        return kAbsent;
+    }
+    const auto end = m_ratingNames.begin() + m_count;
+    const auto found = std::find(m_ratingNames.begin(), end, name);
+    return found == end ? kAbsent : static_cast<uint32_t>(found - m_ratingNames.begin());
+}
+
+NPObject* ParentalRatingScheme::getThreshold() {
+    int32_t threshold = 0;
+    if (m_handle == 0 || TELIX_JS_SI_PARENTALRATINGSCHEME_GetThreshold(m_handle, &threshold) != 0) {
+        return nullptr;
+    }
+    PLUGIN_LOG(PARENTAL, " parentalRatingThreshold is:: ( %d )\n", threshold);
+    NPObject* object = createScriptObject<JSParentalRating>(m_npp);
+    if (!object) {
+        return nullptr;
+    }
+    ParentalRating& rating = *wrapperOf<JSParentalRating>(object)->impl();
+    // Meant: the number is the handle too, which does no harm, since a threshold never asks the platform.
+    rating.setParentalRatingHandle(static_cast<uint32_t>(threshold));
+    rating.setThresholdProperties(static_cast<uint32_t>(threshold), m_name);
+    // Meant: the caller gets one of two references; the other stays behind.
+    return handOut(object);
+}

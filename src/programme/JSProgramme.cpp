@@ -1,0 +1,22 @@
+// The script interface of a programme.
+#include "src/programme/JSProgramme.h"
+
+namespace {
+
+using Model = Programme;
+
+constexpr ScriptMember kMembers[] = {
+    property("name", read<&Model::getName>, write<&Model::setName>),
+    property("startTime", read<&Model::getStartTime>, write<&Model::setStartTime>),
+    property("duration", read<&Model::getDuration>, write<&Model::setDuration>),
+    property("description", read<&Model::getDescription>, write<&Model::setDescription>),
+    property("channelID", read<&Model::getChannelID>, write<&Model::setChannelID>),
+    property("parentalRating", read<&Model::getParentalRatingCollectionObject>),
+};
+
+constexpr ScriptClass kClass =
+    ScriptClass("JSProgramme", LogModule::PROGRAMME, kMembers).refusingWith("JSProgramme class\n");
+
+} // namespace
+
+JSProgramme::JSProgramme(NPP npp) : SubObjectWrapper(npp, kClass) {}
