@@ -18,10 +18,11 @@ namespace {
 
 ScriptedBrowser* s_current = nullptr;
 
-// Objects that outlived their browser by references left behind: still reachable for the leak checker.
-std::vector<NPObject*>& leftBehindObjects() {
-    static auto* objects = new std::vector<NPObject*>;
-    return *objects;
+// Objects and blocks that outlived their browser because the plug-in left them behind: still reachable for the
+// leak checker, since the accounts have told already.
+std::vector<const void*>& leftBehind() {
+    static auto* addresses = new std::vector<const void*>;
+    return *addresses;
 }
 
 struct Identifier {
@@ -622,8 +623,9 @@ ScriptedBrowser::~ScriptedBrowser() {
     m_window.reset();
     m_document.reset();
     for (const auto& entry : m_accounts) {
-        leftBehindObjects().push_back(entry.first);
+        leftBehind().push_back(entry.first);
     }
+    leftBehind().insert(leftBehind().end(), m_blocks.begin(), m_blocks.end());
     s_current = nullptr;
 }
 
