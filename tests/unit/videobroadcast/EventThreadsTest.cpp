@@ -18,7 +18,7 @@
 namespace {
 
 constexpr int kThreads = 4;
-constexpr int kEventsOfAThread = 500;
+constexpr int kEventsOfAThread = 250;
 constexpr unsigned int kFirstHandle = 7;
 
 // An event's number as it travels in the places that the events have for a number.
@@ -68,7 +68,7 @@ protected:
     }
 
     // One platform thread: every kind of event that carries a number, to handles that may be anybody's.
-    void call(int thread, unsigned int handles) const {
+    void call(const Callbacks& callbacks, int thread, unsigned int handles) const {
         while (!started) {
             std::this_thread::yield();
         }
@@ -98,7 +98,9 @@ protected:
 
     void startThreads(unsigned int handles) {
         for (int thread = 0; thread < kThreads; ++thread) {
-            threads.emplace_back([this, thread, handles] { call(thread, handles); });
+            // With a copy of the callbacks: the platform is given them anew whenever a first object comes.
+            threads.emplace_back(
+                [this, given = callbacks, thread, handles] { call(given, thread, handles); });
         }
         started = true;
     }
