@@ -1,6 +1,7 @@
 // Many platform threads at once, while the page makes and drops objects: what is delivered goes to a living
 // object, and in the order in which each thread called.
 #include <atomic>
+#include <chrono>
 #include <cstdio>
 #include <map>
 #include <memory>
@@ -127,9 +128,7 @@ TEST_F(EventThreadsTest, EventsOfSeveralThreadsAllArriveInTheOrderOfTheirThread)
         arrived(kFirstHandle, std::stoi(event.fields.at("name")));
     });
     startThreads(1);
-    while (finished != kThreads) {
-        browser.pump();
-    }
+    browser.pumpUntil([this] { return finished == kThreads; }, std::chrono::seconds(50));
     joinThreads();
     EXPECT_EQ(deliveries, kThreads * kEventsOfAThread);
 }
