@@ -24,7 +24,8 @@ NPObject* PluginBase::getJSObject() {
 NPError PluginBase::init(unsigned short mode, int argc, char* const* argn, char* const* argv) {
     PLUGIN_LOG(COMMON, "PluginBase::Mode: %d , Argc:  %d \n", mode, argc);
     // The value of these two travels in the address itself.
-    NPN_SetValue(m_npp, NPPVpluginWindowBool, reinterpret_cast<void*>(false));
+    NPN_SetValue(m_npp, NPPVpluginWindowBool, nullptr);
+    // NOLINTNEXTLINE(performance-no-int-to-ptr)
     NPN_SetValue(m_npp, NPPVpluginTransparentBool, reinterpret_cast<void*>(true));
     m_pluginMode = mode;
     m_pluginState = PLUGIN_STATE_RUNNING;

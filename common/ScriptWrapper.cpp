@@ -1,8 +1,6 @@
 // Script's road into a model: identifier, row of the table, operation.
 #include "common/ScriptWrapper.h"
 
-#include <algorithm>
-
 #include "common/BrowserGates.h"
 
 ScriptWrapper::ScriptWrapper(NPP npp, const ScriptClass& scriptClass) : m_npp(npp), m_class(scriptClass) {
@@ -15,60 +13,50 @@ ScriptWrapper::~ScriptWrapper() {
                    static_cast<void*>(this));
 }
 
-void ScriptWrapper::fetchIdentifiers(NPIdentifier* identifiers) {
+void ScriptWrapper::fetchIdentifiers(NPIdentifier* identifiers) const {
     for (size_t i = 0; i < m_class.memberCount; ++i) {
         identifiers[i] = NPN_GetStringIdentifier(m_class.members[i].name);
     }
-    m_identifiers = identifiers;
-}
-
-const ScriptMember* ScriptWrapper::find(NPIdentifier name) const {
-    const NPIdentifier* end = m_identifiers + m_class.memberCount;
-    const NPIdentifier* found = std::find(m_identifiers, end, name);
-    return found == end ? nullptr : m_class.members + (found - m_identifiers);
 }
 
 namespace {
 
 // The index that a name stands for, or -1 if it stands for none of the list.
-int indexInRange(const ScriptArray* array, PluginBase* list, NPIdentifier name) {
-    if (!array || !list) {
-        return -1;
-    }
+int indexInRange(const ScriptArray& array, PluginBase& list, NPIdentifier name) {
     const int index = getIntFromNPIdentifier(name);
-    return index != -1 && static_cast<uint32_t>(index) < array->length(*list) ? index : -1;
+    return index != -1 && static_cast<uint32_t>(index) < array.length(list) ? index : -1;
+}
+
+void logRefusal(const ScriptClass& scriptClass, const char* operation) {
+    if (scriptClass.refusalText) {
+        PLUGIN_LOG_FOR(scriptClass.logModule, operation, "%s", scriptClass.refusalText);
+    }
+}
+
+void logMember(const ScriptClass& scriptClass, const char* operation, const ScriptMember& member) {
+    PLUGIN_LOG_FOR(scriptClass.logModule, operation, " %s%s\n", member.logPrefix, member.logName);
 }
 
 } // namespace
 
-bool ScriptWrapper::HasMethod(NPIdentifier name) {
-    const ScriptMember* member = find(name);
-    if (member && member->isMethod()) {
-        return true;
-    }
-    if (m_class.refusalText) {
-        PLUGIN_LOG_FOR(m_class.logModule, __func__, "%s", m_class.refusalText);
-    }
+bool ScriptWrapper::refuseMethod() const {
+    logRefusal(m_class, "HasMethod");
     return false;
 }
 
-bool ScriptWrapper::Invoke(NPIdentifier name, const NPVariant* args, unsigned int argCount,
-                           NPVariant* result) {
-    PluginBase* target = model();
-    if (!target) {
+bool ScriptWrapper::invokeMember(const ScriptMember* member, PluginBase* model, const NPVariant* args,
+                                 unsigned int argCount, NPVariant* result) const {
+    if (!model) {
         if (m_class.missingModelText) {
-            PLUGIN_LOG_FOR(m_class.logModule, __func__, "%s", m_class.missingModelText);
+            PLUGIN_LOG_FOR(m_class.logModule, "Invoke", "%s", m_class.missingModelText);
         }
         return false;
     }
-    const ScriptMember* member = find(name);
     if (member && member->isMethod()) {
-        PLUGIN_LOG_FOR(m_class.logModule, __func__, " %s%s\n", member->logPrefix, member->logName);
-        return member->invoke(*target, args, argCount, *result);
+        logMember(m_class, "Invoke", *member);
+        return member->invoke(*model, args, argCount, *result);
     }
-    if (m_class.refusalText) {
-        PLUGIN_LOG_FOR(m_class.logModule, __func__, "%s", m_class.refusalText);
-    }
+    logRefusal(m_class, "Invoke");
     return false;
 }
 
@@ -76,52 +64,45 @@ bool ScriptWrapper::InvokeDefault(const NPVariant*, unsigned int, NPVariant*) {
     return false;
 }
 
-bool ScriptWrapper::HasProperty(NPIdentifier name) {
-    if (const ScriptMember* member = find(name)) {
-        return !member->isMethod();
-    }
-    return indexInRange(m_class.array, model(), name) != -1;
+bool ScriptWrapper::hasIndex(PluginBase* model, NPIdentifier name) const {
+    return model && indexInRange(*m_class.array, *model, name) != -1;
 }
 
-bool ScriptWrapper::GetProperty(NPIdentifier name, NPVariant* result) {
+bool ScriptWrapper::readMember(const ScriptMember* member, PluginBase* model, NPIdentifier name,
+                               NPVariant* result) const {
     if (m_class.readsStartVoid) {
         setVoid(*result);
     }
-    PluginBase* target = model();
-    if (!target) {
+    if (!model) {
         return false;
     }
-    const ScriptMember* member = find(name);
-    if (member && !member->isMethod()) {
-        PLUGIN_LOG_FOR(m_class.logModule, __func__, " %s%s\n", member->logPrefix, member->logName);
+    if (member) {
+        if (member->isMethod()) {
+            return false;
+        }
+        logMember(m_class, "GetProperty", *member);
         if (member->read) {
-            return member->read(*target, *result);
+            return member->read(*model, *result);
         }
         setResult(*result, member->constantValue);
         return true;
     }
-    if (!m_class.array || member) {
-        return false;
-    }
-    const int index = indexInRange(m_class.array, target, name);
+    const ScriptArray* array = m_class.array;
+    const int index = array ? indexInRange(*array, *model, name) : -1;
     if (index == -1) {
         return false;
     }
-    PLUGIN_LOG_FOR(m_class.array->logModule, __func__, "%sArray Notation Index:-- %d --\n",
-                   m_class.array->logIndent, index);
-    setResult(*result, m_class.array->item(*target, static_cast<uint32_t>(index)));
+    PLUGIN_LOG_FOR(array->logModule, "GetProperty", "%sArray Notation Index:-- %d --\n", array->logIndent,
+                   index);
+    setResult(*result, array->item(*model, static_cast<uint32_t>(index)));
     return true;
 }
 
-bool ScriptWrapper::SetProperty(NPIdentifier name, const NPVariant* value) {
-    PluginBase* target = model();
-    const ScriptMember* member = find(name);
-    if (target && member && member->write) {
-        PLUGIN_LOG_FOR(m_class.logModule, __func__, " %s%s\n", member->logPrefix, member->logName);
-        return member->write(*target, *value);
+bool ScriptWrapper::writeMember(const ScriptMember* member, PluginBase* model, const NPVariant* value) const {
+    if (model && member && member->write) {
+        logMember(m_class, "SetProperty", *member);
+        return member->write(*model, *value);
     }
-    if (m_class.refusalText) {
-        PLUGIN_LOG_FOR(m_class.logModule, __func__, "%s", m_class.refusalText);
-    }
+    logRefusal(m_class, "SetProperty");
     return false;
 }

@@ -45,39 +45,59 @@ struct ScriptClass {
     }
 };
 
+// The part of a wrapper that does not depend on its size: what a name's row has done.
 class ScriptWrapper : public JSPluginBase {
 public:
-    bool HasMethod(NPIdentifier name) override;
-    bool Invoke(NPIdentifier name, const NPVariant* args, unsigned int argCount, NPVariant* result) override;
     bool InvokeDefault(const NPVariant* args, unsigned int argCount, NPVariant* result) override;
-    bool HasProperty(NPIdentifier name) override;
-    bool GetProperty(NPIdentifier name, NPVariant* result) override;
-    bool SetProperty(NPIdentifier name, const NPVariant* value) override;
 
 protected:
     ScriptWrapper(NPP npp, const ScriptClass& scriptClass);
     ~ScriptWrapper() override;
 
-    // Fetches the identifiers of the table's names, in its order, into a place that lives as long as the
-    // wrapper.
-    void fetchIdentifiers(NPIdentifier* identifiers);
+    // Fetches the identifiers of the table's names, in its order.
+    void fetchIdentifiers(NPIdentifier* identifiers) const;
 
-    // The model behind the wrapper at this moment, or null.
-    virtual PluginBase* model() = 0;
+    // The rest of the virtual operations behind the look-up. `member` is the name's row, null if the class
+    // has none; `model` is the model at this moment, or null.
+    bool refuseMethod() const;
+    bool invokeMember(const ScriptMember* member, PluginBase* model, const NPVariant* args,
+                      unsigned int argCount, NPVariant* result) const;
+    bool hasIndex(PluginBase* model, NPIdentifier name) const;
+    bool readMember(const ScriptMember* member, PluginBase* model, NPIdentifier name,
+                    NPVariant* result) const;
+    bool writeMember(const ScriptMember* member, PluginBase* model, const NPVariant* value) const;
 
     NPP m_npp;
-
-private:
-    // The row of a name, null if the class has none: a run of address comparisons, no string work.
-    const ScriptMember* find(NPIdentifier name) const;
-
     const ScriptClass& m_class;
-    const NPIdentifier* m_identifiers = nullptr;
 };
 
-// A wrapper with room for the identifiers of `Count` names.
-template <size_t Count>
+// A wrapper with room for the identifiers of `Count` names. `Self` derives from it and has model(). Looking a
+// name up is a run of address comparisons over adjacent fields, no string work.
+template <class Self, size_t Count>
 class SizedScriptWrapper : public ScriptWrapper {
+public:
+    bool HasMethod(NPIdentifier name) override {
+        const ScriptMember* member = find(name);
+        return (member && member->isMethod()) || refuseMethod();
+    }
+
+    bool Invoke(NPIdentifier name, const NPVariant* args, unsigned int argCount, NPVariant* result) override {
+        return invokeMember(find(name), currentModel(), args, argCount, result);
+    }
+
+    bool HasProperty(NPIdentifier name) override {
+        const ScriptMember* member = find(name);
+        return member ? !member->isMethod() : m_class.array && hasIndex(currentModel(), name);
+    }
+
+    bool GetProperty(NPIdentifier name, NPVariant* result) override {
+        return readMember(find(name), currentModel(), name, result);
+    }
+
+    bool SetProperty(NPIdentifier name, const NPVariant* value) override {
+        return writeMember(find(name), currentModel(), value);
+    }
+
 protected:
     SizedScriptWrapper(NPP npp, const ScriptClass& scriptClass) : ScriptWrapper(npp, scriptClass) {
         assert(scriptClass.memberCount == Count);
@@ -85,31 +105,46 @@ protected:
     }
 
 private:
+    PluginBase* currentModel() const { return static_cast<const Self*>(this)->model(); }
+
+    const ScriptMember* find(NPIdentifier name) const {
+        return find(name, std::make_index_sequence<Count>{});
+    }
+
+    template <size_t... Index>
+    const ScriptMember* find(NPIdentifier name, std::index_sequence<Index...>) const {
+        const ScriptMember* found = nullptr;
+        static_cast<void>(((m_identifiers[Index] == name && (found = m_class.members + Index, true)) || ...));
+        return found;
+    }
+
     NPIdentifier m_identifiers[Count];
 };
 
 // The wrapper of an object that the browser instantiates: finds its model through the instance at every call,
 // since it can outlive it.
 template <size_t Count>
-class EmbeddedObjectWrapper : public SizedScriptWrapper<Count> {
-protected:
-    using SizedScriptWrapper<Count>::SizedScriptWrapper;
+class EmbeddedObjectWrapper : public SizedScriptWrapper<EmbeddedObjectWrapper<Count>, Count> {
+public:
+    // The model at this moment; null once the instance has been destroyed.
+    PluginBase* model() const { return static_cast<PluginBase*>(this->m_npp->pdata); }
 
-    PluginBase* model() override { return static_cast<PluginBase*>(this->m_npp->pdata); }
+protected:
+    EmbeddedObjectWrapper(NPP npp, const ScriptClass& scriptClass)
+        : SizedScriptWrapper<EmbeddedObjectWrapper, Count>(npp, scriptClass) {}
 };
 
 // The wrapper of a sub-object: makes its model and owns it.
 template <class Model, size_t Count>
-class SubObjectWrapper : public SizedScriptWrapper<Count> {
+class SubObjectWrapper : public SizedScriptWrapper<SubObjectWrapper<Model, Count>, Count> {
 public:
     Model* impl() const { return m_impl; }
+    PluginBase* model() const { return m_impl; }
 
 protected:
     SubObjectWrapper(NPP npp, const ScriptClass& scriptClass)
-        : SizedScriptWrapper<Count>(npp, scriptClass), m_impl(new Model(npp)) {}
+        : SizedScriptWrapper<SubObjectWrapper, Count>(npp, scriptClass), m_impl(new Model(npp)) {}
     ~SubObjectWrapper() override { delete m_impl; }
-
-    PluginBase* model() override { return m_impl; }
 
 private:
     Model* m_impl;

@@ -25,7 +25,8 @@ typedef int16_t NPError;
 typedef int16_t NPReason;
 typedef char* NPMIMEType;
 
-/* One embedded object. The browser owns the record; `pdata` belongs to the plug-in, `ndata` to the browser. */
+/* One embedded object. The browser owns the record; `pdata` belongs to the plug-in, `ndata` to the browser.
+ */
 typedef struct _NPP {
     void* pdata;
     void* ndata;
@@ -68,10 +69,7 @@ typedef struct _NPSize {
     int32_t height;
 } NPSize;
 
-typedef enum {
-    NPWindowTypeWindow = 1,
-    NPWindowTypeDrawable = 2
-} NPWindowType;
+typedef enum { NPWindowTypeWindow = 1, NPWindowTypeDrawable = 2 } NPWindowType;
 
 /* The place of an instance in its page. `window` is the X window of a windowed plug-in. */
 typedef struct _NPWindow {
@@ -105,18 +103,10 @@ typedef struct _NPPrint {
 } NPPrint;
 
 /* Modes of an instance. */
-enum {
-    NP_EMBED = 1,
-    NP_FULL = 2
-};
+enum { NP_EMBED = 1, NP_FULL = 2 };
 
 /* Stream modes. */
-enum {
-    NP_NORMAL = 1,
-    NP_SEEK = 2,
-    NP_ASFILE = 3,
-    NP_ASFILEONLY = 4
-};
+enum { NP_NORMAL = 1, NP_SEEK = 2, NP_ASFILE = 3, NP_ASFILEONLY = 4 };
 
 /* Results of the calls that return an NPError. */
 enum {
@@ -137,11 +127,7 @@ enum {
 };
 
 /* Why a stream ended. */
-enum {
-    NPRES_DONE = 0,
-    NPRES_NETWORK_ERR = 1,
-    NPRES_USER_BREAK = 2
-};
+enum { NPRES_DONE = 0, NPRES_NETWORK_ERR = 1, NPRES_USER_BREAK = 2 };
 
 /* What the browser asks of a plug-in (NPP_GetValue). */
 typedef enum {
@@ -184,10 +170,7 @@ typedef enum {
 } NPNVariable;
 
 /* Variables of NPN_GetValueForURL and NPN_SetValueForURL. */
-typedef enum {
-    NPNURLVCookie = 501,
-    NPNURLVProxy = 502
-} NPNURLVariable;
+typedef enum { NPNURLVCookie = 501, NPNURLVProxy = 502 } NPNURLVariable;
 
 /* Coordinate spaces of NPN_ConvertPoint. */
 typedef enum {
@@ -199,16 +182,10 @@ typedef enum {
 } NPCoordinateSpace;
 
 /* Direction in which the focus entered a plug-in (the table's `gotfocus`). */
-typedef enum {
-    NPFocusNext = 0,
-    NPFocusPrevious = 1
-} NPFocusDirection;
+typedef enum { NPFocusNext = 0, NPFocusPrevious = 1 } NPFocusDirection;
 
 /* Pixel formats and surface of asynchronous drawing. */
-typedef enum {
-    NPImageFormatBGRA32 = 1,
-    NPImageFormatBGRX32 = 2
-} NPImageFormat;
+typedef enum { NPImageFormatBGRA32 = 1, NPImageFormatBGRX32 = 2 } NPImageFormat;
 
 typedef struct _NPAsyncSurface {
     uint32_t version;

@@ -39,8 +39,7 @@ typedef NPError (*NPN_GetURLProcPtr)(NPP instance, const char* url, const char* 
 typedef NPError (*NPN_PostURLProcPtr)(NPP instance, const char* url, const char* target, uint32_t length,
                                       const char* buffer, NPBool isFile);
 typedef NPError (*NPN_RequestReadProcPtr)(NPStream* stream, NPByteRange* ranges);
-typedef NPError (*NPN_NewStreamProcPtr)(NPP instance, NPMIMEType type, const char* target,
-                                        NPStream** stream);
+typedef NPError (*NPN_NewStreamProcPtr)(NPP instance, NPMIMEType type, const char* target, NPStream** stream);
 typedef int32_t (*NPN_WriteProcPtr)(NPP instance, NPStream* stream, int32_t length, void* buffer);
 typedef NPError (*NPN_DestroyStreamProcPtr)(NPP instance, NPStream* stream, NPReason reason);
 typedef void (*NPN_StatusProcPtr)(NPP instance, const char* message);

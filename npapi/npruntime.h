@@ -35,7 +35,8 @@ typedef enum {
 typedef struct NPObject NPObject;
 typedef struct NPClass NPClass;
 
-/* A script value. The receiver of a result owns what it holds and gives it back with NPN_ReleaseVariantValue. */
+/* A script value. The receiver of a result owns what it holds and gives it back with NPN_ReleaseVariantValue.
+ */
 typedef struct _NPVariant {
     NPVariantType type;
     union {

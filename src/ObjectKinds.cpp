@@ -3,11 +3,19 @@
 
 #include "src/application/ApplicationManager.h"
 #include "src/avcontrol/AVControl.h"
+#include "src/capabilities/Capabilities.h"
+#include "src/config/OipfConfiguration.h"
+#include "src/drm/DRMAgent.h"
 #include "src/parental/ParentalControlManager.h"
+#include "src/videobroadcast/VideoBroadcast.h"
 
 const ObjectKind* const objectKinds[] = {
     &applicationManagerKind,
     &avControlKind,
+    &videoBroadcastKind,
+    &oipfConfigurationKind,
     &parentalControlManagerKind,
+    &capabilitiesKind,
+    &drmAgentKind,
     nullptr,
 };

@@ -1,18 +1,24 @@
-// An application: handler slots, and the four page functions.
+// An application: its private data, handler slots, and the four page functions.
 #include "src/application/Application.h"
 
 #include "common/Log.h"
 #include "common/ScriptReferences.h"
 #include "src/application/JSApplication.h"
+#include "src/application/JSApplicationPrivateData.h"
 
 Application::Application(NPP npp) : PluginBase(npp) {}
 
 Application::~Application() {
+    releaseHeld(m_privateData);
     releaseHeld(m_onKeyDown);
     releaseHeld(m_onKeyUp);
     releaseHeld(m_onKeyPress);
     releaseHeld(m_onApplicationShown);
     releaseHeld(m_onApplicationHidden);
+}
+
+NPObject* Application::privateData() {
+    return handOutOnce<JSApplicationPrivateData>(m_npp, m_privateData);
 }
 
 NPObject* Application::createApplication(const std::string& uri, bool) {

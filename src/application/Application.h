@@ -10,6 +10,10 @@ public:
     explicit Application(NPP npp);
     ~Application();
 
+    // The private data, made at the first use. The caller owns one reference; null if the browser refuses to
+    // make it.
+    NPObject* privateData();
+
     // Asks the browser to start the application at `uri`. The caller owns the new application object's
     // reference; null if the browser refused. The flag has no effect.
     NPObject* createApplication(const std::string& uri, bool createChild);
@@ -31,6 +35,7 @@ public:
     void setOnApplicationHidden(NPObject* handler);
 
 private:
+    NPObject* m_privateData = nullptr; // one reference held
     NPObject* m_onKeyPress = nullptr;
     NPObject* m_onKeyUp = nullptr;
     NPObject* m_onKeyDown = nullptr;

@@ -12,6 +12,8 @@
 #include "src/application/Application.h"
 #include "src/application/JSApplication.h"
 #include "src/application/JSApplicationManager.h"
+#include "src/application/JSApplicationPrivateData.h"
+#include "src/config/JSKeySet.h"
 #include "telix/telix_platform.h"
 
 std::map<NPP, ApplicationManager*> ApplicationManager::m_instances;
@@ -144,6 +146,31 @@ NPObject* ApplicationManager::getOwnerApplication(NPObject* document) {
     return application;
 }
 
+Application* ApplicationManager::getApplication(ApplicationPrivateData* data) {
+    for (Application* application : m_applications) {
+        // Meant: the reference that comes with the object is left behind.
+        auto* wrapper = wrapperOf<JSApplicationPrivateData>(application->privateData());
+        if (wrapper && wrapper->impl() == data) {
+            return application;
+        }
+    }
+    return nullptr;
+}
+
+Application* ApplicationManager::getApplication(KeySet* keySet) {
+    for (Application* application : m_applications) {
+        // Meant: the references that come with both objects are left behind.
+        auto* dataWrapper = wrapperOf<JSApplicationPrivateData>(application->privateData());
+        if (dataWrapper) {
+            auto* keySetWrapper = wrapperOf<JSKeySet>(dataWrapper->impl()->keySet());
+            if (keySetWrapper && keySetWrapper->impl() == keySet) {
+                return application;
+            }
+        }
+    }
+    return nullptr;
+}
+
 NPObject* ApplicationManager::onLowmemory() {
     return handOut(m_onLowmemory);
 }
@@ -200,9 +227,11 @@ int ApplicationManager::handleKeyDownEvent() {
 
 int ApplicationManager::callKeyHandlers(NPObject* (Application::*handler)()) {
     if (!m_applications.empty() && sharedInstance(m_npp)) {
-        // A copy: a handler may make or drop applications.
+        // A copy, looked up again: a handler may make or drop applications.
         for (Application* application : applicationList()) {
-            if ((application->*handler)()) {
+            const bool isAlive =
+                std::find(m_applications.begin(), m_applications.end(), application) != m_applications.end();
+            if (isAlive && (application->*handler)()) {
                 // Meant: both getter calls leave a reference behind.
                 invokeJScriptFunc((application->*handler)(), nullptr, 0);
             }

@@ -10,6 +10,8 @@
 #include "common/PluginBase.h"
 
 class Application;
+class ApplicationPrivateData;
+class KeySet;
 struct ObjectKind;
 
 extern const ObjectKind applicationManagerKind;
@@ -41,6 +43,12 @@ public:
     NPObject* getOwnerApplication(NPObject* document);
 
     std::vector<Application*> applicationList() const { return m_applications; }
+
+    // The application, of any page, that owns a private data object or a key set; null if none lives. Every
+    // application that is visited makes these objects if it has none, and one reference to each of them is
+    // left behind.
+    Application* getApplication(ApplicationPrivateData* data);
+    Application* getApplication(KeySet* keySet);
 
     // Script handlers. A getter hands out one more reference; null if none is set. A setter takes null too.
     NPObject* onLowmemory();

@@ -8,6 +8,8 @@ namespace {
 
 // Meant: unlike the manager's handlers these can't be cleared: a write of null is refused.
 constexpr ScriptMember kMembers[] = {
+    property("privateData", read<&Application::privateData>),
+    property("private", read<&Application::privateData>),
     property("onKeyPress", read<&Application::onKeyPress>, write<&Application::setOnKeyPress>),
     property("onKeyUp", read<&Application::onKeyUp>, write<&Application::setOnKeyUp>),
     property("onKeyDown", read<&Application::onKeyDown>, write<&Application::setOnKeyDown>),

@@ -6,7 +6,7 @@
 
 class Application;
 
-class JSApplication final : public SubObjectWrapper<Application, 9> {
+class JSApplication final : public SubObjectWrapper<Application, 11> {
 public:
     explicit JSApplication(NPP npp);
     ~JSApplication() override;

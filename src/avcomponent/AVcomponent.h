@@ -23,11 +23,11 @@ public:
     explicit AVcomponent(NPP npp);
 
     // 0 means no handle: the platform is never asked.
+    uint32_t getHandle() const { return m_handle; }
     void setHandle(uint32_t handle) { m_handle = handle; }
     void setType(AVcompType_T type) { m_type = type; }
     void setObjType(AVcompObjType_T objType) { m_objType = objType; }
 
-    uint32_t getHandle() const { return m_handle; }
     AVcompType_T getType() const { return m_type; }
 
     // Each is the platform's first successful answer, for a text the first that isn't empty. Until then they

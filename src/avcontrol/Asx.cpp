@@ -5,7 +5,6 @@
 
 #include <algorithm>
 #include <cstdint>
-#include <cstring>
 #include <deque>
 #include <string_view>
 #include <vector>
@@ -14,9 +13,11 @@
 
 namespace {
 
+// The texts of parameters and clips are parts of the playlist's text, which the list keeps, or of its joined
+// URLs: a clip is read without an allocation for each of its texts.
 struct AsxParam {
-    std::string name;
-    std::string value;
+    std::string_view name;
+    std::string_view value;
 };
 
 struct AsxEntry {
@@ -24,13 +25,13 @@ struct AsxEntry {
     uint8_t clientSkip = 0;
     uint32_t startTime = 0;
     uint32_t duration = 0;
-    std::string baseUrl;
-    std::string fileName;
-    std::string title;
-    std::string author;
-    std::string copyright;
-    std::string rating;
-    std::string description;
+    std::string_view baseUrl;
+    std::string_view fileName;
+    std::string_view title;
+    std::string_view author;
+    std::string_view copyright;
+    std::string_view rating;
+    std::string_view description;
     std::vector<AsxParam> params;
 };
 
@@ -50,6 +51,8 @@ struct AsxData {
     AsxEntry* currentClip = nullptr;
     std::vector<AsxParam> params;
     std::deque<AsxEntry> entries; // the clip with the index i stands at i - 1
+    std::string text;
+    std::deque<std::string> joinedUrls;
 };
 
 AsxData s_asxData;
@@ -58,42 +61,35 @@ char lowerCase(char c) {
     return c >= 'A' && c <= 'Z' ? static_cast<char>(c + 32) : c;
 }
 
-// Whether the text at p begins with `lower`, which is in lower case. Never reads past the text's end.
-bool beginsWith(const char* p, const char* lower) {
-    while (*lower && lowerCase(*p) == *lower) {
-        ++p;
-        ++lower;
-    }
-    return !*lower;
+constexpr size_t npos = std::string_view::npos;
+constexpr std::string_view blanks = "\t\n\r ";
+
+// Whether `lower`, which is in lower case, stands at `at`, a position in the text or its end.
+bool standsAt(std::string_view text, size_t at, std::string_view lower) {
+    return text.size() - at >= lower.size() &&
+           std::equal(lower.begin(), lower.end(), text.begin() + at,
+                      [](char wanted, char c) { return lowerCase(c) == wanted; });
 }
 
-// The next place where the tag beginning `lower` stands, or null.
-const char* searchTag(const char* p, const char* lower) {
-    for (p = std::strchr(p, '<'); p && !beginsWith(p, lower); p = std::strchr(p + 1, '<')) {
+// The next position at which the tag beginning `lower` stands, or npos.
+size_t searchTag(std::string_view text, size_t from, std::string_view lower) {
+    size_t at = text.find('<', from);
+    while (at != npos && !standsAt(text, at, lower)) {
+        at = text.find('<', at + 1);
     }
-    return p;
+    return at;
 }
 
-bool isBlank(char c) {
-    return c == '\t' || c == '\n' || c == '\r' || c == ' ';
-}
-
-const char* skipBlanks(const char* p) {
-    while (isBlank(*p)) {
-        ++p;
-    }
-    return p;
-}
-
-// The number at the start of [p, end), which may be empty or lie behind its end. A number too large gives 0
-// when it shows by getting smaller; one that wraps to something larger passes.
-uint32_t parseNumber(const char* p, const char* end) {
-    while (p < end && isBlank(*p)) {
-        ++p;
-    }
+// The number that the text begins with. One too large gives 0 when it shows by getting smaller; one that
+// wraps to something larger passes.
+uint32_t parseNumber(std::string_view text) {
     uint32_t value = 0;
-    for (; p < end && *p >= '0' && *p <= '9'; ++p) {
-        const uint32_t next = value * 10 + static_cast<uint32_t>(*p - '0');
+    for (size_t at = text.find_first_not_of(blanks); at < text.size(); ++at) {
+        const char c = text[at];
+        if (c < '0' || c > '9') {
+            break;
+        }
+        const uint32_t next = value * 10 + static_cast<uint32_t>(c - '0');
         if (static_cast<int32_t>(next) < static_cast<int32_t>(value)) {
             return 0;
         }
@@ -102,39 +98,39 @@ uint32_t parseNumber(const char* p, const char* end) {
     return value;
 }
 
-// The next colon from places that never move backwards. The last hit is remembered, so that all the searches
-// of a parse together read the text once.
+// The next colon from positions that never go back. The last hit is remembered, so that all the searches of a
+// parse together read the text once.
 class ColonSearch {
 public:
-    explicit ColonSearch(const char* text) : m_hit(std::strchr(text, ':')) {}
+    explicit ColonSearch(std::string_view text) : m_text(text), m_hit(text.find(':')) {}
 
-    const char* from(const char* p) {
-        if (m_hit && m_hit < p) {
-            m_hit = std::strchr(p, ':');
+    size_t from(size_t at) {
+        if (m_hit < at) {
+            m_hit = m_text.find(':', at);
         }
         return m_hit;
     }
 
 private:
-    const char* m_hit;
+    std::string_view m_text;
+    size_t m_hit; // npos, which is behind any position, if no colon follows
 };
 
-// One parse. A search that fails leaves m_p null, and the scan ends there with what it has read so far.
+// One parse. A search that fails leaves the position at npos, and the scan ends there with what it has read.
 class AsxScanner {
 public:
-    explicit AsxScanner(const char* text)
-        : m_text(text), m_p(text), m_firstColon(text), m_secondColon(text) {}
+    explicit AsxScanner(std::string_view text) : m_text(text), m_firstColon(text), m_secondColon(text) {}
 
     // Moves to the start of the playlist; false if the text is none.
     bool findStart() {
-        m_p = searchTag(m_p, "<asx");
-        return m_p;
+        m_at = searchTag(m_text, 0, "<asx");
+        return m_at != npos;
     }
 
     // Reads the clips and returns their number.
     uint32_t scan() {
         search('>');
-        while (m_p && search('<')) {
+        while (m_at != npos && search('<')) {
             readTag();
         }
         return m_count;
@@ -142,46 +138,47 @@ public:
 
 private:
     bool search(char c) {
-        m_p = std::strchr(m_p, c);
-        return m_p;
+        m_at = m_text.find(c, m_at);
+        return m_at != npos;
     }
 
-    void pass(const char* text) {
-        m_p = std::strstr(m_p, text);
-        if (m_p) {
-            m_p += std::strlen(text);
+    void pass(std::string_view token) {
+        m_at = m_text.find(token, m_at);
+        if (m_at != npos) {
+            m_at += token.size();
         }
     }
 
-    bool passPrefix(const char* lower) {
-        if (!beginsWith(m_p, lower)) {
+    bool passPrefix(std::string_view lower) {
+        if (!standsAt(m_text, m_at, lower)) {
             return false;
         }
-        m_p += std::strlen(lower);
+        m_at += lower.size();
         return true;
     }
 
     // Whether the tag's next attribute is `lower`, of which only these letters are compared.
-    bool atAttribute(const char* lower) {
-        m_p = skipBlanks(m_p);
-        return beginsWith(m_p, lower);
+    bool atAttribute(std::string_view lower) {
+        m_at = std::min(m_text.find_first_not_of(blanks, m_at), m_text.size());
+        return standsAt(m_text, m_at, lower);
     }
 
-    // The text between the next two double quotes; leaves m_p at the second.
+    // The text between the next two double quotes; leaves the position at the second.
     bool readQuoted(std::string_view& value) {
         if (!search('"')) {
             return false;
         }
-        const char* start = ++m_p;
+        const size_t start = ++m_at;
         if (!search('"')) {
             return false;
         }
-        value = {start, static_cast<size_t>(m_p - start)};
+        value = m_text.substr(start, m_at - start);
         return true;
     }
 
     void readTag();
-    void readText(const char* closingTag, std::string AsxEntry::*ofEntry, std::string AsxData::*ofList);
+    void readText(std::string_view closingTag, std::string_view AsxEntry::*ofEntry,
+                  std::string AsxData::*ofList);
     void readParam();
     void readBase();
     void readRepeat();
@@ -192,14 +189,14 @@ private:
     void readEntryEnd();
     uint32_t parseTime(std::string_view value);
 
-    const char* m_text;
-    const char* m_p;
+    std::string_view m_text;
+    size_t m_at = 0;
     AsxEntry* m_entry = nullptr; // the open one
     uint32_t m_count = 0;
     int32_t m_pendingRepeat = 0;
     bool m_repeatOpened = false;
-    std::string m_lastHref;
-    std::string m_joinedUrl;
+    std::string_view m_lastHref;
+    std::string_view m_joinedUrl;
     ColonSearch m_firstColon;
     ColonSearch m_secondColon;
 };
@@ -233,26 +230,30 @@ void AsxScanner::readTag() {
         readTime(&AsxEntry::duration, "duration outside an entry section");
     } else if (passPrefix("</entry>")) {
         readEntryEnd();
-    } else if (beginsWith(m_p, "</asx")) {
-        ++m_p; // what follows the end is read all the same
-        ASX_PARSE_LOG("ASX length = %ld", static_cast<long>(m_p - m_text));
-    } else if (beginsWith(m_p, "<!--")) {
+    } else if (standsAt(m_text, m_at, "</asx")) {
+        ++m_at; // what follows the end is read all the same
+        ASX_PARSE_LOG("ASX length = %ld", static_cast<long>(m_at));
+    } else if (standsAt(m_text, m_at, "<!--")) {
         pass("-->");
     } else {
-        ++m_p;
+        ++m_at;
     }
 }
 
-void AsxScanner::readText(const char* closingTag, std::string AsxEntry::*ofEntry,
+void AsxScanner::readText(std::string_view closingTag, std::string_view AsxEntry::*ofEntry,
                           std::string AsxData::*ofList) {
-    const char* start = m_p;
-    m_p = searchTag(m_p, closingTag);
-    if (!m_p) {
+    const size_t start = m_at;
+    m_at = searchTag(m_text, m_at, closingTag);
+    if (m_at == npos) {
         return;
     }
-    std::string& field = m_entry ? m_entry->*ofEntry : s_asxData.*ofList;
-    field.assign(start, m_p);
-    m_p += std::strlen(closingTag);
+    const std::string_view text = m_text.substr(start, m_at - start);
+    if (m_entry) {
+        m_entry->*ofEntry = text;
+    } else {
+        s_asxData.*ofList = text;
+    }
+    m_at += closingTag.size();
 }
 
 void AsxScanner::readParam() {
@@ -263,13 +264,11 @@ void AsxScanner::readParam() {
             return;
         }
         std::vector<AsxParam>& params = m_entry ? m_entry->params : s_asxData.params;
-        param = &params.emplace_back(AsxParam{std::string(text), {}});
+        param = &params.emplace_back(AsxParam{text, {}});
     }
-    // Past the closing quote. A tag without a name loses a character of its own, so "<PARAM />" isn't closed by
+    // Past the closing quote. A tag without a name loses a character of its own, so "<PARAM />" doesn't close
     // itself: meant.
-    if (*m_p) {
-        ++m_p;
-    }
+    m_at = std::min(m_at + 1, m_text.size());
     if (atAttribute("value")) {
         if (!readQuoted(text) || text.empty() || !param) {
             return;
@@ -285,7 +284,11 @@ void AsxScanner::readBase() {
         if (!readQuoted(url)) {
             return;
         }
-        (m_entry ? m_entry->baseUrl : s_asxData.baseUrl) = url;
+        if (m_entry) {
+            m_entry->baseUrl = url;
+        } else {
+            s_asxData.baseUrl = url;
+        }
     }
     pass("/>"); // a tag closed by ">" alone hides all up to the next "/>": meant
 }
@@ -302,7 +305,7 @@ void AsxScanner::readRepeat() {
         if (!readQuoted(count) || count.empty()) {
             return;
         }
-        m_pendingRepeat = static_cast<int32_t>(parseNumber(count.begin(), count.end()));
+        m_pendingRepeat = static_cast<int32_t>(parseNumber(count));
     } else {
         m_pendingRepeat = -1;
     }
@@ -327,14 +330,16 @@ void AsxScanner::readEntry() {
         ASX_PARSE_LOG("We already are in an entry section");
         return;
     }
-    const char* start = m_p;
+    const size_t start = m_at;
     if (!search('>')) {
         return;
     }
     // Only within the tag, so that not each clip looks through the whole text.
+    const std::string_view attributes = m_text.substr(start, m_at - start);
     constexpr std::string_view noSkip = "clientskip=\"no\"";
-    const bool skips = std::search(start, m_p, noSkip.begin(), noSkip.end(),
-                                   [](char c, char lower) { return lowerCase(c) == lower; }) == m_p;
+    const bool skips =
+        std::search(attributes.begin(), attributes.end(), noSkip.begin(), noSkip.end(),
+                    [](char c, char wanted) { return lowerCase(c) == wanted; }) == attributes.end();
     m_entry = &s_asxData.entries.emplace_back();
     m_entry->index = ++m_count;
     m_entry->clientSkip = skips ? 1 : 0;
@@ -354,17 +359,17 @@ void AsxScanner::readRef() {
         if (!readQuoted(href)) {
             return;
         }
-        href.remove_prefix(std::min(href.find_first_not_of("\t\n\r "), href.size()));
+        href.remove_prefix(std::min(href.find_first_not_of(blanks), href.size()));
         if (href.empty()) {
             return;
         }
         m_entry->fileName = href;
         m_lastHref = href;
         // The joined URL outlives its entry: a later entry under no base at all gets it again. Meant.
-        if (!m_entry->baseUrl.empty()) {
-            m_joinedUrl = asxAppendBaseUrl(m_entry->baseUrl, m_entry->fileName);
-        } else if (!s_asxData.baseUrl.empty()) {
-            m_joinedUrl = asxAppendBaseUrl(s_asxData.baseUrl, m_entry->fileName);
+        const std::string_view base = m_entry->baseUrl.empty() ? s_asxData.baseUrl : m_entry->baseUrl;
+        if (!base.empty()) {
+            m_joinedUrl =
+                s_asxData.joinedUrls.emplace_back(asxAppendBaseUrl(std::string(base), std::string(href)));
         }
         if (!m_joinedUrl.empty()) {
             m_entry->fileName = m_joinedUrl;
@@ -403,18 +408,22 @@ void AsxScanner::readEntryEnd() {
 // Seconds, or minutes and seconds, or hours, minutes and seconds, into seconds. Colons count wherever in the
 // text they follow: "30" before one colon is 30 minutes, before two 30 hours. Meant.
 uint32_t AsxScanner::parseTime(std::string_view value) {
-    const char* end = value.end();
-    const uint32_t first = parseNumber(value.begin(), end);
-    const char* colon = m_firstColon.from(value.begin());
-    if (!colon) {
+    const auto start = static_cast<size_t>(value.data() - m_text.data());
+    const size_t end = start + value.size();
+    const auto numberAfter = [&](size_t colon) {
+        return colon < end ? parseNumber(m_text.substr(colon + 1, end - (colon + 1))) : 0;
+    };
+    const uint32_t first = parseNumber(value);
+    size_t colon = m_firstColon.from(start);
+    if (colon == npos) {
         return first;
     }
-    const uint32_t second = parseNumber(colon + 1, end);
+    const uint32_t second = numberAfter(colon);
     colon = m_secondColon.from(colon + 1);
-    if (!colon) {
+    if (colon == npos) {
         return first * 60 + second;
     }
-    return (first * 60 + second) * 60 + parseNumber(colon + 1, end);
+    return (first * 60 + second) * 60 + numberAfter(colon);
 }
 
 #define ASX_PRINT_LOG(...) PLUGIN_LOG_FOR(LogModule::AVCONTROL, "asxPrintAsxData", __VA_ARGS__)
@@ -422,17 +431,18 @@ uint32_t AsxScanner::parseTime(std::string_view value) {
 // The texts that the list as a whole and a clip have in common.
 template <class Record>
 void logTexts(const Record& record) {
-    ASX_PRINT_LOG("ASX File Name: %s", record.fileName.c_str());
-    ASX_PRINT_LOG("ASX Title: %s", record.title.c_str());
-    ASX_PRINT_LOG("ASX Author: %s", record.author.c_str());
-    ASX_PRINT_LOG("ASX CopyRight: %s", record.copyright.c_str());
-    ASX_PRINT_LOG("ASX Rating: %s", record.rating.c_str());
-    ASX_PRINT_LOG("ASX Description: %s", record.description.c_str());
+    ASX_PRINT_LOG("ASX File Name: %s", std::string(record.fileName).c_str());
+    ASX_PRINT_LOG("ASX Title: %s", std::string(record.title).c_str());
+    ASX_PRINT_LOG("ASX Author: %s", std::string(record.author).c_str());
+    ASX_PRINT_LOG("ASX CopyRight: %s", std::string(record.copyright).c_str());
+    ASX_PRINT_LOG("ASX Rating: %s", std::string(record.rating).c_str());
+    ASX_PRINT_LOG("ASX Description: %s", std::string(record.description).c_str());
 }
 
 void logParams(const std::vector<AsxParam>& params) {
     for (const AsxParam& param : params) {
-        ASX_PRINT_LOG("ASX Param: %s = %s", param.name.c_str(), param.value.c_str());
+        ASX_PRINT_LOG("ASX Param: %s = %s", std::string(param.name).c_str(),
+                      std::string(param.value).c_str());
     }
 }
 
@@ -445,21 +455,22 @@ void logClip(const AsxEntry& clip) {
     logParams(clip.params);
 }
 
-std::string ofCurrentClip(std::string AsxEntry::*field) {
-    return s_asxData.currentClip ? s_asxData.currentClip->*field : std::string();
+std::string ofCurrentClip(std::string_view AsxEntry::*field) {
+    return std::string(s_asxData.currentClip ? s_asxData.currentClip->*field : std::string_view());
 }
 
 } // namespace
 
 std::string asxIsAsxfile(const void* data, unsigned /*size*/) {
-    const char* text = static_cast<const char*>(data);
-    return text && searchTag(text, "<asx") ? text : std::string();
+    const std::string_view text = data ? static_cast<const char*>(data) : "";
+    return std::string(searchTag(text, 0, "<asx") != npos ? text : "");
 }
 
 int asxParseAsx(const char* text, const std::string& url) {
     asxClear();
     s_asxData.fileName = url;
-    AsxScanner scanner(text);
+    s_asxData.text = text;
+    AsxScanner scanner(s_asxData.text);
     if (scanner.findStart()) {
         s_asxData.clipCount = scanner.scan();
         asxSetCurrentClipIndex(1);
@@ -475,6 +486,8 @@ void asxClear() {
     s_asxData.clipCount = 0;
     s_asxData.entries.clear();
     s_asxData.params.clear();
+    s_asxData.joinedUrls.clear();
+    s_asxData.text = std::string();
     s_asxData.repeatStart = 0;
     s_asxData.repeatEnd = 0;
     s_asxData.repeatCount = 0;
@@ -626,7 +639,7 @@ std::string asxGetParamName(unsigned index, unsigned n) {
         return {};
     }
     const std::vector<AsxParam>& params = index == 0 ? s_asxData.params : s_asxData.entries[index - 1].params;
-    return n >= 1 && n <= params.size() ? params[n - 1].name : std::string();
+    return std::string(n >= 1 && n <= params.size() ? params[n - 1].name : std::string_view());
 }
 
 // Names are looked for in the head of a list, which has neither a name nor a value, and not in its elements.

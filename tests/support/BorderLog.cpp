@@ -14,9 +14,16 @@ bool startsWith(const std::string& text, const std::string& prefix) {
 
 bool isBookkeeping(const std::string& entry) {
     static const char* const prefixes[] = {
-        "NPN_GetStringIdentifier", "NPN_GetIntIdentifier",   "NPN_IdentifierIsString", "NPN_UTF8FromIdentifier",
-        "NPN_IntFromIdentifier",   "NPN_RetainObject",       "NPN_ReleaseObject",      "NPN_ReleaseVariantValue",
-        "NPN_MemAlloc",            "NPN_MemFree",
+        "NPN_GetStringIdentifier",
+        "NPN_GetIntIdentifier",
+        "NPN_IdentifierIsString",
+        "NPN_UTF8FromIdentifier",
+        "NPN_IntFromIdentifier",
+        "NPN_RetainObject",
+        "NPN_ReleaseObject",
+        "NPN_ReleaseVariantValue",
+        "NPN_MemAlloc",
+        "NPN_MemFree",
     };
     return std::any_of(std::begin(prefixes), std::end(prefixes),
                        [&](const char* prefix) { return startsWith(entry, prefix); });

@@ -1,5 +1,5 @@
-// What crossed the plug-in's border during a test, in order: calls of the browser table, calls of the platform
-// library and the DOM events of the page, each as one short readable text.
+// What crossed the plug-in's border during a test, in order: calls of the browser table, calls of the
+// platform library and the DOM events of the page, each as one short readable text.
 #ifndef TELIX_TESTS_SUPPORT_BORDERLOG_H
 #define TELIX_TESTS_SUPPORT_BORDERLOG_H
 
@@ -14,7 +14,8 @@ public:
 
     // Returns the entry's place, for amend().
     size_t add(const std::string& text);
-    // Completes an entry with what is known only after the call. Does nothing if the log was cleared meanwhile.
+    // Completes an entry with what is known only after the call. Does nothing if the log was cleared
+    // meanwhile.
     void amend(size_t place, const std::string& text);
     void clear();
 
@@ -27,8 +28,8 @@ public:
     size_t count(const std::string& prefix) const { return startingWith(prefix).size(); }
     bool contains(const std::string& entry) const;
 
-    // Each expected entry stands in the log behind the one before it; others may stand between. Fails the test
-    // with the whole log if not.
+    // Each expected entry stands in the log behind the one before it; others may stand between. Fails the
+    // test with the whole log if not.
     void expectInOrder(const Entries& expected) const;
 
     // One entry a line.

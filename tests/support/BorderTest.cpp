@@ -7,6 +7,8 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
+#include <gtest/gtest-spi.h>
+
 namespace {
 
 // Runs the body in a child process and returns what that printed.
@@ -23,9 +25,18 @@ std::string printedBy(const char* level, const std::function<void()>& body) {
         if (level) {
             setenv("LOG_MODULE", level, 1);
         }
-        body();
+        ::testing::TestPartResultArray failures;
+        {
+            using Reporter = ::testing::ScopedFakeTestPartResultReporter;
+            const Reporter ofOtherThreads(Reporter::INTERCEPT_ALL_THREADS, &failures);
+            const Reporter ofThisThread(Reporter::INTERCEPT_ONLY_CURRENT_THREAD, &failures);
+            body();
+        }
+        for (int i = 0; i < failures.size(); ++i) {
+            std::printf("%s\n", failures.GetTestPartResult(i).message());
+        }
         std::fflush(nullptr);
-        _exit(::testing::Test::HasFailure() ? 1 : 0);
+        _exit(failures.size() > 0 ? 1 : 0);
     }
     int status = -1;
     waitpid(child, &status, 0);

@@ -22,8 +22,8 @@ public:
     BrowserStream& operator=(const BrowserStream&) = delete;
 
     NPError offer(const std::string& type, bool seekable);
-    NPError error() const { return m_error; }     // what NPP_NewStream said
-    uint16_t mode() const { return m_mode; }      // the stream mode that the instance chose
+    NPError error() const { return m_error; } // what NPP_NewStream said
+    uint16_t mode() const { return m_mode; }  // the stream mode that the instance chose
     int32_t writeReady();
     // NPP_Write with the next bytes of the stream, zeros behind them in memory; or at another offset.
     int32_t write(const std::string& bytes);

@@ -68,7 +68,8 @@ bool invokeDefault(NPObject* object, const NPVariant* args, uint32_t argCount, N
     return deliver(body ? body(arguments) : Value(), result);
 }
 
-bool invoke(NPObject* object, NPIdentifier name, const NPVariant* args, uint32_t argCount, NPVariant* result) {
+bool invoke(NPObject* object, NPIdentifier name, const NPVariant* args, uint32_t argCount,
+            NPVariant* result) {
     PageObject& page = pageObject(object);
     const std::string key = ScriptedBrowser::textOf(name);
     const auto method = page.methods.find(key);
@@ -111,9 +112,10 @@ void PageObject::forget() {
 }
 
 NPClass* PageObject::pageClass() {
-    static NPClass record = {NP_CLASS_STRUCT_VERSION, nullptr,        nullptr,     nullptr,     ::hasMethod,
-                             ::invoke,                ::invokeDefault, ::hasProperty, ::getProperty, ::setProperty,
-                             ::removeProperty,        ::enumerate,    ::invokeDefault};
+    static NPClass record = {
+        NP_CLASS_STRUCT_VERSION, nullptr,       nullptr,       nullptr,       ::hasMethod,      ::invoke,
+        ::invokeDefault,         ::hasProperty, ::getProperty, ::setProperty, ::removeProperty, ::enumerate,
+        ::invokeDefault};
     return &record;
 }
 

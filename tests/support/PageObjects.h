@@ -1,4 +1,5 @@
-// Objects and functions of the page: what script itself would make. They are handles; copies share the object.
+// Objects and functions of the page: what script itself would make. They are handles; copies share the
+// object.
 #ifndef TELIX_TESTS_SUPPORT_PAGEOBJECTS_H
 #define TELIX_TESTS_SUPPORT_PAGEOBJECTS_H
 

@@ -50,9 +50,10 @@ std::string wrapperNameOf(NPObject* object) {
     const auto& wrapper = *static_cast<JSPluginBase*>(object);
     int status = 0;
     char* name = abi::__cxa_demangle(typeid(wrapper).name(), nullptr, nullptr, &status);
-    std::string result = status == 0 ? name : "object";
+    const std::string qualified = status == 0 ? name : "object";
     std::free(name);
-    return result;
+    const size_t scope = qualified.rfind("::");
+    return scope == std::string::npos ? qualified : qualified.substr(scope + 2);
 }
 
 std::string quoted(const char* text) {
@@ -180,8 +181,9 @@ struct BrowserTable {
     }
 
     static void* memAlloc(uint32_t size) {
-        return browser().enter("NPN_MemAlloc", [&] { return std::to_string(size); }) ? browser().newBlock(size)
-                                                                                     : nullptr;
+        return browser().enter("NPN_MemAlloc", [&] { return std::to_string(size); })
+                   ? browser().newBlock(size)
+                   : nullptr;
     }
 
     static void memFree(void* block) {
@@ -213,7 +215,8 @@ struct BrowserTable {
                    : NPERR_GENERIC_ERROR;
     }
 
-    static NPError postUrlNotify(NPP, const char* url, const char* target, uint32_t, const char*, NPBool, void*) {
+    static NPError postUrlNotify(NPP, const char* url, const char* target, uint32_t, const char*, NPBool,
+                                 void*) {
         return browser().enter("NPN_PostURLNotify", [&] { return quoted(url) + " " + quoted(target); })
                    ? NPERR_NO_ERROR
                    : NPERR_GENERIC_ERROR;
@@ -300,7 +303,8 @@ struct BrowserTable {
     // Null for an integer. The block is the plug-in's, to be freed with free().
     static char* utf8FromIdentifier(NPIdentifier identifier) {
         const auto& known = *static_cast<Identifier*>(identifier);
-        const bool allowed = browser().enter("NPN_UTF8FromIdentifier", [&] { return ScriptedBrowser::textOf(identifier); });
+        const bool allowed =
+            browser().enter("NPN_UTF8FromIdentifier", [&] { return ScriptedBrowser::textOf(identifier); });
         return allowed && known.isString ? strdup(known.text.c_str()) : nullptr;
     }
 
@@ -368,7 +372,8 @@ struct BrowserTable {
         return object->_class->invoke(object, method, args, argCount, result);
     }
 
-    static bool invokeDefault(NPP, NPObject* object, const NPVariant* args, uint32_t argCount, NPVariant* result) {
+    static bool invokeDefault(NPP, NPObject* object, const NPVariant* args, uint32_t argCount,
+                              NPVariant* result) {
         Value().giveTo(*result);
         if (!browser().enter("NPN_InvokeDefault", [&] { return name(object) + list(args, argCount); })) {
             return false;
@@ -401,7 +406,8 @@ struct BrowserTable {
 
     static bool setProperty(NPP, NPObject* object, NPIdentifier property, const NPVariant* value) {
         if (!browser().enter("NPN_SetProperty", [&] {
-                return name(object) + "." + ScriptedBrowser::textOf(property) + " = " + listOf({Value::copyOf(*value)});
+                return name(object) + "." + ScriptedBrowser::textOf(property) + " = " +
+                       listOf({Value::copyOf(*value)});
             })) {
             return false;
         }
@@ -469,7 +475,8 @@ struct BrowserTable {
         target.m_asyncCalls.push_back({function, data});
     }
 
-    static bool construct(NPP, NPObject* object, const NPVariant* args, uint32_t argCount, NPVariant* result) {
+    static bool construct(NPP, NPObject* object, const NPVariant* args, uint32_t argCount,
+                          NPVariant* result) {
         Value().giveTo(*result);
         return browser().enter("NPN_Construct", [&] { return name(object) + list(args, argCount); }) &&
                browser().isLive(object, "NPN_Construct") && object->_class->construct &&
@@ -486,8 +493,8 @@ struct BrowserTable {
         return NPERR_GENERIC_ERROR;
     }
 
-    static NPError getAuthenticationInfo(NPP, const char*, const char*, int32_t, const char*, const char*, char**,
-                                         uint32_t*, char**, uint32_t*) {
+    static NPError getAuthenticationInfo(NPP, const char*, const char*, int32_t, const char*, const char*,
+                                         char**, uint32_t*, char**, uint32_t*) {
         browser().enter("NPN_GetAuthenticationInfo");
         return NPERR_GENERIC_ERROR;
     }
@@ -612,8 +619,8 @@ ScriptedBrowser::ScriptedBrowser() : m_table(BrowserTable::make()) {
 ScriptedBrowser::~ScriptedBrowser() {
     closePage();
     shutdown();
-    m_window = {};
-    m_document = {};
+    m_window.reset();
+    m_document.reset();
     for (const auto& entry : m_accounts) {
         leftBehindObjects().push_back(entry.first);
     }
@@ -646,7 +653,8 @@ NPError ScriptedBrowser::shutdown() {
     return NP_Shutdown();
 }
 
-EmbeddedObject ScriptedBrowser::embed(const std::string& mimeType, const Attributes& attributes, uint16_t mode) {
+EmbeddedObject ScriptedBrowser::embed(const std::string& mimeType, const Attributes& attributes,
+                                      uint16_t mode) {
     const EmbeddedObject object(std::make_shared<EmbeddedObject::Record>());
     m_instances.push_back(object.m_record);
 
@@ -669,8 +677,9 @@ EmbeddedObject ScriptedBrowser::embed(const std::string& mimeType, const Attribu
     element.method("removeEventListener", [](const Values&) { return Value(); });
 
     std::string type = mimeType;
-    object.m_record->error = m_plugin.newp(type.data(), object.npp(), mode, static_cast<int16_t>(attributes.size()),
-                                           names.data(), values.data(), nullptr);
+    object.m_record->error =
+        m_plugin.newp(type.data(), object.npp(), mode, static_cast<int16_t>(attributes.size()), names.data(),
+                      values.data(), nullptr);
     return object;
 }
 
@@ -767,8 +776,8 @@ std::vector<LiveObject> ScriptedBrowser::liveObjects() const {
     std::vector<std::pair<unsigned, LiveObject>> numbered;
     for (const auto& [object, account] : m_accounts) {
         numbered.push_back({account.serial,
-                            {object, account.name, account.className, static_cast<int>(object->referenceCount),
-                             pluginReferences(object)}});
+                            {object, account.name, account.className,
+                             static_cast<int>(object->referenceCount), pluginReferences(object)}});
     }
     std::sort(numbered.begin(), numbered.end(),
               [](const auto& left, const auto& right) { return left.first < right.first; });
@@ -804,19 +813,21 @@ void ScriptedBrowser::closePage() {
         }
         pump();
     }
-    for (const auto& record : m_instances) {
-        record->scriptObject = {};
-        record->element = {};
-    }
     m_rules.clear();
     m_listeners.clear();
-    // Page objects may hold each other.
-    for (const LiveObject& live : liveObjects()) {
-        const bool stillLive = m_accounts.count(live.object) > 0;
-        if (PageObject* object = stillLive ? PageObject::from(live.object) : nullptr) {
-            const ObjectRef kept = ObjectRef::share(object);
-            object->forget();
+    // One by one: the end of an object takes further references along.
+    const auto isOfScript = [this](const ObjectRef* reference) {
+        return reference != &m_window && reference != &m_document;
+    };
+    for (;;) {
+        const auto next = std::find_if(m_pageReferences.begin(), m_pageReferences.end(), isOfScript);
+        if (next == m_pageReferences.end()) {
+            break;
         }
+        (*next)->reset();
+    }
+    for (const ObjectRef* reference : {&m_window, &m_document}) {
+        PageObject::from(reference->object())->forget();
     }
     if (m_initialized) {
         pump();

@@ -35,30 +35,62 @@ Name::Name(const std::string& text) : m_identifier(ScriptedBrowser::identifier(t
 Name::Name(int index) : m_identifier(ScriptedBrowser::identifier(index)) {}
 
 ObjectRef ObjectRef::share(NPObject* object) {
-    return ObjectRef(object && ScriptedBrowser::current().pageRetain(object) ? object : nullptr);
+    ObjectRef reference;
+    if (object && ScriptedBrowser::current().pageRetain(object)) {
+        reference.attach(object);
+    }
+    return reference;
 }
 
 ObjectRef ObjectRef::adopt(NPObject* object) {
-    return ObjectRef(object && ScriptedBrowser::current().pageAdopt(object) ? object : nullptr);
+    ObjectRef reference;
+    if (object && ScriptedBrowser::current().pageAdopt(object)) {
+        reference.attach(object);
+    }
+    return reference;
 }
 
-ObjectRef::ObjectRef(const ObjectRef& other) : m_object(other.m_object) {
-    if (m_object) {
-        ScriptedBrowser::current().pageRetain(m_object);
+ObjectRef::ObjectRef(const ObjectRef& other) {
+    if (other.m_object) {
+        ScriptedBrowser::current().pageRetain(other.m_object);
+        attach(other.m_object);
     }
 }
 
-ObjectRef::ObjectRef(ObjectRef&& other) noexcept : m_object(std::exchange(other.m_object, nullptr)) {}
+ObjectRef::ObjectRef(ObjectRef&& other) noexcept {
+    attach(other.detach());
+}
 
 ObjectRef& ObjectRef::operator=(ObjectRef other) noexcept {
-    std::swap(m_object, other.m_object);
+    NPObject* const mine = detach();
+    attach(other.detach());
+    other.attach(mine);
     return *this;
 }
 
 ObjectRef::~ObjectRef() {
-    if (m_object && ScriptedBrowser::exists()) {
-        ScriptedBrowser::current().pageRelease(m_object);
+    reset();
+}
+
+void ObjectRef::reset() {
+    if (NPObject* const object = detach()) {
+        ScriptedBrowser::current().pageRelease(object);
     }
+}
+
+void ObjectRef::attach(NPObject* object) {
+    m_object = object;
+    if (object) {
+        ScriptedBrowser::current().addPageReference(this);
+    }
+}
+
+// A reference that outlives its browser is empty by then.
+NPObject* ObjectRef::detach() {
+    if (m_object) {
+        ScriptedBrowser::current().removePageReference(this);
+    }
+    return std::exchange(m_object, nullptr);
 }
 
 std::string ObjectRef::name() const {
@@ -75,7 +107,8 @@ bool ObjectRef::hasProperty(const Name& name) const {
 }
 
 bool ObjectRef::hasMethod(const Name& name) const {
-    return m_object && m_object->_class->hasMethod && m_object->_class->hasMethod(m_object, name.identifier());
+    return m_object && m_object->_class->hasMethod &&
+           m_object->_class->hasMethod(m_object, name.identifier());
 }
 
 namespace {
@@ -103,8 +136,8 @@ Outcome ObjectRef::get(const Name& name) const {
     const ObjectRef kept = *this;
     const bool exists = hasProperty(name);
     NPVariant result = voidVariant;
-    const bool succeeded = m_object->_class->getProperty &&
-                           m_object->_class->getProperty(m_object, name.identifier(), &result);
+    const bool succeeded =
+        m_object->_class->getProperty && m_object->_class->getProperty(m_object, name.identifier(), &result);
     return finish(exists, succeeded, result);
 }
 
@@ -131,8 +164,9 @@ Outcome ObjectRef::callWith(const Name& name, const Values& arguments) const {
     const bool exists = hasMethod(name);
     const ArgumentArray array(arguments);
     NPVariant result = voidVariant;
-    const bool succeeded = m_object->_class->invoke && m_object->_class->invoke(m_object, name.identifier(), array.data(),
-                                                                                array.count(), &result);
+    const bool succeeded =
+        m_object->_class->invoke &&
+        m_object->_class->invoke(m_object, name.identifier(), array.data(), array.count(), &result);
     return finish(exists, succeeded, result);
 }
 
@@ -230,7 +264,8 @@ void Value::giveTo(NPVariant& variant) const {
         break;
     case NPVariantType_String: {
         const std::string text = string();
-        variant.value.stringValue = {ScriptedBrowser::current().newBlockOf(text), static_cast<uint32_t>(text.size())};
+        variant.value.stringValue = {ScriptedBrowser::current().newBlockOf(text),
+                                     static_cast<uint32_t>(text.size())};
         break;
     }
     case NPVariantType_Object:
@@ -316,7 +351,8 @@ std::ostream& operator<<(std::ostream& stream, const Outcome& outcome) {
 }
 
 ArgumentArray::ArgumentArray(const Values& values)
-    : m_variants(values.size() + paddingVariants, voidVariant), m_count(static_cast<uint32_t>(values.size())) {
+    : m_variants(values.size() + paddingVariants, voidVariant),
+      m_count(static_cast<uint32_t>(values.size())) {
     for (size_t i = 0; i < values.size(); ++i) {
         NPVariant& variant = m_variants[i];
         variant.type = values[i].type();

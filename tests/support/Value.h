@@ -34,7 +34,7 @@ private:
 };
 
 // One counted reference of the page's to a script object, and what a script can do with the object. Null if
-// empty.
+// empty, and after the browser has closed its page.
 class ObjectRef {
 public:
     ObjectRef() = default;
@@ -71,8 +71,12 @@ public:
     bool hasProperty(const Name& name) const;
     bool hasMethod(const Name& name) const;
 
+    // Drops the reference.
+    void reset();
+
 private:
-    explicit ObjectRef(NPObject* object) : m_object(object) {}
+    void attach(NPObject* object);
+    NPObject* detach();
 
     NPObject* m_object = nullptr;
 };
@@ -86,7 +90,8 @@ public:
     Value(Undefined) {}
     Value(std::nullptr_t) : m_content(nullptr) {}
     Value(bool value) : m_content(value) {}
-    template <class Integer, std::enable_if_t<std::is_integral_v<Integer> && !std::is_same_v<Integer, bool>, int> = 0>
+    template <class Integer,
+              std::enable_if_t<std::is_integral_v<Integer> && !std::is_same_v<Integer, bool>, int> = 0>
     Value(Integer value) : m_content(static_cast<int32_t>(value)) {}
     Value(double value) : m_content(value) {}
     Value(const char* text) : m_content(std::string(text)) {}
@@ -115,7 +120,9 @@ public:
     std::string string() const;
     ObjectRef object() const;
 
-    friend bool operator==(const Value& left, const Value& right) { return left.m_content == right.m_content; }
+    friend bool operator==(const Value& left, const Value& right) {
+        return left.m_content == right.m_content;
+    }
     friend bool operator!=(const Value& left, const Value& right) { return !(left == right); }
 
 private:

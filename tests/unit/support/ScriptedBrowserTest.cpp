@@ -207,7 +207,8 @@ TEST_F(ScriptedBrowserTest, PumpsIdleFunctionsAndWhatTheyQueue) {
     g_idle_add(
         [](void*) -> gboolean {
             ++runs;
-            NPN_PluginThreadAsyncCall(nullptr, [](void*) { ++runs; }, nullptr);
+            NPN_PluginThreadAsyncCall(
+                nullptr, [](void*) { ++runs; }, nullptr);
             return G_SOURCE_REMOVE;
         },
         nullptr);
@@ -226,7 +227,8 @@ TEST_F(ScriptedBrowserTest, WaitsForATimerAndNoLongerThanTheBound) {
         },
         nullptr);
     EXPECT_TRUE(browser.pumpUntil([] { return done; }));
-    EXPECT_NONFATAL_FAILURE(browser.pumpUntil([] { return false; }, std::chrono::milliseconds(1)), "within 1 ms");
+    EXPECT_NONFATAL_FAILURE(browser.pumpUntil([] { return false; }, std::chrono::milliseconds(1)),
+                            "within 1 ms");
 }
 
 TEST_F(ScriptedBrowserTest, EvaluatesAsTheTestSaysYoungestRuleFirst) {
@@ -239,7 +241,9 @@ TEST_F(ScriptedBrowserTest, EvaluatesAsTheTestSaysYoungestRuleFirst) {
     EXPECT_EQ(value, 1);
     EXPECT_TRUE(evaluate("window.special()", &value));
     EXPECT_EQ(value, "special");
-    browser.whenEvaluatingIf([&](const Evaluation& evaluation) { return evaluation.scope == browser.window(); }).throws();
+    browser
+        .whenEvaluatingIf([&](const Evaluation& evaluation) { return evaluation.scope == browser.window(); })
+        .throws();
     EXPECT_FALSE(evaluate("window.special()", &value));
     EXPECT_EQ(browser.lastScript(), "window.special()");
     EXPECT_EQ(browser.scripts().size(), 4U);
@@ -263,8 +267,9 @@ TEST_F(ScriptedBrowserTest, DispatchesDomEventsAtElementsOfThePage) {
     browser.embed("application/none", {{"id", "tv"}});
     size_t heard = 0;
     browser.onEvent("Buffering", [&](const DomEvent&) { ++heard; });
-    const std::string script = "var objElement=document.getElementById(\"tv\"); newEvent=document.createEvent(\"Event\");"
-                               "newEvent.initEvent(\"Buffering\", true,false); objElement.dispatchEvent(newEvent);";
+    const std::string script =
+        "var objElement=document.getElementById(\"tv\"); newEvent=document.createEvent(\"Event\");"
+        "newEvent.initEvent(\"Buffering\", true,false); objElement.dispatchEvent(newEvent);";
     Value value;
     EXPECT_TRUE(evaluate(script, &value));
     EXPECT_EQ(value, true);
@@ -282,11 +287,15 @@ TEST_F(ScriptedBrowserTest, AnEventAtAnUnknownElementThrows) {
 
 TEST_F(ScriptedBrowserTest, ReadsTheFieldsOfAStreamEvent) {
     browser.embed("application/none", {{"id", "tv"}});
-    EXPECT_TRUE(evaluate("var objElement = document.getElementById(\"tv\"); strEvent.initEvent('StreamEvent', false, false); "
-                         "strEvent.name = \"n\"; strEvent.data = \"41\";  strEvent.text = \"A\";  strEvent.status = "
-                         "\"trigger\"; objElement.dispatchEvent(strEvent);"));
-    const DomEvent expected{
-        "StreamEvent", "tv", false, false, {{"name", "n"}, {"data", "41"}, {"text", "A"}, {"status", "trigger"}}};
+    EXPECT_TRUE(evaluate(
+        "var objElement = document.getElementById(\"tv\"); strEvent.initEvent('StreamEvent', false, false); "
+        "strEvent.name = \"n\"; strEvent.data = \"41\";  strEvent.text = \"A\";  strEvent.status = "
+        "\"trigger\"; objElement.dispatchEvent(strEvent);"));
+    const DomEvent expected{"StreamEvent",
+                            "tv",
+                            false,
+                            false,
+                            {{"name", "n"}, {"data", "41"}, {"text", "A"}, {"status", "trigger"}}};
     EXPECT_THAT(browser.events(), ElementsAre(expected));
 }
 
@@ -309,7 +318,8 @@ TEST_F(ScriptedBrowserTest, AFunctionRemembersItsCallsAndDoesWhatTheTestSays) {
 
 TEST_F(ScriptedBrowserTest, PageObjectsHavePropertiesAndMethods) {
     const ScriptObject object = browser.scriptObject("thing");
-    object.method("sum", [](const Values& values) { return Value(values[0].integer() + values[1].integer()); });
+    object.method("sum",
+                  [](const Values& values) { return Value(values[0].integer() + values[1].integer()); });
     EXPECT_EQ(object.call("sum", 2, 3), 5);
     EXPECT_THAT(object.calls("sum"), ElementsAre(Values{2, 3}));
     EXPECT_FALSE(object.call("missing"));

@@ -44,8 +44,8 @@ TEST_F(ValueTest, PrintsAsInScript) {
 
 TEST_F(ValueTest, GivesAwayEveryTypeAndTakesItBack) {
     const ScriptObject object = browser.scriptObject("thing");
-    for (const Value& value :
-         {Value(), Value(nullptr), Value(true), Value(7), Value(0.5), Value("a text"), Value(""), Value(object)}) {
+    for (const Value& value : {Value(), Value(nullptr), Value(true), Value(7), Value(0.5), Value("a text"),
+                               Value(""), Value(object)}) {
         NPVariant variant;
         value.giveTo(variant);
         EXPECT_EQ(variant.type, value.type());

@@ -1,0 +1,49 @@
+// A page as the engine runs it for one application: settings, messages and failures.
+#include "desktop/browser/ApplicationPage.h"
+
+#include "desktop/browser/Diagnostics.h"
+
+#include <QWebFrame>
+
+ApplicationPage::ApplicationPage(QObject* parent) : QWebPage(parent) {
+    mainFrame()->setScrollBarPolicy(Qt::Horizontal, Qt::ScrollBarAlwaysOff);
+    mainFrame()->setScrollBarPolicy(Qt::Vertical, Qt::ScrollBarAlwaysOff);
+    connect(this, &QWebPage::loadStarted, this, [this] { m_loadFailure.clear(); });
+}
+
+bool ApplicationPage::supportsExtension(Extension extension) const {
+    return extension == ErrorPageExtension;
+}
+
+// The engine asks for an error page when a load fails; the reason is all that is wanted here.
+bool ApplicationPage::extension(Extension extension, const ExtensionOption* option, ExtensionReturn*) {
+    if (extension != ErrorPageExtension)
+        return false;
+    const auto* error = static_cast<const ErrorPageExtensionOption*>(option);
+    if (error->frame == mainFrame()) {
+        m_loadFailure = error->errorString;
+        m_failedUrl = error->url;
+    } else {
+        printError(QStringLiteral("can't load %1: %2").arg(error->url.toDisplayString(), error->errorString));
+    }
+    return false;
+}
+
+void ApplicationPage::javaScriptConsoleMessage(const QString& message, int line, const QString& source) {
+    // The engine does not always say which script a message comes from.
+    printConsoleMessage(source.isEmpty() ? mainFrame()->url().toString() : source, line, message);
+}
+
+void ApplicationPage::javaScriptAlert(QWebFrame*, const QString& message) {
+    printError(QStringLiteral("the page says: %1").arg(message));
+}
+
+bool ApplicationPage::javaScriptConfirm(QWebFrame*, const QString& message) {
+    printError(QStringLiteral("the page asks, and is told no: %1").arg(message));
+    return false;
+}
+
+bool ApplicationPage::javaScriptPrompt(QWebFrame*, const QString& message, const QString&, QString*) {
+    printError(QStringLiteral("the page asks, and is told nothing: %1").arg(message));
+    return false;
+}

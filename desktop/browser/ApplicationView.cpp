@@ -1,0 +1,121 @@
+// One application of the stack: its page on the screen, and the keys that reach it.
+#include "desktop/browser/ApplicationView.h"
+
+#include "desktop/browser/ApplicationPage.h"
+#include "desktop/browser/PageScript.h"
+#include "desktop/browser/RemoteControl.h"
+
+#include <QCoreApplication>
+#include <QKeyEvent>
+#include <QPalette>
+#include <QWebFrame>
+
+namespace {
+
+// The key of the remote control that a keyboard event stands for and that the engine knows no code for, or
+// null.
+const RemoteKey* keyUnknownToEngine(const QKeyEvent& event) {
+    const auto shortcutModifiers = Qt::ControlModifier | Qt::AltModifier | Qt::MetaModifier;
+    if (event.modifiers() & shortcutModifiers)
+        return nullptr;
+    const RemoteKey* key = remoteKeyByKeyboardKey(event.key());
+    return key && !key->knownToEngine ? key : nullptr;
+}
+
+// The event as the engine should see it: the number pad is part of the remote control, so its keys have the
+// codes of the ordinary ones.
+QKeyEvent withoutNumberPad(const QKeyEvent& event) {
+    return QKeyEvent(event.type(), event.key(), event.modifiers() & ~Qt::KeypadModifier, event.text(),
+                     event.isAutoRepeat(), static_cast<ushort>(event.count()));
+}
+
+// The text that a keyboard would send along with the key.
+QString textOf(const RemoteKey& key) {
+    const bool hasText = key.keyCode == '\r' || (key.keyCode >= '0' && key.keyCode <= '9');
+    return hasText ? QString(QChar(key.keyCode)) : QString();
+}
+
+} // namespace
+
+ApplicationView::ApplicationView(QWidget* parent) : QWebView(parent), m_page(new ApplicationPage(this)) {
+    setPage(m_page);
+    // Where a page has no background of its own, what lies beneath it shows. The page takes the view's
+    // palette. The view would promise to paint every one of its pixels.
+    QPalette transparent = palette();
+    transparent.setBrush(QPalette::Base, Qt::transparent);
+    setPalette(transparent);
+    setAttribute(Qt::WA_OpaquePaintEvent, false);
+    if (!m_page->settings()->testAttribute(QWebSettings::DeveloperExtrasEnabled))
+        setContextMenuPolicy(Qt::NoContextMenu);
+    connect(m_page, &QWebPage::loadStarted, this, [this] { m_loaded = false; });
+    connect(m_page, &QWebPage::loadFinished, this, &ApplicationView::onLoadFinished);
+}
+
+void ApplicationView::onLoadFinished(bool ok) {
+    m_loaded = ok || m_hasDocument;
+    m_hasDocument = m_loaded;
+    if (!m_page->loadFailure().isEmpty())
+        emit loadFailed(m_page->loadFailure());
+}
+
+void ApplicationView::setShown(bool shown) {
+    m_shown = shown;
+    tellVisibility();
+    update();
+}
+
+void ApplicationView::press(const RemoteKey& key) {
+    const QString text = textOf(key);
+    QKeyEvent press(QEvent::KeyPress, key.keyboardKeys.first(), Qt::NoModifier, text);
+    QCoreApplication::sendEvent(this, &press);
+    QKeyEvent release(QEvent::KeyRelease, key.keyboardKeys.first(), Qt::NoModifier, text);
+    QCoreApplication::sendEvent(this, &release);
+}
+
+void ApplicationView::paintEvent(QPaintEvent* event) {
+    if (m_shown)
+        QWebView::paintEvent(event);
+}
+
+void ApplicationView::showEvent(QShowEvent* event) {
+    QWebView::showEvent(event);
+    tellVisibility();
+}
+
+void ApplicationView::hideEvent(QHideEvent* event) {
+    QWebView::hideEvent(event);
+    tellVisibility();
+}
+
+void ApplicationView::keyPressEvent(QKeyEvent* event) {
+    const RemoteKey* key = keyUnknownToEngine(*event);
+    if (!key) {
+        QKeyEvent plain = withoutNumberPad(*event);
+        QWebView::keyPressEvent(&plain);
+        return;
+    }
+    if (dispatch("keydown", *key))
+        dispatch("keypress", *key);
+}
+
+void ApplicationView::keyReleaseEvent(QKeyEvent* event) {
+    const RemoteKey* key = keyUnknownToEngine(*event);
+    if (!key) {
+        QKeyEvent plain = withoutNumberPad(*event);
+        QWebView::keyReleaseEvent(&plain);
+    } else if (!event->isAutoRepeat()) {
+        dispatch("keyup", *key);
+    }
+}
+
+void ApplicationView::tellVisibility() {
+    m_page->setVisibilityState(isVisible() && m_shown ? QWebPage::VisibilityStateVisible
+                                                      : QWebPage::VisibilityStateHidden);
+}
+
+// False when the page prevented the default action.
+bool ApplicationView::dispatch(const char* type, const RemoteKey& key) {
+    return callPageScript(*m_page->currentFrame(), QStringLiteral("dispatchkey"),
+                          {QLatin1String(type), key.keyCode})
+        .toBool();
+}

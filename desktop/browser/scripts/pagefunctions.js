@@ -1,0 +1,23 @@
+// What every page of a TV browser finds in its window before its own scripts run: the functions that open, close, show
+// and hide applications, and the key codes of the remote control. Called once per window with the key codes by name.
+(function (keyCodes) {
+    var browser = window.telixTvBrowser;
+    delete window.telixTvBrowser;
+
+    window.createHbbTVApplication = function (uri) {
+        return arguments.length > 0 && browser.createApplication(String(uri));
+    };
+    window.destroyHbbTVApplication = function () {
+        browser.destroyApplication();
+    };
+    window.showHbbTVApplication = function () {
+        browser.showApplication();
+    };
+    window.hideHbbTVApplication = function () {
+        browser.hideApplication();
+    };
+
+    for (var name in keyCodes) {
+        window[name] = keyCodes[name];
+    }
+})

@@ -1,0 +1,30 @@
+// The script interface of an application's private data.
+#include "src/application/JSApplicationPrivateData.h"
+
+namespace {
+
+using Model = ApplicationPrivateData;
+
+// Meant: an object also when there is none; no null is put in its place.
+bool readCurrentChannel(PluginBase& model, NPVariant& result) {
+    result.type = NPVariantType_Object;
+    result.value.objectValue = static_cast<Model&>(model).getCurrChannel();
+    return true;
+}
+
+constexpr ScriptMember kMembers[] = {
+    property("keyset", read<&Model::keySet>),
+    method("getFreeMem", invoke<&Model::getFreeMem>),
+    property("currentChannel", readCurrentChannel),
+};
+
+constexpr ScriptClass kClass("JSApplicationPrivateData", LogModule::APP_MGR, kMembers);
+
+} // namespace
+
+JSApplicationPrivateData::JSApplicationPrivateData(NPP npp) : SubObjectWrapper(npp, kClass) {}
+
+bool JSApplicationPrivateData::SetProperty(NPIdentifier, const NPVariant*) {
+    PLUGIN_LOG(APP_MGR, "JSApplicationPrivateData class\n");
+    return false;
+}

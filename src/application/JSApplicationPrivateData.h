@@ -1,0 +1,16 @@
+// The script face of an application's private data.
+#ifndef TELIX_SRC_APPLICATION_JSAPPLICATIONPRIVATEDATA_H
+#define TELIX_SRC_APPLICATION_JSAPPLICATIONPRIVATEDATA_H
+
+#include "common/ScriptWrapper.h"
+#include "src/application/ApplicationPrivateData.h"
+
+class JSApplicationPrivateData final : public SubObjectWrapper<ApplicationPrivateData, 3> {
+public:
+    explicit JSApplicationPrivateData(NPP npp);
+
+    // Refuses as the base does, with a line in the log.
+    bool SetProperty(NPIdentifier name, const NPVariant* value) override;
+};
+
+#endif

@@ -1,0 +1,25 @@
+// The script interface of the embedded configuration object.
+#include "src/config/JSOipfConfiguration.h"
+
+#include "src/config/OipfConfiguration.h"
+
+namespace {
+
+constexpr const char* kRefusal = "JSOipfConfiguration class\n";
+
+constexpr ScriptMember kMembers[] = {
+    property("keyset", read<&OipfConfiguration::getKeySetObject>),
+    property("configuration", read<&OipfConfiguration::getConfigurationObject>),
+};
+
+constexpr ScriptClass kClass = ScriptClass("JSOipfConfiguration", LogModule::CONFIG, kMembers)
+                                   .refusingWith(kRefusal)
+                                   .missingModelSays(kRefusal);
+
+} // namespace
+
+JSOipfConfiguration::JSOipfConfiguration(NPP npp) : EmbeddedObjectWrapper(npp, kClass) {}
+
+bool JSOipfConfiguration::SetProperty(NPIdentifier, const NPVariant*) {
+    return false;
+}

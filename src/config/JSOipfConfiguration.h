@@ -1,0 +1,15 @@
+// The script face of the embedded configuration object.
+#ifndef TELIX_SRC_CONFIG_JSOIPFCONFIGURATION_H
+#define TELIX_SRC_CONFIG_JSOIPFCONFIGURATION_H
+
+#include "common/ScriptWrapper.h"
+
+class JSOipfConfiguration final : public EmbeddedObjectWrapper<2> {
+public:
+    explicit JSOipfConfiguration(NPP npp);
+
+    // Refuses as the base does, but without a line in the log.
+    bool SetProperty(NPIdentifier name, const NPVariant* value) override;
+};
+
+#endif

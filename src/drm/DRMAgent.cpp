@@ -1,0 +1,138 @@
+// The DRM agent: messages to the platform, and the way of a result from the platform's thread to the page.
+#include "src/drm/DRMAgent.h"
+
+#include <glib.h>
+
+#include <cstdlib>
+#include <cstring>
+#include <set>
+
+#include "common/Log.h"
+#include "common/ObjectKind.h"
+#include "common/PluginUtils.h"
+#include "common/ScriptReferences.h"
+#include "common/ScriptValues.h"
+#include "src/drm/JSDRMAgent.h"
+
+DRMAgent* drmAgentInst = nullptr;
+
+namespace {
+
+const char* const kMimeTypes[] = {"application/oipfdrmagent", nullptr};
+
+std::set<const DRMAgent*> s_liveAgents;
+
+// A copy of the platform's text, null if there is no memory.
+char* copyOf(const unsigned char* text) {
+    const size_t size = std::strlen(reinterpret_cast<const char*>(text)) + 1;
+    void* copy = std::malloc(size);
+    return copy ? static_cast<char*>(std::memcpy(copy, text, size)) : nullptr;
+}
+
+// An empty text is a string of length 0, unless the browser gives no block for it.
+NPVariant textArgument(const char* text) {
+    NPVariant argument{};
+    if (!text || !setText(argument, text, std::strlen(text))) {
+        setNull(argument);
+    }
+    return argument;
+}
+
+} // namespace
+
+const ObjectKind drmAgentKind = [] {
+    ObjectKind kind{};
+    kind.id = 800;
+    kind.destroyText = "DRMAGENT_OBJ_ID delete :: %p \n";
+    kind.mimeTypes = kMimeTypes;
+    kind.create = [](NPP npp, unsigned short id) -> PluginBase* { return new DRMAgent(npp, id); };
+    kind.dispose = disposeOf<DRMAgent>;
+    return kind;
+}();
+
+DRMMsgEventData::DRMMsgEventData(unsigned char* id, unsigned char* message,
+                                 TELIX_DRM_RESULT_CODE_ENUM_T_tag code)
+    : messageId(copyOf(id)), resultCode(code) {
+    if (messageId) {
+        resultMessage = copyOf(message);
+    }
+}
+
+DRMMsgEventData::~DRMMsgEventData() {
+    std::free(messageId);
+    std::free(resultMessage);
+}
+
+int handleDRMMessageResultEvent(void* data) {
+    if (!data) {
+        return G_SOURCE_REMOVE;
+    }
+    auto* result = static_cast<DRMMsgEventData*>(data);
+    DRMAgent* agent = drmAgentInst;
+    if (DRMAgent::isAlive(agent)) {
+        agent->invokeJScript(domEventScript(agent->getId(), "DRMMessageResult", false, false));
+        // A listener of the event may have taken the element out of the page.
+        NPObject* handler = DRMAgent::isAlive(agent) ? agent->getOnDRMMessageResult() : nullptr;
+        if (handler) {
+            NPVariant args[3] = {textArgument(result->messageId), textArgument(result->resultMessage), {}};
+            setResult(args[2], result->resultCode);
+            agent->invokeJScriptFunc(handler, args, 3);
+            // Meant: left behind are the handler's reference from the getter and the blocks of both texts.
+        }
+    }
+    delete result;
+    return G_SOURCE_REMOVE;
+}
+
+DRMAgent::DRMAgent(NPP npp, unsigned short objectId) : PluginBase(npp, objectId) {
+    s_liveAgents.insert(this);
+    drmAgentInst = this;
+    TELIX_JS_DRM_RegisterOnDRMMessageResult(onDRMMessageResultCb);
+}
+
+DRMAgent::~DRMAgent() {
+    s_liveAgents.erase(this);
+    // Meant: once for each agent, also while others live on.
+    TELIX_JS_DRM_UnregisterOnDRMMessageResult(onDRMMessageResultCb);
+    releaseHeld(m_jsObject);
+    releaseHeld(m_onDRMMessageResult);
+}
+
+bool DRMAgent::isAlive(const DRMAgent* agent) {
+    return s_liveAgents.count(agent) > 0;
+}
+
+NPObject* DRMAgent::getJSObject() {
+    return handOutOnce<JSDRMAgent>(getBrowser(), m_jsObject);
+}
+
+std::string DRMAgent::sendDRMMessage(const std::string& type, const std::string& message,
+                                     const std::string& systemId) {
+    PLUGIN_LOG(DRMAGENT, " msgType = ( %s ), msg = ( %s ), DRMSystemID = ( %s ) \n", type.c_str(),
+               message.c_str(), systemId.c_str());
+    char* id = nullptr;
+    if (TELIX_JS_DRM_SendDRMMessage(type.c_str(), message.c_str(), systemId.c_str(), &id) == 0 && id) {
+        PLUGIN_LOG(DRMAGENT, " Message Id value returned from IF API = ( %s ) \n", id);
+        m_messageId = id;
+        std::free(id);
+    }
+    return m_messageId;
+}
+
+NPObject* DRMAgent::getOnDRMMessageResult() {
+    return handOut(m_onDRMMessageResult);
+}
+
+void DRMAgent::setOnDRMMessageResult(NPObject* handler) {
+    replaceListener(m_onDRMMessageResult, handler);
+}
+
+int DRMAgent::onDRMMessageResultCb(unsigned char* messageId, unsigned char* resultMessage,
+                                   TELIX_DRM_RESULT_CODE_ENUM_T_tag resultCode) {
+    PLUGIN_LOG(DRMAGENT, " msgID = ( %s ), resultMsg = ( %s ), resultCode = %d \n",
+               reinterpret_cast<const char*>(messageId), reinterpret_cast<const char*>(resultMessage),
+               resultCode);
+    // The record passes to the idle step; this thread must not touch it afterwards.
+    g_idle_add(handleDRMMessageResultEvent, new DRMMsgEventData(messageId, resultMessage, resultCode));
+    return 0;
+}

@@ -1,0 +1,97 @@
+// Tests in a page. The page calls testPage() once with its tests by sentence; each is a function that passes when it
+// makes at least one check and none fails:
+//
+//     testPage({
+//         'a call gives an object': function () { same(typeof manager.call(), 'object'); },
+//         'an event comes': function (done) { element.addEventListener('x', function () { check(true); done(); }); }
+//     });
+//
+// A test that takes `done` goes on until it calls it, at most `testLimit` milliseconds. They run one after the other
+// when the page is loaded. The outcome is then in window.testResult: {passed: number, failed: [text, ...]}.
+var testLimit = 10000;
+var checksMade = 0;
+
+// Fails the test unless `condition` is true.
+function check(condition, text) {
+    checksMade++;
+    if (condition !== true) {
+        throw new Error(text || 'a condition is ' + condition);
+    }
+}
+
+// Fails the test unless both values are the same, arrays element by element.
+function same(actual, expected) {
+    var bothArrays = Array.isArray(actual) && Array.isArray(expected);
+    check(bothArrays ? JSON.stringify(actual) === JSON.stringify(expected) : actual === expected,
+          'is ' + JSON.stringify(actual) + ' (' + typeof actual + '), should be ' + JSON.stringify(expected));
+}
+
+// Fails the test unless the function throws.
+function throws(action) {
+    var thrown = false;
+    try {
+        action();
+    } catch (error) {
+        thrown = true;
+    }
+    check(thrown, 'nothing is thrown');
+}
+
+// Calls `next` as soon as condition() is true; never calls it otherwise.
+function whenTrue(condition, next) {
+    if (condition()) {
+        next();
+    } else {
+        setTimeout(function () { whenTrue(condition, next); }, 20);
+    }
+}
+
+function testPage(tests) {
+    var sentences = Object.keys(tests);
+    var passed = 0;
+    var failed = [];
+
+    function runFrom(index) {
+        if (index === sentences.length) {
+            window.testResult = { passed: passed, failed: failed };
+            return;
+        }
+        var sentence = sentences[index];
+        var test = tests[sentence];
+        var ended = false;
+        var timer = 0;
+
+        function end(failure) {
+            if (ended) {
+                return;
+            }
+            ended = true;
+            clearTimeout(timer);
+            window.onerror = null;
+            if (!failure && checksMade === 0) {
+                failure = 'nothing was checked';
+            }
+            if (failure) {
+                failed.push(sentence + ': ' + failure);
+            } else {
+                passed++;
+            }
+            setTimeout(function () { runFrom(index + 1); }, 0);
+        }
+
+        checksMade = 0;
+        // Checks of a later turn throw into nowhere else.
+        window.onerror = function (message) { end(String(message)); };
+        timer = setTimeout(function () { end('not done within ' + testLimit + ' ms'); }, testLimit);
+        try {
+            test(function () { end(); });
+        } catch (error) {
+            end(String(error));
+        }
+        if (test.length === 0) {
+            end();
+        }
+    }
+
+    window.addEventListener('load', function () { runFrom(0); }, false);
+}

@@ -1,0 +1,43 @@
+/* A browser plug-in that has nothing to do with television: it loads, offers one type of its own, and refuses
+ * every instance. */
+#include "npapi/npfunctions.h"
+
+#define EXPORT __attribute__((visibility("default")))
+
+EXPORT NPError NP_Initialize(NPNetscapeFuncs* browser, NPPluginFuncs* plugin);
+EXPORT NPError NP_Shutdown(void);
+EXPORT NPError NP_GetValue(void* future, NPPVariable variable, void* value);
+EXPORT const char* NP_GetMIMEDescription(void);
+
+static NPError refuseInstance(NPMIMEType type, NPP instance, uint16_t mode, int16_t argc, char* argn[],
+                              char* argv[], NPSavedData* saved) {
+    (void)type, (void)instance, (void)mode, (void)argc, (void)argn, (void)argv, (void)saved;
+    return NPERR_GENERIC_ERROR;
+}
+
+NPError NP_Initialize(NPNetscapeFuncs* browser, NPPluginFuncs* plugin) {
+    (void)browser;
+    plugin->version = NP_VERSION_MINOR;
+    plugin->newp = refuseInstance;
+    return NPERR_NO_ERROR;
+}
+
+NPError NP_Shutdown(void) {
+    return NPERR_NO_ERROR;
+}
+
+NPError NP_GetValue(void* future, NPPVariable variable, void* value) {
+    (void)future;
+    switch (variable) {
+    case NPPVpluginNameString:
+    case NPPVpluginDescriptionString:
+        *(const char**)value = "Stranger";
+        return NPERR_NO_ERROR;
+    default:
+        return NPERR_INVALID_PARAM;
+    }
+}
+
+const char* NP_GetMIMEDescription(void) {
+    return "application/x-telix-stranger::Nothing;";
+}
