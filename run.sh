@@ -15,7 +15,7 @@ cmake --build "$build" --target telix-tv nptelixjs_desktop
 if [ $# -eq 0 ]; then
     set -- "$top/apps/demo/index.html"
 fi
-if [ -n "${DISPLAY:-}${WAYLAND_DISPLAY:-}" ]; then
+if [ -n "${DISPLAY:-}" ]; then
     exec "$build/desktop/telix-tv" "$@"
 fi
 picture="$build/screenshot.png"

@@ -6,7 +6,7 @@
     var previewMilliseconds = 3000;
     var applicationHandlers = ['onKeyPress', 'onKeyUp', 'onKeyDown', 'onApplicationShown', 'onApplicationHidden'];
     var managerHandlers = ['onLowMemory', 'onApplicationLoaded', 'onApplicationUnloaded', 'onApplicationLoadError'];
-    var methods = ['createApplication', 'destroyApplication', 'show', 'hide'];
+    var applicationMethods = ['createApplication', 'destroyApplication', 'show', 'hide'];
 
     var manager = document.getElementById('manager');
     var application = null;
@@ -103,7 +103,7 @@
             title: 'Application',
             panel: function () {
                 return [tv.element('h2', 'What getOwnerApplication() gave'),
-                        propertiesOf(application, applicationHandlers.concat(methods.slice(0, 3)))];
+                        propertiesOf(application, applicationHandlers.concat(applicationMethods))];
             },
             ok: function () {
                 application = manager.getOwnerApplication(document);

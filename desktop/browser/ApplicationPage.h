@@ -26,6 +26,7 @@ protected:
     bool javaScriptConfirm(QWebFrame* frame, const QString& message) override;
     bool javaScriptPrompt(QWebFrame* frame, const QString& message, const QString& proposal,
                           QString* answer) override;
+    QString chooseFile(QWebFrame*, const QString&) override { return {}; }
 
 private:
     QString m_loadFailure;

@@ -22,6 +22,13 @@ const RemoteKey* keyUnknownToEngine(const QKeyEvent& event) {
     return key && !key->knownToEngine ? key : nullptr;
 }
 
+// The event as the engine should see it: the number pad is part of the remote control, so its keys have the
+// codes of the ordinary ones.
+QKeyEvent withoutNumberPad(const QKeyEvent& event) {
+    return QKeyEvent(event.type(), event.key(), event.modifiers() & ~Qt::KeypadModifier, event.text(),
+                     event.isAutoRepeat(), static_cast<ushort>(event.count()));
+}
+
 // The text that a keyboard would send along with the key.
 QString textOf(const RemoteKey& key) {
     const bool hasText = key.keyCode == '\r' || (key.keyCode >= '0' && key.keyCode <= '9');
@@ -83,7 +90,8 @@ void ApplicationView::hideEvent(QHideEvent* event) {
 void ApplicationView::keyPressEvent(QKeyEvent* event) {
     const RemoteKey* key = keyUnknownToEngine(*event);
     if (!key) {
-        QWebView::keyPressEvent(event);
+        QKeyEvent plain = withoutNumberPad(*event);
+        QWebView::keyPressEvent(&plain);
         return;
     }
     if (dispatch("keydown", *key))
@@ -93,7 +101,8 @@ void ApplicationView::keyPressEvent(QKeyEvent* event) {
 void ApplicationView::keyReleaseEvent(QKeyEvent* event) {
     const RemoteKey* key = keyUnknownToEngine(*event);
     if (!key) {
-        QWebView::keyReleaseEvent(event);
+        QKeyEvent plain = withoutNumberPad(*event);
+        QWebView::keyReleaseEvent(&plain);
     } else if (!event->isAutoRepeat()) {
         dispatch("keyup", *key);
     }

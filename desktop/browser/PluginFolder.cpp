@@ -44,5 +44,5 @@ PluginFolder::PluginFolder(const QString& file)
 
     const QString link = QDir(m_folder.path()).filePath(QStringLiteral("plugin.so"));
     if (!m_folder.isValid() || !QFile::link(info.absoluteFilePath(), link))
-        m_failure = QStringLiteral("a folder for it can't be made: %1").arg(m_folder.errorString());
+        m_failure = QStringLiteral("a link to it can't be made in %1").arg(m_folder.path());
 }

@@ -92,9 +92,10 @@ void TvWindow::remove(ApplicationView* application) {
 }
 
 void TvWindow::bringUpTop() {
+    const int last = m_applications.size() - 1;
+    for (int index = 0; index <= last; ++index)
+        m_applications[index]->setVisible(index == last);
     ApplicationView* top = topApplication();
-    for (auto* application : m_applications)
-        application->setVisible(application == top);
     if (m_inspector)
         m_inspector->setPage(top ? top->page() : nullptr);
     if (!top)

@@ -227,9 +227,11 @@ int ApplicationManager::handleKeyDownEvent() {
 
 int ApplicationManager::callKeyHandlers(NPObject* (Application::*handler)()) {
     if (!m_applications.empty() && sharedInstance(m_npp)) {
-        // A copy: a handler may make or drop applications.
+        // A copy, looked up again: a handler may make or drop applications.
         for (Application* application : applicationList()) {
-            if ((application->*handler)()) {
+            const bool isAlive =
+                std::find(m_applications.begin(), m_applications.end(), application) != m_applications.end();
+            if (isAlive && (application->*handler)()) {
                 // Meant: both getter calls leave a reference behind.
                 invokeJScriptFunc((application->*handler)(), nullptr, 0);
             }

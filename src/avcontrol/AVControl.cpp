@@ -200,7 +200,7 @@ void AVControl::openPlayerPage() {
     const std::string url = std::string(page ? page : "file:///mnt/browser/pages/player/index.html") +
                             "?qv_media_url=" + getURL();
     if (NPN_GetURL(m_npp, url.c_str(), "_self") != NPERR_NO_ERROR) {
-        PLUGIN_LOG(AVCONTROL, "NPN_GetURL failed for URL:: %s ", url.c_str());
+        PLUGIN_LOG_FOR(LogModule::AVCONTROL, "initAV", "NPN_GetURL failed for URL:: %s ", url.c_str());
     }
 }
 

@@ -116,6 +116,7 @@ public:
     void changePlayState(play_state to);                  // any thread
     void changePlayState(play_state from, play_state to); // any thread
     void changeReadyState(int value);                     // any thread
+    void decrementWorkingAsyncCall() { --m_workingAsyncCalls; }
 
     // Play operations.
     bool play(double speed);
@@ -236,7 +237,6 @@ private:
     bool waitsForStream();
     bool beginMedia();
     bool handOverMedia();
-    void decrementWorkingAsyncCall() { --m_workingAsyncCalls; }
 
     static void* bufferingThread(void* object);
     void poll(Monitor& monitor);

@@ -118,7 +118,7 @@ void AVControl::handlePlayStateChange(unsigned int handle, TELIX_AV_CB_MSG msg) 
 void AVControl::takeQueuedURL() {
     if (!m_urlQueue.empty()) {
         m_data = m_urlQueue.front();
-        PLUGIN_LOG(AVCONTROL, "Queued URL is (%s)\n", m_data.c_str());
+        PLUGIN_LOG_FOR(LogModule::AVCONTROL, "handlePlayStateChange", "Queued URL is (%s)\n", m_data.c_str());
         m_urlQueue.pop();
     }
 }
@@ -131,8 +131,9 @@ void AVControl::endOfClip() {
     if (!m_isPlayList) {
         destroyBufferingThread();
         changePlayState(PLAY_STATE_FINISHED);
-        PLUGIN_LOG(AVCONTROL, "Normal Mode :: TELIX_AV_CB_MSG_PLAYEND :: destroyBufferingThread :: "
-                              "changePlayState(Finished)\n");
+        PLUGIN_LOG_FOR(LogModule::AVCONTROL, "handlePlayStateChange",
+                       "Normal Mode :: TELIX_AV_CB_MSG_PLAYEND :: destroyBufferingThread :: "
+                       "changePlayState(Finished)\n");
         return;
     }
     if (asxIsEndofRepeat()) {

@@ -41,6 +41,7 @@ class Television:
         if not number:
             self.close()
             raise RuntimeError('Xvfb did not start')
+        # A developer's own settings of Qt, of the engine and of the plug-in change nothing.
         self.environment = {name: value for name, value in os.environ.items()
                             if not name.startswith(('QT', 'PLUGIN_')) and name != 'LOG_MODULE'}
         self.environment.update(DISPLAY=f':{number}', XDG_RUNTIME_DIR=self._folder, TMPDIR=self._folder,

@@ -39,10 +39,10 @@ class Demo(unittest.TestCase):
     def test_it_shows_what_its_application_offers(self):
         text = self.text('panel')
         for name in ('onKeyPress', 'onKeyUp', 'onKeyDown', 'onApplicationShown', 'onApplicationHidden',
-                     'createApplication', 'destroyApplication', 'show'):
+                     'createApplication', 'destroyApplication', 'show', 'hide'):
             self.assertIn(name, text)
         self.assertEqual(text.count('null'), 5)
-        self.assertEqual(text.count('function'), 3)
+        self.assertEqual(text.count('function'), 4)
 
     def test_the_focus_moves_with_the_arrow_keys_and_goes_round(self):
         focused = ('--eval', 'document.querySelector(".focused").innerText')
@@ -55,8 +55,8 @@ class Demo(unittest.TestCase):
         self.assertEqual(self.text('panel', '--keys', 'down').count('null'), 4)
         self.assertEqual(self.text('panel', '--keys', 'down,yellow').count('function'), 5)
         self.assertEqual(self.text('panel', '--keys', 'down,yellow,yellow').count('null'), 4)
-        self.assertEqual(self.text('panel', '--keys', 'yellow').count('function'), 8)
-        self.assertEqual(self.text('panel', '--keys', 'yellow,yellow').count('function'), 8)
+        self.assertEqual(self.text('panel', '--keys', 'yellow').count('function'), 9)
+        self.assertEqual(self.text('panel', '--keys', 'yellow,yellow').count('function'), 9)
 
     def test_ok_on_the_manager_sets_the_handlers_as_well(self):
         self.assertEqual(self.text('panel', '--keys', 'down,ok').count('function'), 5)
@@ -90,6 +90,7 @@ class Demo(unittest.TestCase):
 
     def test_the_plug_in_is_named(self):
         text = self.text('panel', '--keys', 'down,down,down')
+        self.screenshot('plugin', '--keys', 'down,down,down')
         self.assertIn('TELIX Scriptable Plugin', text)
         self.assertIn('15', text)
 

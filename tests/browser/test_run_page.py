@@ -10,14 +10,14 @@ from television import temporary_folder
 FOLDER = os.path.dirname(os.path.abspath(__file__))
 
 
-def run_page(content, browser=os.environ['TELIX_TV']):
+def run_page(content, *arguments, browser=os.environ['TELIX_TV']):
     with temporary_folder() as folder:
         page = os.path.join(folder, 'page.html')
         with open(page, 'w', encoding='utf-8') as file:
             file.write(f'<script src="file://{FOLDER}/pages/testpage.js"></script><script>{content}</script>')
         return subprocess.run(
             [sys.executable, '-B', os.path.join(FOLDER, 'run_page.py'), '--browser', browser,
-             '--screenshot', os.path.join(folder, 'page.png'), page, '--',
+             '--screenshot', os.path.join(folder, 'page.png'), *arguments, page, '--',
              '--plugin', os.environ['TELIX_PLUGIN'], '--timeout', '5'],
             stdout=subprocess.PIPE, stderr=subprocess.STDOUT, text=True, check=False)
 
@@ -32,6 +32,14 @@ class RunPage(unittest.TestCase):
                        "'later': function (done) { setTimeout(function () { check(true); done(); }, 5); }})")
         self.assertEqual(run.returncode, 0, run.stdout)
         self.assertIn('3 passed', run.stdout)
+
+    def test_the_plug_in_gets_the_environment(self):
+        content = """var element = document.createElement('object');
+            element.type = 'application/oipfapplicationmanager';
+            testPage({'object': function () { document.body.appendChild(element); check(!!element.getOwnerApplication);
+                                              throw new Error('to see the output'); }})"""
+        self.assertIn('PLUGIN >>>', run_page(content, '--environment=LOG_MODULE=1').stdout)
+        self.assertNotIn('PLUGIN >>>', run_page(content).stdout)
 
     def test_one_failed_check_fails(self):
         run = run_page("testPage({'good': function () { check(true); }, 'bad': function () { same(1, 2); }})")
@@ -75,7 +83,7 @@ class RunPage(unittest.TestCase):
             with open(browser, 'w', encoding='utf-8') as file:
                 file.write('#!/bin/sh\necho \'{"passed": 1, "failed": []}\'\nkill -SEGV $$\n')
             os.chmod(browser, 0o755)
-            self.assert_fails(run_page('', browser), 'SIGSEGV')
+            self.assert_fails(run_page('', browser=browser), 'SIGSEGV')
 
 
 if __name__ == '__main__':

@@ -148,6 +148,14 @@ class CommandLine(TelixTv):
     def test_the_inspector_opens_beside_the_page(self):
         self.assertEqual(self.value(shipped('first.html'), '--inspect', '--eval', 'document.title'), 'first')
 
+    def test_the_inspector_follows_the_application_on_top_to_the_last(self):
+        for keys, title in (('green', 'second'), ('green,back', 'first')):
+            self.assertEqual(self.value(shipped('first.html'), '--inspect', '--keys', keys, '--eval', 'document.title'),
+                             title)
+        file_name = os.path.join(self.folder, 'picture.png')
+        run = self.run_tv(shipped('first.html'), '--inspect', '--keys', 'back', '--screenshot', file_name)
+        self.assertEqual(run.status, 0, run)
+
     def test_termination_ends_the_program_and_removes_its_folder(self):
         page = self.write('<script>console.log("ready")</script>')
         with self.television.start('--plugin', PLUGIN, page) as process:

@@ -50,9 +50,10 @@ std::string wrapperNameOf(NPObject* object) {
     const auto& wrapper = *static_cast<JSPluginBase*>(object);
     int status = 0;
     char* name = abi::__cxa_demangle(typeid(wrapper).name(), nullptr, nullptr, &status);
-    std::string result = status == 0 ? name : "object";
+    const std::string qualified = status == 0 ? name : "object";
     std::free(name);
-    return result;
+    const size_t scope = qualified.rfind("::");
+    return scope == std::string::npos ? qualified : qualified.substr(scope + 2);
 }
 
 std::string quoted(const char* text) {
@@ -618,8 +619,8 @@ ScriptedBrowser::ScriptedBrowser() : m_table(BrowserTable::make()) {
 ScriptedBrowser::~ScriptedBrowser() {
     closePage();
     shutdown();
-    m_window = {};
-    m_document = {};
+    m_window.reset();
+    m_document.reset();
     for (const auto& entry : m_accounts) {
         leftBehindObjects().push_back(entry.first);
     }
@@ -812,19 +813,21 @@ void ScriptedBrowser::closePage() {
         }
         pump();
     }
-    for (const auto& record : m_instances) {
-        record->scriptObject = {};
-        record->element = {};
-    }
     m_rules.clear();
     m_listeners.clear();
-    // Page objects may hold each other.
-    for (const LiveObject& live : liveObjects()) {
-        const bool stillLive = m_accounts.count(live.object) > 0;
-        if (PageObject* object = stillLive ? PageObject::from(live.object) : nullptr) {
-            const ObjectRef kept = ObjectRef::share(object);
-            object->forget();
+    // One by one: the end of an object takes further references along.
+    const auto isOfScript = [this](const ObjectRef* reference) {
+        return reference != &m_window && reference != &m_document;
+    };
+    for (;;) {
+        const auto next = std::find_if(m_pageReferences.begin(), m_pageReferences.end(), isOfScript);
+        if (next == m_pageReferences.end()) {
+            break;
         }
+        (*next)->reset();
+    }
+    for (const ObjectRef* reference : {&m_window, &m_document}) {
+        PageObject::from(reference->object())->forget();
     }
     if (m_initialized) {
         pump();

@@ -130,7 +130,8 @@ public:
     size_t liveCount(const std::string& className) const;
     size_t memoryBlocks() const { return m_blocks.size(); }
 
-    // Destroys the instances that are left and lets the page drop all that its script refers to.
+    // Destroys the instances that are left and drops every reference of the page, those in the test's own
+    // variables included.
     void closePage();
 
     // The identifiers of this process; equal names have equal identifiers for good.
@@ -143,6 +144,8 @@ public:
     bool pageRetain(NPObject* object);
     void pageRelease(NPObject* object);
     bool pageAdopt(NPObject* object);
+    void addPageReference(ObjectRef* reference) { m_pageReferences.insert(reference); }
+    void removePageReference(ObjectRef* reference) { m_pageReferences.erase(reference); }
     void giveReference(NPObject* object);
     int pluginReferences(NPObject* object) const;
     std::string nameOf(NPObject* object) const;
@@ -190,6 +193,7 @@ private:
     std::thread::id m_thread = std::this_thread::get_id();
 
     std::map<NPObject*, Account> m_accounts;
+    std::set<ObjectRef*> m_pageReferences;
     std::map<std::string, unsigned> m_numbers; // of the names given so far
     unsigned m_serial = 0;
     std::vector<std::unique_ptr<PageObject>> m_deadPageObjects; // kept, so that no address comes again

@@ -35,30 +35,62 @@ Name::Name(const std::string& text) : m_identifier(ScriptedBrowser::identifier(t
 Name::Name(int index) : m_identifier(ScriptedBrowser::identifier(index)) {}
 
 ObjectRef ObjectRef::share(NPObject* object) {
-    return ObjectRef(object && ScriptedBrowser::current().pageRetain(object) ? object : nullptr);
+    ObjectRef reference;
+    if (object && ScriptedBrowser::current().pageRetain(object)) {
+        reference.attach(object);
+    }
+    return reference;
 }
 
 ObjectRef ObjectRef::adopt(NPObject* object) {
-    return ObjectRef(object && ScriptedBrowser::current().pageAdopt(object) ? object : nullptr);
+    ObjectRef reference;
+    if (object && ScriptedBrowser::current().pageAdopt(object)) {
+        reference.attach(object);
+    }
+    return reference;
 }
 
-ObjectRef::ObjectRef(const ObjectRef& other) : m_object(other.m_object) {
-    if (m_object) {
-        ScriptedBrowser::current().pageRetain(m_object);
+ObjectRef::ObjectRef(const ObjectRef& other) {
+    if (other.m_object) {
+        ScriptedBrowser::current().pageRetain(other.m_object);
+        attach(other.m_object);
     }
 }
 
-ObjectRef::ObjectRef(ObjectRef&& other) noexcept : m_object(std::exchange(other.m_object, nullptr)) {}
+ObjectRef::ObjectRef(ObjectRef&& other) noexcept {
+    attach(other.detach());
+}
 
 ObjectRef& ObjectRef::operator=(ObjectRef other) noexcept {
-    std::swap(m_object, other.m_object);
+    NPObject* const mine = detach();
+    attach(other.detach());
+    other.attach(mine);
     return *this;
 }
 
 ObjectRef::~ObjectRef() {
-    if (m_object && ScriptedBrowser::exists()) {
-        ScriptedBrowser::current().pageRelease(m_object);
+    reset();
+}
+
+void ObjectRef::reset() {
+    if (NPObject* const object = detach()) {
+        ScriptedBrowser::current().pageRelease(object);
     }
+}
+
+void ObjectRef::attach(NPObject* object) {
+    m_object = object;
+    if (object) {
+        ScriptedBrowser::current().addPageReference(this);
+    }
+}
+
+// A reference that outlives its browser is empty by then.
+NPObject* ObjectRef::detach() {
+    if (m_object) {
+        ScriptedBrowser::current().removePageReference(this);
+    }
+    return std::exchange(m_object, nullptr);
 }
 
 std::string ObjectRef::name() const {

@@ -34,7 +34,7 @@ private:
 };
 
 // One counted reference of the page's to a script object, and what a script can do with the object. Null if
-// empty.
+// empty, and after the browser has closed its page.
 class ObjectRef {
 public:
     ObjectRef() = default;
@@ -71,8 +71,12 @@ public:
     bool hasProperty(const Name& name) const;
     bool hasMethod(const Name& name) const;
 
+    // Drops the reference.
+    void reset();
+
 private:
-    explicit ObjectRef(NPObject* object) : m_object(object) {}
+    void attach(NPObject* object);
+    NPObject* detach();
 
     NPObject* m_object = nullptr;
 };

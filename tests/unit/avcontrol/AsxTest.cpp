@@ -696,6 +696,10 @@ INSTANTIATE_TEST_SUITE_P(, AsxTimeTag,
 
 // Repeat sections
 
+std::string sectionBetweenClips(const std::string& tag, const std::string& clips) {
+    return clip + tag + clips + "</Repeat>" + clip;
+}
+
 TEST_F(Asx, RepeatCountOfTwoPlaysTheSectionTwice) {
     parseBody(clip + "<Repeat count=\"2\">" + clip + clip + "</Repeat>" + clip);
     EXPECT_EQ(playOrder(), (Order{1, 2, 3, 2, 3, 4}));
@@ -730,7 +734,7 @@ TEST_F(Asx, EverySectionAndCountIsPlayedThatManyTimes) {
 
 TEST_F(Asx, RepeatWithoutACountHasNoEnd) {
     for (const char* tag : {"<Repeat>", "<Repeat times=\"2\">", "<RepeatSection >"}) {
-        parseBody(std::string(clip).append(tag).append(clip + clip + "</Repeat>" + clip));
+        parseBody(sectionBetweenClips(tag, clip + clip));
         EXPECT_EQ(playOrder(8), (Order{1, 2, 3, 2, 3, 2, 3, 2})) << tag;
     }
     EXPECT_EQ(repeatLine(), "asxPrintAsxData :: ASX Repeat: (-1)2-3");
@@ -738,8 +742,7 @@ TEST_F(Asx, RepeatWithoutACountHasNoEnd) {
 
 TEST_F(Asx, RepeatCountOfZeroHasNoEffect) {
     for (const char* count : {"0", "none", " ", "99999999999999999999"}) {
-        parseBody(
-            std::string(clip + "<Repeat count=\"").append(count).append("\">" + clip + "</Repeat>" + clip));
+        parseBody(sectionBetweenClips(std::string("<Repeat count=\"").append(count).append("\">"), clip));
         EXPECT_EQ(playOrder(), (Order{1, 2, 3})) << count;
         EXPECT_EQ(repeatLine(), "asxPrintAsxData :: ASX Repeat: (0)0-0");
     }

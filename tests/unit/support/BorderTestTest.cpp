@@ -68,6 +68,14 @@ TEST_F(LeftoverTest, WhatThePageHoldsIsNoLeftover) {
     end();
 }
 
+TEST_F(LeftoverTest, ThePageDropsTheReferencesInTheTestsVariablesToo) {
+    const ScriptFunction listener = browser.function("listener");
+    const Values values = {listener};
+    end();
+    EXPECT_FALSE(listener);
+    EXPECT_EQ(browser.liveCount("listener"), 0U);
+}
+
 TEST_F(LeftoverTest, ThePlatformWritesIntoTheSameLog) {
     NPN_MemFlush(1);
     TELIX_JS_APP_RegisterLowMemory(nullptr);

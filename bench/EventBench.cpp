@@ -1,0 +1,195 @@
+// What an event of the broadcast costs from the platform's callback to the page's handler, beside a bare
+// g_idle_add of a record of the same size, alone and with the browser's own calls of one delivery; one by one
+// on one thread, and 100,000 in a burst from another thread, with the heap before and after.
+#include <benchmark/benchmark.h>
+#include <glib.h>
+#include <malloc.h>
+
+#include <cstdlib>
+#include <string>
+#include <thread>
+
+#include "bench/BenchBrowser.h"
+#include "common/PluginExports.h"
+#include "common/PluginUtils.h"
+#include "src/videobroadcast/VideoBroadcast.h"
+#include "src/videobroadcast/VideoBroadcastUtils.h"
+
+namespace {
+
+constexpr int kBurst = 100000;
+constexpr unsigned int kHandle = 7;
+const std::string kId = "tv";
+
+int g_delivered = 0;
+
+// ---- The bare hop: the same memory, nothing done with it
+
+struct BareRecord {
+    unsigned int type;
+    void* receiver;
+    void* payload;
+};
+
+struct BarePayload {
+    unsigned int value;
+    int state;
+    int error;
+};
+
+void deleteRecord(BareRecord* record) {
+    delete static_cast<BarePayload*>(record->payload);
+    delete record;
+    ++g_delivered;
+}
+
+gboolean bareHandler(gpointer data) {
+    deleteRecord(static_cast<BareRecord*>(data));
+    return G_SOURCE_REMOVE;
+}
+
+// The same with what the browser itself does for a delivery: it runs a text and calls a function.
+gboolean callingHandler(gpointer data) {
+    auto* record = static_cast<BareRecord*>(data);
+    const auto* payload = static_cast<const BarePayload*>(record->payload);
+    NPNetscapeFuncs& browser = benchBrowserTable();
+    static NPObject object{nullptr, 1};
+    static const std::string script = domEventScript(kId, "PlayStateChange", false, false);
+    NPString text{script.data(), static_cast<uint32_t>(script.size())};
+    NPVariant result{};
+    browser.evaluate(nullptr, nullptr, &text, &result);
+    browser.releasevariantvalue(&result);
+    browser.retainobject(&object);
+    NPVariant args[2]{};
+    args[0].type = NPVariantType_Int32;
+    args[0].value.intValue = payload->state;
+    browser.invokeDefault(nullptr, &object, args, 2, &result);
+    browser.releasevariantvalue(&result);
+    deleteRecord(record);
+    return G_SOURCE_REMOVE;
+}
+
+template <GSourceFunc Handler>
+void fireBare() {
+    g_idle_add(Handler, new BareRecord{1, &g_delivered, new BarePayload{0, 2, 200}});
+}
+
+// ---- Ours
+
+void fireOurs() {
+    onPlayStateChangeCb(kHandle, 0, TELIX_PLAYSTATE_PRESENTING, TELIX_ERR_STATE_NONE);
+}
+
+// A video/broadcast object with an id and a handler, for as long as a benchmark runs.
+class Page {
+public:
+    Page() : m_object(VideoBroadcast::getInstance(&m_npp, 400)) {
+        char name[] = "id";
+        std::string id = kId;
+        char* names[] = {name};
+        char* values[] = {id.data()};
+        m_object->init(NP_EMBED, 1, names, values);
+        m_object->setHandle(kHandle);
+        m_object->setOnPlayStateChange(&m_handler);
+        benchBrowserTable().invokeDefault = [](NPP, NPObject*, const NPVariant*, uint32_t,
+                                               NPVariant* result) {
+            ++g_delivered;
+            result->type = NPVariantType_Void;
+            return true;
+        };
+    }
+    Page(const Page&) = delete;
+    Page& operator=(const Page&) = delete;
+    ~Page() {
+        m_object->setOnPlayStateChange(nullptr);
+        delete m_object;
+    }
+
+private:
+    NPP_t m_npp{};
+    NPObject m_handler{nullptr, 1};
+    VideoBroadcast* m_object;
+};
+
+// ---- The two ways to measure
+
+using Fire = void (*)();
+
+void oneByOne(benchmark::State& state, Fire fire) {
+    g_delivered = 0;
+    for (auto _ : state) {
+        fire();
+        g_main_context_iteration(nullptr, FALSE);
+    }
+    if (g_delivered == 0) {
+        state.SkipWithError("nothing was delivered");
+    }
+}
+
+void inABurst(benchmark::State& state, Fire fire) {
+    size_t before = 0;
+    size_t queued = 0;
+    size_t after = 0;
+    for (auto _ : state) {
+        before = mallinfo2().uordblks;
+        g_delivered = 0;
+        std::thread platform([fire] {
+            for (int i = 0; i < kBurst; ++i) {
+                fire();
+            }
+        });
+        platform.join();
+        queued = mallinfo2().uordblks;
+        while (g_main_context_iteration(nullptr, FALSE) == TRUE) {
+        }
+        after = mallinfo2().uordblks;
+        if (g_delivered < kBurst) {
+            state.SkipWithError("events were lost");
+            break;
+        }
+    }
+    state.SetItemsProcessed(state.iterations() * kBurst);
+    state.counters["queued_bytes"] = static_cast<double>(queued - before);
+    state.counters["left_bytes"] = static_cast<double>(after) - static_cast<double>(before);
+}
+
+void registerAll(const std::string& mode, const char* level) {
+    const auto add = [&](const char* name, bool burst, Fire fire, bool needsPage) {
+        auto* made = benchmark::RegisterBenchmark(
+            (std::string(burst ? "burst" : "event") + "/" + name + "/" + mode).c_str(),
+            [=](benchmark::State& state) {
+                level ? setenv("LOG_MODULE", level, 1) : unsetenv("LOG_MODULE");
+                if (needsPage) {
+                    const Page page;
+                    burst ? inABurst(state, fire) : oneByOne(state, fire);
+                } else {
+                    burst ? inABurst(state, fire) : oneByOne(state, fire);
+                }
+            });
+        if (burst) {
+            made->UseRealTime()->Unit(benchmark::kMillisecond);
+        }
+    };
+    for (const bool burst : {false, true}) {
+        add("bare hop", burst, fireBare<bareHandler>, false);
+        add("bare hop and the browser's calls", burst, fireBare<callingHandler>, false);
+        add("ours", burst, fireOurs, true);
+    }
+}
+
+} // namespace
+
+int main(int argc, char** argv) {
+    NPPluginFuncs plugin{};
+    plugin.size = sizeof(plugin);
+    if (NP_Initialize(&benchBrowserTable(), &plugin) != NPERR_NO_ERROR) {
+        return 2;
+    }
+    benchmark::Initialize(&argc, argv);
+    registerAll("log unset", nullptr);
+    // Behind those, since a level other than 0 stays for good. No module has this number: nothing is printed.
+    registerAll("log set", "99");
+    benchmark::RunSpecifiedBenchmarks();
+    NP_Shutdown();
+    return 0;
+}

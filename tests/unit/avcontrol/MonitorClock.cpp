@@ -1,0 +1,153 @@
+// The clock behind the test's own `sleep`. It waits with plain pthread calls, since a monitor is cancelled
+// while it sleeps.
+#include "tests/unit/avcontrol/MonitorClock.h"
+
+#include <ctime>
+
+#include <gtest/gtest.h>
+
+namespace {
+
+constexpr time_t kBound = 20; // seconds, for what must come at once
+
+} // namespace
+
+class MonitorClock::Lock {
+public:
+    explicit Lock(pthread_mutex_t& mutex) : m_mutex(mutex) { pthread_mutex_lock(&m_mutex); }
+    Lock(const Lock&) = delete;
+    Lock& operator=(const Lock&) = delete;
+    ~Lock() { pthread_mutex_unlock(&m_mutex); }
+
+private:
+    pthread_mutex_t& m_mutex;
+};
+
+// Counts a thread from its first sleep to its end, whatever ends it.
+class MonitorThread {
+public:
+    MonitorThread() { ++clock().m_threads; }
+    MonitorThread(const MonitorThread&) = delete;
+    MonitorThread& operator=(const MonitorThread&) = delete;
+    ~MonitorThread() {
+        const MonitorClock::Lock lock(clock().m_mutex);
+        --clock().m_threads;
+        ++clock().m_ended;
+        pthread_cond_broadcast(&clock().m_changed);
+    }
+
+    // Counts the thread as sleeping until the clock moves, or until it is cancelled.
+    class Sleep {
+    public:
+        Sleep() { ++clock().m_sleeping; }
+        Sleep(const Sleep&) = delete;
+        Sleep& operator=(const Sleep&) = delete;
+        ~Sleep() {
+            if (!isOver()) {
+                --clock().m_sleeping;
+            }
+        }
+        bool isOver() const { return m_began != clock().m_now; }
+
+    private:
+        const unsigned long m_began = clock().m_now;
+    };
+
+private:
+    static MonitorClock& clock() { return MonitorClock::instance(); }
+};
+
+MonitorClock& MonitorClock::instance() {
+    static auto* clock = new MonitorClock; // kept: threads may outlive everything else
+    return *clock;
+}
+
+// Made on the main thread, which is the browser's.
+[[maybe_unused]] static const MonitorClock& s_made = MonitorClock::instance();
+
+template <class Condition>
+bool MonitorClock::waitUntil(Condition condition) {
+    timespec end{};
+    clock_gettime(CLOCK_REALTIME, &end);
+    end.tv_sec += kBound;
+    while (!condition()) {
+        if (pthread_cond_timedwait(&m_changed, &m_mutex, &end) != 0) {
+            ADD_FAILURE() << "The monitors didn't come to rest: " << m_sleeping << " of " << m_threads
+                          << " sleep.";
+            return false;
+        }
+    }
+    return true;
+}
+
+void MonitorClock::await(size_t sleeping) {
+    const Lock lock(m_mutex);
+    waitUntil([&] { return m_sleeping == sleeping && m_threads == sleeping; });
+}
+
+void MonitorClock::second() {
+    const Lock lock(m_mutex);
+    waitUntil([&] { return m_sleeping == m_threads; });
+    ++m_now;
+    pthread_cond_broadcast(&m_changed);
+    m_sleeping = 0;
+    waitUntil([&] { return m_sleeping == m_threads; });
+}
+
+void MonitorClock::seconds(unsigned count) {
+    for (unsigned i = 0; i < count; ++i) {
+        second();
+    }
+}
+
+void MonitorClock::runFreely(bool free) {
+    const Lock lock(m_mutex);
+    m_free = free;
+    pthread_cond_broadcast(&m_changed);
+}
+
+size_t MonitorClock::sleeping() {
+    const Lock lock(m_mutex);
+    return m_sleeping;
+}
+
+size_t MonitorClock::ended() {
+    const Lock lock(m_mutex);
+    return m_ended;
+}
+
+void MonitorClock::reset() {
+    const Lock lock(m_mutex);
+    m_ended = 0;
+    m_free = false;
+    m_browserSleeps = 0;
+    m_whenBrowserSleeps = nullptr;
+}
+
+void MonitorClock::sleepOneSecond() {
+    if (pthread_equal(pthread_self(), m_browserThread)) {
+        ++m_browserSleeps;
+        if (m_whenBrowserSleeps) {
+            m_whenBrowserSleeps();
+        }
+        return;
+    }
+    const Lock lock(m_mutex);
+    thread_local const MonitorThread presence; // from the first sleep to the end of the thread
+    static_cast<void>(presence);
+    const MonitorThread::Sleep sleep;
+    pthread_cond_broadcast(&m_changed);
+    if (m_free) {
+        pthread_testcancel();
+    }
+    while (!sleep.isOver() && !m_free) {
+        pthread_cond_wait(&m_changed, &m_mutex);
+    }
+}
+
+extern "C" unsigned int sleep(unsigned int seconds) {
+    for (unsigned int i = 0; i < seconds; ++i) {
+        MonitorClock::instance().sleepOneSecond();
+    }
+    return 0;
+}

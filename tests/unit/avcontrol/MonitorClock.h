@@ -1,0 +1,56 @@
+// The time of the buffering monitors: this executable has a `sleep` of its own, and the threads that call it
+// go on when a test lets a second pass. The browser thread never waits in it.
+#ifndef TELIX_TESTS_UNIT_AVCONTROL_MONITORCLOCK_H
+#define TELIX_TESTS_UNIT_AVCONTROL_MONITORCLOCK_H
+
+#include <pthread.h>
+
+#include <cstddef>
+#include <functional>
+#include <utility>
+
+class MonitorClock {
+public:
+    static MonitorClock& instance();
+
+    // Waits until this many monitors stand in `sleep` and none is on its way. The test fails if it doesn't
+    // come to that.
+    void await(size_t sleeping);
+    // Lets each of the sleeping monitors go on, and waits until it sleeps again or has ended.
+    void second();
+    void seconds(unsigned count);
+    // Monitors no longer stop in `sleep`, or stop again.
+    void runFreely(bool free);
+
+    size_t sleeping();
+    // Threads that have ended since the last reset.
+    size_t ended();
+
+    // How often the browser thread slept since the last reset, and what happens meanwhile.
+    unsigned browserSleeps() const { return m_browserSleeps; }
+    void whenBrowserSleeps(std::function<void()> what) { m_whenBrowserSleeps = std::move(what); }
+    void reset();
+
+    void sleepOneSecond(); // what `sleep` does
+
+private:
+    friend class MonitorThread;
+
+    class Lock;
+
+    template <class Condition>
+    bool waitUntil(Condition condition);
+
+    pthread_mutex_t m_mutex = PTHREAD_MUTEX_INITIALIZER;
+    pthread_cond_t m_changed = PTHREAD_COND_INITIALIZER;
+    const pthread_t m_browserThread = pthread_self();
+    size_t m_threads = 0; // that have called `sleep` and live
+    size_t m_sleeping = 0;
+    size_t m_ended = 0;
+    unsigned long m_now = 0;
+    bool m_free = false;
+    unsigned m_browserSleeps = 0;
+    std::function<void()> m_whenBrowserSleeps;
+};
+
+#endif

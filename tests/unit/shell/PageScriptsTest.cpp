@@ -1,0 +1,168 @@
+// The texts that the plug-in has the page evaluate, byte for byte.
+#include "common/PluginUtils.h"
+#include "tests/support/BorderTest.h"
+
+using ::testing::HasSubstr;
+using ::testing::Not;
+using ::testing::StartsWith;
+
+namespace {
+
+using PageScriptsTest = BorderTest;
+
+TEST_F(PageScriptsTest, ADomEventIsDispatchedAtTheElement) {
+    EXPECT_EQ(domEventScript("a", "b", true, false),
+              "var objElement=document.getElementById(\"a\"); newEvent=document.createEvent(\"Event\");"
+              "newEvent.initEvent(\"b\", true,false); objElement.dispatchEvent(newEvent);");
+    EXPECT_THAT(domEventScript("a", "b", false, true), HasSubstr("newEvent.initEvent(\"b\", false,true);"));
+    EXPECT_THAT(domEventScript("a", "b", true, true), HasSubstr("newEvent.initEvent(\"b\", true,true);"));
+    EXPECT_THAT(domEventScript("a", "b", false, false), HasSubstr("newEvent.initEvent(\"b\", false,false);"));
+}
+
+TEST_F(PageScriptsTest, ADomEventNeedsElementAndName) {
+    EXPECT_DEATH(domEventScript("", "b", false, false), "common/PluginUtils.*!id.empty\\(\\)");
+    EXPECT_DEATH(domEventScript("a", "", false, false), "common/PluginUtils.*!event.empty\\(\\)");
+    EXPECT_DEATH(domEventScript("", "", false, false), "!id.empty\\(\\)");
+}
+
+TEST_F(PageScriptsTest, ArgumentsGoInUnescaped) {
+    EXPECT_THAT(domEventScript("a\"b", "c'\\d", false, false),
+                StartsWith("var objElement=document.getElementById(\"a\"b\"); "));
+    EXPECT_THAT(domEventScript("a", "c'\\d", false, false), HasSubstr("initEvent(\"c'\\d\", "));
+    EXPECT_THAT(getEncodedURL("a\"b"), HasSubstr("encodeURI(\"a\"b\");"));
+}
+
+TEST_F(PageScriptsTest, AStreamEventCarriesItsData) {
+    EXPECT_EQ(
+        streamEventScript("name", "41420A", "trigger", "tv"),
+        "var objElement = document.getElementById(\"tv\"); var strEvent = document.createEvent('Event'); "
+        "strEvent.initEvent('StreamEvent', false, false); strEvent.name = \"name\"; strEvent.data = "
+        "\"41420A\";  strEvent.text = \"AB\\n\";  strEvent.status = \"trigger\"; "
+        "objElement.dispatchEvent(strEvent);");
+}
+
+TEST_F(PageScriptsTest, AStreamEventWithoutTextLeavesItOut) {
+    EXPECT_EQ(
+        streamEventScript("name", "", "error", "tv"),
+        "var objElement = document.getElementById(\"tv\"); var strEvent = document.createEvent('Event'); "
+        "strEvent.initEvent('StreamEvent', false, false); strEvent.name = \"name\"; strEvent.data = \"\";  "
+        "strEvent.status = \"error\"; objElement.dispatchEvent(strEvent);");
+    EXPECT_THAT(streamEventScript("name", "00", "trigger", "tv"), Not(HasSubstr("strEvent.text")));
+}
+
+TEST_F(PageScriptsTest, ControlCharactersHaveEscapes) {
+    const char* const escapes[] = {"\\a", "\\b", "\\t", "\\n", "\\v", "\\f", "\\r"};
+    for (int value = -1; value < 256; ++value) {
+        EXPECT_EQ(getEscapeChar(static_cast<ESC_CHAR_ENUM_T>(value)),
+                  value >= 7 && value <= 13 ? escapes[value - 7] : "")
+            << value;
+    }
+}
+
+TEST_F(PageScriptsTest, HexadecimalDataBecomesText) {
+    EXPECT_EQ(parseDataAsUTF8("41420A"), "AB\\n");
+    EXPECT_EQ(parseDataAsUTF8("c3A4"), "\xC3\xA4");
+    EXPECT_EQ(parseDataAsUTF8("0708090a0b0c0d0e06"), "\\a\\b\\t\\n\\v\\f\\r\x0E\x06");
+    EXPECT_EQ(parseDataAsUTF8("22"), "\"");
+    EXPECT_EQ(parseDataAsUTF8("ff"), "\xFF");
+    EXPECT_EQ(parseDataAsUTF8(""), "");
+}
+
+TEST_F(PageScriptsTest, AHalfPairCountsAsAWholeValue) {
+    EXPECT_EQ(parseDataAsUTF8("4"), "\x04");
+    EXPECT_EQ(parseDataAsUTF8("414"), "A\x04");
+    EXPECT_EQ(parseDataAsUTF8("4G"), "\x04");
+}
+
+TEST_F(PageScriptsTest, APairWithoutLeadingDigitAndAZeroAddNothing) {
+    EXPECT_EQ(parseDataAsUTF8("00"), "");
+    EXPECT_EQ(parseDataAsUTF8("410042"), "AB");
+    EXPECT_EQ(parseDataAsUTF8("G4"), "");
+    EXPECT_EQ(parseDataAsUTF8("41G442"), "AB");
+}
+
+// The text of parseStreamEventXMLScript between url and method name.
+const std::string streamEventScriptBody =
+    "var httpReq = new XMLHttpRequest();httpReq.open('GET', requestURL, true);"
+    "httpReq.onreadystatechange = function(){\tif((httpReq.readyState == 4) && (httpReq.status == 200)){"
+    "\t\tvar eventId_val = null;\t\tvar comp_tag_val = null;\t\tif(xmlData = httpReq.responseXML){"
+    "\t\t\tvar stream_event_type_elem =  xmlData.getElementsByTagName('stream_event');"
+    "\t\t\tfor(i=0; i < stream_event_type_elem.length; i++){"
+    "\t\t\t\tif(stream_event_type_elem[i].getAttribute('stream_event_name') == eventName){"
+    "\t\t\t\t\teventId_val = stream_event_type_elem[i].getAttribute('stream_event_id');"
+    "\t\t\t\t\tvar stream_event_elem = stream_event_type_elem[i].parentNode;\t\t\t\t\tif(stream_event_elem)"
+    "\t\t\t\t\t\tcomp_tag_val = stream_event_elem.getAttribute('component_tag');\t\t\t\t\tbreak;"
+    "\t\t\t\t}\t\t\t}\t\t}\t\tif(!eventId_val || !comp_tag_val){\t\t\tif(respText = httpReq.responseText){"
+    "\t\t\t\tvar eventset = respText.split(',');\t\t\t\tfor(i=0; i < eventset.length - 1; i++){"
+    "\t\t\t\t\teventToken = eventset[i].split('.', 2);\t\t\t\t\tif(eventName == event[1]){"
+    "\t\t\t\t\t\teventId_val = event[0];\t\t\t\t\t\tbreak;\t\t\t\t\t}\t\t\t\t}"
+    "\t\t\t\tcompToken = eventset[eventset.length - 1];\t\t\t\teventToken = compToken.split('$');"
+    "\t\t\t\tcomp_tag_val = eventToken[1];\t\t\t\tif(null == eventId_val){"
+    "\t\t\t\t\tevent = eventToken[0].split('.', 2);\t\t\t\t\tif(event[1] == eventName)"
+    "\t\t\t\t\t\teventId_val = event[0];\t\t\t\t}\t\t\t}\t\t}";
+
+TEST_F(PageScriptsTest, AStreamEventDescriptionIsFetchedAndHandedToTheElement) {
+    EXPECT_EQ(parseStreamEventXMLScript("dvb://1", "name", "tv", true),
+              "var requestURL = 'dvb://1'; var eventName = 'name';" + streamEventScriptBody +
+                  "var objElem = document.getElementById('tv');objElem.addStreamEventListener(requestURL, "
+                  "eventName, "
+                  "eventId_val, comp_tag_val);}};httpReq.send(null);");
+    EXPECT_EQ(parseStreamEventXMLScript("dvb://1", "name", "tv", false),
+              "var requestURL = 'dvb://1'; var eventName = 'name';" + streamEventScriptBody +
+                  "var objElem = document.getElementById('tv');objElem.removeStreamEventListener(requestURL, "
+                  "eventName, eventId_val, comp_tag_val);}};httpReq.send(null);");
+}
+
+TEST_F(PageScriptsTest, ThePlayCountIsReadFromTheFirstParam) {
+    EXPECT_EQ(getPlayCountVal("player"),
+              "window.getPlayCountVal = function(){\tvar objElem = document.getElementById(\"player\");"
+              "\tvar nodeList = objElem.childNodes;\tfor( var i = 0; i < nodeList.length ; i++)\t{"
+              "\t\tvar paramElem = nodeList.item(i);"
+              "\t\tif( 'param' == paramElem.nodeName || 'PARAM' == paramElem.nodeName)\t\t{"
+              "\t\t\tvar loopStr = paramElem.getAttribute('value');\t\t\treturn loopStr;\t\t}\t}};");
+}
+
+TEST_F(PageScriptsTest, AnAddressIsEncodedByThePage) {
+    EXPECT_EQ(getEncodedURL("http://a.example/b c"),
+              "window.getEncodedURL = function(){\tvar encodedURL = encodeURI(\"http://a.example/b c\");"
+              "\treturn encodedURL;};");
+}
+
+TEST_F(PageScriptsTest, EveryScriptIsOneLine) {
+    for (const std::string& script :
+         {domEventScript("a", "b", true, true), streamEventScript("a", "0A0D", "b", "c"),
+          parseStreamEventXMLScript("a", "b", "c", true), getPlayCountVal("a"), getEncodedURL("a")}) {
+        EXPECT_EQ(script.find_first_of("\r\n"), std::string::npos) << script;
+    }
+}
+
+TEST_F(PageScriptsTest, ComposingTouchesNothing) {
+    domEventScript("a", "b", true, true);
+    streamEventScript("a", "41", "b", "c");
+    parseStreamEventXMLScript("a", "b", "c", true);
+    getPlayCountVal("a");
+    getEncodedURL("a");
+    EXPECT_TRUE(log.everything().empty());
+}
+
+TEST_F(PageScriptsTest, LogsUnderCommon) {
+    EXPECT_EQ(logOf(9, [] { domEventScript("a", "b", true, true); }),
+              logLine("COMMON", "domEventScript", "Id: a , Event: b \n"));
+    EXPECT_EQ(logOf(9, [] { parseDataAsUTF8("41"); }),
+              logLine("COMMON", "parseDataAsUTF8", "Data val is: 41 \n"));
+    EXPECT_EQ(
+        logOf(9, [] { streamEventScript("n", "41", "s", "i"); }),
+        logLine("COMMON", "streamEventScript", "is called. Name: n , Data: 41 , Status: s , Id:  i \n") +
+            logLine("COMMON", "parseDataAsUTF8", "Data val is: 41 \n") +
+            logLine("COMMON", "streamEventScript",
+                    "Script: " + streamEventScript("n", "41", "s", "i") + " \n"));
+    EXPECT_EQ(logOf(9, [] { parseStreamEventXMLScript("u", "e", "i", true); }),
+              logLine("COMMON", "parseStreamEventXMLScript",
+                      "Script: " + parseStreamEventXMLScript("u", "e", "i", true) + " \n"));
+    EXPECT_EQ(logOf(9, [] { getPlayCountVal("i"); }),
+              logLine("COMMON", "getPlayCountVal", "Script:--  " + getPlayCountVal("i") + " ----\n"));
+    EXPECT_EQ(logOf(9, [] { getEncodedURL("u"); }),
+              logLine("COMMON", "getEncodedURL", "Script:--  " + getEncodedURL("u") + " ----\n"));
+}
+
+} // namespace
