@@ -1,5 +1,6 @@
-// The dispatch of the browser's calls: which kind is made for which type, which calls reach a kind, and how an
-// object ends. The kinds here stand for the plug-in's own: one that takes everything and one that takes nothing.
+// The dispatch of the browser's calls: which kind is made for which type, which calls reach a kind, and how
+// an object ends. The kinds here stand for the plug-in's own: one that takes everything and one that takes
+// nothing.
 #include "common/ObjectKind.h"
 #include "common/PluginExports.h"
 #include "tests/support/BorderTest.h"
@@ -25,7 +26,9 @@ std::string textOf(const char* text) {
 
 class Model final : public PluginBase {
 public:
-    Model(NPP npp, unsigned short id) : PluginBase(npp, id) { g_reached.push_back("created " + std::to_string(id)); }
+    Model(NPP npp, unsigned short id) : PluginBase(npp, id) {
+        g_reached.push_back("created " + std::to_string(id));
+    }
     ~Model() { g_reached.push_back("deleted " + std::to_string(getObjectId())); }
     NPObject* getJSObject() override {
         g_reached.push_back("getJSObject " + std::to_string(getObjectId()));
@@ -61,7 +64,8 @@ const StreamOperations streamOperations = {
         return 100001;
     },
     [](PluginBase&, const char* url, NPReason reason, void* data) {
-        g_reached.push_back("urlNotify " + textOf(url) + " " + std::to_string(reason) + (data ? " data" : ""));
+        g_reached.push_back("urlNotify " + textOf(url) + " " + std::to_string(reason) +
+                            (data ? " data" : ""));
     },
 };
 
@@ -73,8 +77,8 @@ ObjectKind takingKind() {
     kind.create = create;
     kind.dispose = disposeOf<Model>;
     kind.init = [](PluginBase& model, const InstanceArguments& arguments) -> NPError {
-        g_reached.push_back("init " + textOf(arguments.mimeType) + " " + std::to_string(arguments.mode) + " " +
-                            std::to_string(arguments.argc));
+        g_reached.push_back("init " + textOf(arguments.mimeType) + " " + std::to_string(arguments.mode) +
+                            " " + std::to_string(arguments.argc));
         model.init(arguments.mode, arguments.argc, arguments.argn, arguments.argv);
         return g_initResult;
     };
@@ -176,7 +180,8 @@ TEST_F(DispatchTest, EveryKindIsAskedForItsScriptableObject) {
     for (const char* type : {"test/taking", "test/plain", "test/silent"}) {
         const EmbeddedObject object = embedAndForget(type);
         NPObject* scriptable = browser.window().object();
-        EXPECT_EQ(NPP_GetValue(object.npp(), NPPVpluginScriptableNPObject, &scriptable), NPERR_NO_ERROR) << type;
+        EXPECT_EQ(NPP_GetValue(object.npp(), NPPVpluginScriptableNPObject, &scriptable), NPERR_NO_ERROR)
+            << type;
         EXPECT_EQ(scriptable, nullptr); // what the model gave
         EXPECT_THAT(g_reached, ElementsAre(HasSubstr("getJSObject"))) << type;
     }

@@ -18,8 +18,8 @@ namespace {
 
 ScriptedBrowser* s_current = nullptr;
 
-// Objects and blocks that outlived their browser because the plug-in left them behind: still reachable for the
-// leak checker, since the accounts have told already.
+// Objects and blocks that outlived their browser because the plug-in left them behind: still reachable for
+// the leak checker, since the accounts have told already.
 std::vector<const void*>& leftBehind() {
     static auto* addresses = new std::vector<const void*>;
     return *addresses;
