@@ -8,6 +8,22 @@ TELIX_RETCODE_ENUM_T TELIX_JS_APP_GetFreeMem(uint32_t* amount) {
     return TELIX_RETCODE_SUCCESS;
 }
 
+TELIX_RETCODE_ENUM_T TELIX_JS_AV_CreatePlayer(TELIX_JS_AV_HANDLE* player, int32_t containerCode,
+                                              int32_t audioCodecCode, uint32_t memoryAudio) {
+    (void)containerCode;
+    (void)audioCodecCode;
+    (void)memoryAudio;
+    *player = 1;
+    return TELIX_RETCODE_SUCCESS;
+}
+
+TELIX_RETCODE_ENUM_T TELIX_JS_AV_GetPlayInfo(TELIX_JS_AV_HANDLE player, TELIX_JS_AV_PLAY_INFO** info) {
+    static TELIX_JS_AV_PLAY_INFO record = {2, 5000, 60000, 0, 10, 20};
+    (void)player;
+    *info = &record;
+    return TELIX_RETCODE_SUCCESS;
+}
+
 TELIX_RETCODE_ENUM_T TELIX_JS_CM_GetChannelType(TELIX_JS_CM_HANDLE channel, int32_t* type) {
     *type = (int32_t)(channel & 1);
     return TELIX_RETCODE_SUCCESS;

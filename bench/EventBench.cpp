@@ -121,8 +121,11 @@ void oneByOne(benchmark::State& state, Fire fire) {
         fire();
         g_main_context_iteration(nullptr, FALSE);
     }
-    if (g_delivered == 0) {
-        state.SkipWithError("nothing was delivered");
+    // What a turn left over because a timer was due in it.
+    while (g_main_context_iteration(nullptr, FALSE) == TRUE) {
+    }
+    if (g_delivered < state.iterations()) {
+        state.SkipWithError("events were lost");
     }
 }
 

@@ -82,6 +82,13 @@ public:
 
     NPObject* getJSObject() override;
 
+    // Callbacks of the platform (its threads) and the idle step of the first.
+    static int onPlayStateChangeCb(unsigned int handle, TELIX_AV_CB_MSG msg);
+    static int onPlayStateChangeCb(void* record);
+    static int onDRMRightsErrorCb(unsigned int handle, TELIX_AV_DRM_ERR_STATE_ENUM_T state,
+                                  unsigned char* contentId, unsigned char* drmSystemId,
+                                  unsigned char* rightsIssuerUrl);
+
     // Media.
     void setData(const std::string& url);
     std::string getData() const { return m_data; }
@@ -203,13 +210,6 @@ private:
         bool bufferingPaused = false; // the monitor itself has paused the player
         bool startReported = false;
     };
-
-    // Callbacks of the platform (its threads) and the idle step of the first.
-    static int onPlayStateChangeCb(unsigned int handle, TELIX_AV_CB_MSG msg);
-    static int onPlayStateChangeCb(void* record);
-    static int onDRMRightsErrorCb(unsigned int handle, TELIX_AV_DRM_ERR_STATE_ENUM_T state,
-                                  unsigned char* contentId, unsigned char* drmSystemId,
-                                  unsigned char* rightsIssuerUrl);
 
     // Steps posted to the browser thread; each finds out whether its object still lives.
     static void startMediaCb(void* object);

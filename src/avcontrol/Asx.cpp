@@ -13,9 +13,11 @@
 
 namespace {
 
+// The texts of parameters and clips are parts of the playlist's text, which the list keeps, or of its joined
+// URLs: a clip is read without an allocation for each of its texts.
 struct AsxParam {
-    std::string name;
-    std::string value;
+    std::string_view name;
+    std::string_view value;
 };
 
 struct AsxEntry {
@@ -23,13 +25,13 @@ struct AsxEntry {
     uint8_t clientSkip = 0;
     uint32_t startTime = 0;
     uint32_t duration = 0;
-    std::string baseUrl;
-    std::string fileName;
-    std::string title;
-    std::string author;
-    std::string copyright;
-    std::string rating;
-    std::string description;
+    std::string_view baseUrl;
+    std::string_view fileName;
+    std::string_view title;
+    std::string_view author;
+    std::string_view copyright;
+    std::string_view rating;
+    std::string_view description;
     std::vector<AsxParam> params;
 };
 
@@ -49,6 +51,8 @@ struct AsxData {
     AsxEntry* currentClip = nullptr;
     std::vector<AsxParam> params;
     std::deque<AsxEntry> entries; // the clip with the index i stands at i - 1
+    std::string text;
+    std::deque<std::string> joinedUrls;
 };
 
 AsxData s_asxData;
@@ -173,7 +177,8 @@ private:
     }
 
     void readTag();
-    void readText(std::string_view closingTag, std::string AsxEntry::*ofEntry, std::string AsxData::*ofList);
+    void readText(std::string_view closingTag, std::string_view AsxEntry::*ofEntry,
+                  std::string AsxData::*ofList);
     void readParam();
     void readBase();
     void readRepeat();
@@ -190,8 +195,8 @@ private:
     uint32_t m_count = 0;
     int32_t m_pendingRepeat = 0;
     bool m_repeatOpened = false;
-    std::string m_lastHref;
-    std::string m_joinedUrl;
+    std::string_view m_lastHref;
+    std::string_view m_joinedUrl;
     ColonSearch m_firstColon;
     ColonSearch m_secondColon;
 };
@@ -235,14 +240,19 @@ void AsxScanner::readTag() {
     }
 }
 
-void AsxScanner::readText(std::string_view closingTag, std::string AsxEntry::*ofEntry,
+void AsxScanner::readText(std::string_view closingTag, std::string_view AsxEntry::*ofEntry,
                           std::string AsxData::*ofList) {
     const size_t start = m_at;
     m_at = searchTag(m_text, m_at, closingTag);
     if (m_at == npos) {
         return;
     }
-    (m_entry ? m_entry->*ofEntry : s_asxData.*ofList) = m_text.substr(start, m_at - start);
+    const std::string_view text = m_text.substr(start, m_at - start);
+    if (m_entry) {
+        m_entry->*ofEntry = text;
+    } else {
+        s_asxData.*ofList = text;
+    }
     m_at += closingTag.size();
 }
 
@@ -254,7 +264,7 @@ void AsxScanner::readParam() {
             return;
         }
         std::vector<AsxParam>& params = m_entry ? m_entry->params : s_asxData.params;
-        param = &params.emplace_back(AsxParam{std::string(text), {}});
+        param = &params.emplace_back(AsxParam{text, {}});
     }
     // Past the closing quote. A tag without a name loses a character of its own, so "<PARAM />" doesn't close
     // itself: meant.
@@ -274,7 +284,11 @@ void AsxScanner::readBase() {
         if (!readQuoted(url)) {
             return;
         }
-        (m_entry ? m_entry->baseUrl : s_asxData.baseUrl) = url;
+        if (m_entry) {
+            m_entry->baseUrl = url;
+        } else {
+            s_asxData.baseUrl = url;
+        }
     }
     pass("/>"); // a tag closed by ">" alone hides all up to the next "/>": meant
 }
@@ -352,10 +366,10 @@ void AsxScanner::readRef() {
         m_entry->fileName = href;
         m_lastHref = href;
         // The joined URL outlives its entry: a later entry under no base at all gets it again. Meant.
-        if (!m_entry->baseUrl.empty()) {
-            m_joinedUrl = asxAppendBaseUrl(m_entry->baseUrl, m_entry->fileName);
-        } else if (!s_asxData.baseUrl.empty()) {
-            m_joinedUrl = asxAppendBaseUrl(s_asxData.baseUrl, m_entry->fileName);
+        const std::string_view base = m_entry->baseUrl.empty() ? s_asxData.baseUrl : m_entry->baseUrl;
+        if (!base.empty()) {
+            m_joinedUrl =
+                s_asxData.joinedUrls.emplace_back(asxAppendBaseUrl(std::string(base), std::string(href)));
         }
         if (!m_joinedUrl.empty()) {
             m_entry->fileName = m_joinedUrl;
@@ -417,17 +431,18 @@ uint32_t AsxScanner::parseTime(std::string_view value) {
 // The texts that the list as a whole and a clip have in common.
 template <class Record>
 void logTexts(const Record& record) {
-    ASX_PRINT_LOG("ASX File Name: %s", record.fileName.c_str());
-    ASX_PRINT_LOG("ASX Title: %s", record.title.c_str());
-    ASX_PRINT_LOG("ASX Author: %s", record.author.c_str());
-    ASX_PRINT_LOG("ASX CopyRight: %s", record.copyright.c_str());
-    ASX_PRINT_LOG("ASX Rating: %s", record.rating.c_str());
-    ASX_PRINT_LOG("ASX Description: %s", record.description.c_str());
+    ASX_PRINT_LOG("ASX File Name: %s", std::string(record.fileName).c_str());
+    ASX_PRINT_LOG("ASX Title: %s", std::string(record.title).c_str());
+    ASX_PRINT_LOG("ASX Author: %s", std::string(record.author).c_str());
+    ASX_PRINT_LOG("ASX CopyRight: %s", std::string(record.copyright).c_str());
+    ASX_PRINT_LOG("ASX Rating: %s", std::string(record.rating).c_str());
+    ASX_PRINT_LOG("ASX Description: %s", std::string(record.description).c_str());
 }
 
 void logParams(const std::vector<AsxParam>& params) {
     for (const AsxParam& param : params) {
-        ASX_PRINT_LOG("ASX Param: %s = %s", param.name.c_str(), param.value.c_str());
+        ASX_PRINT_LOG("ASX Param: %s = %s", std::string(param.name).c_str(),
+                      std::string(param.value).c_str());
     }
 }
 
@@ -440,8 +455,8 @@ void logClip(const AsxEntry& clip) {
     logParams(clip.params);
 }
 
-std::string ofCurrentClip(std::string AsxEntry::*field) {
-    return s_asxData.currentClip ? s_asxData.currentClip->*field : std::string();
+std::string ofCurrentClip(std::string_view AsxEntry::*field) {
+    return std::string(s_asxData.currentClip ? s_asxData.currentClip->*field : std::string_view());
 }
 
 } // namespace
@@ -454,7 +469,8 @@ std::string asxIsAsxfile(const void* data, unsigned /*size*/) {
 int asxParseAsx(const char* text, const std::string& url) {
     asxClear();
     s_asxData.fileName = url;
-    AsxScanner scanner(text);
+    s_asxData.text = text;
+    AsxScanner scanner(s_asxData.text);
     if (scanner.findStart()) {
         s_asxData.clipCount = scanner.scan();
         asxSetCurrentClipIndex(1);
@@ -470,6 +486,8 @@ void asxClear() {
     s_asxData.clipCount = 0;
     s_asxData.entries.clear();
     s_asxData.params.clear();
+    s_asxData.joinedUrls.clear();
+    s_asxData.text = std::string();
     s_asxData.repeatStart = 0;
     s_asxData.repeatEnd = 0;
     s_asxData.repeatCount = 0;
@@ -621,7 +639,7 @@ std::string asxGetParamName(unsigned index, unsigned n) {
         return {};
     }
     const std::vector<AsxParam>& params = index == 0 ? s_asxData.params : s_asxData.entries[index - 1].params;
-    return n >= 1 && n <= params.size() ? params[n - 1].name : std::string();
+    return std::string(n >= 1 && n <= params.size() ? params[n - 1].name : std::string_view());
 }
 
 // Names are looked for in the head of a list, which has neither a name nor a value, and not in its elements.

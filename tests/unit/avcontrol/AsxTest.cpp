@@ -8,6 +8,7 @@
 #include <cctype>
 #include <cstdlib>
 #include <functional>
+#include <ostream>
 #include <random>
 #include <string>
 #include <vector>
@@ -120,6 +121,15 @@ protected:
 };
 
 using Order = std::vector<unsigned>;
+
+// A tag and the reader of the field that it sets.
+template <typename Value>
+struct TagAndField {
+    const char* tag;
+    Value (*field)();
+
+    friend std::ostream& operator<<(std::ostream& out, const TagAndField& self) { return out << self.tag; }
+};
 
 const std::string clip = "<Entry><Ref HREF=\"clip\"/></Entry>";
 
@@ -272,12 +282,12 @@ TEST_F(Asx, ListWithoutClipsKeepsNoParametersAndNoRepeat) {
 
 // Tags with a text
 
-class AsxTextTag : public Asx, public testing::WithParamInterface<std::pair<const char*, std::string (*)()>> {
+class AsxTextTag : public Asx, public testing::WithParamInterface<TagAndField<std::string>> {
 protected:
     std::string open() const { return "<" + name() + ">"; }
     std::string close() const { return "</" + name() + ">"; }
-    std::string name() const { return GetParam().first; }
-    std::string value() const { return GetParam().second(); }
+    std::string name() const { return GetParam().tag; }
+    std::string value() const { return GetParam().field(); }
 };
 
 TEST_P(AsxTextTag, TakesAllUpToItsOwnClosingTag) {
@@ -306,11 +316,11 @@ TEST_P(AsxTextTag, LastOneWins) {
 }
 
 INSTANTIATE_TEST_SUITE_P(, AsxTextTag,
-                         testing::Values(std::make_pair("TITLE", asxShowTitle),
-                                         std::make_pair("Author", asxShowAuthor),
-                                         std::make_pair("Copyright", asxShowCopyRight),
-                                         std::make_pair("ABSTRACT", asxShowDescription)),
-                         [](const auto& info) { return std::string(info.param.first); });
+                         testing::Values(TagAndField<std::string>{"TITLE", asxShowTitle},
+                                         TagAndField<std::string>{"Author", asxShowAuthor},
+                                         TagAndField<std::string>{"Copyright", asxShowCopyRight},
+                                         TagAndField<std::string>{"ABSTRACT", asxShowDescription}),
+                         [](const auto& info) { return std::string(info.param.tag); });
 
 // Comments, the end tag and anything else
 
@@ -425,6 +435,12 @@ TEST_F(Asx, ParameterClosedByGreaterAloneHidesAllUpToTheNextSelfClosingTag) {
     parse("<ASX>" + clip + "<PARAM name=\"a\" value=\"1\"><Entry>");
     EXPECT_EQ(asxGetClipCount(), 1u);
     EXPECT_EQ(paramLines(), (Lines{"a = 1"}));
+}
+
+TEST_F(Asx, ParameterWithAnEmptyOrUselessValueHidesNothing) {
+    parseBody("<PARAM name=\"a\" value=\"\">" + clip + "<PARAM -value=\"z\">" + clip + "<PARAM name=\"\">" +
+              clip);
+    EXPECT_EQ(asxGetClipCount(), 3u);
 }
 
 TEST_F(Asx, ParameterCutOffAnywhereIsReadNoFurtherThanTheText) {
@@ -660,10 +676,10 @@ TEST_F(Asx, DurationIsReadLikeAStartTime) {
     EXPECT_EQ(asxGetStartTime(), 0u);
 }
 
-class AsxTimeTag : public Asx, public testing::WithParamInterface<std::pair<const char*, unsigned (*)()>> {
+class AsxTimeTag : public Asx, public testing::WithParamInterface<TagAndField<unsigned>> {
 protected:
-    std::string tag() const { return "<" + std::string(GetParam().first) + " "; }
-    unsigned value() const { return GetParam().second(); }
+    std::string tag() const { return "<" + std::string(GetParam().tag) + " "; }
+    unsigned value() const { return GetParam().field(); }
 };
 
 TEST_P(AsxTimeTag, WithoutOrWithAnEmptyValueChangesNothing) {
@@ -686,15 +702,19 @@ TEST_P(AsxTimeTag, WithAMissingTokenEndsTheScan) {
 
 TEST_P(AsxTimeTag, OutsideAnEntryIsLogged) {
     EXPECT_EQ(logOfBody(clip + tag() + "value=\"7\"/>"),
-              (Lines{"asxParseAsx :: " + std::string(GetParam().first) + " outside an entry section"}));
+              (Lines{"asxParseAsx :: " + std::string(GetParam().tag) + " outside an entry section"}));
 }
 
 INSTANTIATE_TEST_SUITE_P(, AsxTimeTag,
-                         testing::Values(std::make_pair("starttime", asxGetStartTime),
-                                         std::make_pair("duration", asxGetDuration)),
-                         [](const auto& info) { return std::string(info.param.first); });
+                         testing::Values(TagAndField<unsigned>{"starttime", asxGetStartTime},
+                                         TagAndField<unsigned>{"duration", asxGetDuration}),
+                         [](const auto& info) { return std::string(info.param.tag); });
 
 // Repeat sections
+
+std::string sectionBetweenClips(const std::string& tag, const std::string& clips) {
+    return clip + tag + clips + "</Repeat>" + clip;
+}
 
 TEST_F(Asx, RepeatCountOfTwoPlaysTheSectionTwice) {
     parseBody(clip + "<Repeat count=\"2\">" + clip + clip + "</Repeat>" + clip);
@@ -730,7 +750,7 @@ TEST_F(Asx, EverySectionAndCountIsPlayedThatManyTimes) {
 
 TEST_F(Asx, RepeatWithoutACountHasNoEnd) {
     for (const char* tag : {"<Repeat>", "<Repeat times=\"2\">", "<RepeatSection >"}) {
-        parseBody(std::string(clip).append(tag).append(clip + clip + "</Repeat>" + clip));
+        parseBody(sectionBetweenClips(tag, clip + clip));
         EXPECT_EQ(playOrder(8), (Order{1, 2, 3, 2, 3, 2, 3, 2})) << tag;
     }
     EXPECT_EQ(repeatLine(), "asxPrintAsxData :: ASX Repeat: (-1)2-3");
@@ -738,8 +758,7 @@ TEST_F(Asx, RepeatWithoutACountHasNoEnd) {
 
 TEST_F(Asx, RepeatCountOfZeroHasNoEffect) {
     for (const char* count : {"0", "none", " ", "99999999999999999999"}) {
-        parseBody(
-            std::string(clip + "<Repeat count=\"").append(count).append("\">" + clip + "</Repeat>" + clip));
+        parseBody(sectionBetweenClips(std::string("<Repeat count=\"").append(count).append("\">"), clip));
         EXPECT_EQ(playOrder(), (Order{1, 2, 3})) << count;
         EXPECT_EQ(repeatLine(), "asxPrintAsxData :: ASX Repeat: (0)0-0");
     }

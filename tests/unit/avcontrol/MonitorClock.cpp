@@ -85,6 +85,11 @@ void MonitorClock::await(size_t sleeping) {
     waitUntil([&] { return m_sleeping == sleeping && m_threads == sleeping; });
 }
 
+void MonitorClock::awaitEnded(size_t ended) {
+    const Lock lock(m_mutex);
+    waitUntil([&] { return m_ended == ended; });
+}
+
 void MonitorClock::second() {
     const Lock lock(m_mutex);
     waitUntil([&] { return m_sleeping == m_threads; });

@@ -16,6 +16,8 @@ public:
     // Waits until this many monitors stand in `sleep` and none is on its way. The test fails if it doesn't
     // come to that.
     void await(size_t sleeping);
+    // Waits until this many have ended since the last reset.
+    void awaitEnded(size_t ended);
     // Lets each of the sleeping monitors go on, and waits until it sleeps again or has ended.
     void second();
     void seconds(unsigned count);

@@ -1,0 +1,133 @@
+// What a message of the player costs from the platform's callback to the page's state event and listener,
+// beside a bare g_idle_add of a record of the same size; and what a read of `playPosition` costs, beside the
+// platform call that it makes.
+#include <benchmark/benchmark.h>
+#include <glib.h>
+
+#include "bench/BenchBrowser.h"
+#include "common/JSPluginBase.h"
+#include "common/PluginExports.h"
+#include "src/avcontrol/AVControl.h"
+
+namespace {
+
+int g_delivered = 0;
+
+// An element that plays, with an id and a listener, for as long as a benchmark runs.
+class Page {
+public:
+    explicit Page(NPPluginFuncs& plugin) : m_plugin(plugin) {
+        char type[] = "video/mp4";
+        char names[][10] = {"id", "buffering", "url"};
+        char values[][30] = {"video", "false", "mms://media.example/clip"};
+        char* argn[] = {names[0], names[1], names[2]};
+        char* argv[] = {values[0], values[1], values[2]};
+        m_plugin.newp(type, &m_npp, NP_EMBED, 3, argn, argv, nullptr);
+        m_control = static_cast<AVControl*>(m_npp.pdata);
+        m_control->setOnPlayStateChange(&m_listener);
+        m_control->play(1.0);
+        m_script = m_control->getJSObject();
+    }
+    Page(const Page&) = delete;
+    Page& operator=(const Page&) = delete;
+    ~Page() {
+        benchBrowserTable().releaseobject(m_script);
+        m_plugin.destroy(&m_npp, nullptr);
+    }
+
+    NPObject* script() const { return m_script; }
+
+private:
+    NPPluginFuncs& m_plugin;
+    NPP_t m_npp{};
+    NPObject m_listener{nullptr, 1};
+    AVControl* m_control = nullptr;
+    NPObject* m_script = nullptr;
+};
+
+struct BareRecord {
+    unsigned int player;
+    unsigned int message;
+};
+
+void bareHop(benchmark::State& state) {
+    const auto handler = [](gpointer data) -> gboolean {
+        delete static_cast<BareRecord*>(data);
+        ++g_delivered;
+        return G_SOURCE_REMOVE;
+    };
+    for (auto _ : state) {
+        g_idle_add(handler, new BareRecord{1, 2});
+        g_main_context_iteration(nullptr, FALSE);
+    }
+}
+
+// A start and an end by turns: one state event and one call of the listener for each message.
+void stateEvent(benchmark::State& state, NPPluginFuncs& plugin) {
+    const Page page(plugin);
+    g_delivered = 0;
+    bool playing = false;
+    for (auto _ : state) {
+        playing = !playing;
+        AVControl::onPlayStateChangeCb(1, playing ? TELIX_AV_CB_MSG_PLAYSTART : TELIX_AV_CB_MSG_PLAYEND);
+        g_main_context_iteration(nullptr, FALSE);
+    }
+    if (g_delivered < state.iterations()) {
+        state.SkipWithError("events were lost");
+    }
+}
+
+void platformCall(benchmark::State& state) {
+    for (auto _ : state) {
+        TELIX_JS_AV_PLAY_INFO* info = nullptr;
+        benchmark::DoNotOptimize(TELIX_JS_AV_GetPlayInfo(1, &info));
+        benchmark::DoNotOptimize(info);
+    }
+}
+
+void readPlayPosition(benchmark::State& state, NPPluginFuncs& plugin) {
+    const Page page(plugin);
+    NPObject* script = page.script();
+    const NPIdentifier name = benchBrowserTable().getstringidentifier("playPosition");
+    AVControl::onPlayStateChangeCb(1, TELIX_AV_CB_MSG_PLAYSTART);
+    g_main_context_iteration(nullptr, FALSE);
+    NPVariant position{};
+    for (auto _ : state) {
+        script->_class->getProperty(script, name, &position);
+        benchmark::DoNotOptimize(position);
+    }
+    if (position.type != NPVariantType_Double || position.value.doubleValue == 0) {
+        state.SkipWithError("no position was read");
+    }
+}
+
+// The rest of what an A/V control object asks of its browser.
+void completeTable(NPNetscapeFuncs& table) {
+    table.pluginthreadasynccall = [](NPP, void (*function)(void*), void* data) { function(data); };
+    table.getproperty = [](NPP, NPObject*, NPIdentifier, NPVariant*) { return false; };
+    table.invokeDefault = [](NPP, NPObject*, const NPVariant*, uint32_t, NPVariant* result) {
+        ++g_delivered;
+        result->type = NPVariantType_Void;
+        return true;
+    };
+}
+
+} // namespace
+
+int main(int argc, char** argv) {
+    completeTable(benchBrowserTable());
+    NPPluginFuncs plugin{};
+    plugin.size = sizeof(plugin);
+    if (NP_Initialize(&benchBrowserTable(), &plugin) != NPERR_NO_ERROR) {
+        return 2;
+    }
+    benchmark::Initialize(&argc, argv);
+    benchmark::RegisterBenchmark("message/bare hop", bareHop);
+    benchmark::RegisterBenchmark("message/state event", [&](benchmark::State& s) { stateEvent(s, plugin); });
+    benchmark::RegisterBenchmark("playPosition/platform call", platformCall);
+    benchmark::RegisterBenchmark("playPosition/read",
+                                 [&](benchmark::State& s) { readPlayPosition(s, plugin); });
+    benchmark::RunSpecifiedBenchmarks();
+    NP_Shutdown();
+    return 0;
+}
