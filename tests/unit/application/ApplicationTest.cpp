@@ -30,10 +30,16 @@ protected:
     ObjectRef application = manager.call("getOwnerApplication", browser.document()).object();
 };
 
-TEST_F(ApplicationTest, HasItsHandlersAndMethods) {
+TEST_F(ApplicationTest, HasItsPropertiesAndMethods) {
     for (const char* name : handlerNames) {
         EXPECT_TRUE(application.hasProperty(name)) << name;
         EXPECT_FALSE(application.hasMethod(name)) << name;
+    }
+    for (const char* name : {"privateData", "private"}) {
+        EXPECT_TRUE(application.hasProperty(name)) << name;
+        EXPECT_FALSE(application.hasMethod(name)) << name;
+        EXPECT_FALSE(application.set(name, browser.scriptObject("data"))) << name;
+        EXPECT_FALSE(application.set(name, nullptr)) << name;
     }
     for (const char* name : {"createApplication", "destroyApplication", "show", "hide"}) {
         EXPECT_TRUE(application.hasMethod(name)) << name;
@@ -96,17 +102,18 @@ TEST_F(ApplicationTest, TheHandlersAreApart) {
     }
 }
 
-TEST_F(ApplicationTest, TheEndReleasesTheHandlersInItsOwnOrder) {
+TEST_F(ApplicationTest, TheEndReleasesPrivateDataAndHandlersInItsOwnOrder) {
     for (const char* name : handlerNames) {
         application.set(name, browser.function(name));
     }
+    application.get("privateData");
     application.call("show"); // an application may know its window by now
     log.clear();
     application.reset();
     EXPECT_THAT(log.everything(),
-                ElementsAre("NPN_ReleaseObject onKeyDown", "NPN_ReleaseObject onKeyUp",
-                            "NPN_ReleaseObject onKeyPress", "NPN_ReleaseObject onApplicationShown",
-                            "NPN_ReleaseObject onApplicationHidden"));
+                ElementsAre("NPN_ReleaseObject JSApplicationPrivateData", "NPN_ReleaseObject onKeyDown",
+                            "NPN_ReleaseObject onKeyUp", "NPN_ReleaseObject onKeyPress",
+                            "NPN_ReleaseObject onApplicationShown", "NPN_ReleaseObject onApplicationHidden"));
     EXPECT_EQ(applicationCount(), 0U);
 }
 

@@ -1,5 +1,6 @@
 // The entry points: initialisation, description, values, and the life of an instance.
 #include <algorithm>
+#include <cctype>
 #include <cstring>
 
 #include "common/BrowserGates.h"
@@ -293,6 +294,50 @@ TEST_F(EntryPointsTest, TheCaseOfATypeDoesNotMatter) {
     const EmbeddedObject manager = browser.embed("APPLICATION/OipfApplicationManager");
     ASSERT_NE(manager.model(), nullptr);
     EXPECT_EQ(static_cast<PluginBase*>(manager.model())->getObjectId(), 200);
+}
+
+TEST_F(EntryPointsTest, EveryTypeOfTheDescriptionMakesItsKindInAnyCase) {
+    struct Row {
+        const char* type;
+        unsigned short kind;
+    };
+    for (const Row& row :
+         {Row{"application/oipfapplicationmanager", 200}, Row{"audio/mpeg", 300}, Row{"video/mp4", 300},
+          Row{"video/mpeg", 300}, Row{"audio/mp4", 300}, Row{"video/mpeg4", 300}, Row{"video/x-ms-ism", 300},
+          Row{"application/vnd.ms-sstr+xml", 300}, Row{"application/vnd.apple.mpegurl", 300},
+          Row{"audio/mpegurl", 300}, Row{"video/broadcast", 400}, Row{"application/oipfconfiguration", 500},
+          Row{"application/oipfparentalcontrolmanager", 600}, Row{"application/oipfcapabilities", 700},
+          Row{"application/oipfdrmagent", 800}}) {
+        std::string capitals = row.type;
+        std::transform(capitals.begin(), capitals.end(), capitals.begin(),
+                       [](unsigned char c) { return std::toupper(c); });
+        for (const std::string& type : {std::string(row.type), capitals}) {
+            const EmbeddedObject object = browser.embed(type, {{"id", "element"}});
+            EXPECT_EQ(object.error(), NPERR_NO_ERROR) << type;
+            ASSERT_NE(object.model(), nullptr) << type;
+            EXPECT_EQ(static_cast<PluginBase*>(object.model())->getObjectId(), row.kind) << type;
+            EXPECT_TRUE(object.scriptObject()) << type;
+            EXPECT_EQ(object.handleEvent(), 0) << type;
+            EXPECT_EQ(object.setNullWindow(), NPERR_NO_ERROR) << type;
+            EXPECT_EQ(object.destroy(), NPERR_NO_ERROR) << type;
+            EXPECT_EQ(object.model(), nullptr) << type;
+        }
+        EXPECT_THAT(std::string(NP_GetMIMEDescription()), HasSubstr(std::string(row.type) + ":"));
+    }
+}
+
+TEST_F(EntryPointsTest, EachKindLogsItsEnd) {
+    const auto endOf = [this](const char* type) { return logOf(9, [&] { browser.embed(type).destroy(); }); };
+    const std::string line = " PLUGIN >>> COMMON :: destroyInst :: ";
+    EXPECT_THAT(endOf("application/oipfapplicationmanager"), HasSubstr(line + "APPMANAGER_OBJ_ID delete\n"));
+    EXPECT_THAT(endOf("video/mp4"), HasSubstr(line + "AVCONTROL_OBJ_ID delete :: 0x"));
+    EXPECT_THAT(endOf("video/broadcast"), HasSubstr(line + "VIDEOBROADCAST_OBJ_ID delete :: 0x"));
+    EXPECT_THAT(endOf("application/oipfconfiguration"),
+                HasSubstr(line + "OIPFCONFIGURATION_OBJ_ID delete :: 0x"));
+    EXPECT_THAT(endOf("application/oipfparentalcontrolmanager"), Not(HasSubstr("_OBJ_ID delete")));
+    EXPECT_THAT(endOf("application/oipfcapabilities"),
+                HasSubstr(line + "OIPFCAPABILITIES_OBJ_ID delete :: 0x"));
+    EXPECT_THAT(endOf("application/oipfdrmagent"), HasSubstr(line + "DRMAGENT_OBJ_ID delete :: 0x"));
 }
 
 TEST_F(EntryPointsTest, AnUnknownTypeIsNoErrorAndGivesNoModel) {
