@@ -117,7 +117,7 @@ using Fire = void (*)();
 
 void oneByOne(benchmark::State& state, Fire fire) {
     g_delivered = 0;
-    for (auto _ : state) {
+    while (state.KeepRunning()) {
         fire();
         g_main_context_iteration(nullptr, FALSE);
     }
@@ -133,7 +133,7 @@ void inABurst(benchmark::State& state, Fire fire) {
     size_t before = 0;
     size_t queued = 0;
     size_t after = 0;
-    for (auto _ : state) {
+    while (state.KeepRunning()) {
         before = mallinfo2().uordblks;
         g_delivered = 0;
         std::thread platform([fire] {
