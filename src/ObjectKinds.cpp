@@ -10,12 +10,6 @@
 #include "src/videobroadcast/VideoBroadcast.h"
 
 const ObjectKind* const objectKinds[] = {
-    &applicationManagerKind,
-    &avControlKind,
-    &videoBroadcastKind,
-    &oipfConfigurationKind,
-    &parentalControlManagerKind,
-    &capabilitiesKind,
-    &drmAgentKind,
-    nullptr,
+    &applicationManagerKind,     &avControlKind,    &videoBroadcastKind, &oipfConfigurationKind,
+    &parentalControlManagerKind, &capabilitiesKind, &drmAgentKind,       nullptr,
 };
