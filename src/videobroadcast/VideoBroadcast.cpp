@@ -141,8 +141,8 @@ NPObject* VideoBroadcast::getJSObject() {
     return handOutOnce<JSVideoBroadcast>(getBrowser(), m_jsObject);
 }
 
-unsigned int VideoBroadcast::getHandle() const {
-    return VBInstanceList.handleOf(const_cast<VideoBroadcast*>(this));
+unsigned int VideoBroadcast::getHandle() {
+    return VBInstanceList.handleOf(this);
 }
 
 void VideoBroadcast::setHandle(unsigned int handle) {

@@ -47,7 +47,7 @@ public:
 
     NPObject* getJSObject() override;
 
-    unsigned int getHandle() const;
+    unsigned int getHandle();
     void setHandle(unsigned int handle);
 
     void registerCallbacks();
