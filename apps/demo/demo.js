@@ -1,4 +1,5 @@
-// The demonstration: what a page gets from the application manager, shown and tried with the remote control.
+// The demonstration: what a page gets from the application manager and the device, shown and tried with the remote
+// control.
 (function () {
     'use strict';
 
@@ -14,6 +15,7 @@
     var hidden = false;
     var lastKey = null;
     var created = null;
+    var drm = { sent: null, id: null, result: null, code: null };
 
     function byId(id) {
         return document.getElementById(id);
@@ -96,6 +98,58 @@
         log(hidden ? 'hide()' : 'show()');
     }
 
+    // The device. The key mask goes back and forth between what a menu needs and that with the digits.
+
+    function keySet() {
+        return application.privateData.keyset;
+    }
+
+    function switchKeyMask() {
+        var keys = keySet();
+        var colours = keys.RED + keys.GREEN + keys.YELLOW + keys.BLUE;
+        var menuKeys = colours + keys.NAVIGATION;
+        var mask = keys.value === menuKeys ? menuKeys + keys.NUMERIC : menuKeys;
+        log('setValue(' + hexadecimal(mask) + ') gives ' + hexadecimal(keys.setValue(mask)));
+    }
+
+    function hexadecimal(number) {
+        return '0x' + number.toString(16);
+    }
+
+    function value(of) {
+        return of === null || of === undefined ? 'not known' : String(of);
+    }
+
+    function deviceRows() {
+        var settings = byId('configuration').configuration;
+        var capabilities = byId('capabilities');
+        var description = capabilities.xmlCapabilities;
+        return [['Country', value(settings.countryId)],
+                ['Audio language', value(settings.preferredAudioLanguage)],
+                ['Subtitle language', value(settings.preferredSubtitleLanguage)],
+                ['Free memory', value(application.privateData.getFreeMem())],
+                ['Key mask in force', hexadecimal(keySet().value)],
+                ['HD user interface', capabilities.hasCapability('OITF_HD_UIPROF') ? 'yes' : 'no'],
+                ['More decoders, SD and HD', capabilities.extraSDVideoDecodes + ' and ' + capabilities.extraHDVideoDecodes],
+                ['Capability profiles', description ? String(description.documentElement.childNodes.length) : 'not known']];
+    }
+
+    // DRM: a message to the set, and its answer some time later.
+
+    function sendDrmMessage() {
+        drm = { sent: 'Hello, set', id: null, result: null, code: null };
+        drm.id = byId('agent').sendDRMMessage('text/plain', drm.sent, 'urn:dvb:casystemid:0');
+        log('sendDRMMessage() gives ' + value(drm.id));
+    }
+
+    function onDrmResult(id, result, code) {
+        drm.id = id;
+        drm.result = result;
+        drm.code = code;
+        log('onDRMMessageResult: ' + value(result));
+        show();
+    }
+
     // The menu: a title, what the panel shows, and what OK does.
 
     var menu = [
@@ -136,6 +190,22 @@
                         table([['Types of objects', String(plugin.length)], ['File', plugin.filename]])];
             },
             ok: function () { log('nothing to do here'); }
+        },
+        {
+            title: 'Device',
+            panel: function () {
+                return [tv.element('h2', 'The set, as a page sees it'), table(deviceRows())];
+            },
+            ok: switchKeyMask
+        },
+        {
+            title: 'DRM messages',
+            panel: function () {
+                return [tv.element('h2', 'OK sends a message to the set'),
+                        table([['Message', value(drm.sent)], ['Id', value(drm.id)], ['Result', value(drm.result)],
+                               ['Code', value(drm.code)]])];
+            },
+            ok: sendDrmMessage
         },
         {
             title: 'Remote control',
@@ -195,6 +265,7 @@
         lastKey = event.keyCode;
         show();
     }, false);
+    byId('agent').onDRMMessageResult = onDrmResult;
     var actions = {};
     actions[VK_UP] = thenShow(function () { moveFocus(-1); });
     actions[VK_DOWN] = thenShow(function () { moveFocus(1); });

@@ -64,6 +64,32 @@ class Demo(unittest.TestCase):
     def test_ok_on_the_application_gets_another_one(self):
         self.assertEqual(self.text('panel', '--keys', 'yellow,ok').count('null'), 5)
 
+    def test_the_device_page_shows_what_the_platform_says(self):
+        text = self.text('panel', '--keys', 'down,down,down,down', plugin='TELIX_DEVICE_PLUGIN')
+        for words in ('Country\tDEU', 'Audio language\tdeu', 'Subtitle language\teng', 'Free memory\t123456',
+                      'Key mask in force\t0x1f', 'HD user interface\tyes', '2 and 1', 'Capability profiles\t2'):
+            self.assertIn(words, text)
+        self.assertGreater(len(self.screenshot('device', '--keys', 'down,down,down,down',
+                                               plugin='TELIX_DEVICE_PLUGIN').colours()), COLOURS_OF_A_PAGE)
+
+    def test_ok_on_the_device_sets_the_key_mask(self):
+        for keys, mask in (('ok', '0x11f'), ('ok,ok', '0x1f')):
+            with self.subTest(keys):
+                self.assertIn(f'Key mask in force\t{mask}', self.text('panel', '--keys', f'down,down,down,down,{keys}',
+                                                                     plugin='TELIX_DEVICE_PLUGIN'))
+
+    def test_a_drm_message_comes_back_turned_round(self):
+        text = self.text('panel', '--keys', 'up,up,ok', '--wait-for',
+                         'document.getElementById("panel").innerText.indexOf("tes ,olleH") > 0',
+                         plugin='TELIX_DEVICE_PLUGIN')
+        self.assertIn('Id\tmessage 1', text)
+        self.assertIn('Code\t0', text)
+
+    def test_without_a_platform_library_the_device_is_not_known(self):
+        text = self.text('panel', '--keys', 'down,down,down,down')
+        self.assertIn('Country\tnot known', text)
+        self.assertIn('HD user interface\tno', text)
+
     def test_green_opens_the_second_application(self):
         title = ('--eval', 'document.title')
         self.assertEqual(self.run_demo('--keys', 'green', *title).value, 'A second application')
