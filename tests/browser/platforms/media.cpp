@@ -1,0 +1,174 @@
+// A platform with one media pipeline that runs by itself: media connects, plays along with the clock, and
+// ends. It reports from a thread of its own and says on standard error which calls it got.
+//
+// The address says how media behaves: "length=NUMBER" in it is its length in milliseconds, a minute
+// otherwise, and "absent" makes it unavailable. Up to the first change of the volume there is no report on
+// what is buffered; from then on the volume is the amount, in seconds.
+#include "tests/support/RecordingPlatform.h"
+
+#include <algorithm>
+#include <chrono>
+#include <cstdio>
+#include <cstdlib>
+#include <map>
+#include <mutex>
+#include <thread>
+
+namespace {
+
+constexpr int kTickMilliseconds = 20;
+constexpr int kTicksToConnect = 5;
+constexpr double kMinute = 60000;
+constexpr uint32_t kNoBufferReport = 0xFFFFFFFF;
+
+enum class Stage { IDLE, CONNECTING, PLAYING, PAUSED, ENDED };
+
+struct Pipeline {
+    std::mutex mutex; // guards everything here
+    Stage stage = Stage::IDLE;
+    Stage stageBeforePause = Stage::IDLE;
+    TELIX_JS_AV_HANDLE player = 0;
+    bool available = true;
+    int ticks = 0;
+    double position = 0; // milliseconds, as the length
+    double length = 0;
+    double speed = 1;
+    uint32_t buffered = kNoBufferReport;
+    TELIX_JS_AV_PLAYSTATE_CB callback = nullptr;
+    std::map<TELIX_JS_AV_HANDLE, TELIX_JS_AV_PLAY_INFO> records; // by player
+};
+
+// Never taken down: the pipeline's thread runs as long as the process.
+Pipeline& pipeline = *new Pipeline;
+
+double lengthOf(const std::string& url) {
+    static const std::string name = "length=";
+    const size_t found = url.find(name);
+    return found == std::string::npos ? kMinute : std::atof(url.c_str() + found + name.size());
+}
+
+void report(TELIX_AV_CB_MSG message) {
+    std::fprintf(stderr, "message %x\n", message);
+    pipeline.callback(pipeline.player, message);
+}
+
+void tick() {
+    const std::lock_guard<std::mutex> lock(pipeline.mutex);
+    if (pipeline.stage == Stage::CONNECTING && ++pipeline.ticks == kTicksToConnect) {
+        pipeline.stage = pipeline.available ? Stage::PLAYING : Stage::IDLE;
+        report(pipeline.available ? TELIX_AV_CB_MSG_PLAYSTART : TELIX_AV_CB_MSG_ERR_NOT_FOUND);
+    } else if (pipeline.stage == Stage::PLAYING) {
+        pipeline.position = std::max(0.0, pipeline.position + kTickMilliseconds * pipeline.speed);
+        if (pipeline.position >= pipeline.length) {
+            pipeline.stage = Stage::ENDED;
+            report(TELIX_AV_CB_MSG_PLAYEND);
+        }
+    }
+}
+
+void run() {
+    for (;;) {
+        std::this_thread::sleep_for(std::chrono::milliseconds(kTickMilliseconds));
+        tick();
+    }
+}
+
+TELIX_RETCODE_ENUM_T play(TELIX_JS_AV_HANDLE player, const char* url, uint32_t, int32_t, int32_t, int32_t,
+                          uint32_t, uint16_t) {
+    const std::lock_guard<std::mutex> lock(pipeline.mutex);
+    if (pipeline.stage != Stage::IDLE) {
+        pipeline.position = 0; // a seek of what has been stopped is for what plays now
+    }
+    pipeline.stage = Stage::CONNECTING;
+    pipeline.player = player;
+    pipeline.available = std::string(url).find("absent") == std::string::npos;
+    pipeline.ticks = 0;
+    pipeline.length = lengthOf(url);
+    return TELIX_RETCODE_SUCCESS;
+}
+
+TELIX_RETCODE_ENUM_T stop(TELIX_JS_AV_HANDLE) {
+    const std::lock_guard<std::mutex> lock(pipeline.mutex);
+    pipeline.stage = Stage::IDLE;
+    pipeline.position = 0;
+    return TELIX_RETCODE_SUCCESS;
+}
+
+TELIX_RETCODE_ENUM_T pause(TELIX_JS_AV_HANDLE) {
+    const std::lock_guard<std::mutex> lock(pipeline.mutex);
+    if (pipeline.stage != Stage::PAUSED) {
+        pipeline.stageBeforePause = pipeline.stage;
+        pipeline.stage = Stage::PAUSED;
+    }
+    return TELIX_RETCODE_SUCCESS;
+}
+
+TELIX_RETCODE_ENUM_T resume(TELIX_JS_AV_HANDLE) {
+    const std::lock_guard<std::mutex> lock(pipeline.mutex);
+    if (pipeline.stage == Stage::PAUSED) {
+        pipeline.stage = pipeline.stageBeforePause;
+    }
+    return TELIX_RETCODE_SUCCESS;
+}
+
+TELIX_RETCODE_ENUM_T seek(TELIX_JS_AV_HANDLE, uint32_t milliseconds) {
+    const std::lock_guard<std::mutex> lock(pipeline.mutex);
+    pipeline.position = milliseconds;
+    return TELIX_RETCODE_SUCCESS;
+}
+
+TELIX_RETCODE_ENUM_T setSpeed(TELIX_JS_AV_HANDLE, ___UINT8 positive, int16_t integerPart, uint16_t tenths) {
+    const std::lock_guard<std::mutex> lock(pipeline.mutex);
+    pipeline.speed = (integerPart + tenths / 10.0) * (positive ? 1 : -1);
+    return TELIX_RETCODE_SUCCESS;
+}
+
+TELIX_RETCODE_ENUM_T setVolume(TELIX_JS_AV_HANDLE, uint32_t volume) {
+    const std::lock_guard<std::mutex> lock(pipeline.mutex);
+    pipeline.buffered = volume;
+    return TELIX_RETCODE_SUCCESS;
+}
+
+TELIX_RETCODE_ENUM_T getPlayInfo(TELIX_JS_AV_HANDLE player, TELIX_JS_AV_PLAY_INFO** info) {
+    const std::lock_guard<std::mutex> lock(pipeline.mutex);
+    TELIX_JS_AV_PLAY_INFO& record = pipeline.records[player];
+    record.state = pipeline.stage == Stage::IDLE ? 0 : 2;
+    record.playPosition = static_cast<uint32_t>(pipeline.position);
+    record.duration = static_cast<uint32_t>(pipeline.length);
+    record.buffered = pipeline.buffered;
+    *info = &record;
+    return TELIX_RETCODE_SUCCESS;
+}
+
+TELIX_RETCODE_ENUM_T createPlayer(TELIX_JS_AV_HANDLE* player, int32_t, int32_t, uint32_t) {
+    static TELIX_JS_AV_HANDLE lastPlayer = 0;
+    *player = ++lastPlayer;
+    return TELIX_RETCODE_SUCCESS;
+}
+
+TELIX_RETCODE_ENUM_T registerCallback(TELIX_JS_AV_HANDLE, TELIX_JS_AV_PLAYSTATE_CB callback) {
+    const std::lock_guard<std::mutex> lock(pipeline.mutex);
+    if (!pipeline.callback) {
+        std::thread(run).detach();
+    }
+    pipeline.callback = callback;
+    return TELIX_RETCODE_SUCCESS;
+}
+
+const bool scenario = [] {
+    RecordingPlatform& platform = *telix_recording_platform();
+    platform.onCall = [](const std::string& call) { std::fprintf(stderr, "call %s\n", call.c_str()); };
+    platform.TELIX_JS_AV_CreatePlayer = createPlayer;
+    platform.TELIX_JS_AV_RegisterOnPlayStateChange = registerCallback;
+    platform.TELIX_JS_AV_Play = play;
+    platform.TELIX_JS_AV_Stop = stop;
+    platform.TELIX_JS_AV_Pause = pause;
+    platform.TELIX_JS_AV_Resume = resume;
+    platform.TELIX_JS_AV_Seek = seek;
+    platform.TELIX_JS_AV_SetPlaySpeed = setSpeed;
+    platform.TELIX_JS_AV_SetVolume = setVolume;
+    platform.TELIX_JS_AV_GetPlayInfo = getPlayInfo;
+    return true;
+}();
+
+} // namespace

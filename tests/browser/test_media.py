@@ -1,0 +1,173 @@
+"""Media objects, fed by a server of the test's own and observed at a platform that records."""
+
+import http.server
+import os
+import re
+import socket
+import threading
+import time
+import unittest
+import urllib.parse
+
+from television import Television
+
+ROOT = os.path.abspath(__file__).rsplit('/tests/', 1)[0]
+TYPES = {'.html': 'text/html; charset=utf-8', '.js': 'text/javascript', '.css': 'text/css', '.mp4': 'video/mp4',
+         '.mp3': 'audio/mpeg', '.asx': 'video/x-ms-asf'}
+# Seconds that a page may take in all its tests, and a stream without an end until somebody drops it.
+PAGE_LIMIT = 100
+STREAM_LIMIT = 60
+
+PLAYLIST = '''<ASX version="3.0">
+<Title>Four clips</Title>
+<Entry><Ref href="{base}/one.mp4?length=200"/></Entry>
+<Repeat count="2">
+<Entry><Ref href="{base}/two.mp4?length=200"/></Entry>
+<Entry><Ref href="{base}/three.mp4?length=200"/></Entry>
+</Repeat>
+<Entry><Ref href="{base}/four.mp4?length=200"/></Entry>
+</ASX>
+'''
+
+
+class Handler(http.server.BaseHTTPRequestHandler):
+    """Files of the project, and below a folder media/ what there is to play."""
+
+    def do_GET(self):
+        folder, name = self.path.split('?')[0].rsplit('/', 1)
+        name = urllib.parse.unquote(name)
+        self.server.asked.append(name)
+        if folder.endswith('/dropped'):
+            self.answer('text/plain', b'yes' if name in self.server.dropped else b'no')
+        elif not folder.endswith('/media') or folder.startswith('/apps/'):
+            self.send_file(ROOT + folder + '/' + name)
+        elif name.startswith('endless'):
+            self.send_endlessly(name)
+        elif name == 'list.asx':
+            self.answer(TYPES['.asx'], PLAYLIST.format(base=self.server.address + '/media').encode())
+        elif name.startswith('missing'):
+            self.send_error(404)
+        else:
+            self.answer(TYPES['.mp4'], b'a beginning')
+
+    def answer(self, kind, content):
+        self.send_response(200)
+        self.send_header('Content-Type', kind)
+        self.send_header('Content-Length', str(len(content)))
+        self.end_headers()
+        self.wfile.write(content)
+
+    def send_file(self, file_name):
+        if not os.path.isfile(file_name):
+            self.send_error(404)
+            return
+        with open(file_name, 'rb') as file:
+            self.answer(TYPES[os.path.splitext(file_name)[1]], file.read())
+
+    def send_endlessly(self, name):
+        self.send_response(200)
+        self.send_header('Content-Type', TYPES[os.path.splitext(name)[1]])
+        self.end_headers()
+        end = time.monotonic() + STREAM_LIMIT
+        try:
+            while time.monotonic() < end:
+                self.wfile.write(bytes(4096))
+                time.sleep(0.02)
+        except OSError:
+            self.server.dropped.add(name)
+
+    def log_message(self, *_):
+        pass
+
+
+class Server(http.server.ThreadingHTTPServer):
+    daemon_threads = True
+
+    def __init__(self):
+        super().__init__(('127.0.0.1', 0), Handler)
+        self.address = f'http://127.0.0.1:{self.server_port}'
+        self.asked = []
+        self.dropped = set()
+        threading.Thread(target=self.serve_forever, daemon=True).start()
+
+    def handle_error(self, *_):
+        """A browser that goes away in the middle of an answer is nothing special."""
+
+
+class Media(unittest.TestCase):
+    @classmethod
+    def setUpClass(cls):
+        cls.television = Television(os.environ['TELIX_TV'])
+        cls.addClassCleanup(cls.television.close)
+
+    def setUp(self):
+        self.server = Server()
+        self.addCleanup(self.server.server_close)
+        self.addCleanup(self.server.shutdown)
+
+    def run_page(self, page):
+        """Runs a page of tests; gives the calls that the platform got, without the address of the server."""
+        run = self.television.run('--plugin', os.environ['TELIX_PLUGIN'], '--timeout', PAGE_LIMIT,
+                                  '--wait-for', 'window.testResult', '--eval', 'window.testResult',
+                                  f'{self.server.address}/tests/browser/pages/{page}')
+        self.assertEqual(run.status, 0, run)
+        self.assertEqual(run.value['failed'], [], run)
+        self.assertGreater(run.value['passed'], 0, run)
+        return self.calls(run)
+
+    def calls(self, run):
+        return [line[len('call TELIX_JS_AV_'):].replace(self.server.address, '') for line in run.errors.splitlines()
+                if line.startswith('call TELIX_JS_AV_')]
+
+    @staticmethod
+    def plays(calls):
+        """What was played: name and codes of source, container and audio."""
+        matches = (re.fullmatch(r'Play\(\d+, ".*/([^/"]*)", 1, (\d+), (\d+), (\d+), 0, 0\)', call) for call in calls)
+        return [(match[1], *map(int, match.groups()[1:])) for match in matches if match]
+
+    def test_each_type_makes_a_player_with_its_codes(self):
+        calls = self.run_page('mediatypes.html')
+        # Players are numbered as they are made, in an order of the engine's own; each object has told its player which
+        # one it is.
+        created = [call for call in calls if call.startswith('CreatePlayer')]
+        told = [re.fullmatch(r'SetVolume\((\d+), (\d+)\)', call) for call in calls]
+        players = {int(match[2]): int(match[1]) for match in told if match}
+        self.assertEqual([created[players[number] - 1] for number in range(9)], [
+            f'CreatePlayer(out, {codes}, 0)' for codes in (
+                '2, 1', '512, 4', '512, 0', '512, 0', '512, 0', '512, 0', '512, 0', '512, 0', '512, 0')])
+        self.assertEqual(len(created), 10)
+        self.assertEqual(self.plays(calls), [])
+        self.assertEqual(sum(call.startswith('DestroyPlayer') for call in calls), 10)
+
+    def test_a_playlist_repeats_its_section(self):
+        # The browser fetches by itself what it takes for the address of the element, the plug-in asks for the rest.
+        for element in ('object&data', 'object&src', 'embed&src'):
+            with self.subTest(element):
+                played = [name for name, *_ in self.plays(self.run_page(f'mediaplaylist.html?{element}'))]
+                self.assertEqual(played, [f'{name}.mp4?length=200'
+                                          for name in ('one', 'two', 'three', 'two', 'three', 'four')])
+                self.assertIn('list.asx', self.server.asked)
+
+    def test_an_audio_stream_is_looked_at_and_dropped(self):
+        self.assertEqual(self.plays(self.run_page('mediaaudio.html')), [
+            ('endless.mp3', 6, 2, 1), ('endless-too.mp3', 6, 512, 0), ('next.mp4', 6, 1280, 0)])
+
+    def test_a_stream_that_is_not_there(self):
+        with socket.socket() as nobody:
+            # Bound and not listening: a connection is refused.
+            nobody.bind(('127.0.0.1', 0))
+            calls = self.run_page(f'mediamissing.html?{nobody.getsockname()[1]}')
+        self.assertEqual(self.plays(calls), [])
+        self.assertIn('missing.mp4', self.server.asked)
+
+    def test_states_and_events_come_in_order(self):
+        calls = self.run_page('mediaevents.html')
+        asked = [re.sub(r'\((\d+, ".*/(\w+\.mp4)|\d+).*', r' \2', call) for call in calls
+                 if re.match(r'(Play|Pause|Resume|Seek)\(', call)]
+        self.assertEqual([words.strip() for words in asked], [
+            'Play clip.mp4', 'Pause', 'Resume', 'Pause', 'Resume', 'Seek',
+            'Play clip.mp4', 'Play absent.mp4', 'Play clip.mp4', 'Play clip.mp4'])
+
+
+if __name__ == '__main__':
+    unittest.main()
