@@ -41,7 +41,7 @@ GstFlowReturn showSample(GstAppSink* sink, GstSample* sample, gpointer data) {
 
 } // namespace
 
-Picture::Token Picture::take(const View& view, std::function<void()> lost) {
+Picture::Token Picture::take(const View& view, std::function<void()> lost, std::function<void()> shown) {
     std::function<void()> formerLost;
     GstSample* formerSample = nullptr;
     Token token = 0;
@@ -51,6 +51,7 @@ Picture::Token Picture::take(const View& view, std::function<void()> lost) {
         m_view = view;
         formerSample = std::exchange(m_sample, nullptr);
         formerLost = std::exchange(m_lost, std::move(lost));
+        m_shown = std::move(shown);
     }
     giveBack(formerSample);
     if (formerLost) {
@@ -69,6 +70,7 @@ void Picture::release(Token token) {
         }
         m_current = 0;
         m_lost = nullptr;
+        m_shown = nullptr;
         formerSample = std::exchange(m_sample, nullptr);
     }
     giveBack(formerSample);
@@ -100,6 +102,7 @@ void Picture::blank(Token token) {
 }
 
 void Picture::show(Token token, GstSample* sample) {
+    std::function<void()> shown;
     GstSample* formerSample = nullptr;
     {
         std::lock_guard<std::mutex> lock(m_mutex);
@@ -108,9 +111,13 @@ void Picture::show(Token token, GstSample* sample) {
         }
         formerSample = std::exchange(m_sample, gst_sample_ref(sample)); // kept until the next one
         ++m_serial;
+        shown = std::exchange(m_shown, nullptr);
     }
     giveBack(formerSample);
     wake();
+    if (shown) {
+        shown();
+    }
 }
 
 GstElement* Picture::makeSink(Token token) {

@@ -61,6 +61,7 @@ private:
     GstSample* m_sample = nullptr; // one reference
     uint64_t m_serial = 0;
     std::function<void()> m_lost;
+    std::function<void()> m_shown;
 
     std::mutex m_wakeupMutex; // held while the wake-up runs
     telix_desktop_wakeup m_wakeup = nullptr;

@@ -104,6 +104,19 @@ size_t lengthOf(const Bytes& section) {
 
 } // namespace
 
+std::optional<size_t> findPackets(const uint8_t* bytes, size_t length) {
+    constexpr size_t packetsCompared = 5;
+    for (size_t start = 0; start < packetSize; ++start) {
+        size_t seen = 0;
+        while (start + (seen + 1) * packetSize <= length && bytes[start + seen * packetSize] == packetStart) {
+            if (++seen == packetsCompared) {
+                return start;
+            }
+        }
+    }
+    return std::nullopt;
+}
+
 void SectionFilter::push(const uint8_t* packet) {
     const bool damaged = packet[0] != packetStart || (packet[1] & 0x80) != 0 || (packet[3] & 0xC0) != 0;
     if (damaged) {

@@ -10,6 +10,9 @@
 
 namespace desktop {
 
+// Where the first of some packets stands that follow each other; nothing if there are none.
+std::optional<size_t> findPackets(const uint8_t* bytes, size_t length);
+
 // Reassembles the sections of one PID.
 class SectionFilter {
 public:

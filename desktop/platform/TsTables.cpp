@@ -221,11 +221,20 @@ Bytes packTime(int64_t seconds) {
     return bytes;
 }
 
-Bytes describeLanguage(const std::string& language) {
+Bytes describeLanguage(const std::string& language, uint8_t audioType) {
     Bytes words;
     putCode(words, language);
-    put8(words, 0); // no special kind of audio
+    put8(words, audioType);
     return descriptor(0x0A, words);
+}
+
+Bytes describeSubtitles(const std::string& language, uint8_t subtitleType) {
+    Bytes words;
+    putCode(words, language);
+    put8(words, subtitleType);
+    put16(words, 1); // composition page
+    put16(words, 1); // ancillary page
+    return descriptor(0x59, words);
 }
 
 Bytes describeComponentTag(uint8_t tag) {

@@ -121,7 +121,12 @@ Bytes pack(const StreamEvent& event);
 Bytes packTime(int64_t seconds); // the time table, without a sum as ever
 
 // Descriptors, complete with tag and length.
-Bytes describeLanguage(const std::string& language);
+// `audioType` is 0 for ordinary audio, audioTypeDescription for a description of the picture.
+constexpr uint8_t audioTypeHearingImpaired = 2;
+constexpr uint8_t audioTypeDescription = 3;
+Bytes describeLanguage(const std::string& language, uint8_t audioType);
+// `subtitleType` is 0x10 for ordinary subtitles, 0x20 for those for the hard of hearing.
+Bytes describeSubtitles(const std::string& language, uint8_t subtitleType);
 Bytes describeComponentTag(uint8_t tag);
 
 // The packets that carry a section; `continuity` is the counter of the PID and runs on.
