@@ -28,8 +28,9 @@ public:
     };
 
     // Begins a presentation, which takes the set's one media pipeline from the one before: that one's `lost`
-    // is called on this thread, inside. Platform thread.
-    Token take(const View& view, std::function<void()> lost);
+    // is called on this thread, inside. `shown` is called once, when the first frame is there, on GStreamer's
+    // thread. Platform thread.
+    Token take(const View& view, std::function<void()> lost, std::function<void()> shown = nullptr);
 
     // Ends a presentation by its own will: `lost` is not called, the picture goes black. Platform thread.
     void release(Token token);
