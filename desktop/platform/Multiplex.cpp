@@ -110,13 +110,13 @@ bool makeSubtitles(const SubtitleLanguage& language, const std::string& folder, 
 std::vector<std::string> ffmpegCommand(const std::string& folder, const std::string& file) {
     std::vector<std::string> command{"ffmpeg", "-hide_banner", "-loglevel", "error", "-nostdin", "-y"};
     const auto add = [&](std::initializer_list<std::string> more) { command.insert(command.end(), more); };
-    const std::string duration = std::string(":d=") + length;
     const std::vector<TestService>& services = testServices();
     for (const TestService& service : services) {
-        add({"-f", "lavfi", "-i", std::string(service.picture) + duration});
+        add({"-f", "lavfi", "-t", length, "-i", service.picture});
     }
-    add({"-f", "lavfi", "-i", "sine=f=440:r=48000" + duration, "-f", "lavfi", "-i",
-         "sine=f=880:r=48000" + duration});
+    for (const char* tone : {"sine=f=440:r=48000", "sine=f=880:r=48000"}) {
+        add({"-f", "lavfi", "-t", length, "-i", tone});
+    }
     for (const SubtitleLanguage& language : subtitleLanguages) {
         add({"-itsoffset", "0.5", "-i", folder + "/subtitles-" + language.code + ".ts"});
     }
