@@ -35,7 +35,8 @@ std::string chooseSink() {
 } // namespace
 
 GstElement* makeAudioSink() {
-    static const std::string name = chooseSink();
+    static const auto& name =
+        *new std::string(chooseSink()); // kept: the platform thread ends with the process
     GstElement* sink = gst_element_factory_make(name.c_str(), nullptr);
     if (sink && name == silentSink) {
         g_object_set(sink, "sync", TRUE, nullptr);

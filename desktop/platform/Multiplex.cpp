@@ -191,7 +191,8 @@ bool runCommand(const std::vector<std::string>& command, std::string& error) {
 } // namespace
 
 const std::vector<TestService>& testServices() {
-    static const std::vector<TestService> services{
+    // Kept until the process ends: the head-end's thread reads it to the last.
+    static const auto& services = *new std::vector<TestService>{
         {101,
          0x0101,
          "Telix One",
@@ -220,8 +221,8 @@ const std::vector<TestService>& testServices() {
 
 const Bytes& testDeliveryDescriptor() {
     // Satellite: 11.72755 GHz, 19.2 degrees east, horizontal, QPSK, 27.511 megasymbols, inner code 3/4.
-    static const Bytes descriptor{0x43, 0x0B, 0x11, 0x72, 0x75, 0x51, 0x01,
-                                  0x92, 0x81, 0x27, 0x51, 0x11, 0x13};
+    static const auto& descriptor =
+        *new Bytes{0x43, 0x0B, 0x11, 0x72, 0x75, 0x51, 0x01, 0x92, 0x81, 0x27, 0x51, 0x11, 0x13};
     return descriptor;
 }
 
