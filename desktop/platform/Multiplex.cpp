@@ -59,6 +59,35 @@ std::string cacheFolder() {
     return result;
 }
 
+// Widens the regions of encoded subtitles. The encoder makes them as wide as what is in them, and the decoder
+// takes the end of a line that reaches the end of its region for a fault.
+GstPadProbeReturn widenRegions(GstPad* pad, GstPadProbeInfo* info, gpointer data) {
+    (void)pad;
+    (void)data;
+    constexpr uint8_t segmentStart = 0x0F;
+    constexpr uint8_t regionSegment = 0x11;
+    constexpr gsize segmentHeader = 6;
+    constexpr gsize widthOffset = 2; // in the segment
+    GstBuffer* buffer = gst_buffer_make_writable(GST_PAD_PROBE_INFO_BUFFER(info));
+    GST_PAD_PROBE_INFO_DATA(info) = buffer; // in place of the one that came
+    GstMapInfo map;
+    if (!gst_buffer_map(buffer, &map, GST_MAP_READWRITE)) {
+        return GST_PAD_PROBE_OK;
+    }
+    gsize at = 2; // behind the identifier of data and stream
+    while (at + segmentHeader <= map.size && map.data[at] == segmentStart) {
+        uint8_t* width = map.data + at + segmentHeader + widthOffset;
+        if (map.data[at + 1] == regionSegment && at + segmentHeader + widthOffset + 2 <= map.size) {
+            const unsigned int wider = (static_cast<unsigned int>(width[0]) << 8 | width[1]) + 2;
+            width[0] = static_cast<uint8_t>(wider >> 8);
+            width[1] = static_cast<uint8_t>(wider);
+        }
+        at += segmentHeader + (static_cast<gsize>(map.data[at + 4]) << 8 | map.data[at + 5]);
+    }
+    gst_buffer_unmap(buffer, &map);
+    return GST_PAD_PROBE_OK;
+}
+
 // Writes the subtitles of one language as a transport stream; false with the reason.
 bool makeSubtitles(const SubtitleLanguage& language, const std::string& folder, std::string& error) {
     const std::string stem = folder + "/subtitles-" + language.code;
@@ -72,10 +101,11 @@ bool makeSubtitles(const SubtitleLanguage& language, const std::string& folder, 
         g_error_free(reason);
         return false;
     }
-    GstElement* pipeline = gst_parse_launch(
-        "filesrc name=source ! subparse ! textrender font-desc=\"Sans 24\" ! "
-        "video/x-raw,format=AYUV,width=720,height=576 ! dvbsubenc ! mpegtsmux ! filesink name=sink",
-        &reason);
+    GstElement* pipeline =
+        gst_parse_launch("filesrc name=source ! subparse ! textrender font-desc=\"Sans 24\" ! "
+                         "video/x-raw,format=AYUV,width=720,height=576 ! dvbsubenc name=encoder ! mpegtsmux "
+                         "! filesink name=sink",
+                         &reason);
     if (reason) {
         error = reason->message;
         g_error_free(reason);
@@ -89,6 +119,11 @@ bool makeSubtitles(const SubtitleLanguage& language, const std::string& folder, 
         g_object_set(element, "location", (stem + ending).c_str(), nullptr);
         gst_object_unref(element);
     }
+    GstElement* encoder = gst_bin_get_by_name(GST_BIN(pipeline), "encoder");
+    GstPad* encoded = gst_element_get_static_pad(encoder, "src");
+    gst_pad_add_probe(encoded, GST_PAD_PROBE_TYPE_BUFFER, widenRegions, nullptr, nullptr);
+    gst_object_unref(encoded);
+    gst_object_unref(encoder);
     gst_element_set_state(pipeline, GST_STATE_PLAYING);
     GstBus* bus = gst_element_get_bus(pipeline);
     GstMessage* message = gst_bus_timed_pop_filtered(
