@@ -388,7 +388,6 @@ std::string decodeText(const uint8_t* bytes, size_t length) {
         void operator()(char* block) const { g_free(block); }
     };
     using Text = std::unique_ptr<char, Free>;
-    gsize written = 0;
     Text converted;
     if (charset == "UTF-8") {
         converted.reset(g_utf8_make_valid(text.data(), static_cast<gssize>(text.size())));
@@ -396,9 +395,9 @@ std::string decodeText(const uint8_t* bytes, size_t length) {
     }
     for (const char* each : {charset.c_str(), "ISO-8859-1"}) {
         converted.reset(g_convert(text.data(), static_cast<gssize>(text.size()), "UTF-8", each, nullptr,
-                                  &written, nullptr));
+                                  nullptr, nullptr));
         if (converted) {
-            return std::string(converted.get(), written).c_str(); // up to the first zero
+            return converted.get(); // up to the first zero
         }
     }
     return "";

@@ -17,6 +17,8 @@
 extern "C" {
 #endif
 
+/* NOLINTBEGIN(modernize-use-using): the header is C. */
+
 /* What is to be seen now. Coordinates are pixels of the browser's 1280 by 720 page. */
 typedef struct telix_desktop_frame {
     const uint8_t* pixels; /* 4 bytes a pixel: blue, green, red, not used; null while there is no frame */
@@ -43,6 +45,8 @@ typedef void (*telix_desktop_wakeup)(void* data);
 typedef void (*telix_desktop_set_wakeup_function)(telix_desktop_wakeup wakeup, void* data);
 typedef void (*telix_desktop_acquire_frame_function)(telix_desktop_frame* frame);
 typedef void (*telix_desktop_release_frame_function)(telix_desktop_frame* frame);
+
+/* NOLINTEND(modernize-use-using) */
 
 #define TELIX_DESKTOP_API __attribute__((visibility("default")))
 
