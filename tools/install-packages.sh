@@ -7,7 +7,10 @@ packages=(build-essential cmake ninja-build pkg-config libglib2.0-dev)
 for purpose in "$@"; do
     case "$purpose" in
     run)
-        packages+=(qtbase5-dev libqt5webkit5-dev fonts-dejavu-core xvfb xauth)
+        packages+=(qtbase5-dev libqt5webkit5-dev fonts-dejavu-core xvfb xauth libgstreamer1.0-dev
+            libgstreamer-plugins-base1.0-dev gstreamer1.0-plugins-base gstreamer1.0-plugins-good
+            gstreamer1.0-plugins-bad gstreamer1.0-plugins-ugly gstreamer1.0-libav gstreamer1.0-x gstreamer1.0-alsa
+            ffmpeg libjson-glib-dev)
         ;;
     test)
         packages+=(libgtest-dev libgmock-dev libbenchmark-dev libexpat1-dev clang-14 libclang-rt-14-dev

@@ -1,0 +1,48 @@
+// One callback of the plug-in: registered and given up from the browser's thread, called on the platform
+// thread.
+#ifndef TELIX_DESKTOP_CALLBACK_H
+#define TELIX_DESKTOP_CALLBACK_H
+
+#include <mutex>
+
+namespace desktop {
+
+template <typename Function>
+class Callback {
+public:
+    // The last one registered is called; null counts as none.
+    void set(Function function) {
+        std::lock_guard<std::recursive_mutex> lock(m_mutex);
+        m_function = function;
+    }
+
+    // When this returns, `function` is not running on another thread and is never called again.
+    void clear(Function function) {
+        std::lock_guard<std::recursive_mutex> lock(m_mutex);
+        if (m_function == function) {
+            m_function = nullptr;
+        }
+    }
+
+    bool isSet() const {
+        std::lock_guard<std::recursive_mutex> lock(m_mutex);
+        return m_function != nullptr;
+    }
+
+    // On the platform thread, without the platform's mutex. The callback may itself give the registration up.
+    template <typename... Arguments>
+    void call(Arguments... arguments) const {
+        std::lock_guard<std::recursive_mutex> lock(m_mutex);
+        if (m_function) {
+            m_function(arguments...);
+        }
+    }
+
+private:
+    mutable std::recursive_mutex m_mutex;
+    Function m_function = nullptr;
+};
+
+} // namespace desktop
+
+#endif

@@ -1,0 +1,145 @@
+// The calls on programmes and parental ratings.
+#include "desktop/platform/Broadcast.h"
+#include "desktop/platform/Output.h"
+
+using namespace desktop;
+
+namespace {
+
+template <typename Give>
+TELIX_RETCODE_ENUM_T ofProgramme(TELIX_JS_SI_HANDLE handle, Give give) {
+    const auto programme = Broadcast::instance().programmes().find(handle);
+    return programme ? give(*programme) : refused;
+}
+
+template <typename Give>
+TELIX_RETCODE_ENUM_T ofRating(TELIX_JS_SI_PARENTALRATING_HANDLE handle, Give give) {
+    const auto rating = Broadcast::instance().programmes().findRating(handle);
+    return rating ? give(*rating) : refused;
+}
+
+template <typename Value>
+TELIX_RETCODE_ENUM_T setProperty(TELIX_JS_SI_HANDLE programme, Value Programme::*property,
+                                 const Value& value) {
+    return Broadcast::instance().programmes().set(programme, property, value) ? TELIX_RETCODE_SUCCESS
+                                                                              : refused;
+}
+
+// A text of at most 255 bytes, cut between characters; none for the length 0.
+TELIX_RETCODE_ENUM_T giveShortText(char** text, ___UINT8* length, const std::string& value) {
+    size_t size = std::min<size_t>(value.size(), 255);
+    while (size < value.size() && size > 0 && (static_cast<uint8_t>(value[size]) & 0xC0) == 0x80) {
+        --size;
+    }
+    *length = static_cast<___UINT8>(size);
+    return size == 0 ? TELIX_RETCODE_SUCCESS : giveText(text, value.substr(0, size));
+}
+
+} // namespace
+
+TELIX_RETCODE_ENUM_T TELIX_JS_SI_GetProgrammeHandles(uint32_t* count, TELIX_JS_SI_HANDLE** programmes) {
+    static std::vector<TELIX_JS_SI_HANDLE> handles; // valid until the next call
+    handles = Broadcast::instance().currentProgrammes();
+    handles.reserve(1);
+    *count = static_cast<uint32_t>(handles.size());
+    *programmes = handles.data();
+    return TELIX_RETCODE_SUCCESS;
+}
+
+TELIX_RETCODE_ENUM_T TELIX_JS_SI_SetName(TELIX_JS_SI_HANDLE programme, const char* name) {
+    return setProperty<std::string>(programme, &Programme::name, name);
+}
+
+TELIX_RETCODE_ENUM_T TELIX_JS_SI_SetChannelID(TELIX_JS_SI_HANDLE programme, const char* channelId) {
+    return setProperty<std::string>(programme, &Programme::channelId, channelId);
+}
+
+TELIX_RETCODE_ENUM_T TELIX_JS_SI_SetDescription(TELIX_JS_SI_HANDLE programme, const char* description) {
+    return setProperty<std::string>(programme, &Programme::description, description);
+}
+
+TELIX_RETCODE_ENUM_T TELIX_JS_SI_SetStartTime(TELIX_JS_SI_HANDLE programme, uint32_t startTime) {
+    return setProperty(programme, &Programme::start, startTime);
+}
+
+TELIX_RETCODE_ENUM_T TELIX_JS_SI_SetDuration(TELIX_JS_SI_HANDLE programme, uint32_t duration) {
+    return setProperty(programme, &Programme::duration, duration);
+}
+
+TELIX_RETCODE_ENUM_T TELIX_JS_SI_GetName(TELIX_JS_SI_HANDLE programme, char** name, ___UINT8* length) {
+    return ofProgramme(programme,
+                       [=](const Programme& found) { return giveShortText(name, length, found.name); });
+}
+
+TELIX_RETCODE_ENUM_T TELIX_JS_SI_GetDescription(TELIX_JS_SI_HANDLE programme, char** description,
+                                                ___UINT8* length) {
+    return ofProgramme(programme, [=](const Programme& found) {
+        return giveShortText(description, length, found.description);
+    });
+}
+
+TELIX_RETCODE_ENUM_T TELIX_JS_SI_GetStartTime(TELIX_JS_SI_HANDLE programme, uint32_t* startTime) {
+    return ofProgramme(programme, [=](const Programme& found) {
+        *startTime = found.start;
+        return TELIX_RETCODE_SUCCESS;
+    });
+}
+
+TELIX_RETCODE_ENUM_T TELIX_JS_SI_GetDuration(TELIX_JS_SI_HANDLE programme, uint32_t* duration) {
+    return ofProgramme(programme, [=](const Programme& found) {
+        *duration = found.duration;
+        return TELIX_RETCODE_SUCCESS;
+    });
+}
+
+TELIX_RETCODE_ENUM_T TELIX_JS_SI_GetChannelID(TELIX_JS_SI_HANDLE programme, char** channelId) {
+    return ofProgramme(programme,
+                       [=](const Programme& found) { return giveText(channelId, found.channelId); });
+}
+
+TELIX_RETCODE_ENUM_T TELIX_JS_SI_GetParentalRatingHandles(TELIX_JS_SI_HANDLE programme, uint32_t* count,
+                                                          TELIX_JS_SI_PARENTALRATING_HANDLE** ratings) {
+    static std::vector<TELIX_JS_SI_PARENTALRATING_HANDLE> handles; // valid until the next call
+    return ofProgramme(programme, [=](const Programme& found) {
+        handles = found.ratings;
+        handles.reserve(1);
+        *count = static_cast<uint32_t>(handles.size());
+        *ratings = handles.data();
+        return TELIX_RETCODE_SUCCESS;
+    });
+}
+
+// The age as a text; a number of the broadcaster's own has no name.
+TELIX_RETCODE_ENUM_T TELIX_JS_SI_PARENTALRATING_GetName(TELIX_JS_SI_PARENTALRATING_HANDLE rating,
+                                                        char** name) {
+    return ofRating(rating, [=](const ParentalRating& found) {
+        return giveText(name, found.isAge() ? std::to_string(found.value()) : "");
+    });
+}
+
+TELIX_RETCODE_ENUM_T TELIX_JS_SI_PARENTALRATING_GetScheme(TELIX_JS_SI_PARENTALRATING_HANDLE rating,
+                                                          char** scheme) {
+    return ofRating(rating, [=](const ParentalRating&) { return giveText(scheme, "dvb-si"); });
+}
+
+TELIX_RETCODE_ENUM_T TELIX_JS_SI_PARENTALRATING_GetValue(TELIX_JS_SI_PARENTALRATING_HANDLE rating,
+                                                         int32_t* value) {
+    return ofRating(rating, [=](const ParentalRating& found) {
+        *value = found.value();
+        return TELIX_RETCODE_SUCCESS;
+    });
+}
+
+// Broadcast carries no labels.
+TELIX_RETCODE_ENUM_T TELIX_JS_SI_PARENTALRATING_GetLabels(TELIX_JS_SI_PARENTALRATING_HANDLE rating,
+                                                          int32_t* labels) {
+    return ofRating(rating, [=](const ParentalRating&) {
+        *labels = 0;
+        return TELIX_RETCODE_SUCCESS;
+    });
+}
+
+TELIX_RETCODE_ENUM_T TELIX_JS_SI_PARENTALRATING_GetRegion(TELIX_JS_SI_PARENTALRATING_HANDLE rating,
+                                                          char** region) {
+    return ofRating(rating, [=](const ParentalRating& found) { return giveText(region, found.region); });
+}

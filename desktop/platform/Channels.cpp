@@ -1,0 +1,247 @@
+// Services of transport stream files, and looking channels up.
+#include "desktop/platform/Channels.h"
+
+#include "desktop/platform/Multiplex.h"
+#include "desktop/platform/Sections.h"
+
+#include <algorithm>
+#include <cstdio>
+#include <memory>
+
+namespace desktop {
+
+namespace {
+
+constexpr size_t bytesScanned = size_t{8} << 20; // tables come round every two seconds at the latest
+constexpr size_t mostUnlisted = 256;
+
+// The tables of a file that name its services.
+struct Scan {
+    std::optional<Pat> pat;
+    std::optional<Sdt> sdt;
+    std::optional<Nit> nit;
+};
+
+Scan scanFile(const std::string& file) {
+    Scan scan;
+    struct Unref {
+        void operator()(GMappedFile* mapping) const { g_mapped_file_unref(mapping); }
+    };
+    GError* error = nullptr;
+    const std::unique_ptr<GMappedFile, Unref> mapping(g_mapped_file_new(file.c_str(), FALSE, &error));
+    if (!mapping) {
+        std::fprintf(stderr, "libtelix: %s\n", error->message);
+        g_error_free(error);
+        return scan;
+    }
+    const auto* bytes = reinterpret_cast<const uint8_t*>(g_mapped_file_get_contents(mapping.get()));
+    const size_t length = std::min(g_mapped_file_get_length(mapping.get()), bytesScanned);
+    const auto start = findPackets(bytes, length);
+    if (!start) {
+        std::fprintf(stderr, "libtelix: %s is no transport stream\n", file.c_str());
+        return scan;
+    }
+    SectionDemultiplexer demultiplexer([&](uint16_t pid, const Bytes& section) {
+        if (pid == patPid && !scan.pat) {
+            scan.pat = parsePat(section);
+        } else if (pid == sdtPid && !scan.sdt) {
+            scan.sdt = parseSdt(section);
+        } else if (pid == nitPid && !scan.nit) {
+            scan.nit = parseNit(section);
+        }
+    });
+    for (const uint16_t pid : {patPid, sdtPid, nitPid}) {
+        demultiplexer.add(pid);
+    }
+    for (size_t at = *start; at + packetSize <= length && !(scan.pat && scan.sdt && scan.nit);
+         at += packetSize) {
+        demultiplexer.push(bytes + at);
+    }
+    return scan;
+}
+
+int32_t typeOf(uint8_t serviceType) {
+    switch (serviceType) {
+    case 0x01:
+    case 0x11:
+    case 0x16:
+    case 0x19:
+    case 0x1F:
+        return 0;
+    case 0x02:
+    case 0x0A:
+        return 1;
+    default:
+        return 2;
+    }
+}
+
+std::string stemOf(const std::string& file) {
+    const size_t slash = file.rfind('/');
+    const std::string name = slash == std::string::npos ? file : file.substr(slash + 1);
+    return name.substr(0, name.rfind('.'));
+}
+
+std::vector<std::string> filesIn(const std::string& folder) {
+    std::vector<std::string> files;
+    if (GDir* dir = g_dir_open(folder.c_str(), 0, nullptr)) {
+        while (const char* name = g_dir_read_name(dir)) {
+            if (g_str_has_suffix(name, ".ts")) {
+                files.push_back(folder + "/" + name);
+            }
+        }
+        g_dir_close(dir);
+    }
+    std::sort(files.begin(), files.end());
+    return files;
+}
+
+} // namespace
+
+Channels::Channels(const std::vector<Configuration::Source>& sources) {
+    for (const Configuration::Source& source : sources) {
+        if (source.path.empty()) {
+            for (const TestService& service : testServices()) {
+                if (!source.service || *source.service == service.serviceId) {
+                    add({0, Channel::Origin::testMultiplex, "", 0, testOriginalNetworkId,
+                         testTransportStreamId, service.serviceId, service.name, testDeliveryDescriptor()});
+                }
+            }
+        } else if (g_file_test(source.path.c_str(), G_FILE_TEST_IS_DIR)) {
+            for (const std::string& file : filesIn(source.path)) {
+                addFile(file, source.service);
+            }
+        } else {
+            addFile(source.path, source.service);
+        }
+    }
+    for (const Channel& channel : m_channels) {
+        m_list.push_back(channel.handle);
+    }
+}
+
+void Channels::add(Channel channel) {
+    channel.handle = static_cast<TELIX_JS_CM_HANDLE>(m_channels.size() + 1);
+    m_channels.push_back(std::move(channel));
+}
+
+void Channels::addFile(const std::string& file, std::optional<uint16_t> service) {
+    const Scan scan = scanFile(file);
+    Channel channel;
+    channel.origin = Channel::Origin::file;
+    channel.file = file;
+    if (scan.nit) {
+        channel.deliveryDescriptor = scan.nit->deliveryDescriptor;
+    }
+    bool isFound = false;
+    for (const auto& [sid, pid] : scan.pat ? scan.pat->programmes : decltype(Pat::programmes)()) {
+        if (sid == 0 || (service && *service != sid)) {
+            continue;
+        }
+        isFound = true;
+        channel.sid = sid;
+        channel.tsid = scan.pat->transportStreamId;
+        channel.name = stemOf(file);
+        if (scan.pat->programmes.size() > 1) {
+            channel.name += " " + std::to_string(sid);
+        }
+        if (scan.sdt) {
+            channel.onid = scan.sdt->originalNetworkId;
+            for (const SdtService& described : scan.sdt->services) {
+                if (described.serviceId == sid) {
+                    channel.type = typeOf(described.type);
+                    channel.name = described.name.empty() ? channel.name : described.name;
+                }
+            }
+        }
+        add(channel);
+    }
+    if (!isFound) { // tuning to it tells what is wrong
+        channel.sid = service.value_or(0);
+        channel.name = stemOf(file);
+        add(channel);
+    }
+}
+
+std::optional<Channel> Channels::find(TELIX_JS_CM_HANDLE handle) const {
+    std::lock_guard<std::mutex> lock(m_mutex);
+    if (handle == 0 || handle > m_channels.size()) {
+        return std::nullopt;
+    }
+    return m_channels[handle - 1];
+}
+
+TELIX_JS_CM_HANDLE Channels::findByTriplet(uint32_t onid, uint32_t tsid, uint32_t sid) const {
+    std::lock_guard<std::mutex> lock(m_mutex);
+    for (const TELIX_JS_CM_HANDLE handle : m_list) {
+        const Channel& channel = m_channels[handle - 1];
+        const bool isStream = tsid == anyTransportStream || channel.tsid == tsid;
+        if (channel.onid == onid && isStream && channel.sid == sid) {
+            return handle;
+        }
+    }
+    return 0;
+}
+
+TELIX_JS_CM_HANDLE Channels::makeByTriplet(uint32_t onid, uint32_t tsid, uint32_t sid) {
+    if (const TELIX_JS_CM_HANDLE listed = findByTriplet(onid, tsid, sid)) {
+        return listed;
+    }
+    Channel channel;
+    channel.onid = onid;
+    channel.tsid = tsid;
+    channel.sid = sid;
+    return addUnlisted(channel);
+}
+
+TELIX_JS_CM_HANDLE Channels::makeByDescriptor(const Bytes& descriptor, uint32_t sid) {
+    {
+        std::lock_guard<std::mutex> lock(m_mutex);
+        for (const TELIX_JS_CM_HANDLE handle : m_list) {
+            const Channel& channel = m_channels[handle - 1];
+            if (!descriptor.empty() && channel.deliveryDescriptor == descriptor && channel.sid == sid) {
+                return handle;
+            }
+        }
+    }
+    Channel channel;
+    channel.deliveryDescriptor = descriptor;
+    channel.sid = sid;
+    return addUnlisted(channel);
+}
+
+TELIX_JS_CM_HANDLE Channels::addUnlisted(Channel channel) {
+    std::lock_guard<std::mutex> lock(m_mutex);
+    for (size_t index = m_list.size(); index < m_channels.size(); ++index) {
+        const Channel& each = m_channels[index];
+        if (each.onid == channel.onid && each.tsid == channel.tsid && each.sid == channel.sid &&
+            each.deliveryDescriptor == channel.deliveryDescriptor) {
+            return each.handle;
+        }
+    }
+    if (m_channels.size() - m_list.size() >= mostUnlisted) {
+        return 0;
+    }
+    add(std::move(channel));
+    return m_channels.back().handle;
+}
+
+TELIX_JS_CM_HANDLE Channels::neighbour(TELIX_JS_CM_HANDLE handle, int distance) const {
+    if (m_list.empty()) {
+        return 0;
+    }
+    const auto at = std::find(m_list.begin(), m_list.end(), handle);
+    if (at == m_list.end()) {
+        return m_list.front();
+    }
+    const auto count = static_cast<int>(m_list.size());
+    const int index = (static_cast<int>(at - m_list.begin()) + distance % count + count) % count;
+    return m_list[static_cast<size_t>(index)];
+}
+
+bool Channels::usesTestMultiplex() const {
+    return std::any_of(m_channels.begin(), m_channels.end(),
+                       [](const Channel& each) { return each.origin == Channel::Origin::testMultiplex; });
+}
+
+} // namespace desktop

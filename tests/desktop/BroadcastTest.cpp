@@ -1,0 +1,525 @@
+// Television through the calls of the plug-in: real pipelines on the test multiplex.
+#include "desktop/platform/Broadcast.h"
+#include "desktop/platform/Multiplex.h"
+#include "desktop/platform/telix_picture.h"
+#include "telix/telix_platform.h"
+
+#include <chrono>
+#include <condition_variable>
+#include <ctime>
+#include <future>
+#include <gtest/gtest.h>
+#include <set>
+#include <thread>
+
+using namespace desktop;
+using testing::Test;
+
+namespace {
+
+// What the callbacks were given.
+struct Event {
+    std::string kind;
+    TELIX_JS_VB_HANDLE object = 0;
+    int64_t first = 0;
+    int64_t second = 0;
+    std::string text;
+};
+
+std::mutex eventsMutex;
+std::condition_variable eventCame;
+std::vector<Event> events;
+std::set<std::thread::id> threads;
+
+TELIX_RETCODE_ENUM_T record(Event event) {
+    {
+        std::lock_guard<std::mutex> lock(eventsMutex);
+        events.push_back(std::move(event));
+        threads.insert(std::this_thread::get_id());
+    }
+    eventCame.notify_all();
+    return 0;
+}
+
+TELIX_RETCODE_ENUM_T onChange(TELIX_JS_VB_HANDLE object, TELIX_JS_CM_HANDLE channel) {
+    return record({"change", object, channel, 0, ""});
+}
+TELIX_RETCODE_ENUM_T onError(TELIX_JS_VB_HANDLE object, TELIX_JS_CM_HANDLE channel,
+                             TELIX_ERR_STATE_ENUM_T error) {
+    return record({"error", object, channel, error, ""});
+}
+TELIX_RETCODE_ENUM_T onState(TELIX_JS_VB_HANDLE object, uint32_t, TELIX_PLAYSTATE_ENUM_T state,
+                             TELIX_ERR_STATE_ENUM_T error) {
+    return record({"state", object, state, error, ""});
+}
+TELIX_RETCODE_ENUM_T onProgrammes(TELIX_JS_VB_HANDLE object) {
+    return record({"programmes", object, 0, 0, ""});
+}
+TELIX_RETCODE_ENUM_T onRating(TELIX_JS_VB_HANDLE object, ___UINT8*, TELIX_JS_SI_PARENTALRATING_HANDLE rating,
+                              ___UINT8*) {
+    return record({"rating", object, rating, 0, ""});
+}
+TELIX_RETCODE_ENUM_T onStreamEvent(TELIX_JS_VB_HANDLE object, ___UINT8*, ___UINT8*, ___UINT8* name,
+                                   ___UINT8* data, ___UINT32 length, ___UINT8* status) {
+    return record({"event", object, 0, 0,
+                   std::string(reinterpret_cast<char*>(name)) + "/" +
+                       std::string(reinterpret_cast<char*>(data), length) + "/" +
+                       reinterpret_cast<char*>(status)});
+}
+
+// The newest frame, copied.
+struct Shot {
+    uint64_t serial = 0;
+    uint32_t width = 0;
+    uint32_t height = 0;
+    bool visible = false;
+    std::vector<uint8_t> pixels; // without padding
+};
+
+Shot takeShot() {
+    telix_desktop_frame frame{};
+    telix_desktop_acquire_frame(&frame);
+    Shot shot{frame.serial, frame.width, frame.height, frame.visible != 0, {}};
+    for (uint32_t line = 0; frame.pixels && line < frame.height; ++line) {
+        const uint8_t* begin = frame.pixels + size_t{line} * frame.stride;
+        shot.pixels.insert(shot.pixels.end(), begin, begin + size_t{frame.width} * 4);
+    }
+    telix_desktop_release_frame(&frame);
+    return shot;
+}
+
+// The share of pixels of a part of the picture that differ clearly.
+double difference(const Shot& left, const Shot& right, double from, double to) {
+    if (left.pixels.size() != right.pixels.size() || left.pixels.empty()) {
+        return 1;
+    }
+    const auto begin = static_cast<size_t>(from * left.height) * left.width;
+    const auto end = static_cast<size_t>(to * left.height) * left.width;
+    size_t count = 0;
+    for (size_t pixel = begin; pixel < end; ++pixel) {
+        for (size_t colour = 0; colour < 3; ++colour) {
+            if (std::abs(left.pixels[pixel * 4 + colour] - right.pixels[pixel * 4 + colour]) > 40) {
+                ++count;
+                break;
+            }
+        }
+    }
+    return static_cast<double>(count) / static_cast<double>(end - begin);
+}
+
+bool waitUntil(const std::function<bool()>& isSo, int seconds = 12) {
+    const auto end = std::chrono::steady_clock::now() + std::chrono::seconds(seconds);
+    while (!isSo()) {
+        if (std::chrono::steady_clock::now() > end) {
+            return false;
+        }
+        std::this_thread::sleep_for(std::chrono::milliseconds(10));
+    }
+    return true;
+}
+
+std::string textOf(char* text) {
+    std::string copy = text ? text : "";
+    std::free(text);
+    return copy;
+}
+
+class BroadcastTest : public Test {
+protected:
+    void SetUp() override {
+        TELIX_JS_VB_RegisterOnChannelChangeSucceeded(onChange);
+        TELIX_JS_VB_RegisterOnChannelChangeError(onError);
+        TELIX_JS_VB_RegisterOnPlayStateChange(onState);
+        ASSERT_EQ(TELIX_JS_VB_GetHandle(&m_object), 0);
+        TELIX_JS_VB_RegisterOnProgrammesChanged(m_object, onProgrammes);
+        TELIX_JS_VB_RegisterOnParentalRatingChange(m_object, onRating);
+        uint32_t count = 0;
+        TELIX_JS_CM_HANDLE* handles = nullptr;
+        ASSERT_EQ(TELIX_JS_CM_GetChannelList(&count, &handles), 0);
+        m_channels.assign(handles, handles + count);
+    }
+
+    void TearDown() override {
+        TELIX_JS_VB_Release(m_object);
+        TELIX_JS_VB_UnRegisterOnChannelChangeSucceeded(onChange);
+        TELIX_JS_VB_UnRegisterOnChannelChangeError(onError);
+        TELIX_JS_VB_UnRegisterOnPlayStateChange(onState);
+        TELIX_JS_VB_UnRegisterOnProgrammesChanged(onProgrammes);
+        TELIX_JS_VB_UnRegisterOnParentalRatingChange(onRating);
+    }
+
+    static size_t countOf(const std::string& kind) {
+        std::lock_guard<std::mutex> lock(eventsMutex);
+        return static_cast<size_t>(std::count_if(events.begin(), events.end(),
+                                                 [&](const Event& each) { return each.kind == kind; }));
+    }
+
+    // Waits for the event number `index` of a kind, from 0.
+    static Event waitFor(const std::string& kind, size_t index = 0) {
+        std::unique_lock<std::mutex> lock(eventsMutex);
+        Event found;
+        const auto isThere = [&] {
+            size_t seen = 0;
+            for (const Event& each : events) {
+                if (each.kind == kind && seen++ == index) {
+                    found = each;
+                    return true;
+                }
+            }
+            return false;
+        };
+        EXPECT_TRUE(eventCame.wait_for(lock, std::chrono::seconds(12), isThere))
+            << "no " << kind << " " << index;
+        return found;
+    }
+
+    void tune(TELIX_JS_CM_HANDLE channel) {
+        const size_t before = countOf("change");
+        ASSERT_EQ(TELIX_JS_VB_SetChannel(m_object, channel, 0), 0);
+        const Event change = waitFor("change", before);
+        ASSERT_EQ(change.object, m_object);
+        ASSERT_EQ(change.first, channel);
+    }
+
+    TELIX_JS_VB_HANDLE m_object = 0;
+    std::vector<TELIX_JS_CM_HANDLE> m_channels;
+};
+
+TEST_F(BroadcastTest, ShowsADifferentMovingPictureOnEachOfItsChannels) {
+    ASSERT_EQ(m_channels.size(), 3U);
+    std::vector<Shot> shots;
+    for (const TELIX_JS_CM_HANDLE channel : m_channels) {
+        const auto begin = std::chrono::steady_clock::now();
+        tune(channel);
+        RecordProperty("milliseconds", static_cast<int>(std::chrono::duration_cast<std::chrono::milliseconds>(
+                                                            std::chrono::steady_clock::now() - begin)
+                                                            .count()));
+        const Shot first = takeShot();
+        ASSERT_TRUE(first.visible);
+        EXPECT_EQ(first.width, 720U);
+        EXPECT_EQ(first.height, 576U);
+        EXPECT_TRUE(waitUntil([&] { return takeShot().serial >= first.serial + 20; }))
+            << "the picture stands still";
+        const Shot later = takeShot();
+        EXPECT_NE(first.pixels, later.pixels);
+        shots.push_back(later);
+    }
+    EXPECT_GT(difference(shots[0], shots[1], 0, 1), 0.2);
+    EXPECT_GT(difference(shots[1], shots[2], 0, 1), 0.2);
+    EXPECT_GT(difference(shots[0], shots[2], 0, 1), 0.2);
+    std::lock_guard<std::mutex> lock(eventsMutex);
+    EXPECT_EQ(threads.size(), 1U);
+    EXPECT_EQ(threads.count(std::this_thread::get_id()), 0U);
+}
+
+TEST_F(BroadcastTest, ListsItsChannelsWithIdsNamesAndDescriptor) {
+    ASSERT_EQ(m_channels.size(), testServices().size());
+    for (size_t index = 0; index < m_channels.size(); ++index) {
+        int32_t type = -1;
+        uint32_t onid = 0;
+        uint32_t tsid = 0;
+        uint32_t sid = 0;
+        char* name = nullptr;
+        char* descriptor = nullptr;
+        EXPECT_EQ(TELIX_JS_CM_GetChannelType(m_channels[index], &type), 0);
+        EXPECT_EQ(TELIX_JS_CM_GetOnid(m_channels[index], &onid), 0);
+        EXPECT_EQ(TELIX_JS_CM_GetTsid(m_channels[index], &tsid), 0);
+        EXPECT_EQ(TELIX_JS_CM_GetSid(m_channels[index], &sid), 0);
+        EXPECT_EQ(TELIX_JS_CM_GetName(m_channels[index], &name), 0);
+        EXPECT_EQ(TELIX_JS_CM_GetDsd(m_channels[index], &descriptor), 0);
+        EXPECT_EQ(type, 0);
+        EXPECT_EQ(onid, testOriginalNetworkId);
+        EXPECT_EQ(tsid, testTransportStreamId);
+        EXPECT_EQ(sid, testServices()[index].serviceId);
+        EXPECT_EQ(textOf(name), testServices()[index].name);
+        EXPECT_EQ(textOf(descriptor).substr(0, 2), "\x43\x0B");
+        TELIX_JS_CM_HANDLE found = 0;
+        EXPECT_EQ(TELIX_JS_CM_GetChannelByTriplet(onid, anyTransportStream, sid, &found), 0);
+        EXPECT_EQ(found, m_channels[index]);
+        const Bytes& bytes = testDeliveryDescriptor();
+        EXPECT_EQ(TELIX_JS_VB_CreateChannelObjectByDsd(m_object, 10, bytes.data(),
+                                                       static_cast<uint32_t>(bytes.size()), sid, &found),
+                  0);
+        EXPECT_EQ(found, m_channels[index]);
+    }
+}
+
+TEST_F(BroadcastTest, StepsRoundTheEndsOfTheLineUp) {
+    tune(m_channels.back());
+    TELIX_JS_CM_HANDLE selected = 0;
+    ASSERT_EQ(TELIX_JS_VB_NextChannel(m_object, &selected), 0);
+    EXPECT_EQ(selected, m_channels.back()); // as it was before
+    EXPECT_EQ(waitFor("change", 1).first, m_channels.front());
+    ASSERT_EQ(TELIX_JS_VB_PrevChannel(m_object, &selected), 0);
+    EXPECT_EQ(selected, m_channels.front());
+    EXPECT_EQ(waitFor("change", 2).first, m_channels.back());
+}
+
+TEST_F(BroadcastTest, GoesFromConnectingToPresentingAndStopped) {
+    ASSERT_EQ(TELIX_JS_VB_BindToCurrChannel(m_object), 0);
+    EXPECT_EQ(waitFor("change").first, m_channels.front());
+    EXPECT_EQ(waitFor("state", 0).first, TELIX_PLAYSTATE_CONNECTING);
+    EXPECT_EQ(waitFor("state", 1).first, TELIX_PLAYSTATE_PRESENTING);
+    EXPECT_EQ(waitFor("state", 1).second, TELIX_ERR_STATE_NONE);
+    EXPECT_TRUE(takeShot().visible);
+    ASSERT_EQ(TELIX_JS_VB_Stop(m_object), 0);
+    EXPECT_EQ(waitFor("state", 2).first, TELIX_PLAYSTATE_STOPPED);
+    EXPECT_TRUE(waitUntil([] { return !takeShot().visible; }));
+    TELIX_JS_CM_HANDLE channel = 0;
+    EXPECT_EQ(TELIX_JS_VB_GetCurrentChannel(m_object, &channel), 0);
+    EXPECT_EQ(channel, m_channels.front());
+    ASSERT_EQ(TELIX_JS_VB_Release(m_object), 0);
+    EXPECT_NE(TELIX_JS_VB_GetCurrentChannel(m_object, &channel), 0);
+    tune(m_channels[1]); // a released object is good for another tune
+}
+
+TEST_F(BroadcastTest, TellsThatAChannelIsUnknown) {
+    ASSERT_EQ(TELIX_JS_VB_SetChannelByTriplet(m_object, testOriginalNetworkId, testTransportStreamId, 999),
+              0);
+    const Event error = waitFor("error");
+    EXPECT_EQ(error.object, m_object);
+    EXPECT_EQ(error.second, errorUnknownChannel);
+    uint32_t sid = 0;
+    EXPECT_EQ(TELIX_JS_CM_GetSid(static_cast<TELIX_JS_CM_HANDLE>(error.first), &sid), 0);
+    EXPECT_EQ(sid, 999U);
+}
+
+TEST_F(BroadcastTest, NamesThePresentAndTheFollowingProgrammeAndTellsWhenTheyChange) {
+    const Configuration& configuration = Platform::instance().configuration();
+    tune(m_channels[0]);
+    for (int change = 0; change < 2; ++change) {
+        uint32_t count = 0;
+        TELIX_JS_SI_HANDLE* handles = nullptr;
+        ASSERT_TRUE(
+            waitUntil([&] { return TELIX_JS_SI_GetProgrammeHandles(&count, &handles) == 0 && count == 2; }));
+        const std::vector<TELIX_JS_SI_HANDLE> programmes(handles, handles + count);
+        uint32_t firstStart = 0;
+        uint32_t secondStart = 0;
+        EXPECT_EQ(TELIX_JS_SI_GetStartTime(programmes[0], &firstStart), 0);
+        EXPECT_EQ(TELIX_JS_SI_GetStartTime(programmes[1], &secondStart), 0);
+        EXPECT_LE(std::abs(static_cast<int64_t>(firstStart) - std::time(nullptr)),
+                  configuration.programmeSeconds + 2);
+        if (secondStart != firstStart + configuration.programmeSeconds) {
+            --change; // between the two sections of a change
+            continue;
+        }
+        const EitEvent sent = testProgramme(testServices()[0], firstStart, configuration.programmeSeconds, 0);
+        char* name = nullptr;
+        ___UINT8 length = 0;
+        ASSERT_EQ(TELIX_JS_SI_GetName(programmes[0], &name, &length), 0);
+        EXPECT_EQ(std::string(name, length), sent.name);
+        std::free(name);
+        uint32_t duration = 0;
+        EXPECT_EQ(TELIX_JS_SI_GetDuration(programmes[0], &duration), 0);
+        EXPECT_EQ(duration, configuration.programmeSeconds);
+        char* channelId = nullptr;
+        EXPECT_EQ(TELIX_JS_SI_GetChannelID(programmes[0], &channelId), 0);
+        EXPECT_EQ(textOf(channelId), std::to_string(m_channels[0]));
+        uint32_t ratingCount = 0;
+        TELIX_JS_SI_PARENTALRATING_HANDLE* ratings = nullptr;
+        ASSERT_EQ(TELIX_JS_SI_GetParentalRatingHandles(programmes[0], &ratingCount, &ratings), 0);
+        ASSERT_EQ(ratingCount, sent.ratings.size());
+        if (ratingCount == 1) {
+            int32_t value = 0;
+            EXPECT_EQ(TELIX_JS_SI_PARENTALRATING_GetValue(ratings[0], &value), 0);
+            EXPECT_EQ(value, sent.ratings[0].value + 3);
+        }
+        EXPECT_TRUE(waitUntil([&] {
+            return TELIX_JS_SI_GetProgrammeHandles(&count, &handles) == 0 && count == 2 &&
+                   handles[0] != programmes[0];
+        }));
+    }
+    EXPECT_GE(countOf("programmes"), 3U);
+    EXPECT_TRUE(waitUntil([] { return countOf("rating") >= 1; }));
+}
+
+TEST_F(BroadcastTest, LetsTheAudioBeHeardThatIsSelected) {
+    tune(m_channels[0]);
+    TELIX_JS_AVCOMPHANDLE* handles = nullptr;
+    uint32_t count = 0;
+    ASSERT_EQ(TELIX_JS_VB_GetComponents(m_object, TELIX_JS_AVCOMPTYPE_AUDIO, &handles, &count), 0);
+    ASSERT_EQ(count, 2U);
+    const std::vector<TELIX_JS_AVCOMPHANDLE> audio(handles, handles + count);
+    const auto heard = [] {
+        std::promise<std::optional<uint16_t>> result;
+        Platform::instance().post([&] { result.set_value(Broadcast::instance().heardAudio()); });
+        return result.get_future().get();
+    };
+    const auto languageOf = [](TELIX_JS_AVCOMPHANDLE component) {
+        char* language = nullptr;
+        TELIX_JS_VB_AVComponent_GetLanguage(component, TELIX_JS_AVCOMPTYPE_AUDIO, &language);
+        return textOf(language);
+    };
+    EXPECT_EQ(languageOf(audio[0]), "deu");
+    EXPECT_EQ(languageOf(audio[1]), "eng");
+    const uint16_t german = testServices()[0].streams[1].pid;
+    const uint16_t english = testServices()[0].streams[2].pid;
+    EXPECT_TRUE(waitUntil([&] { return heard() == german; }));
+    ASSERT_EQ(TELIX_JS_VB_SelectComponent(m_object, audio[1], TELIX_JS_AVCOMPTYPE_AUDIO), 0);
+    EXPECT_TRUE(waitUntil([&] { return heard() == english; }));
+    ASSERT_EQ(TELIX_JS_VB_GetCurrActiveComponents(m_object, TELIX_JS_AVCOMPTYPE_AUDIO, &handles, &count), 0);
+    ASSERT_EQ(count, 1U);
+    EXPECT_EQ(handles[0], audio[1]);
+    ASSERT_EQ(TELIX_JS_VB_UnselectComponent(m_object, audio[1], TELIX_JS_AVCOMPTYPE_AUDIO), 0);
+    EXPECT_TRUE(waitUntil([&] { return !heard(); }));
+    uint32_t channels = 0;
+    EXPECT_TRUE(waitUntil([&] {
+        return TELIX_JS_VB_AVComponent_GetAudioChannels(audio[0], TELIX_JS_AVCOMPTYPE_AUDIO, &channels) == 0;
+    }));
+    EXPECT_EQ(channels, 1U);
+}
+
+TEST_F(BroadcastTest, DescribesItsVideo) {
+    tune(m_channels[0]);
+    TELIX_JS_AVCOMPHANDLE* handles = nullptr;
+    uint32_t count = 0;
+    ASSERT_EQ(TELIX_JS_VB_GetComponents(m_object, TELIX_JS_AVCOMPTYPE_VIDEO, &handles, &count), 0);
+    ASSERT_EQ(count, 1U);
+    float aspectRatio = 0;
+    EXPECT_EQ(TELIX_JS_VB_AVComponent_GetAspectRatio(handles[0], TELIX_JS_AVCOMPTYPE_VIDEO, &aspectRatio), 0);
+    EXPECT_NEAR(aspectRatio, 16.0 / 9.0, 0.01);
+    char* encoding = nullptr;
+    EXPECT_EQ(TELIX_JS_VB_AVComponent_GetEncoding(handles[0], TELIX_JS_AVCOMPTYPE_VIDEO, &encoding), 0);
+    EXPECT_EQ(textOf(encoding), "MPEG2");
+}
+
+TEST_F(BroadcastTest, ShowsSubtitlesOnlyWhileTheyAreSelected) {
+    tune(m_channels[2]); // its picture has nothing white below
+    const auto whitePixels = [] {
+        const Shot shot = takeShot();
+        size_t count = 0;
+        for (size_t at = shot.pixels.size() / 4 * 3 / 4 * 4; at + 4 <= shot.pixels.size(); at += 4) {
+            count += shot.pixels[at] > 200 && shot.pixels[at + 1] > 200 && shot.pixels[at + 2] > 200 ? 1 : 0;
+        }
+        return count;
+    };
+    TELIX_JS_AVCOMPHANDLE* handles = nullptr;
+    uint32_t count = 0;
+    ASSERT_EQ(TELIX_JS_VB_GetComponents(m_object, TELIX_JS_AVCOMPTYPE_SUBTITLE, &handles, &count), 0);
+    ASSERT_EQ(count, 2U);
+    const TELIX_JS_AVCOMPHANDLE german = handles[0];
+    EXPECT_EQ(whitePixels(), 0U);
+    ASSERT_EQ(TELIX_JS_VB_SelectComponent(m_object, german, TELIX_JS_AVCOMPTYPE_SUBTITLE), 0);
+    EXPECT_TRUE(waitUntil([&] { return whitePixels() > 200; }));
+    ASSERT_EQ(TELIX_JS_VB_UnselectComponent(m_object, german, TELIX_JS_AVCOMPTYPE_SUBTITLE), 0);
+    EXPECT_TRUE(waitUntil([&] { return whitePixels() == 0; }, 2));
+}
+
+TEST_F(BroadcastTest, HandsStreamEventsOfTheMultiplexToWhoeverWatchesThem) {
+    tune(m_channels[0]);
+    TELIX_JS_VB_RegisterStreamEvent(m_object, onStreamEvent, "1", "1f", "red");
+    TELIX_JS_VB_RegisterStreamEvent(m_object, onStreamEvent, "2", "1f", "of another id");
+    TELIX_JS_VB_RegisterStreamEvent(m_object, onStreamEvent, "1", "20", "of another component");
+    std::string digits;
+    for (const char letter : std::string("Red button on Telix One")) {
+        char pair[3];
+        std::snprintf(pair, sizeof(pair), "%02x", static_cast<unsigned int>(letter));
+        digits += pair;
+    }
+    EXPECT_EQ(waitFor("event", 0).text, "red/" + digits + "/trigger");
+    waitFor("event", 1);
+    TELIX_JS_VB_UnRegisterStreamEvent(m_object, onStreamEvent, "1", "1f", "a name that differs");
+    const size_t before = countOf("event");
+    std::this_thread::sleep_for(std::chrono::milliseconds(2500)); // two more are sent
+    EXPECT_EQ(countOf("event"), before);
+}
+
+TEST_F(BroadcastTest, PlacesThePictureWhereThePageWantsIt) {
+    const TELIX_JS_DISPLAY_AREA area{100, 50, 640, 360};
+    ASSERT_EQ(TELIX_JS_VB_SetDisplayArea(m_object, &area), 0);
+    tune(m_channels[0]);
+    telix_desktop_frame frame{};
+    telix_desktop_acquire_frame(&frame);
+    EXPECT_EQ(frame.areaX, 100);
+    EXPECT_EQ(frame.areaY, 50);
+    EXPECT_EQ(frame.areaWidth, 640U);
+    EXPECT_EQ(frame.areaHeight, 360U);
+    EXPECT_EQ(frame.fullScreen, 0);
+    EXPECT_EQ(frame.aspectWidth, 16U);
+    EXPECT_EQ(frame.aspectHeight, 9U);
+    telix_desktop_release_frame(&frame);
+    ASSERT_EQ(TELIX_JS_VB_SetFullScreen(m_object, 1), 0);
+    ___UINT8 isFull = 0;
+    ASSERT_EQ(TELIX_JS_VB_IsFullScreen(m_object, &isFull), 0);
+    EXPECT_EQ(isFull, 1);
+    telix_desktop_acquire_frame(&frame);
+    EXPECT_EQ(frame.fullScreen, 1);
+    telix_desktop_release_frame(&frame);
+    int32_t width = 0;
+    EXPECT_EQ(TELIX_JS_VB_SetWidth(m_object, 320), 0);
+    EXPECT_EQ(TELIX_JS_VB_GetWidth(m_object, &width), 0);
+    EXPECT_EQ(width, 320);
+}
+
+TEST_F(BroadcastTest, RefusesHandlesThatItNeverGave) {
+    for (const uint32_t nonsense : {0U, 4711U, 0xFFFFFFFFU}) {
+        uint32_t number = 0;
+        int32_t value = 0;
+        float ratio = 0;
+        ___UINT8 flag = 0;
+        char* text = nullptr;
+        uint32_t* array = nullptr;
+        const TELIX_JS_DISPLAY_AREA area{};
+        EXPECT_NE(TELIX_JS_CM_GetChannelType(nonsense, &value), 0);
+        EXPECT_NE(TELIX_JS_CM_GetSid(nonsense, &number), 0);
+        EXPECT_NE(TELIX_JS_CM_GetName(nonsense, &text), 0);
+        EXPECT_NE(TELIX_JS_CM_GetDsd(nonsense, &text), 0);
+        EXPECT_NE(TELIX_JS_SI_SetName(nonsense, "x"), 0);
+        EXPECT_NE(TELIX_JS_SI_GetName(nonsense, &text, &flag), 0);
+        EXPECT_NE(TELIX_JS_SI_GetParentalRatingHandles(nonsense, &number, &array), 0);
+        EXPECT_NE(TELIX_JS_SI_PARENTALRATING_GetValue(nonsense, &value), 0);
+        EXPECT_NE(TELIX_JS_VB_Release(nonsense), 0);
+        EXPECT_NE(TELIX_JS_VB_Stop(nonsense), 0);
+        EXPECT_NE(TELIX_JS_VB_BindToCurrChannel(nonsense), 0);
+        EXPECT_NE(TELIX_JS_VB_SetChannel(nonsense, m_channels[0], 0), 0);
+        EXPECT_NE(TELIX_JS_VB_SetChannel(nonsense, 0, 0), 0);
+        EXPECT_NE(TELIX_JS_VB_NextChannel(nonsense, &number), 0);
+        EXPECT_NE(TELIX_JS_VB_PrevChannel(nonsense, &number), 0);
+        EXPECT_NE(TELIX_JS_VB_GetCurrentChannel(nonsense, &number), 0);
+        EXPECT_NE(TELIX_JS_VB_SetChannelByTriplet(nonsense, 1, 2, 3), 0);
+        EXPECT_NE(TELIX_JS_VB_CreateChannelObjectByTriplet(nonsense, 0, 1, 2, 3, &number), 0);
+        EXPECT_NE(TELIX_JS_VB_SetFullScreen(nonsense, 1), 0);
+        EXPECT_NE(TELIX_JS_VB_IsFullScreen(nonsense, &flag), 0);
+        EXPECT_NE(TELIX_JS_VB_SetWidth(nonsense, 1), 0);
+        EXPECT_NE(TELIX_JS_VB_GetHeight(nonsense, &value), 0);
+        EXPECT_NE(TELIX_JS_VB_GetPlayBackState(nonsense, &value), 0);
+        EXPECT_NE(TELIX_JS_VB_SetDisplayArea(nonsense, &area), 0);
+        EXPECT_NE(TELIX_JS_VB_GetComponents(nonsense, 0, &array, &number), 0);
+        EXPECT_NE(TELIX_JS_VB_SelectComponent(nonsense, nonsense, nonsense), 0);
+        EXPECT_NE(TELIX_JS_VB_RegisterStreamEvent(nonsense, onStreamEvent, "1", "1f", ""), 0);
+        EXPECT_NE(TELIX_JS_VB_UnRegisterStreamEvent(nonsense, onStreamEvent, "1", "1f", ""), 0);
+        EXPECT_NE(TELIX_JS_VB_AVComponent_GetAspectRatio(nonsense, nonsense, &ratio), 0);
+        EXPECT_NE(TELIX_JS_VB_AVComponent_GetLanguage(nonsense, 1, &text), 0);
+        EXPECT_EQ(text, nullptr);
+        EXPECT_EQ(array, nullptr);
+    }
+    EXPECT_NE(TELIX_JS_VB_SetChannel(m_object, 4711, 0), 0);
+    EXPECT_NE(TELIX_JS_VB_SelectComponent(m_object, 4711, 77), 0);
+}
+
+TEST_F(BroadcastTest, AnswersFiftyQuickTunesAndShowsTheLast) {
+    constexpr size_t tunes = 50;
+    for (size_t index = 0; index < tunes; ++index) {
+        ASSERT_EQ(TELIX_JS_VB_SetChannel(m_object, m_channels[index % m_channels.size()], 0), 0);
+        if (index % 10 == 0) {
+            std::this_thread::sleep_for(std::chrono::milliseconds(100)); // some get as far as a pipeline
+        }
+    }
+    EXPECT_TRUE(waitUntil([&] { return countOf("change") + countOf("error") == tunes; }, 20));
+    {
+        std::lock_guard<std::mutex> lock(eventsMutex);
+        std::vector<int64_t> changes;
+        for (const Event& each : events) {
+            if (each.kind == "change") {
+                changes.push_back(each.first);
+            } else if (each.kind == "error") {
+                EXPECT_EQ(each.second, errorInterrupted);
+            }
+        }
+        ASSERT_FALSE(changes.empty());
+        EXPECT_EQ(changes.back(), m_channels[(tunes - 1) % m_channels.size()]);
+    }
+    EXPECT_TRUE(takeShot().visible);
+}
+
+} // namespace

@@ -1,0 +1,30 @@
+// Making of the test multiplex.
+#include "desktop/platform/Multiplex.h"
+#include "desktop/platform/Platform.h"
+#include "desktop/platform/Sections.h"
+
+#include <fstream>
+#include <gtest/gtest.h>
+
+using namespace desktop;
+
+TEST(MultiplexTest, CarriesEveryStreamOfEveryService) {
+    Platform::instance();
+    std::string error;
+    const std::string file = makeTestMultiplex(error);
+    ASSERT_NE(file, "") << error;
+    std::ifstream stream(file, std::ios::binary);
+    std::set<uint16_t> pids;
+    uint8_t packet[packetSize];
+    while (stream.read(reinterpret_cast<char*>(packet), packetSize)) {
+        ASSERT_EQ(packet[0], packetStart);
+        pids.insert(pidOf(packet));
+    }
+    for (const TestService& service : testServices()) {
+        for (const ElementaryStream& each : service.streams) {
+            if (each.type != streamTypeStreamEvents) { // sent with the tables
+                EXPECT_EQ(pids.count(each.pid), 1U) << service.name << " PID " << each.pid;
+            }
+        }
+    }
+}
