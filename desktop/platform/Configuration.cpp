@@ -178,7 +178,7 @@ std::optional<Configuration::Error> Configuration::load(const std::string& file,
         {"parental",
          {{"threshold",
            [&](const std::string& value) {
-               const std::string wrong = numberReader(threshold, 0, 18)(value);
+               std::string wrong = numberReader(threshold, 0, 18)(value);
                read.ratingThreshold = static_cast<int32_t>(threshold);
                return wrong;
            }}}},
