@@ -1,6 +1,7 @@
 """Media objects, fed by a server of the test's own and observed at a platform that records."""
 
 import http.server
+import json
 import os
 import re
 import socket
@@ -167,6 +168,29 @@ class Pages(Served):
             calls = self.run_page(f'mediamissing.html?{nobody.getsockname()[1]}')
         self.assertEqual(self.plays(calls), [])
         self.assertIn('missing.mp4', self.server.asked)
+
+    def test_a_page_that_has_just_changed_ends_well(self):
+        changed = 'document.body.insertBefore(document.createElement("p"), document.body.firstChild).innerText = "x"'
+        page = f'{self.server.address}/tests/browser/pages/mediatypes.html'
+        for expression, title in ((changed, '"x"'),
+                                  (f'{changed}; location.href = "second.html"', '"second.html"'),
+                                  (f'{changed}; document.body.innerHTML = ""', '""')):
+            with self.subTest(expression):
+                run = self.television.run('--plugin', os.environ['TELIX_PLUGIN'], '--wait-for', 'window.testResult',
+                                          '--eval', f'eval({json.dumps(expression)})', page)
+                self.assertEqual(run.status, 0, run)
+                self.assertEqual(run.output.splitlines()[-1], title)
+
+    def test_another_page_takes_the_place_of_one_that_has_just_changed(self):
+        run = self.television.run(
+            '--plugin', os.environ['TELIX_PLUGIN'], '--wait-for',
+            # Again and again until the other page is there: each time the layout is out of date.
+            '(function () { if (!window.testResult) { return document.title === "second"; } '
+            'if (!window.gone) { window.gone = true; location.href = "second.html"; } '
+            'document.body.insertBefore(document.createElement("p"), document.body.firstChild).innerText = "x"; }())',
+            '--eval', 'document.title', f'{self.server.address}/tests/browser/pages/mediatypes.html')
+        self.assertEqual(run.status, 0, run)
+        self.assertEqual(sum(call.startswith('DestroyPlayer') for call in self.calls(run)), 10)
 
     def test_states_and_events_come_in_order(self):
         calls = self.run_page('mediaevents.html')
