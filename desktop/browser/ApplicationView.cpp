@@ -60,6 +60,10 @@ ApplicationView::~ApplicationView() {
     QImage nowhere(1, 1, QImage::Format_ARGB32_Premultiplied);
     QPainter painter(&nowhere);
     m_page->mainFrame()->render(&painter, QRegion(nowhere.rect()));
+    painter.end();
+    // What the layout has left to a later turn; without it the engine forgets plug-ins that have moved, and
+    // they never end.
+    QCoreApplication::sendPostedEvents();
 }
 
 void ApplicationView::onLoadFinished(bool ok) {

@@ -180,6 +180,7 @@ class Pages(Served):
                                           '--eval', f'eval({json.dumps(expression)})', page)
                 self.assertEqual(run.status, 0, run)
                 self.assertEqual(run.output.splitlines()[-1], title)
+                self.assertEqual(sum(call.startswith('DestroyPlayer') for call in self.calls(run)), 10)
 
     def test_another_page_takes_the_place_of_one_that_has_just_changed(self):
         run = self.television.run(
