@@ -6,7 +6,9 @@
 #include "desktop/browser/RemoteControl.h"
 
 #include <QCoreApplication>
+#include <QImage>
 #include <QKeyEvent>
+#include <QPainter>
 #include <QPalette>
 #include <QWebFrame>
 
@@ -49,6 +51,19 @@ ApplicationView::ApplicationView(QWidget* parent) : QWebView(parent), m_page(new
         setContextMenuPolicy(Qt::NoContextMenu);
     connect(m_page, &QWebPage::loadStarted, this, [this] { m_loaded = false; });
     connect(m_page, &QWebPage::loadFinished, this, &ApplicationView::onLoadFinished);
+}
+
+ApplicationView::~ApplicationView() {
+    // Plug-ins are told that their windows shrink while the page is taken apart, and they ask it then where
+    // they stand. If the page has changed since it was last painted, the engine would lay out what is half
+    // gone, and crash. Painting brings the layout of all frames up to date.
+    QImage nowhere(1, 1, QImage::Format_ARGB32_Premultiplied);
+    QPainter painter(&nowhere);
+    m_page->mainFrame()->render(&painter, QRegion(nowhere.rect()));
+    painter.end();
+    // What the layout has left to a later turn; without it the engine forgets plug-ins that have moved, and
+    // they never end.
+    QCoreApplication::sendPostedEvents();
 }
 
 void ApplicationView::onLoadFinished(bool ok) {

@@ -12,6 +12,7 @@ class ApplicationView : public QWebView {
 
 public:
     explicit ApplicationView(QWidget* parent);
+    ~ApplicationView() override;
 
     ApplicationPage& applicationPage() const { return *m_page; }
     // Whether a document is loaded and no other on its way.

@@ -1,6 +1,7 @@
 """Media objects, fed by a server of the test's own and observed at a platform that records."""
 
 import http.server
+import json
 import os
 import re
 import socket
@@ -9,7 +10,7 @@ import time
 import unittest
 import urllib.parse
 
-from television import Television
+from television import Picture, Television
 
 ROOT = os.path.abspath(__file__).rsplit('/tests/', 1)[0]
 TYPES = {'.html': 'text/html; charset=utf-8', '.js': 'text/javascript', '.css': 'text/css', '.mp4': 'video/mp4',
@@ -17,6 +18,11 @@ TYPES = {'.html': 'text/html; charset=utf-8', '.js': 'text/javascript', '.css': 
 # Seconds that a page may take in all its tests, and a stream without an end until somebody drops it.
 PAGE_LIMIT = 100
 STREAM_LIMIT = 60
+# A page that is drawn has many colours, for its letters are smoothed; an empty one has a single one.
+COLOURS_OF_A_PAGE = 50
+# Lines of the media page: its log, the latest first, and what it says on the media.
+LOG, PANEL = (f'Array.prototype.map.call(document.querySelectorAll("#{part} > *"), '
+              'function (line) { return line.textContent; })' for part in ('log', 'panel'))
 
 PLAYLIST = '''<ASX version="3.0">
 <Title>Four clips</Title>
@@ -94,7 +100,7 @@ class Server(http.server.ThreadingHTTPServer):
         """A browser that goes away in the middle of an answer is nothing special."""
 
 
-class Media(unittest.TestCase):
+class Served(unittest.TestCase):
     @classmethod
     def setUpClass(cls):
         cls.television = Television(os.environ['TELIX_TV'])
@@ -105,17 +111,8 @@ class Media(unittest.TestCase):
         self.addCleanup(self.server.server_close)
         self.addCleanup(self.server.shutdown)
 
-    def run_page(self, page):
-        """Runs a page of tests; gives the calls that the platform got, without the address of the server."""
-        run = self.television.run('--plugin', os.environ['TELIX_PLUGIN'], '--timeout', PAGE_LIMIT,
-                                  '--wait-for', 'window.testResult', '--eval', 'window.testResult',
-                                  f'{self.server.address}/tests/browser/pages/{page}')
-        self.assertEqual(run.status, 0, run)
-        self.assertEqual(run.value['failed'], [], run)
-        self.assertGreater(run.value['passed'], 0, run)
-        return self.calls(run)
-
     def calls(self, run):
+        """The calls that the platform got, without the address of the server."""
         return [line[len('call TELIX_JS_AV_'):].replace(self.server.address, '') for line in run.errors.splitlines()
                 if line.startswith('call TELIX_JS_AV_')]
 
@@ -124,6 +121,18 @@ class Media(unittest.TestCase):
         """What was played: name and codes of source, container and audio."""
         matches = (re.fullmatch(r'Play\(\d+, ".*/([^/"]*)", 1, (\d+), (\d+), (\d+), 0, 0\)', call) for call in calls)
         return [(match[1], *map(int, match.groups()[1:])) for match in matches if match]
+
+
+class Pages(Served):
+    def run_page(self, page):
+        """Runs a page of tests; gives the calls that the platform got."""
+        run = self.television.run('--plugin', os.environ['TELIX_PLUGIN'], '--timeout', PAGE_LIMIT,
+                                  '--wait-for', 'window.testResult', '--eval', 'window.testResult',
+                                  f'{self.server.address}/tests/browser/pages/{page}')
+        self.assertEqual(run.status, 0, run)
+        self.assertEqual(run.value['failed'], [], run)
+        self.assertGreater(run.value['passed'], 0, run)
+        return self.calls(run)
 
     def test_each_type_makes_a_player_with_its_codes(self):
         calls = self.run_page('mediatypes.html')
@@ -160,6 +169,30 @@ class Media(unittest.TestCase):
         self.assertEqual(self.plays(calls), [])
         self.assertIn('missing.mp4', self.server.asked)
 
+    def test_a_page_that_has_just_changed_ends_well(self):
+        changed = 'document.body.insertBefore(document.createElement("p"), document.body.firstChild).innerText = "x"'
+        page = f'{self.server.address}/tests/browser/pages/mediatypes.html'
+        for expression, title in ((changed, '"x"'),
+                                  (f'{changed}; location.href = "second.html"', '"second.html"'),
+                                  (f'{changed}; document.body.innerHTML = ""', '""')):
+            with self.subTest(expression):
+                run = self.television.run('--plugin', os.environ['TELIX_PLUGIN'], '--wait-for', 'window.testResult',
+                                          '--eval', f'eval({json.dumps(expression)})', page)
+                self.assertEqual(run.status, 0, run)
+                self.assertEqual(run.output.splitlines()[-1], title)
+                self.assertEqual(sum(call.startswith('DestroyPlayer') for call in self.calls(run)), 10)
+
+    def test_another_page_takes_the_place_of_one_that_has_just_changed(self):
+        run = self.television.run(
+            '--plugin', os.environ['TELIX_PLUGIN'], '--wait-for',
+            # Again and again until the other page is there: each time the layout is out of date.
+            '(function () { if (!window.testResult) { return document.title === "second"; } '
+            'if (!window.gone) { window.gone = true; location.href = "second.html"; } '
+            'document.body.insertBefore(document.createElement("p"), document.body.firstChild).innerText = "x"; }())',
+            '--eval', 'document.title', f'{self.server.address}/tests/browser/pages/mediatypes.html')
+        self.assertEqual(run.status, 0, run)
+        self.assertEqual(sum(call.startswith('DestroyPlayer') for call in self.calls(run)), 10)
+
     def test_states_and_events_come_in_order(self):
         calls = self.run_page('mediaevents.html')
         asked = [re.sub(r'\((\d+, ".*/(\w+\.mp4)|\d+).*', r' \2', call) for call in calls
@@ -167,6 +200,97 @@ class Media(unittest.TestCase):
         self.assertEqual([words.strip() for words in asked], [
             'Play clip.mp4', 'Pause', 'Resume', 'Pause', 'Resume', 'Seek',
             'Play clip.mp4', 'Play absent.mp4', 'Play clip.mp4', 'Play clip.mp4'])
+
+
+class Application(Served):
+    """The media page of the applications, driven by the remote control."""
+
+    def run_application(self, *arguments, media=('one.mp4', 'two%20clips.mp4', 'absent.mp4'), plugin='TELIX_PLUGIN'):
+        query = '&'.join(f'media={self.server.address}/media/{name}' for name in media)
+        run = self.television.run('--plugin', os.environ[plugin], *arguments,
+                                  f'{self.server.address}/apps/media/index.html?{query}')
+        self.assertEqual(run.status, 0, run)
+        # Messages of its scripts carry the name of the file.
+        self.assertNotIn('/apps/', run.errors.replace('/apps/media/index.html', ''), run)
+        return run
+
+    def after(self, keys, condition, result):
+        """Presses keys, waits for a state of the page and gives the value of an expression."""
+        return self.run_application('--keys', keys, '--wait-for', condition, '--eval', result).value
+
+    def test_it_names_its_media(self):
+        run = self.run_application('--eval', 'document.getElementById("menu").innerText')
+        self.assertEqual(run.value.split(), ['one.mp4', 'two', 'clips.mp4', 'absent.mp4'])
+
+    def test_ok_plays_what_has_the_focus(self):
+        run = self.run_application('--keys', 'down,ok', '--wait-for', 'video.playState === 1 && video.playPosition > 0',
+                                   '--eval', LOG)
+        self.assertEqual(run.value, ['state: playing', 'play(1) gives true', 'state: buffering', 'state: connecting'])
+        self.assertEqual([name for name, *_ in self.plays(self.calls(run))], ['two%20clips.mp4'])
+
+    def test_pause_play_and_stop(self):
+        self.assertEqual(self.after('play,pause', 'video.playState === 2', PANEL)[0], 'paused')
+        self.assertEqual(self.after('play,pause,play', 'video.playState === 1', LOG)[:3],
+                         ['play(1) gives false', 'state: playing', 'play(0) gives true'])
+        self.assertEqual(self.after('play,stop', 'video.playState === 0', PANEL)[0], 'stopped')
+
+    def test_the_arrows_seek(self):
+        calls = self.calls(self.run_application(
+            '--keys', 'play,right,right,left', '--wait-for', 'video.playState === 1', '--eval', '1'))
+        targets = [int(re.search(r', (\d+)\)', call)[1]) for call in calls if call.startswith('Seek')]
+        self.assertEqual([round(target, -4) for target in targets], [10000, 20000, 10000])
+
+    def test_the_bar_shows_the_position(self):
+        width = self.after('play,right,right,right',
+                           'video.playState === 1 && parseFloat(document.getElementById("played").style.width) >= 50',
+                           'document.getElementById("bar").clientWidth / document.getElementById("played").clientWidth')
+        self.assertLessEqual(width, 2)
+        self.assertGreater(width, 1.2)
+
+    def test_rewind_and_fast_forward_change_the_speed(self):
+        for keys, speed in (('fast-forward', 2), ('fast-forward,fast-forward', 4), ('rewind', -2),
+                            ('fast-forward,rewind', 1)):
+            with self.subTest(keys):
+                self.assertEqual(self.after(f'play,{keys}', 'video.playState === 1', PANEL)[2], f'Speed {speed}')
+
+    def test_an_error_is_told(self):
+        self.assertEqual(self.after('up,ok', 'video.playState === 6', PANEL)[0], 'error: not available')
+
+    def screenshot(self, name, *arguments):
+        file_name = os.path.join(os.environ['TELIX_SCREENSHOTS'], f'media-{name}.png')
+        self.run_application('--screenshot', file_name, *arguments)
+        return Picture(file_name)
+
+    def test_red_fills_the_screen_and_goes_back(self):
+        calls = self.calls(self.run_application('--keys', 'red,red', '--eval', '1'))
+        self.assertEqual([call for call in calls if call.startswith('SetFullScreen')],
+                         ['SetFullScreen(1, 1)', 'SetFullScreen(1, 0)'])
+        self.assertEqual(len(self.screenshot('full', '--keys', 'red').colours()), 1)
+        self.assertGreater(len(self.screenshot('back', '--keys', 'red,red').colours()), COLOURS_OF_A_PAGE)
+
+    def test_the_page_has_a_hole_for_the_picture(self):
+        page = self.screenshot('playing', '--keys', 'play,right,right', '--wait-for', 'video.playState === 1')
+        beneath = self.screenshot('full', '--keys', 'red').colour(626, 228)
+        self.assertEqual(page.colour(626, 228), beneath)
+        self.assertNotEqual(page.colour(830, 228), beneath)
+
+    def test_everything_lies_within_the_safe_area_and_nothing_is_cut_off(self):
+        outside = '''Array.prototype.filter.call(document.querySelectorAll('.screen > *'), function (element) {
+            var box = element.getBoundingClientRect();
+            return box.width > 0 && (box.left < 64 || box.right > 1216 || box.top < 36 || box.bottom > 684 ||
+                element.scrollHeight > element.clientHeight || element.scrollWidth > element.clientWidth);
+        }).map(function (element) { return element.className; })'''
+        for keys in ('back', 'up,ok', 'play,pause,play,pause,play,stop'):
+            with self.subTest(keys):
+                self.assertEqual(self.after(keys, 'true', outside), [])
+
+    def test_without_media_it_says_so(self):
+        self.assertIn('No media', self.run_application('--eval', LOG, media=()).value[0])
+
+    def test_without_the_plug_in_it_says_so(self):
+        text = self.run_application('--eval', 'document.body.innerText', plugin='TELIX_STRANGER').value
+        self.assertIn('The plug-in is missing', text)
+        self.assertNotIn('Speed', text)
 
 
 if __name__ == '__main__':
