@@ -23,7 +23,8 @@ function callsOf(object) {
 // that only begins with a digit.
 function questionsFor(object, property, call) {
     callsOf(tv);
-    check(object[property] !== null && object[property] !== undefined);
+    var value = object[property];
+    check(value !== null && value !== undefined);
     return callsOf(tv, call).length;
 }
 

@@ -136,6 +136,17 @@ TELIX_RETCODE_ENUM_T give(char** out, const std::string& text) {
     return TELIX_RETCODE_SUCCESS;
 }
 
+// As stream events carry their payload.
+std::string hexadecimal(const std::string& text) {
+    static const char digits[] = "0123456789abcdef";
+    std::string result;
+    for (const char c : text) {
+        result += digits[static_cast<unsigned char>(c) >> 4];
+        result += digits[static_cast<unsigned char>(c) & 0xF];
+    }
+    return result;
+}
+
 // 0 if there is none.
 TELIX_JS_CM_HANDLE listedChannel(uint32_t onid, uint32_t tsid, uint32_t sid) {
     std::lock_guard<std::mutex> lock(guard);
@@ -205,7 +216,7 @@ void happen(TELIX_JS_VB_HANDLE object, int32_t occurrence, int32_t argument) {
         break;
     case streamEventComes:
         std::thread([object, name = streamEventName,
-                     data = "id " + streamEventId + " tag " + streamEventTag] {
+                     data = hexadecimal("id " + streamEventId + " tag " + streamEventTag)] {
             if (auto callback = onStreamEvent.load()) {
                 callback(object, nullptr, nullptr, bytes(name.c_str()), bytes(data.c_str()),
                          static_cast<___UINT32>(data.size()), bytes("trigger"));
