@@ -25,7 +25,7 @@ protected:
         std::vector<unsigned char> text(message.begin(), message.end());
         id.push_back(0);
         text.push_back(0);
-        EXPECT_EQ(callback(id.data(), text.data(), code), 0);
+        EXPECT_EQ(callback.load()(id.data(), text.data(), code), 0);
         std::fill(id.begin(), id.end(), 'x');
         std::fill(text.begin(), text.end(), 'x');
     }
@@ -79,7 +79,7 @@ TEST_F(DRMAgentTest, IsMadeForItsTypeInAnyCase) {
 }
 
 TEST_F(DRMAgentTest, RegistersItsCallbackBeforeAnythingElseAndGivesItUpFirst) {
-    EXPECT_EQ(callback, DRMAgent::onDRMMessageResultCb);
+    EXPECT_EQ(callback.load(), DRMAgent::onDRMMessageResultCb);
     log.expectInOrder({"TELIX_JS_DRM_RegisterOnDRMMessageResult(callback)", "NPN_SetValue 3 0"});
     agent.set("onDRMMessageResult", browser.function("handler"));
     agent.dropScriptObject();
@@ -621,6 +621,7 @@ TEST_F(DRMAgentTest, ResultsOfSeveralThreadsAtOnceAllArriveEachThreadsInOrderEve
     constexpr int threads = 4;
     constexpr int results = 100;
     std::vector<std::function<void()>> reporters;
+    reporters.reserve(threads);
     std::atomic<int> ended{0};
     for (int thread = 0; thread < threads; ++thread) {
         reporters.emplace_back([this, thread, &ended] {
@@ -633,7 +634,7 @@ TEST_F(DRMAgentTest, ResultsOfSeveralThreadsAtOnceAllArriveEachThreadsInOrderEve
     log.clear();
     // The browser's thread delivers while the others report.
     std::thread platformThreads([&] { onPlatformThreads(reporters); });
-    browser.pumpUntil([&] { return second.count() == threads * results; });
+    browser.pumpUntil([&] { return second.count() == size_t{threads} * results; });
     platformThreads.join();
     EXPECT_EQ(ended, threads);
     EXPECT_EQ(first.count(), 0U);
