@@ -130,10 +130,9 @@ Capabilities Capabilities::builtIn(const Configuration& configuration) {
     for (const Configuration::DrmSystem& system : configuration.drmSystems) {
         drm += "    <drm DRMSystemID=\"" + escaped(system.id) + "\">TS MP4</drm>\n";
     }
-    std::string document =
-        "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n"
-        "<profilelist xmlns=\"urn:hbbtv:config:oitf:oitfCapabilities:2011-1\">\n"
-        "  <ui_profile name=\"OITF_HD_UIPROF+META_SI+TRICKMODE+AVCAD";
+    std::string document = "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n"
+                           "<profilelist xmlns=\"urn:hbbtv:config:oitf:oitfCapabilities:2011-1\">\n"
+                           "  <ui_profile name=\"OITF_HD_UIPROF+META_SI+TRICKMODE+AVCAD";
     document += drm.empty() ? "" : "+DRM";
     document += "+DVB_S\">\n"
                 "    <ext>\n"
@@ -163,8 +162,8 @@ bool Capabilities::has(const std::string& name) const {
     const UiProfile wanted = split(name);
     return std::any_of(m_uiProfiles.begin(), m_uiProfiles.end(), [&](const UiProfile& each) {
         const bool isBase = wanted.base == each.base || (wanted.base.empty() && !wanted.fragments.empty());
-        return isBase && std::includes(each.fragments.begin(), each.fragments.end(),
-                                       wanted.fragments.begin(), wanted.fragments.end());
+        return isBase && std::includes(each.fragments.begin(), each.fragments.end(), wanted.fragments.begin(),
+                                       wanted.fragments.end());
     });
 }
 

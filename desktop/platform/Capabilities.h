@@ -26,7 +26,8 @@ public:
     const std::string& document() const { return m_document; }
 
     // Whether the document has a profile of that name: the whole name of a media profile; the base name of a
-    // user interface profile, with any of its fragments behind it in any order; or fragments alone, as +DVB_S.
+    // user interface profile, with any of its fragments behind it in any order; or fragments alone, as
+    // +DVB_S.
     bool has(const std::string& name) const;
 
 private:

@@ -282,7 +282,7 @@ std::string nameBehind(const std::string& header, const std::string& word) {
 
 const std::vector<KeyGroup>& keyGroups() {
     static const auto& groups = *new std::vector<KeyGroup>{
-        {"red", 0x1},  {"green", 0x2},   {"yellow", 0x4}, {"blue", 0x8},     {"navigation", 0x10},
+        {"red", 0x1},  {"green", 0x2},   {"yellow", 0x4}, {"blue", 0x8},      {"navigation", 0x10},
         {"vcr", 0x20}, {"scroll", 0x40}, {"info", 0x80},  {"numeric", 0x100}, {"alpha", 0x200}};
     return groups;
 }
