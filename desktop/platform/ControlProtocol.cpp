@@ -39,9 +39,21 @@ const std::vector<ControlCommand>& controlCommands() {
          {{"result", Kind::number, true, "what became of it; 0 is success", 0, INT32_MAX},
           {"message", Kind::text, false, "text of the answer"},
           {"id", Kind::text, false, "id of the message (the last one)"}}},
+        {"rights-error",
+         "tell the page that rights for the media of its player are missing",
+         {{"state", Kind::number, true, "what is wrong; 0 no licence, 1 invalid licence", 0, INT32_MAX},
+          {"content-id", Kind::text, false, "of the media"},
+          {"drm-system", Kind::text, false, "its id"},
+          {"rights-issuer-url", Kind::text, false, "where rights are to be had"}}},
         {"low-memory",
          "tell the page that memory is short",
          {{"free", Kind::number, false, "bytes that are free from now on"}}},
+        {"buffered",
+         "report a buffering level of the players instead of the real one",
+         {{"amount", Kind::number, false, "seconds, or any raw value (the real level again)"}}},
+        {"player-message",
+         "send a platform message of the player, by name or number",
+         {{"message", Kind::text, true, "as play-end, err-not-found or 0xF000"}}},
     };
     return commands;
 }
@@ -62,6 +74,25 @@ const ControlParameter* findControlParameter(const ControlCommand& command, cons
         }
     }
     return nullptr;
+}
+
+const std::vector<PlayerMessage>& playerMessages() {
+    static const auto& messages = *new std::vector<PlayerMessage>{
+        {"play-end", TELIX_AV_CB_MSG_PLAYEND},
+        {"play-start", TELIX_AV_CB_MSG_PLAYSTART},
+        {"err-playing", TELIX_AV_CB_MSG_ERR_PLAYING},
+        {"err-not-found", TELIX_AV_CB_MSG_ERR_NOT_FOUND},
+        {"err-codec-not-supported", TELIX_AV_CB_MSG_ERR_CODEC_NOT_SUPPORTED},
+        {"err-net-disconnected", TELIX_AV_CB_MSG_ERR_NET_DISCONNECTED},
+        {"err-net-busy", TELIX_AV_CB_MSG_ERR_NET_BUSY},
+        {"err-net-cannot-process", TELIX_AV_CB_MSG_ERR_NET_CANNOT_PROCESS},
+        {"err-net-cannot-connect", TELIX_AV_CB_MSG_ERR_NET_CANNOT_CONNECT},
+        {"err-drm-cannot-process", TELIX_AV_CB_MSG_ERR_WMDRM_CANNOT_PROCESS},
+        {"err-drm-licence-local", TELIX_AV_CB_MSG_ERR_WMDRM_LIC_FAILLOCAL},
+        {"err-drm-licence-transfer", TELIX_AV_CB_MSG_ERR_WMDRM_LIC_FAILTRANSFER},
+        {"err-drm-licence-expired", TELIX_AV_CB_MSG_ERR_WMDRM_LIC_EXPIRED},
+    };
+    return messages;
 }
 
 } // namespace desktop

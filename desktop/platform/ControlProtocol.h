@@ -39,6 +39,13 @@ const ControlParameter* findControlParameter(const ControlCommand& command, cons
 // The longest line of a request in bytes, without its end.
 constexpr size_t longestControlRequest = 65536;
 
+// The names of player messages, as "play-end", with their numbers.
+struct PlayerMessage {
+    const char* name;
+    uint32_t number;
+};
+const std::vector<PlayerMessage>& playerMessages();
+
 } // namespace desktop
 
 #endif

@@ -3,6 +3,7 @@
 #include "desktop/platform/Control.h"
 #include "desktop/platform/ControlProtocol.h"
 #include "desktop/platform/Device.h"
+#include "desktop/platform/Players.h"
 
 #include <algorithm>
 #include <cstring>
@@ -385,7 +386,62 @@ Object lowMemory(const Request& request) {
     return {};
 }
 
+const char noPlayer[] = "there is no player with media";
+
+Object rightsError(const Request& request) {
+    require(Players::instance().injectRightsError(static_cast<int32_t>(request.number("state")),
+                                                  request.text("content-id"), request.text("drm-system"),
+                                                  request.text("rights-issuer-url")),
+            noPlayer);
+    return {};
+}
+
+Object buffered(const Request& request) {
+    Players::instance().injectBuffered(
+        request.has("amount") ? std::optional(static_cast<uint32_t>(request.number("amount"))) : std::nullopt);
+    return {};
+}
+
+Object playerMessage(const Request& request) {
+    const std::string text = request.text("message");
+    std::optional<TELIX_AV_CB_MSG> message;
+    for (const PlayerMessage& each : playerMessages()) {
+        if (text == each.name) {
+            message = each.number;
+        }
+    }
+    if (!message) {
+        const bool isHexadecimal = text.compare(0, 2, "0x") == 0;
+        guint64 number = 0;
+        if (!g_ascii_string_to_unsigned(text.c_str() + (isHexadecimal ? 2 : 0), isHexadecimal ? 16 : 10, 0,
+                                        G_MAXUINT32, &number, nullptr)) {
+            throw Refusal("\"message\" is neither a known name nor a number");
+        }
+        message = static_cast<TELIX_AV_CB_MSG>(number);
+    }
+    require(Players::instance().injectMessage(*message), noPlayer);
+    return {};
+}
+
 // ---- The state
+
+Array players() {
+    Array list;
+    for (const Players::State& each : Players::instance().states()) {
+        Object player;
+        player.number("handle", each.player)
+            .text("url", each.url)
+            .text("state", each.state)
+            .number("position", each.position)
+            .number("duration", each.duration)
+            .number("bufferedEnd", each.bufferedEnd)
+            .number("buffered", each.buffered)
+            .real("speed", each.speed)
+            .number("volume", each.volume);
+        list.add(std::move(player));
+    }
+    return list;
+}
 
 const char* nameOf(TELIX_PLAYSTATE_ENUM_T state) {
     switch (state) {
@@ -529,6 +585,7 @@ Object tellState(const Request& request) {
     setProgramme(programmes, "now", state.present);
     setProgramme(programmes, "next", state.following);
     answer.object("programmes", std::move(programmes)).object("picture", pictureObject());
+    answer.array("players", players());
     Array keys;
     for (const KeyGroup& group : keyGroups()) {
         if ((device().keySet() & group.bit) != 0) {
@@ -550,7 +607,10 @@ Function functionOf(const std::string& command) {
         {"channels", channels},          {"state", tellState},        {"channel", tune},
         {"channel-error", channelError}, {"rating", rating},          {"rating-error", ratingError},
         {"stream-event", streamEvent},   {"full-screen", fullScreen}, {"drm-result", drmResult},
+        {"rights-error", rightsError},
         {"low-memory", lowMemory},
+        {"buffered", buffered},
+        {"player-message", playerMessage},
     };
     const auto found = functions.find(command);
     return found == functions.end() ? nullptr : found->second;
