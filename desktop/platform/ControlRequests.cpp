@@ -397,8 +397,9 @@ Object rightsError(const Request& request) {
 }
 
 Object buffered(const Request& request) {
-    Players::instance().injectBuffered(
-        request.has("amount") ? std::optional(static_cast<uint32_t>(request.number("amount"))) : std::nullopt);
+    Players::instance().injectBuffered(request.has("amount")
+                                           ? std::optional(static_cast<uint32_t>(request.number("amount")))
+                                           : std::nullopt);
     return {};
 }
 
@@ -604,9 +605,15 @@ using Function = Object (*)(const Request& request);
 
 Function functionOf(const std::string& command) {
     static const auto& functions = *new std::map<std::string, Function>{
-        {"channels", channels},          {"state", tellState},        {"channel", tune},
-        {"channel-error", channelError}, {"rating", rating},          {"rating-error", ratingError},
-        {"stream-event", streamEvent},   {"full-screen", fullScreen}, {"drm-result", drmResult},
+        {"channels", channels},
+        {"state", tellState},
+        {"channel", tune},
+        {"channel-error", channelError},
+        {"rating", rating},
+        {"rating-error", ratingError},
+        {"stream-event", streamEvent},
+        {"full-screen", fullScreen},
+        {"drm-result", drmResult},
         {"rights-error", rightsError},
         {"low-memory", lowMemory},
         {"buffered", buffered},

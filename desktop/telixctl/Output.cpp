@@ -103,8 +103,8 @@ void printPlayer(JsonObject* player) {
 
 void printState(JsonObject* answer) {
     JsonObject* channel = objectOf(answer, "channel");
-    line("channel", channel ? std::to_string(numberOf(channel, "number")) + " " + textOf(channel, "name")
-                            : "none");
+    line("channel",
+         channel ? std::to_string(numberOf(channel, "number")) + " " + textOf(channel, "name") : "none");
     forEach(answer, "objects", [](JsonObject* object) {
         if (textOf(object, "playState") != "unrealized" || isSo(object, "holdsTuner")) {
             line("object", std::to_string(numberOf(object, "handle")) + " " + textOf(object, "playState") +
@@ -124,11 +124,11 @@ void printState(JsonObject* answer) {
     printProgramme("now", objectOf(programmes, "now"));
     printProgramme("next", objectOf(programmes, "next"));
     JsonObject* picture = objectOf(answer, "picture");
-    line("picture", isSo(picture, "visible") ? "frame " + std::to_string(numberOf(picture, "serial")) + ", " +
-                                                   std::to_string(numberOf(picture, "width")) + "x" +
-                                                   std::to_string(numberOf(picture, "height")) + ", shown " +
-                                                   areaText(picture)
-                                             : "none");
+    line("picture", isSo(picture, "visible")
+                        ? "frame " + std::to_string(numberOf(picture, "serial")) + ", " +
+                              std::to_string(numberOf(picture, "width")) + "x" +
+                              std::to_string(numberOf(picture, "height")) + ", shown " + areaText(picture)
+                        : "none");
     forEach(answer, "players", printPlayer);
     std::string keys;
     JsonNode* names = json_object_get_member(answer, "keys");

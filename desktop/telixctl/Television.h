@@ -15,8 +15,8 @@ struct Choice {
 // The socket that is meant; nothing, with the reason in `error`, if there is none or more than one.
 std::optional<std::string> findTelevision(const Choice& choice, std::string& error);
 
-// Sends one request and gives the answer, both without the end of the line; nothing, with the reason in `error`,
-// if there is no answer within ten seconds.
+// Sends one request and gives the answer, both without the end of the line; nothing, with the reason in
+// `error`, if there is no answer within ten seconds.
 std::optional<std::string> ask(const std::string& socket, const std::string& request, std::string& error);
 
 #endif

@@ -75,19 +75,21 @@ std::string overview() {
     for (const ControlCommand& command : controlCommands()) {
         add(synopsis(command), command.help);
         for (const ControlParameter& parameter : command.parameters) {
-            add("    " +
-                    (parameter.isRequired ? positional(parameter)
-                                          : std::string("--") + parameter.name + "=" +
-                                                (parameter.kind == ControlParameter::Kind::number ? "NUMBER"
-                                                                                                  : "TEXT")),
+            add("    " + (parameter.isRequired
+                              ? positional(parameter)
+                              : std::string("--") + parameter.name + "=" +
+                                    (parameter.kind == ControlParameter::Kind::number ? "NUMBER" : "TEXT")),
                 parameter.help);
         }
     }
     add("list", "list the televisions that run, by their process");
-    add("check-config [FILE]", "look for faults in a configuration file (the one that a television would read)");
-    text += "\nNumbers are decimal, or hexadecimal behind 0x. The television is the one named by --socket, --pid or "
+    add("check-config [FILE]",
+        "look for faults in a configuration file (the one that a television would read)");
+    text += "\nNumbers are decimal, or hexadecimal behind 0x. The television is the one named by --socket, "
+            "--pid or "
             "TELIX_SOCKET,\nelse the only one of this user that runs.\n\n"
-            "Exit status: 0 done, 1 refused by the television or none is running, 2 for a bad command line or a bad\n"
+            "Exit status: 0 done, 1 refused by the television or none is running, 2 for a bad command line "
+            "or a bad\n"
             "configuration file.";
     return text;
 }
@@ -123,8 +125,8 @@ void parse(GOptionContext* context, const std::vector<GOptionEntry>& entries,
 int64_t readNumber(const std::string& what, const std::string& text, int64_t least, int64_t most) {
     const bool isHexadecimal = text.compare(0, 2, "0x") == 0 || text.compare(0, 2, "0X") == 0;
     gint64 number = 0;
-    if (!g_ascii_string_to_signed(text.c_str() + (isHexadecimal ? 2 : 0), isHexadecimal ? 16 : 10, least, most,
-                                  &number, nullptr)) {
+    if (!g_ascii_string_to_signed(text.c_str() + (isHexadecimal ? 2 : 0), isHexadecimal ? 16 : 10, least,
+                                  most, &number, nullptr)) {
         throw Misuse{what + ": \"" + text + "\" is no number from " + std::to_string(least) + " to " +
                      std::to_string(most)};
     }
@@ -165,7 +167,8 @@ std::string readRequest(const ControlCommand& command, std::vector<std::string> 
     for (size_t index = 0; index < command.parameters.size(); ++index) {
         const ControlParameter& parameter = command.parameters[index];
         if (!parameter.isRequired) {
-            entries.push_back({parameter.name, 0, 0, G_OPTION_ARG_STRING, &texts.values[index], parameter.help,
+            entries.push_back({parameter.name, 0, 0, G_OPTION_ARG_STRING, &texts.values[index],
+                               parameter.help,
                                parameter.kind == ControlParameter::Kind::number ? "NUMBER" : "TEXT"});
         }
     }
@@ -191,7 +194,8 @@ std::string readRequest(const ControlCommand& command, std::vector<std::string> 
     if (next < arguments.size()) {
         throw Misuse{std::string(command.name) + ": \"" + arguments[next] + "\" is one argument too many"};
     }
-    const std::unique_ptr<JsonNode, void (*)(JsonNode*)> node(json_node_new(JSON_NODE_OBJECT), json_node_unref);
+    const std::unique_ptr<JsonNode, void (*)(JsonNode*)> node(json_node_new(JSON_NODE_OBJECT),
+                                                              json_node_unref);
     json_node_set_object(node.get(), request.get());
     char* text = json_to_string(node.get(), FALSE);
     std::string line = text;
@@ -202,8 +206,7 @@ std::string readRequest(const ControlCommand& command, std::vector<std::string> 
 Choice choiceOf(const Options& options) {
     Choice choice;
     choice.socket = options.socket ? options.socket : "";
-    choice.pid =
-        options.pid ? static_cast<pid_t>(readNumber("--pid", options.pid, 1, G_MAXINT32)) : 0;
+    choice.pid = options.pid ? static_cast<pid_t>(readNumber("--pid", options.pid, 1, G_MAXINT32)) : 0;
     if (options.socket && options.pid) {
         throw Misuse{"give either --socket or --pid"};
     }
