@@ -507,11 +507,13 @@ void Player::selectSubtitle(std::optional<int> number) {
     if (number && *number != current) { // a choice that changes nothing would still drop the text that is due
         g_object_set(m_pipeline, "current-text", *number, nullptr);
     }
+    fprintf(stderr, "CUR %d want %d\n", current, number.value_or(-7));
     m_showsSubtitle = number.has_value();
     applySubtitle();
 }
 
-// The element that draws subtitles is there if the media has any; it is told whether to.
+// The element that draws subtitles is there if the media has any; it is told whether to. What it was given
+// before it was told stays unseen: the next text is the first.
 void Player::applySubtitle() {
     GstIterator* overlays = gst_bin_iterate_all_by_element_factory_name(GST_BIN(m_pipeline), subtitleElement);
     gst_iterator_foreach(
