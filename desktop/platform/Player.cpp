@@ -507,7 +507,6 @@ void Player::selectSubtitle(std::optional<int> number) {
     if (number && *number != current) { // a choice that changes nothing would still drop the text that is due
         g_object_set(m_pipeline, "current-text", *number, nullptr);
     }
-    fprintf(stderr, "CUR %d want %d\n", current, number.value_or(-7));
     m_showsSubtitle = number.has_value();
     applySubtitle();
 }
