@@ -329,6 +329,11 @@ void Player::handle(GstMessage* message) {
         }
         break;
     }
+    case GST_MESSAGE_ELEMENT:
+        if (gst_message_has_name(message, "http-headers")) {
+            readHeaders(gst_message_get_structure(message));
+        }
+        break;
     case GST_MESSAGE_CLOCK_LOST:
         if (m_state == GST_STATE_PLAYING) {
             gst_element_set_state(m_pipeline, GST_STATE_PAUSED);
@@ -371,6 +376,23 @@ void Player::handleError(GstMessage* message) {
     fail(kind, reason);
 }
 
+void Player::readHeaders(const GstStructure* headers) {
+    const GValue* response = gst_structure_get_value(headers, "response-headers");
+    if (!response || !GST_VALUE_HOLDS_STRUCTURE(response)) {
+        return;
+    }
+    gst_structure_foreach(
+        gst_value_get_structure(response),
+        [](GQuark name, const GValue* value, gpointer hasRanges) -> gboolean {
+            const bool isGiven = g_ascii_strcasecmp(g_quark_to_string(name), "accept-ranges") == 0 &&
+                                 G_VALUE_HOLDS_STRING(value) &&
+                                 g_ascii_strcasecmp(g_value_get_string(value), "bytes") == 0;
+            *static_cast<bool*>(hasRanges) = *static_cast<bool*>(hasRanges) || isGiven;
+            return TRUE;
+        },
+        &m_hasRanges);
+}
+
 // ---- States
 
 void Player::takeBuffering(int percent) {
@@ -411,7 +433,9 @@ void Player::becomeKnown() {
         media.canSeek = canSeek != FALSE;
     }
     gst_query_unref(query);
-    media.canReverse = media.canSeek && (!m_isNetwork || usesStore());
+    m_hasStore = usesStore();
+    media.canSeekAhead = media.canSeek && (!m_hasStore || m_hasRanges);
+    media.canReverse = media.canSeek && (!m_isNetwork || m_hasStore);
     m_listener.known(media);
 }
 
@@ -445,7 +469,15 @@ void Player::setPaused(bool isPaused) {
 
 // ---- Seeks
 
+// A server that does not give parts is not asked for one: it would cut the media off, or leave it hanging.
+bool Player::canReach(uint32_t milliseconds) {
+    return !m_hasStore || m_hasRanges || milliseconds / 1000 <= progress().bufferedEnd;
+}
+
 bool Player::applySeek(double speed, uint32_t milliseconds) {
+    if (!canReach(milliseconds)) {
+        return false;
+    }
     const auto at = static_cast<gint64>(milliseconds) * GST_MSECOND;
     const auto flags = static_cast<GstSeekFlags>(GST_SEEK_FLAG_FLUSH | GST_SEEK_FLAG_ACCURATE);
     const bool isForward = speed > 0;
