@@ -107,7 +107,7 @@ std::string languageOf(const GstTagList* tags) {
     }
     // Of the two codes of three letters, broadcast and pages use that of the language's own name.
     const char* ofThree = gst_tag_get_language_code_iso_639_2T(code);
-    const std::string language = ofThree ? ofThree : "";
+    std::string language = ofThree ? ofThree : "";
     g_free(code);
     return language;
 }
@@ -347,33 +347,32 @@ void Player::handle(GstMessage* message) {
 
 // ---- Errors
 
-void Player::fail(TELIX_AV_CB_MSG message, const std::string& reason) {
-    m_hasFailed = true;
-    m_listener.failed(message, reason);
+TELIX_AV_CB_MSG Player::kindOf(GstMessage* message, const GError& error) const {
+    const uint32_t status = httpStatusOf(message);
+    const bool isMissing =
+        (status >= 400 && status < 500) ||
+        (!m_isNetwork && g_error_matches(&error, GST_RESOURCE_ERROR, GST_RESOURCE_ERROR_NOT_FOUND));
+    if (isMissing) {
+        return TELIX_AV_CB_MSG_ERR_NOT_FOUND;
+    }
+    const bool isOfConnection =
+        m_isNetwork && status == 0 && (error.domain == GST_RESOURCE_ERROR || isDriedUp(message, error));
+    if (isOfConnection) {
+        return m_hasData ? TELIX_AV_CB_MSG_ERR_NET_DISCONNECTED : TELIX_AV_CB_MSG_ERR_NET_CANNOT_CONNECT;
+    }
+    // Data that does not flow before anything is presented has not been understood.
+    const bool isNotUnderstood =
+        (error.domain == GST_STREAM_ERROR && (!m_hasBegun || error.code != GST_STREAM_ERROR_FAILED)) ||
+        g_error_matches(&error, GST_CORE_ERROR, GST_CORE_ERROR_MISSING_PLUGIN);
+    return isNotUnderstood ? TELIX_AV_CB_MSG_ERR_CODEC_NOT_SUPPORTED : TELIX_AV_CB_MSG_ERR_PLAYING;
 }
 
 void Player::handleError(GstMessage* message) {
     GError* error = nullptr;
     gst_message_parse_error(message, &error, nullptr);
-    const uint32_t status = httpStatusOf(message);
-    TELIX_AV_CB_MSG kind = TELIX_AV_CB_MSG_ERR_PLAYING;
-    if (status >= 400 && status < 500) {
-        kind = TELIX_AV_CB_MSG_ERR_NOT_FOUND;
-    } else if (status >= 500) {
-        kind = TELIX_AV_CB_MSG_ERR_PLAYING; // the server's own trouble
-    } else if (m_isNetwork && (error->domain == GST_RESOURCE_ERROR || isDriedUp(message, *error))) {
-        kind = m_hasData ? TELIX_AV_CB_MSG_ERR_NET_DISCONNECTED : TELIX_AV_CB_MSG_ERR_NET_CANNOT_CONNECT;
-    } else if (g_error_matches(error, GST_RESOURCE_ERROR, GST_RESOURCE_ERROR_NOT_FOUND)) {
-        kind = TELIX_AV_CB_MSG_ERR_NOT_FOUND;
-    } else if (error->domain == GST_STREAM_ERROR && (!m_hasBegun || error->code != GST_STREAM_ERROR_FAILED)) {
-        // Data that does not flow before anything is presented has not been understood.
-        kind = TELIX_AV_CB_MSG_ERR_CODEC_NOT_SUPPORTED;
-    } else if (error->domain == GST_CORE_ERROR && error->code == GST_CORE_ERROR_MISSING_PLUGIN) {
-        kind = TELIX_AV_CB_MSG_ERR_CODEC_NOT_SUPPORTED;
-    }
-    const std::string reason = error->message;
+    m_hasFailed = true;
+    m_listener.failed(kindOf(message, *error), error->message);
     g_error_free(error);
-    fail(kind, reason);
 }
 
 void Player::readHeaders(const GstStructure* headers) {

@@ -107,7 +107,7 @@ private:
     static void onStore(GObject* store, GParamSpec* property, gpointer data);
     void handle(GstMessage* message);
     void handleError(GstMessage* message);
-    void fail(TELIX_AV_CB_MSG message, const std::string& reason);
+    TELIX_AV_CB_MSG kindOf(GstMessage* message, const GError& error) const;
     void takeBuffering(int percent);
     void settle();
     void becomeKnown();
