@@ -16,7 +16,7 @@ LIMIT = 20  # seconds after which something that should end is taken for hung
 
 sys.dont_write_bytecode = True
 sys.path.insert(0, os.path.dirname(PROGRAM))
-import media_server  # noqa: E402
+import media_server
 
 CONTENT = bytes(range(256)) * 40
 TYPES = {'clip.mp4': 'video/mp4', 'tune.mp3': 'audio/mpeg', 'tune.aac': 'audio/aac', 'tune.wav': 'audio/wav',
