@@ -10,7 +10,7 @@ build="$top/build"
 if [ ! -f "$build/CMakeCache.txt" ]; then
     cmake -S "$top" -B "$build" -G Ninja -DTELIX_BUILD_TESTS=OFF -DTELIX_BUILD_BENCH=OFF
 fi
-cmake --build "$build" --target telix-tv nptelixjs_desktop telix
+cmake --build "$build" --target telix-tv nptelixjs_desktop telix telixctl
 
 if [ $# -eq 0 ]; then
     set -- "$top/apps/demo/index.html"
