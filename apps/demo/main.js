@@ -29,12 +29,13 @@
     television.on.announced = function (text) { announcement.receive(text); };
 
     function watchTelevision() {
-        tv.setVisible('legend', false);
-        if (television.start()) {
+        var hasChannels = television.start();
+        tv.setVisible('ground', !hasChannels);
+        tv.setVisible('legend', !hasChannels);
+        if (hasChannels) {
             return;
         }
         // Nothing to zap through, but the other pages have something to tell all the same.
-        tv.setVisible('legend', true);
         if (television.isThere()) {
             showMessage('No television here', 'The set has no channels: its platform library is missing, or has no tuner.');
         } else {
@@ -63,7 +64,9 @@
 
     function openDevice() {
         clearScreen();
+        tv.setVisible('overlays', false);
         device.show(function () {
+            tv.setVisible('overlays', true);
             if (television.state.channels.length > 0) {
                 banner.show();
             }

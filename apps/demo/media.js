@@ -43,18 +43,19 @@ var media = (function () {
         return location.protocol !== 'file:';
     }
 
+    // The whole address. The plug-in would only put the page's folder in front.
     function addressOf(clip) {
-        return clip.url.indexOf('://') > 0 ? clip.url : folder + clip.url;
+        var link = document.createElement('a');
+        link.href = clip.url.indexOf('://') > 0 ? clip.url : folder + clip.url;
+        return link.href;
     }
 
     // ---- What is shown
 
     // The clip that presents: a queued one takes the place of the one before it.
     function presented() {
-        var address = video ? video.data || '' : '';
-        return clips.filter(function (clip) {
-            return !clip.isPlaylist && address.substr(-clip.url.length - 1) === '/' + clip.url;
-        })[0] || playing;
+        var address = video ? video.data : null;
+        return clips.filter(function (clip) { return addressOf(clip) === address; })[0] || playing;
     }
 
     function describeSpeed() {
@@ -112,7 +113,7 @@ var media = (function () {
         tv.say('media-notice', notice);
         // The picture is beneath: the ground covers it where there is none to be seen.
         var hasPicture = isPlaying && !clip.isAudio && [state.PLAYING, state.PAUSED, state.BUFFERING].indexOf(playState) >= 0;
-        tv.setVisible('media-ground', !hasPicture);
+        tv.setVisible('ground', !hasPicture);
         if (playState !== state.PLAYING) {
             tv.byId('media').className = '';
         }
