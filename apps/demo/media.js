@@ -19,10 +19,11 @@ var media = (function () {
     var clips = [
         { title: 'Running clock', detail: 'MP4', type: 'video/mp4', url: 'clip.mp4' },
         { title: 'Second clip', detail: 'MP4', type: 'video/mp4', url: 'second.mp4' },
+        { title: 'Two languages', detail: 'MP4', type: 'video/mp4', url: 'languages.mp4' },
         { title: 'A tune', detail: 'MP3', type: 'audio/mpeg', url: 'tune.mp3', isAudio: true },
         { title: 'Adaptive streaming', detail: 'HLS', type: 'application/vnd.apple.mpegurl', url: 'hls/index.m3u8' },
         { title: 'Playlist of two clips', detail: 'ASX', type: 'video/mp4', url: 'playlist.asx', isPlaylist: true },
-        { title: 'A clip that is not there', detail: 'MP4', type: 'video/mp4', url: 'missing.mp4' },
+        { title: 'A clip that is not there', detail: 'MP4', type: 'video/mp4', url: 'absent.mp4' },
         // Port 9 is for discarding what comes, and nowadays nobody listens on it.
         { title: 'A server that is switched off', detail: 'MP4', type: 'video/mp4', url: 'http://127.0.0.1:9/clip.mp4' },
         { title: 'A page, which is no clip', detail: 'HTML', type: 'video/mp4', url: '../demo/index.html' }
