@@ -2,7 +2,7 @@
 var channels = (function () {
     'use strict';
 
-    var linesShown = 9;
+    var linesShown = 7;
     var entryMilliseconds = 2000;
     var messageMilliseconds = 3000;
     var focused = 0;

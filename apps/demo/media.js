@@ -37,6 +37,7 @@ var media = (function () {
     var speedChanges = 0;
     var notice = '';
     var focused = 0;
+    var openTimer = 0;
     var refreshTimer = 0;
     var restTimer = 0;
 
@@ -145,9 +146,6 @@ var media = (function () {
     }
 
     function makeVideo(clip) {
-        dropVideo();
-        speed = 1;
-        notice = '';
         var made = tv.makeObject(clip.type, 'media-' + ++objectsMade);
         if (!made.isThere) {
             tv.removeObject(made);
@@ -163,14 +161,21 @@ var media = (function () {
             tell('There are no rights for ' + (contentId || 'this content') + ' (' + error + ').');
         };
         video.data = addressOf(clip);
-    }
-
-    function open() {
-        makeVideo(clips[focused]);
-        if (video && !playing.isPlaylist) {
+        if (!clip.isPlaylist) {
             video.play(1);
         }
         update();
+    }
+
+    // Some sets stop their one pipeline for any player that ends. The browser ends the former one a turn later; the new
+    // one comes after it.
+    function open() {
+        var clip = clips[focused];
+        dropVideo();
+        speed = 1;
+        notice = '';
+        clearTimeout(openTimer);
+        openTimer = setTimeout(function () { makeVideo(clip); }, 0);
     }
 
     // The plug-in hands a speed to the set when the next one is asked for. So each speed is asked for twice, and the
@@ -281,6 +286,7 @@ var media = (function () {
     // ---- The page
 
     function close() {
+        clearTimeout(openTimer);
         clearInterval(refreshTimer);
         clearTimeout(restTimer);
         choice.close();
