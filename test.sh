@@ -9,7 +9,8 @@ jobs=$(nproc)
 
 cmake --preset asan >/dev/null
 cmake --build --preset asan -- -k 0
-cmake --preset release -DTELIX_BUILD_TESTS=ON -DTELIX_BUILD_BENCH=ON -DTELIX_BUILD_DESKTOP=ON >/dev/null
+cmake --preset release -DTELIX_BUILD_TESTS=ON -DTELIX_BUILD_BENCH=ON -DTELIX_BUILD_DESKTOP=ON \
+    -DTELIX_BUILD_BROWSER=ON >/dev/null
 cmake --build --preset release -- -k 0
 
 ctest --preset asan -j "$jobs" --output-on-failure

@@ -5,7 +5,10 @@
 
 #include <QWebFrame>
 
-ApplicationPage::ApplicationPage(QObject* parent) : QWebPage(parent) {
+#include <utility>
+
+ApplicationPage::ApplicationPage(QString userAgent, QObject* parent)
+    : QWebPage(parent), m_userAgent(std::move(userAgent)) {
     mainFrame()->setScrollBarPolicy(Qt::Horizontal, Qt::ScrollBarAlwaysOff);
     mainFrame()->setScrollBarPolicy(Qt::Vertical, Qt::ScrollBarAlwaysOff);
     connect(this, &QWebPage::loadStarted, this, [this] { m_loadFailure.clear(); });

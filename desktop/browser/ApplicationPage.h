@@ -9,7 +9,8 @@ class ApplicationPage : public QWebPage {
     Q_OBJECT
 
 public:
-    explicit ApplicationPage(QObject* parent);
+    // `userAgent`: what servers and scripts are told that this is.
+    ApplicationPage(QString userAgent, QObject* parent);
 
     // Why the last document could not be loaded; empty when it could.
     QString loadFailure() const { return m_loadFailure; }
@@ -20,6 +21,7 @@ public:
     bool shouldInterruptJavaScript() override { return false; }
 
 protected:
+    QString userAgentForUrl(const QUrl&) const override { return m_userAgent; }
     void javaScriptConsoleMessage(const QString& message, int line, const QString& source) override;
     // A television has no dialogs: a page's questions are printed and answered with no.
     void javaScriptAlert(QWebFrame* frame, const QString& message) override;
@@ -29,6 +31,7 @@ protected:
     QString chooseFile(QWebFrame*, const QString&) override { return {}; }
 
 private:
+    QString m_userAgent;
     QString m_loadFailure;
     QUrl m_failedUrl;
 };

@@ -2,15 +2,20 @@
 #include "desktop/browser/ApplicationView.h"
 
 #include "desktop/browser/ApplicationPage.h"
+#include "desktop/browser/PageGeometry.h"
 #include "desktop/browser/PageScript.h"
 #include "desktop/browser/RemoteControl.h"
 
+#include <QContextMenuEvent>
 #include <QCoreApplication>
 #include <QImage>
 #include <QKeyEvent>
+#include <QMouseEvent>
+#include <QPaintEvent>
 #include <QPainter>
 #include <QPalette>
 #include <QWebFrame>
+#include <QWheelEvent>
 
 namespace {
 
@@ -39,8 +44,10 @@ QString textOf(const RemoteKey& key) {
 
 } // namespace
 
-ApplicationView::ApplicationView(QWidget* parent) : QWebView(parent), m_page(new ApplicationPage(this)) {
+ApplicationView::ApplicationView(const QString& userAgent, QWidget* parent)
+    : QWebView(parent), m_page(new ApplicationPage(userAgent, this)) {
     setPage(m_page);
+    m_page->setViewportSize(pageSize);
     // Where a page has no background of its own, what lies beneath it shows. The page takes the view's
     // palette. The view would promise to paint every one of its pixels.
     QPalette transparent = palette();
@@ -51,6 +58,10 @@ ApplicationView::ApplicationView(QWidget* parent) : QWebView(parent), m_page(new
         setContextMenuPolicy(Qt::NoContextMenu);
     connect(m_page, &QWebPage::loadStarted, this, [this] { m_loaded = false; });
     connect(m_page, &QWebPage::loadFinished, this, &ApplicationView::onLoadFinished);
+    // The engine takes the pixels of the page for those of the view.
+    connect(m_page, &QWebPage::repaintRequested, this,
+            [this](const QRect& area) { update(aroundOnView(area, size())); });
+    connect(m_page, &QWebPage::scrollRequested, this, [this] { update(); });
 }
 
 ApplicationView::~ApplicationView() {
@@ -88,8 +99,59 @@ void ApplicationView::press(const RemoteKey& key) {
 }
 
 void ApplicationView::paintEvent(QPaintEvent* event) {
-    if (m_shown)
-        QWebView::paintEvent(event);
+    if (!m_shown)
+        return;
+    QPainter painter(this);
+    painter.setRenderHints(renderHints() | QPainter::SmoothPixmapTransform);
+    painter.scale(qreal(width()) / pageSize.width(), qreal(height()) / pageSize.height());
+    QRegion onPage;
+    for (const QRect& area : event->region())
+        onPage += aroundOnPage(area, size());
+    m_page->mainFrame()->render(&painter, onPage);
+}
+
+// The engine would lay the page out anew.
+void ApplicationView::resizeEvent(QResizeEvent* event) {
+    QWidget::resizeEvent(event);
+}
+
+// The event as the engine should see it.
+QMouseEvent ApplicationView::onPage(const QMouseEvent& event) const {
+    return QMouseEvent(event.type(), toPage(event.localPos(), size()), event.windowPos(), event.screenPos(),
+                       event.button(), event.buttons(), event.modifiers(), event.source());
+}
+
+void ApplicationView::mousePressEvent(QMouseEvent* event) {
+    QMouseEvent onPage = this->onPage(*event);
+    QWebView::mousePressEvent(&onPage);
+}
+
+void ApplicationView::mouseReleaseEvent(QMouseEvent* event) {
+    QMouseEvent onPage = this->onPage(*event);
+    QWebView::mouseReleaseEvent(&onPage);
+}
+
+void ApplicationView::mouseMoveEvent(QMouseEvent* event) {
+    QMouseEvent onPage = this->onPage(*event);
+    QWebView::mouseMoveEvent(&onPage);
+}
+
+void ApplicationView::mouseDoubleClickEvent(QMouseEvent* event) {
+    QMouseEvent onPage = this->onPage(*event);
+    QWebView::mouseDoubleClickEvent(&onPage);
+}
+
+void ApplicationView::wheelEvent(QWheelEvent* event) {
+    QWheelEvent onPage(toPage(event->position(), size()), event->globalPosition(), event->pixelDelta(),
+                       event->angleDelta(), event->buttons(), event->modifiers(), event->phase(),
+                       event->inverted(), event->source());
+    QWebView::wheelEvent(&onPage);
+}
+
+void ApplicationView::contextMenuEvent(QContextMenuEvent* event) {
+    QContextMenuEvent onPage(event->reason(), toPage(event->pos(), size()).toPoint(), event->globalPos(),
+                             event->modifiers());
+    QWebView::contextMenuEvent(&onPage);
 }
 
 void ApplicationView::showEvent(QShowEvent* event) {

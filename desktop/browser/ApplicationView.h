@@ -7,11 +7,14 @@
 class ApplicationPage;
 struct RemoteKey;
 
+// The page is laid out on 1280 by 720 pixels whatever the view's size, and painted enlarged or reduced:
+// script and plug-ins see the same geometry in every window.
 class ApplicationView : public QWebView {
     Q_OBJECT
 
 public:
-    explicit ApplicationView(QWidget* parent);
+    // `userAgent`: what the page says it is, to servers and to its scripts.
+    ApplicationView(const QString& userAgent, QWidget* parent);
     ~ApplicationView() override;
 
     ApplicationPage& applicationPage() const { return *m_page; }
@@ -31,6 +34,13 @@ signals:
 
 protected:
     void paintEvent(QPaintEvent* event) override;
+    void resizeEvent(QResizeEvent* event) override;
+    void mousePressEvent(QMouseEvent* event) override;
+    void mouseReleaseEvent(QMouseEvent* event) override;
+    void mouseMoveEvent(QMouseEvent* event) override;
+    void mouseDoubleClickEvent(QMouseEvent* event) override;
+    void wheelEvent(QWheelEvent* event) override;
+    void contextMenuEvent(QContextMenuEvent* event) override;
     void showEvent(QShowEvent* event) override;
     void hideEvent(QHideEvent* event) override;
     void keyPressEvent(QKeyEvent* event) override;
@@ -39,6 +49,7 @@ protected:
 private:
     void onLoadFinished(bool ok);
     void tellVisibility();
+    QMouseEvent onPage(const QMouseEvent& event) const;
     bool dispatch(const char* type, const RemoteKey& key);
 
     ApplicationPage* m_page;

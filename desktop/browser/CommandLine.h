@@ -14,12 +14,15 @@
 
 struct CommandLine {
     QUrl page;
+    // Of the window.
     QSize size;
     bool fullscreen = false;
     bool inspect = false;
     // File name of the plug-in.
     QString plugin;
     QVector<const RemoteKey*> keys;
+    QString userAgent;
+    bool waitForPicture = false;
     // Null texts: not asked for.
     QString waitFor;
     QString eval;
@@ -27,7 +30,9 @@ struct CommandLine {
     double timeoutSeconds = 0;
 
     // Whether the program ends by itself once everything that was asked for is done.
-    bool quitsWhenDone() const { return !waitFor.isNull() || !eval.isNull() || !screenshot.isNull(); }
+    bool quitsWhenDone() const {
+        return waitForPicture || !waitFor.isNull() || !eval.isNull() || !screenshot.isNull();
+    }
 };
 
 // Reads the arguments (the program's name first) into `commandLine`. Gives the exit status when there is

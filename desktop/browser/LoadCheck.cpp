@@ -21,9 +21,10 @@ int httpStatus(const QNetworkReply& reply) {
 
 // Asks for the page itself and leaves after the head of the answer, since many a server refuses to give only
 // a head.
-QString askServer(const QUrl& url) {
+QString askServer(const QUrl& url, const QString& userAgent) {
     QNetworkAccessManager network;
     QNetworkRequest request(url);
+    request.setHeader(QNetworkRequest::UserAgentHeader, userAgent);
     request.setAttribute(QNetworkRequest::RedirectPolicyAttribute, QNetworkRequest::NoLessSafeRedirectPolicy);
     const std::unique_ptr<QNetworkReply> reply(network.get(request));
 
@@ -46,7 +47,7 @@ QString askServer(const QUrl& url) {
 
 } // namespace
 
-QString loadObstacle(const QUrl& url) {
+QString loadObstacle(const QUrl& url, const QString& userAgent) {
     if (!url.isValid())
         return QStringLiteral("the address is malformed");
     if (url.isLocalFile()) {
@@ -63,7 +64,7 @@ QString loadObstacle(const QUrl& url) {
     // On a thread of its own, so that waiting for the answer runs nothing else on this one: a page that is in
     // the middle of a call must not be entered again or destroyed meanwhile.
     QString obstacle;
-    const std::unique_ptr<QThread> thread(QThread::create([&] { obstacle = askServer(url); }));
+    const std::unique_ptr<QThread> thread(QThread::create([&] { obstacle = askServer(url, userAgent); }));
     thread->start();
     thread->wait();
     return obstacle;

@@ -40,7 +40,7 @@ ScriptedRun::ScriptedRun(TvWindow& window, const CommandLine& commandLine)
 void ScriptedRun::step() {
     m_pageLoaded = m_pageLoaded || topIsLoaded();
     const bool settled = topIsLoaded() || !m_window.topApplication();
-    if (m_pageLoaded && settled && pressKeys() && waitForExpression()) {
+    if (m_pageLoaded && settled && pressKeys() && waitForExpression() && waitForPicture()) {
         finish();
     } else if (m_sinceStart.elapsed() > m_commandLine.timeoutSeconds * 1000) {
         giveUp();
@@ -61,7 +61,12 @@ bool ScriptedRun::waitForExpression() {
         return true;
     const Evaluation evaluation = evaluate(m_commandLine.waitFor);
     m_lastError = evaluation.error;
+    m_expressionTrue = evaluation.truth;
     return evaluation.truth;
+}
+
+bool ScriptedRun::waitForPicture() const {
+    return !m_commandLine.waitForPicture || m_window.hasPicture();
 }
 
 void ScriptedRun::finish() {
@@ -91,6 +96,8 @@ void ScriptedRun::giveUp() {
     if (m_keysPressed < m_commandLine.keys.size()) {
         printError(
             QStringLiteral("can't press the keys from number %1 on %2").arg(m_keysPressed + 1).arg(limit));
+    } else if (m_commandLine.waitFor.isNull() || m_expressionTrue) {
+        printError(QStringLiteral("there is no picture %1").arg(limit));
     } else {
         const QString error = m_lastError.isNull() ? QString() : QStringLiteral(" (%1)").arg(m_lastError);
         printError(QStringLiteral("not true %1: %2%3").arg(limit, m_commandLine.waitFor, error));

@@ -30,6 +30,7 @@ private:
     // Each gives true when its part is done.
     bool pressKeys();
     bool waitForExpression();
+    bool waitForPicture() const;
     void finish();
     void giveUp();
     void onWindowClosed();
@@ -45,6 +46,8 @@ private:
     QElapsedTimer m_sinceStart;
     bool m_pageLoaded = false;
     int m_keysPressed = 0;
+    // How --wait-for was found last.
+    bool m_expressionTrue = false;
     QString m_lastError;
     QString m_evaluated;
 };

@@ -5,6 +5,8 @@
 #include "desktop/browser/ApplicationView.h"
 #include "desktop/browser/LoadCheck.h"
 #include "desktop/browser/PageFunctions.h"
+#include "desktop/browser/PageGeometry.h"
+#include "desktop/browser/PictureView.h"
 
 #include <QPalette>
 #include <QWebFrame>
@@ -12,12 +14,13 @@
 
 #include <algorithm>
 
-TvWindow::TvWindow(const QSize& pageSize) : m_pageSize(pageSize) {
+TvWindow::TvWindow(const QString& userAgent) : m_userAgent(userAgent), m_picture(new PictureView(this)) {
     QPalette black = palette();
     black.setColor(QPalette::Window, Qt::black);
     setPalette(black);
     setWindowTitle(QStringLiteral("telix-tv"));
     resize(pageSize);
+    place(*m_picture);
 }
 
 TvWindow::~TvWindow() {
@@ -29,7 +32,7 @@ TvWindow::~TvWindow() {
 }
 
 void TvWindow::openApplication(const QUrl& url) {
-    auto* application = new ApplicationView(this);
+    auto* application = new ApplicationView(m_userAgent, this);
     auto* page = &application->applicationPage();
     page->setNetworkAccessManager(&m_network);
     const auto addFunctions = [this, application](QWebFrame* frame) {
@@ -48,7 +51,7 @@ void TvWindow::openApplication(const QUrl& url) {
 }
 
 bool TvWindow::createApplication(const ApplicationView& caller, const QUrl& url) {
-    if (!has(caller) || !loadObstacle(url).isEmpty())
+    if (!has(caller) || !loadObstacle(url, m_userAgent).isEmpty())
         return false;
     openApplication(url);
     return true;
@@ -68,15 +71,20 @@ void TvWindow::inspect() {
     m_inspector = new QWebInspector;
     m_inspector->setAttribute(Qt::WA_QuitOnClose, false);
     m_inspector->setWindowTitle(QStringLiteral("telix-tv inspector"));
-    m_inspector->resize(m_pageSize);
+    m_inspector->resize(pageSize);
     // It stays empty when it is shown before it has a page.
     bringUpTop();
     m_inspector->show();
 }
 
 void TvWindow::resizeEvent(QResizeEvent*) {
+    place(*m_picture);
     for (auto* application : m_applications)
         place(*application);
+}
+
+bool TvWindow::hasPicture() const {
+    return m_picture->hasPicture();
 }
 
 bool TvWindow::has(const ApplicationView& application) const {
@@ -104,9 +112,6 @@ void TvWindow::bringUpTop() {
     top->setFocus();
 }
 
-void TvWindow::place(ApplicationView& application) const {
-    QRect area(QPoint(), m_pageSize.scaled(size(), Qt::KeepAspectRatio));
-    area.moveCenter(rect().center());
-    application.setGeometry(area);
-    application.setZoomFactor(qreal(area.width()) / m_pageSize.width());
+void TvWindow::place(QWidget& view) const {
+    view.setGeometry(pageAreaIn(size()));
 }

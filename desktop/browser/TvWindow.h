@@ -2,22 +2,27 @@
 #ifndef TELIX_DESKTOP_BROWSER_TVWINDOW_H
 #define TELIX_DESKTOP_BROWSER_TVWINDOW_H
 
-#include <QNetworkAccessManager>
+#include "desktop/browser/NetworkAccess.h"
+
+#include <QString>
 #include <QVector>
 #include <QWidget>
 
 class ApplicationView;
+class PictureView;
 class QUrl;
 class QWebInspector;
 
-// The window is black, and the applications' views lie on it. Another child placed beneath them all shows
-// through wherever the page on top is transparent, and everywhere when there is no application.
+// The window is black. On it lies the picture of the platform library, and on that lie the applications'
+// views: the picture shows through wherever the page on top is transparent, and everywhere when there is no
+// application. A window of another size than the page's shows both enlarged or reduced, with black bars if
+// its shape is another.
 class TvWindow : public QWidget {
     Q_OBJECT
 
 public:
-    // `pageSize`: pixels of the page. A window of another size (the full screen) enlarges the page to fit.
-    explicit TvWindow(const QSize& pageSize);
+    // `userAgent`: what servers and pages are told that this is.
+    explicit TvWindow(const QString& userAgent);
     ~TvWindow() override;
 
     // Puts a new application on top and starts to load its page.
@@ -33,6 +38,8 @@ public:
     ApplicationView* topApplication() const;
     // Opens the engine's inspector, which looks into the topmost application from then on.
     void inspect();
+    // Whether there is a picture beneath the page.
+    bool hasPicture() const;
 
 signals:
     // A document of an application could not be loaded. An application without any has left the stack.
@@ -45,11 +52,12 @@ private:
     bool has(const ApplicationView& application) const;
     void remove(ApplicationView* application);
     void bringUpTop();
-    void place(ApplicationView& application) const;
+    void place(QWidget& view) const;
 
-    QSize m_pageSize;
+    QString m_userAgent;
+    PictureView* m_picture;
     // Shared by all applications, as the cookies are.
-    QNetworkAccessManager m_network;
+    NetworkAccess m_network;
     // The topmost last.
     QVector<ApplicationView*> m_applications;
     QWebInspector* m_inspector = nullptr;

@@ -47,14 +47,14 @@ gboolean onTermination(gpointer signalNumber) {
 
 // Runs the window until it is done. Afterwards every page and every object in it is gone.
 int runWindow(const CommandLine& commandLine, QString& evaluated) {
-    TvWindow window(commandLine.size);
+    TvWindow window(commandLine.userAgent);
     ScriptedRun run(window, commandLine);
     if (commandLine.fullscreen) {
         // Without a window manager nobody else sets the size.
         window.setGeometry(QGuiApplication::primaryScreen()->geometry());
         window.showFullScreen();
     } else {
-        window.setFixedSize(commandLine.size);
+        window.resize(commandLine.size);
         window.show();
     }
     window.openApplication(commandLine.page);
@@ -98,7 +98,7 @@ int main(int argc, char* argv[]) {
                            "is QT_NO_GLIB set?"));
         return exitUnusable;
     }
-    const QString obstacle = loadObstacle(commandLine.page);
+    const QString obstacle = loadObstacle(commandLine.page, commandLine.userAgent);
     if (!obstacle.isEmpty()) {
         printError(QStringLiteral("can't load %1: %2").arg(commandLine.page.toDisplayString(), obstacle));
         return exitUnusable;

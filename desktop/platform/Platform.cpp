@@ -9,21 +9,15 @@ namespace desktop {
 
 namespace {
 
-// A function on its way to the platform thread.
-struct Posted {
+// A function that is called by and by on the platform thread.
+struct Repeated {
     std::function<bool()> function;
 
     static gboolean run(gpointer data) {
-        return static_cast<Posted*>(data)->function() ? G_SOURCE_CONTINUE : G_SOURCE_REMOVE;
+        return static_cast<Repeated*>(data)->function() ? G_SOURCE_CONTINUE : G_SOURCE_REMOVE;
     }
-    static void destroy(gpointer data) { delete static_cast<Posted*>(data); }
+    static void destroy(gpointer data) { delete static_cast<Repeated*>(data); }
 };
-
-void attach(GSource* source, GMainContext* context, std::function<bool()> function) {
-    g_source_set_callback(source, Posted::run, new Posted{std::move(function)}, Posted::destroy);
-    g_source_attach(source, context);
-    g_source_unref(source); // the context keeps it
-}
 
 } // namespace
 
@@ -57,16 +51,37 @@ void Platform::run() {
 }
 
 void Platform::post(std::function<void()> function) {
+    {
+        std::lock_guard<std::mutex> lock(m_postedMutex);
+        m_posted.push_back(std::move(function));
+    }
     GSource* source = g_idle_source_new();
     g_source_set_priority(source, G_PRIORITY_DEFAULT);
-    attach(source, m_context, [function = std::move(function)] {
-        function();
-        return false;
-    });
+    g_source_set_callback(source, runPosted, this, nullptr);
+    g_source_attach(source, m_context);
+    g_source_unref(source); // the context keeps it
+}
+
+// There is one source for each function, so that those of others get their turn in between.
+gboolean Platform::runPosted(gpointer platform) {
+    auto* self = static_cast<Platform*>(platform);
+    std::function<void()> function;
+    {
+        std::lock_guard<std::mutex> lock(self->m_postedMutex);
+        function = std::move(self->m_posted.front());
+        self->m_posted.pop_front();
+    }
+    function();
+    return G_SOURCE_REMOVE;
 }
 
 void Platform::postDelayed(unsigned int milliseconds, std::function<bool()> function) {
-    attach(g_timeout_source_new(milliseconds), m_context, std::move(function));
+    post([this, milliseconds, function = std::move(function)]() mutable {
+        GSource* source = g_timeout_source_new(milliseconds);
+        g_source_set_callback(source, Repeated::run, new Repeated{std::move(function)}, Repeated::destroy);
+        g_source_attach(source, m_context);
+        g_source_unref(source); // the context keeps it
+    });
 }
 
 bool Platform::isPlatformThread() const {

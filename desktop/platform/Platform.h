@@ -7,6 +7,8 @@
 #include "desktop/platform/Configuration.h"
 #include "desktop/platform/Picture.h"
 
+#include <condition_variable>
+#include <deque>
 #include <functional>
 #include <glib.h>
 #include <mutex>
@@ -47,12 +49,15 @@ public:
 private:
     Platform();
     void run();
+    static gboolean runPosted(gpointer platform);
 
     std::mutex m_mutex;
     GMainContext* m_context;
     std::mutex m_startMutex;
     std::condition_variable m_started;
     bool m_isStarted = false;
+    std::mutex m_postedMutex;
+    std::deque<std::function<void()>> m_posted;
     Configuration m_configuration;
     Picture m_picture;
 };

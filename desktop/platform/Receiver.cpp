@@ -35,8 +35,8 @@ void Receiver::push(const uint8_t* packets, size_t size) {
         }
     }
     if (m_isBegun && !m_batch.empty()) {
-        m_service->feed(std::move(m_batch));
-        m_batch = {};
+        m_service->feed(m_batch);
+        m_batch.clear();
     }
 }
 

@@ -16,7 +16,7 @@ public:
     // may post and must not call the receiver.
     struct Service {
         uint16_t serviceId = 0;
-        std::function<void(Bytes packets)> feed;        // tables and streams of this service alone
+        std::function<void(const Bytes& packets)> feed; // tables and streams of this service alone
         std::function<void(const Pmt& map)> mapped;     // once, before the first packets
         std::function<void()> missing;                  // once: the multiplex has no such service
         std::function<void(const Eit& eit)> programmes; // whenever a section differs

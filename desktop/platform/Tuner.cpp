@@ -154,14 +154,11 @@ Tuner::~Tuner() {
     }
 }
 
-std::function<void(Bytes packets)> Tuner::feed() const {
+std::function<void(const Bytes& packets)> Tuner::feed() const {
     const std::shared_ptr<GstElement> source(GST_ELEMENT(gst_object_ref(m_source)), gst_object_unref);
-    return [source](Bytes packets) {
-        auto* held = new Bytes(std::move(packets));
-        GstBuffer* buffer =
-            gst_buffer_new_wrapped_full(GST_MEMORY_FLAG_READONLY, held->data(), held->size(), 0, held->size(),
-                                        held, [](gpointer data) { delete static_cast<Bytes*>(data); });
-        gst_app_src_push_buffer(GST_APP_SRC(source.get()), buffer);
+    return [source](const Bytes& packets) {
+        gst_app_src_push_buffer(GST_APP_SRC(source.get()),
+                                gst_buffer_new_memdup(packets.data(), packets.size()));
     };
 }
 

@@ -31,7 +31,7 @@ public:
     bool start(Picture& picture, Picture::Token token, std::string& error);
 
     // Takes packets of the service and its tables. Any thread, also while the tuner ends and later.
-    std::function<void(Bytes packets)> feed() const;
+    std::function<void(const Bytes& packets)> feed() const;
 
     // What is presented; it may be chosen before the stream shows up. None is silence, no picture, no
     // subtitles.
