@@ -85,6 +85,7 @@ public:
     bool seek(uint32_t milliseconds);
     // Backward is negative; never 0.
     bool setSpeed(double speed);
+    double speed() const { return m_speed; }
     // Plays from the start once more. False if the media cannot be wound back.
     bool repeat();
 
@@ -125,6 +126,7 @@ private:
     bool m_isPaused = false; // by wish, not by want of media
     bool m_isHeld = false;   // by want of media
     bool m_hasSound = true;
+    std::optional<int> m_subtitle;
     double m_speed = 1;
     double m_volume = 1;
     std::optional<uint32_t> m_goal;    // of a seek that waits

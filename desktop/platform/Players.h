@@ -153,6 +153,7 @@ private:
     static void forgetMedia(Entry& entry);
     uint32_t bufferedOf(const Entry& entry) const;
     TELIX_JS_AV_HANDLE addresseeLocked() const;
+    std::shared_ptr<Callbacks> callbacksOf(TELIX_JS_AV_HANDLE player) const;
     TELIX_JS_AVCOMPHANDLE internLocked(const Component& component);
     std::vector<TELIX_JS_AVCOMPHANDLE> ofKindLocked(const Entry& entry, TELIX_JS_AVCOMPTYPE type,
                                                     bool activeOnly) const;
@@ -176,6 +177,7 @@ private:
 
     // Under the platform's mutex.
     std::map<TELIX_JS_AV_HANDLE, Entry> m_entries;
+    std::deque<TELIX_JS_AV_PLAY_INFO> m_records; // kept, also of players that have ended
     TELIX_JS_AV_HANDLE m_lastHandle = 0;
     TELIX_JS_AV_HANDLE m_owner = 0; // the player that has the pipeline, or will
     TELIX_JS_AV_HANDLE m_lastPlayed = 0;
