@@ -19,6 +19,17 @@ struct Repeated {
     static void destroy(gpointer data) { delete static_cast<Repeated*>(data); }
 };
 
+// Makes GStreamer's own source the first choice for media over HTTP. The browser engine shares the process,
+// and when it starts with media of its own it registers a source with a rank of 100 above the ordinary one,
+// which works only for it.
+void preferOwnHttpSource() {
+    GstPluginFeature* source = gst_registry_lookup_feature(gst_registry_get(), "souphttpsrc");
+    if (source) {
+        gst_plugin_feature_set_rank(source, GST_RANK_PRIMARY + 200);
+        gst_object_unref(source);
+    }
+}
+
 } // namespace
 
 Platform& Platform::instance() {
@@ -39,6 +50,8 @@ void Platform::run() {
         std::fprintf(stderr, "libtelix: no pictures and no sound: %s\n",
                      error ? error->message : "GStreamer");
         g_clear_error(&error);
+    } else {
+        preferOwnHttpSource();
     }
     {
         std::lock_guard<std::mutex> lock(m_startMutex);
