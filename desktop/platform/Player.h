@@ -102,6 +102,8 @@ public:
 private:
     static gboolean onMessage(GstBus* bus, GstMessage* message, gpointer player);
     static void onSource(GstElement* playbin, GstElement* source, gpointer player);
+    static void onElement(GstElement* playbin, GstElement* element, gpointer player);
+    static void onStore(GObject* store, GParamSpec* property, gpointer data);
     void handle(GstMessage* message);
     void handleError(GstMessage* message);
     void fail(TELIX_AV_CB_MSG message, const std::string& reason);
@@ -111,6 +113,7 @@ private:
     bool applySeek(double speed, uint32_t milliseconds);
     void applyState();
     void applySound();
+    void applySubtitle();
     bool usesStore() const;
     void readBuffering(Progress& progress);
 
@@ -126,7 +129,6 @@ private:
     bool m_isPaused = false; // by wish, not by want of media
     bool m_isHeld = false;   // by want of media
     bool m_hasSound = true;
-    std::optional<int> m_subtitle;
     double m_speed = 1;
     double m_volume = 1;
     std::optional<uint32_t> m_goal;    // of a seek that waits
@@ -134,7 +136,10 @@ private:
     GstState m_state = GST_STATE_NULL; // that was asked for
     uint32_t m_position = 0;
     uint32_t m_duration = 0;
-    std::atomic<bool> m_hasData{false}; // the source has given something; written on GStreamer's thread
+
+    // These are shared with GStreamer's threads.
+    std::atomic<bool> m_showsSubtitle{false};
+    std::atomic<bool> m_hasData{false}; // the source has given something
 };
 
 } // namespace desktop
