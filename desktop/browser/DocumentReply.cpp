@@ -11,21 +11,25 @@ const char knownType[] = "application/xhtml+xml";
 
 // The value of the header with the type changed; what follows the type, as the character set, stays.
 QByteArray inKnownTerms(const QByteArray& contentType) {
-    const int end = contentType.indexOf(';');
-    const QByteArray type = contentType.left(end).trimmed().toLower();
-    if (type != televisionType)
+    const int separator = contentType.indexOf(';');
+    const int end = separator < 0 ? contentType.size() : separator;
+    if (contentType.left(end).trimmed().toLower() != televisionType)
         return contentType;
-    return end < 0 ? QByteArray(knownType) : knownType + contentType.mid(end);
+    return knownType + contentType.mid(end);
 }
 
-// The type of what has none of its own: files have names instead.
-QByteArray typeByName(const QUrl& url) {
-    const QString ending = url.isLocalFile() ? QFileInfo(url.toLocalFile()).suffix() : QString();
-    return ending.compare(QLatin1String("hbbtv"), Qt::CaseInsensitive) == 0 ? QByteArray(knownType)
-                                                                            : QByteArray();
+// Files have no type but their names.
+bool isTelevisionFile(const QUrl& url) {
+    return url.isLocalFile() &&
+           QFileInfo(url.toLocalFile()).suffix().compare(QLatin1String("hbbtv"), Qt::CaseInsensitive) == 0;
 }
 
 } // namespace
+
+bool DocumentReply::isNeededFor(const QNetworkRequest& request) {
+    // The engine asks a server so for what goes into a window or a frame, and for nothing else.
+    return request.rawHeader("Accept").contains(knownType) || isTelevisionFile(request.url());
+}
 
 DocumentReply::DocumentReply(QNetworkReply* reply, QObject* parent) : QNetworkReply(parent), m_reply(reply) {
     reply->setParent(this);
@@ -81,9 +85,8 @@ void DocumentReply::takeHead() {
         const bool isType = header.first.compare("content-type", Qt::CaseInsensitive) == 0;
         setRawHeader(header.first, isType ? inKnownTerms(header.second) : header.second);
     }
-    const QByteArray type = hasRawHeader("Content-Type") ? QByteArray() : typeByName(url());
-    if (!type.isEmpty())
-        setRawHeader("Content-Type", type);
+    if (isTelevisionFile(url()))
+        setRawHeader("Content-Type", knownType);
 }
 
 void DocumentReply::onFinished() {

@@ -10,6 +10,9 @@ class DocumentReply : public QNetworkReply {
     Q_OBJECT
 
 public:
+    // Whether the reply to the request may be a document.
+    static bool isNeededFor(const QNetworkRequest& request);
+
     // Owns `reply`.
     DocumentReply(QNetworkReply* reply, QObject* parent);
 

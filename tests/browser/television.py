@@ -1,6 +1,7 @@
 """A virtual display and telix-tv on it, for the tests."""
 
 import contextlib
+import ctypes
 import json
 import os
 import shutil
@@ -8,12 +9,26 @@ import signal
 import struct
 import subprocess
 import tempfile
+import time
 import zlib
 
 # Seconds that a run of telix-tv, and a whole test program, may last before they are taken for hung. CTest's own limit
 # is longer: it would leave display and browser behind.
 RUN_LIMIT = 120
 PROGRAM_LIMIT = 270
+
+# The display as its user has it: the mouse, and what is on the screen. The library comes with Qt.
+X11 = ctypes.CDLL('libX11.so.6')
+X11.XOpenDisplay.restype = X11.XGetImage.restype = ctypes.c_void_p
+X11.XDefaultRootWindow.restype = X11.XGetPixel.restype = ctypes.c_ulong
+X11.XDefaultRootWindow.argtypes = X11.XCloseDisplay.argtypes = X11.XDestroyImage.argtypes = [ctypes.c_void_p]
+X11.XSync.argtypes = [ctypes.c_void_p, ctypes.c_int]
+X11.XWarpPointer.argtypes = [ctypes.c_void_p, ctypes.c_ulong, ctypes.c_ulong] + 2 * [ctypes.c_int] + \
+    2 * [ctypes.c_uint] + 2 * [ctypes.c_int]
+X11.XGetImage.argtypes = [ctypes.c_void_p, ctypes.c_ulong] + 2 * [ctypes.c_int] + 2 * [ctypes.c_uint] + \
+    [ctypes.c_ulong, ctypes.c_int]
+X11.XGetPixel.argtypes = [ctypes.c_void_p, ctypes.c_int, ctypes.c_int]
+ZPIXMAP = 2
 
 
 def give_up(*_):
@@ -30,6 +45,7 @@ class Television:
 
     def __init__(self, browser, width=1920, height=1080):
         self._browser = browser
+        self._connection = None
         self._folder = tempfile.mkdtemp(prefix='telix-tv-test-')
         receiver, sender = os.pipe()
         self._server = subprocess.Popen(
@@ -48,6 +64,8 @@ class Television:
                                 LC_ALL='C.UTF-8')
 
     def close(self):
+        if self._connection:
+            X11.XCloseDisplay(self._connection)
         self._server.terminate()
         self._server.wait()
         shutil.rmtree(self._folder)
@@ -61,6 +79,33 @@ class Television:
     def leftovers(self):
         """What runs of telix-tv have left in the folder for temporary files."""
         return os.listdir(self._folder)
+
+    def point_at(self, x, y):
+        """Moves the mouse."""
+        display = self._display()
+        X11.XWarpPointer(display, 0, X11.XDefaultRootWindow(display), 0, 0, 0, 0, x, y)
+        X11.XSync(display, 0)
+
+    def shows(self, place, colour):
+        """Whether the screen has that colour there now or within ten seconds."""
+        end = time.monotonic() + 10
+        while self._colour_on_screen(*place) != colour:
+            if time.monotonic() > end:
+                return False
+            time.sleep(0.02)
+        return True
+
+    def _colour_on_screen(self, x, y):
+        display = self._display()
+        image = X11.XGetImage(display, X11.XDefaultRootWindow(display), x, y, 1, 1, ctypes.c_ulong(-1), ZPIXMAP)
+        pixel = X11.XGetPixel(image, 0, 0)
+        X11.XDestroyImage(image)
+        return pixel >> 16 & 255, pixel >> 8 & 255, pixel & 255
+
+    def _display(self):
+        if not self._connection:
+            self._connection = X11.XOpenDisplay(self.environment['DISPLAY'].encode())
+        return self._connection
 
     def start(self, *arguments, environment=None):
         return subprocess.Popen([self._browser, *map(str, arguments)],

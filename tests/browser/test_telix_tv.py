@@ -7,6 +7,7 @@ import shutil
 import signal
 import threading
 import unittest
+import urllib.parse
 
 from television import Picture, Television, temporary_folder
 
@@ -14,6 +15,8 @@ PAGES = os.path.join(os.path.dirname(os.path.abspath(__file__)), 'pages')
 PLUGIN = os.environ['TELIX_PLUGIN']
 STRANGER = os.environ['TELIX_STRANGER']
 BLACK, GREEN, BLUE = (0, 0, 0), (0, 128, 0), (0, 0, 255)
+# What HbbTV 1.1.1 has a set say of itself: options, maker, model, software, hardware, one field that is kept free.
+AGENT_TOKEN = r'HbbTV/1\.1\.1 \([^;()]*;[^;()]*;[^;()]*;[^;()]*;[^;()]*;[^;()]*\)'
 
 # Every key of the remote control with the code that a page sees.
 KEY_CODES = {
@@ -55,9 +58,10 @@ class TelixTv(unittest.TestCase):
         self.assertEqual(run.status, 0, run)
         return run.value
 
-    def picture(self, *arguments):
+    def picture(self, *arguments, size='64x36'):
+        """A screenshot: small, for it is read pixel by pixel. At 64x36 one pixel of it shows 20x20 of the page."""
         file_name = os.path.join(self.folder, 'picture.png')
-        run = self.run_tv('--size', '64x36', '--screenshot', file_name, *arguments)
+        run = self.run_tv('--size', size, '--screenshot', file_name, *arguments)
         self.assertEqual(run.status, 0, run)
         return Picture(file_name)
 
@@ -74,8 +78,8 @@ class CommandLine(TelixTv):
     def test_help_names_every_option(self):
         run = self.television.run('--help', environment={'DISPLAY': ''})
         self.assertEqual((run.status, run.errors), (0, ''), run)
-        for option in ('size', 'fullscreen', 'plugin', 'screenshot', 'wait-for', 'timeout', 'eval', 'keys', 'inspect',
-                       'help', 'version'):
+        for option in ('size', 'fullscreen', 'plugin', 'screenshot', 'wait-for', 'wait-for-picture', 'timeout', 'eval',
+                       'keys', 'user-agent', 'inspect', 'help', 'version'):
             self.assertIn(f'--{option}', run.output)
 
     def test_help_names_every_key(self):
@@ -113,7 +117,7 @@ class CommandLine(TelixTv):
             self.assert_refused(self.run_tv(f'--keys={keys}', shipped('first.html')), 'key', f'"{unknown}"')
 
     def test_an_empty_expression_or_file_name_is_refused(self):
-        for option in ('--wait-for', '--eval', '--screenshot', '--plugin'):
+        for option in ('--wait-for', '--eval', '--screenshot', '--plugin', '--user-agent'):
             self.assert_refused(self.run_tv(f'{option}=', shipped('first.html')), option)
 
     def test_no_display_is_refused(self):
@@ -124,26 +128,59 @@ class CommandLine(TelixTv):
         run = self.run_tv(shipped('first.html'), environment={'QT_NO_GLIB': '1'})
         self.assert_refused(run, 'GLib')
 
-    def test_the_size_is_that_of_the_page(self):
-        self.assertEqual(self.value(shipped('first.html'), '--eval', '[innerWidth, innerHeight]'), [1280, 720])
-        self.assertEqual(self.value(shipped('first.html'), '--size', '640x360', '--eval', '[innerWidth, innerHeight]'),
-                         [640, 360])
+    def test_a_user_agent_of_several_lines_is_refused(self):
+        self.assert_refused(self.run_tv('--user-agent', 'one\r\nCookie: two', shipped('first.html')), 'user agent')
+
+    def test_the_size_is_that_of_the_window(self):
+        for size in ((1280, 720), (333, 444)):
+            file_name = os.path.join(self.folder, 'picture.png')
+            run = self.run_tv('--size', f'{size[0]}x{size[1]}', '--screenshot', file_name, shipped('first.html'))
+            self.assertEqual(run.status, 0, run)
+            picture = Picture(file_name)
+            self.assertEqual((picture.width, picture.height), size)
+
+    def test_the_page_has_its_size_in_every_window(self):
+        page = self.write('<body style="margin: 0"><div id="box" style="width: 33.3%; height: 7px; font-size: 17px">'
+                          '<span id="text">How wide this is depends on the letters</span></div>')
+        layout = ('[innerWidth, innerHeight, document.documentElement.clientWidth, box.getBoundingClientRect(),'
+                  ' text.getBoundingClientRect()]')
+        original = self.value(page, '--eval', layout)
+        self.assertEqual(original[:3], [1280, 720, 1280])
+        for options in (('--size', '640x360'), ('--size', '1111x333'), ('--size', '1x1'), ('--fullscreen',)):
+            self.assertEqual(self.value(page, *options, '--eval', layout), original, options)
 
     def test_the_full_screen_shows_the_same_page_larger(self):
         file_name = os.path.join(self.folder, 'picture.png')
-        self.assertEqual(self.value(shipped('first.html'), '--fullscreen', '--eval', '[innerWidth, innerHeight]',
-                                    '--screenshot', file_name), [1280, 720])
+        page = self.write('<body style="margin: 0; background: rgb(0, 0, 255)">'
+                          '<div style="width: 640px; height: 360px; background: rgb(0, 128, 0)">')
+        run = self.run_tv(page, '--fullscreen', '--screenshot', file_name)
+        self.assertEqual(run.status, 0, run)
         picture = Picture(file_name)
         self.assertEqual((picture.width, picture.height), (1920, 1080))
-        self.assertEqual(picture.colours(), {bytes(GREEN)})
+        self.assertEqual([picture.colour(x, y) for x, y in ((0, 0), (959, 539), (960, 539), (959, 540), (1919, 1079))],
+                         [GREEN, GREEN, BLUE, BLUE, BLUE])
 
-    def test_a_full_screen_of_another_shape_keeps_the_shape_of_the_page(self):
-        file_name = os.path.join(self.folder, 'picture.png')
-        self.assertEqual(self.run_tv(shipped('first.html'), '--fullscreen', '--size', '540x540',
-                                     '--screenshot', file_name).status, 0)
-        picture = Picture(file_name)
-        self.assertEqual([picture.colour(x, 540) for x in (0, 419, 420, 1499, 1500, 1919)],
+    def test_a_window_of_another_shape_keeps_the_shape_of_the_page(self):
+        wide = self.picture(shipped('first.html'), size='256x90')
+        self.assertEqual([wide.colour(x, 45) for x in (0, 47, 48, 207, 208, 255)],
                          [BLACK, BLACK, GREEN, GREEN, BLACK, BLACK])
+        high = self.picture(shipped('first.html'), size='160x120')
+        self.assertEqual([high.colour(80, y) for y in (0, 14, 15, 104, 105, 119)],
+                         [BLACK, BLACK, GREEN, GREEN, BLACK, BLACK])
+
+    def test_the_mouse_points_at_what_is_shown_there(self):
+        page = self.write('<script>onmousemove = function (event) { console.log(event.clientX + " " + event.clientY); };'
+                          'onload = function () { console.log("ready"); }</script>')
+        with self.television.start('--plugin', PLUGIN, '--fullscreen', page) as process:
+            self.assertIn('ready', process.stderr.readline())
+            # The window may not be on the screen yet when the first movement comes.
+            while True:
+                self.television.point_at(300, 600)
+                self.television.point_at(1500, 750)
+                if any(process.stderr.readline().endswith(' 1000 500\n') for _ in range(2)):
+                    break
+            process.send_signal(signal.SIGTERM)
+            process.communicate(timeout=60)
 
     def test_the_inspector_opens_beside_the_page(self):
         self.assertEqual(self.value(shipped('first.html'), '--inspect', '--eval', 'document.title'), 'first')
@@ -177,15 +214,23 @@ class CommandLine(TelixTv):
 
 
 class Server(http.server.BaseHTTPRequestHandler):
-    """A page at /page, an error at /error, no answer in time at /silence."""
+    """A page at /page, an error at /error, no answer in time at /silence, and at /as/TYPE, with any type, what the server's
+    `document` holds. Keeps what its clients say that they are."""
 
     def do_GET(self):  # pylint: disable=invalid-name
+        self.server.agents.append(self.headers['User-Agent'])
+        if self.path.startswith('/as/'):
+            self.send_response(200)
+            self.send_header('Content-Type', urllib.parse.unquote(self.path[len('/as/'):]))
+            self.end_headers()
+            self.wfile.write(self.server.document)
+            return
         if self.path == '/silence':
             self.server.over.wait()
             return
         if self.path == '/elsewhere':
             self.send_response(302)
-            self.send_header('Location', '/page')
+            self.send_header('Location', self.server.elsewhere)
             self.end_headers()
             return
         self.send_response(200 if self.path == '/page' else 404)
@@ -198,17 +243,27 @@ class Server(http.server.BaseHTTPRequestHandler):
 
 
 @contextlib.contextmanager
-def server():
+def running_server(document=b'', elsewhere='/page'):
     with http.server.ThreadingHTTPServer(('127.0.0.1', 0), Server) as running:
         running.over = threading.Event()
+        running.agents = []
+        running.document = document
+        running.elsewhere = elsewhere
+        running.address = f'http://127.0.0.1:{running.server_port}'
         thread = threading.Thread(target=running.serve_forever)
         thread.start()
         try:
-            yield f'http://127.0.0.1:{running.server_port}'
+            yield running
         finally:
             running.over.set()
             running.shutdown()
             thread.join()
+
+
+@contextlib.contextmanager
+def server():
+    with running_server() as running:
+        yield running.address
 
 
 class Pages(TelixTv):
@@ -352,6 +407,78 @@ class Pages(TelixTv):
     def test_nothing_is_left_behind(self):
         self.value(shipped('first.html'), '--eval', '1')
         self.assertEqual(self.television.leftovers(), [])
+
+
+class Documents(TelixTv):
+    """Pages as television services send them."""
+
+    TYPE = 'application/vnd.hbbtv.xhtml+xml'
+    # Names keep their case in XHTML alone, and an element that is closed at once holds nothing of what follows.
+    DOCUMENT = ('<?xml version="1.0" encoding="utf-8"?>\n'
+                '<!DOCTYPE html PUBLIC "-//HbbTV//1.1.1//EN" "http://www.hbbtv.org/dtd/HbbTV-1.1.1.dtd">\n'
+                '<html xmlns="http://www.w3.org/1999/xhtml"><head><title>tele\u00e9</title></head>'
+                '<body><div id="empty"/><p>text</p></body></html>').encode()
+    FACTS = '[document.title, document.body.tagName, document.getElementById("empty").childNodes.length]'
+    XHTML = ['tele\u00e9', 'body', 0]
+
+    def test_a_television_document_of_a_server_is_xhtml(self):
+        with running_server(self.DOCUMENT) as running:
+            for kind in (self.TYPE, self.TYPE + ';charset=utf-8', 'Application/VND.HbbTV.XHTML+XML ; charset="utf-8"',
+                         'application/xhtml+xml'):
+                self.assertEqual(self.value(f'{running.address}/as/{urllib.parse.quote(kind)}', '--eval', self.FACTS),
+                                 self.XHTML, kind)
+
+    def test_the_character_set_that_the_server_names_stays(self):
+        document = self.DOCUMENT.replace(b' encoding="utf-8"', b'').decode().encode('latin-1')
+        with running_server(document) as running:
+            kind = urllib.parse.quote(self.TYPE + ';charset=iso-8859-1')
+            self.assertEqual(self.value(f'{running.address}/as/{kind}', '--eval', self.FACTS), self.XHTML)
+
+    def test_other_types_stay_what_they_are(self):
+        with running_server(self.DOCUMENT) as running:
+            self.assertEqual(self.value(f'{running.address}/as/text/html', '--eval', self.FACTS), ['tele\u00e9', 'BODY', 1])
+
+    def test_a_television_document_that_is_far_from_the_first_packet_is_whole(self):
+        filling = b'<!-- ' + 64 * b'x' + b' -->\n'
+        long = self.DOCUMENT.replace(b'<p>', 20000 * filling + b'<p>')
+        with running_server(long) as running:
+            self.assertEqual(self.value(f'{running.address}/as/{self.TYPE}', '--eval',
+                                        'document.querySelector("p").textContent'), 'text')
+
+    def test_a_television_document_is_found_behind_a_redirection_in_a_frame_and_as_an_application(self):
+        with running_server(self.DOCUMENT, elsewhere='/as/' + self.TYPE) as running:
+            self.assertEqual(self.value(running.address + '/elsewhere', '--eval', self.FACTS), self.XHTML)
+            frame = self.write(f'<iframe src="{running.address}/as/{self.TYPE}"></iframe><script>onload = function () {{'
+                               ' loaded = true; }</script>')
+            run = self.run_tv(frame, '--eval', 'loaded')
+            self.assertEqual((run.status, run.errors), (0, ''), run)
+            page = self.write(f'<script>onload = function () {{ createHbbTVApplication("{running.address}/as/{self.TYPE}");'
+                              ' }</script>')
+            self.assertEqual(self.value(page, '--wait-for', 'document.getElementById("empty")', '--eval', self.FACTS),
+                             self.XHTML)
+
+    def test_a_television_document_that_is_not_well_formed_says_so(self):
+        with running_server(self.DOCUMENT.replace(b'</p>', b'')) as running:
+            self.assertIn('error', self.value(f'{running.address}/as/{self.TYPE}', '--eval',
+                                              'document.documentElement.textContent'))
+
+    def test_files_are_xhtml_by_their_names(self):
+        for name in ('page.xhtml', 'page.hbbtv', 'PAGE.HBBTV'):
+            page = self.write(self.DOCUMENT, name)
+            self.assertEqual(self.value(page, '--eval', self.FACTS), self.XHTML, name)
+
+    def test_servers_and_pages_are_told_that_this_is_a_television(self):
+        with running_server() as running:
+            agent = self.value(running.address + '/page', '--eval', 'navigator.userAgent')
+        self.assertRegex(agent, f' {AGENT_TOKEN}$')
+        self.assertEqual(agent.count('HbbTV'), 1)
+        self.assertEqual(set(running.agents), {agent})
+
+    def test_the_user_agent_of_the_command_line_replaces_all_of_it(self):
+        with running_server() as running:
+            self.assertEqual(self.value(running.address + '/page', '--user-agent', 'My set/2 (a; b)', '--eval',
+                                        'navigator.userAgent'), 'My set/2 (a; b)')
+        self.assertEqual(set(running.agents), {'My set/2 (a; b)'})
 
 
 class Plugins(TelixTv):
@@ -546,7 +673,7 @@ class Applications(TelixTv):
 class Screen(TelixTv):
     def test_the_screen_is_black_where_the_page_is_transparent(self):
         page = self.write('<body style="margin: 0; background: transparent">'
-                          '<div style="width: 32px; height: 36px; background: rgb(0, 0, 255)">')
+                          '<div style="width: 640px; height: 720px; background: rgb(0, 0, 255)">')
         picture = self.picture(page)
         self.assertEqual([picture.colour(x, 18) for x in (0, 31, 32, 63)], [BLUE, BLUE, BLACK, BLACK])
 
@@ -560,23 +687,162 @@ class Screen(TelixTv):
         for element in ('<object type="application/oipfapplicationmanager" style="{}"></object>',
                         '<object type="Application/OIPFApplicationManager" style="{}"></object>',
                         '<embed type="application/oipfapplicationmanager" style="{}">'):
-            style = 'display: block; opacity: 1; width: 64px; height: 36px'
+            style = 'display: block; opacity: 1; width: 1280px; height: 720px'
             page = self.write('<body style="margin: 0; background: transparent">' + element.format(style))
             self.assertEqual(self.picture(page).colours(), {bytes(BLACK)}, element)
 
     def test_an_object_of_the_plug_in_is_transparent_in_an_xml_page_as_well(self):
         page = self.write('<html xmlns="http://www.w3.org/1999/xhtml"><body style="margin: 0">'
-                          '<object type="Application/OIPFApplicationManager" style="width: 64px; height: 36px"/>'
+                          '<object type="Application/OIPFApplicationManager" style="width: 1280px; height: 720px"/>'
                           '</body></html>', 'page.xhtml')
         self.assertEqual(self.picture(page).colours(), {bytes(BLACK)})
 
     def test_there_are_no_scroll_bars(self):
-        page = self.write('<body style="margin: 0; background: rgb(0, 0, 255)"><div style="width: 999px; height: 999px">')
+        page = self.write('<body style="margin: 0; background: rgb(0, 0, 255)"><div style="width: 1999px; height: 1999px">')
         self.assertEqual(self.picture(page).colours(), {bytes(BLUE)})
 
     def test_a_screenshot_that_cannot_be_written_is_refused(self):
         run = self.run_tv(shipped('first.html'), '--screenshot', os.path.join(self.folder, 'missing', 'picture.png'))
         self.assert_refused(run, 'picture.png')
+
+    def test_layers_of_their_own_are_enlarged_and_reduced_like_the_page(self):
+        page = self.write('<body style="margin: 0; background: transparent"><div style="width: 320px; height: 180px;'
+                          ' background: rgb(0, 0, 255); -webkit-transform: translate3d(640px, 360px, 0)">')
+        picture = self.picture(page)
+        self.assertEqual([picture.colour(x, y) for x, y in ((33, 19), (46, 25), (30, 19), (49, 19), (33, 16), (33, 28))],
+                         [BLUE, BLUE, BLACK, BLACK, BLACK, BLACK])
+
+    def test_a_change_of_the_page_is_painted_wherever_it_is(self):
+        page = self.write('''<body style="margin: 0; background: rgb(0, 0, 255)">
+            <div id="box" style="position: absolute; left: 1200px; top: 640px; width: 80px; height: 80px"></div>
+            <script>setTimeout(function () { box.style.background = 'rgb(0, 128, 0)'; }, 200);
+            setTimeout(function () { changed = true; }, 400); onload = function () { console.log('ready'); };</script>''')
+        # What the window's pixels are, not what painting all of it anew would give.
+        for options, place in ((('--fullscreen',), (1860, 1020)), (('--size', '320x180'), (310, 170))):
+            with self.television.start('--plugin', PLUGIN, *options, page) as process:
+                self.assertIn('ready', process.stderr.readline())
+                self.assertTrue(self.television.shows(place, GREEN), options)
+                self.assertTrue(self.television.shows((place[0] // 2, place[1] // 2), BLUE), options)
+                process.send_signal(signal.SIGTERM)
+                process.communicate(timeout=60)
+
+
+class PictureBeneath(TelixTv):
+    """The picture of a platform library that shows a pattern of four quarters."""
+
+    RED, LIME, WHITE = (255, 0, 0), (0, 255, 0), (255, 255, 255)
+    PATTERN = [RED, LIME, BLUE, WHITE]
+
+    def page(self, style='left: 0; top: 0; width: 1280px; height: 720px', content='', shape='16, 9, 1', script=''):
+        return self.write('<body style="margin: 0"><object id="tv" type="video/broadcast" style="position: absolute; '
+                          f'{style}"></object>{content}<script>onload = function () {{ tv.offsetWidth;'
+                          f'tv.setChannelByTriplet({shape}); {script} }}</script>')
+
+    def shown(self, page, *arguments, **options):
+        picture = self.picture(page, '--wait-for-picture', *arguments, **options)
+        self.assertNotIn(bytes((0x12, 0x34, 0x56)), picture.colours(), 'what lies behind the lines of the frame is shown')
+        return picture
+
+    def quarters(self, picture, left, top, width, height):
+        """The colours in the middle of the quarters of a rectangle."""
+        return [picture.colour(left + x * width // 4, top + y * height // 4) for y in (1, 3) for x in (1, 3)]
+
+    def test_the_picture_fills_the_page(self):
+        picture = self.shown(self.page(), size='128x72')
+        self.assertEqual(self.quarters(picture, 0, 0, 128, 72), self.PATTERN)
+        self.assertEqual([picture.colour(x, y) for x, y in ((0, 0), (127, 0), (0, 71), (127, 71))], self.PATTERN)
+
+    def test_every_pixel_is_where_it_belongs(self):
+        picture = self.shown(self.page('left: 0; top: 0; width: 64px; height: 36px'), size='1280x720')
+        for x, y, colour in ((0, 0, self.RED), (31, 17, self.RED), (32, 17, self.LIME), (63, 0, self.LIME),
+                             (31, 18, BLUE), (0, 35, BLUE), (32, 18, self.WHITE), (63, 35, self.WHITE),
+                             (64, 0, BLACK), (0, 36, BLACK)):
+            self.assertEqual(picture.colour(x, y), colour, (x, y))
+
+    def test_the_picture_stands_where_the_element_is_in_every_window(self):
+        page = self.page('left: 640px; top: 180px; width: 320px; height: 180px')
+        for size, left, top, width, height in (('320x180', 160, 45, 80, 45), ('64x36', 32, 9, 16, 9),
+                                               ('320x220', 160, 65, 80, 45), ('400x180', 200, 45, 80, 45)):
+            picture = self.shown(page, size=size)
+            self.assertEqual(self.quarters(picture, left, top, width, height), self.PATTERN, size)
+            inside = {(left, top), (left + width - 1, top), (left, top + height - 1), (left + width - 1, top + height - 1)}
+            outside = {(left - 1, top), (left, top - 1), (left + width, top), (left, top + height)}
+            self.assertNotIn(BLACK, {picture.colour(*place) for place in inside}, size)
+            self.assertEqual({picture.colour(*place) for place in outside}, {BLACK}, size)
+
+    def test_full_screen_fills_the_page_wherever_the_element_is(self):
+        page = self.page('left: 900px; top: 500px; width: 32px; height: 18px', script='tv.setFullScreen(true)')
+        self.assertEqual(self.quarters(self.shown(page), 0, 0, 64, 36), self.PATTERN)
+
+    def test_a_picture_that_leaves_the_full_screen_is_back_at_its_place(self):
+        page = self.page('left: 640px; top: 360px; width: 640px; height: 360px',
+                         script='tv.setFullScreen(true); setTimeout(function () { tv.setFullScreen(false); }, 100);'
+                                'setTimeout(function () { isBack = true; }, 300)')
+        picture = self.shown(page, '--wait-for', 'window.isBack')
+        self.assertEqual(self.quarters(picture, 32, 18, 32, 18), self.PATTERN)
+        self.assertEqual(picture.colour(10, 10), BLACK)
+
+    def test_the_shape_of_the_frame_is_kept_with_black_bars(self):
+        narrow = self.shown(self.page(shape='4, 3, 1'))
+        self.assertEqual(self.quarters(narrow, 8, 0, 48, 36), self.PATTERN)
+        self.assertEqual([narrow.colour(x, 20) for x in (0, 7, 56, 63)], 4 * [BLACK])
+        self.assertNotIn(BLACK, [narrow.colour(x, 20) for x in (8, 55)])
+        wide = self.shown(self.page(shape='32, 9, 1'))
+        self.assertEqual(self.quarters(wide, 0, 9, 64, 18), self.PATTERN)
+        self.assertEqual([wide.colour(20, y) for y in (0, 8, 27, 35)], 4 * [BLACK])
+
+    def test_a_frame_without_a_shape_has_that_of_its_pixels(self):
+        self.assertEqual(self.quarters(self.shown(self.page(shape='0, 0, 1')), 0, 0, 64, 36), self.PATTERN)
+
+    def test_the_page_lies_above_the_picture(self):
+        page = self.page(content='<div style="position: absolute; left: 0; top: 0; width: 640px; height: 360px; background: '
+                                 'rgb(0, 128, 0)"></div><div style="position: absolute; left: 640px; top: 360px; '
+                                 'width: 640px; height: 360px; background: rgba(0, 0, 0, 0.5)"></div>')
+        upper_left, upper_right, lower_left, lower_right = self.quarters(self.shown(page), 0, 0, 64, 36)
+        self.assertEqual([upper_left, upper_right, lower_left], [GREEN, self.LIME, BLUE])
+        self.assertTrue(all(value in (127, 128) for value in lower_right), lower_right)
+
+    def test_a_page_with_a_background_hides_the_picture(self):
+        picture = self.shown(self.page(content='<style>body { background: rgb(0, 128, 0) }</style>'))
+        self.assertEqual(picture.colours(), {bytes(GREEN)})
+
+    def test_the_newest_frame_is_shown(self):
+        page = self.page(script='setTimeout(function () { tv.setChannelByTriplet(16, 9, 2); }, 100);'
+                                'setTimeout(function () { isNew = true; }, 300)')
+        picture = self.shown(page, '--wait-for', 'window.isNew')
+        self.assertEqual(self.quarters(picture, 0, 0, 64, 36),
+                         [tuple(255 - value for value in colour) for colour in self.PATTERN])
+
+    def test_without_a_picture_the_screen_is_black(self):
+        page = self.page(script='setTimeout(function () { tv.setChannelByTriplet(16, 9, 0); }, 100);'
+                                'setTimeout(function () { isGone = true; }, 300)')
+        self.assertEqual(self.picture(page, '--wait-for', 'window.isGone').colours(), {bytes(BLACK)})
+
+    def test_the_picture_is_there_without_an_application_and_beneath_a_hidden_one(self):
+        for command in ('destroyHbbTVApplication', 'hideHbbTVApplication'):
+            page = self.page(script=f'onkeydown = {command}')
+            self.assertEqual(self.quarters(self.shown(page, '--keys', 'red'), 0, 0, 64, 36), self.PATTERN, command)
+
+    def test_a_picture_that_never_comes_ends_in_time_with_a_screenshot(self):
+        file_name = os.path.join(self.folder, 'picture.png')
+        run = self.run_tv(self.page(shape='16, 9, 0'), '--size', '64x36', '--wait-for-picture', '--timeout', '0.5',
+                          '--screenshot', file_name)
+        self.assertEqual(run.status, 1, run)
+        self.assertIn('telix-tv: there is no picture within 0.5 s\n', run.errors)
+        self.assertEqual(Picture(file_name).colours(), {bytes(BLACK)})
+
+    def test_waiting_for_the_picture_alone_ends_the_program(self):
+        run = self.run_tv(self.page(), '--wait-for-picture')
+        self.assertEqual(run.status, 0, run)
+
+    def test_wake_ups_without_end_leave_the_page_its_time_and_end_with_the_window(self):
+        page = self.page(shape='16, 9, 3', script='ticks = 0; setInterval(function () { ticks += 1; }, 10)')
+        file_name = os.path.join(self.folder, 'picture.png')
+        run = self.run_tv(page, '--size', '64x36', '--wait-for', 'window.ticks > 30', '--screenshot', file_name)
+        self.assertEqual(run.status, 0, run)
+        self.assertEqual(self.quarters(Picture(file_name), 0, 0, 64, 36), self.PATTERN)
+        self.assertEqual([line for line in run.errors.splitlines() if line.startswith('picture: ')],
+                         ['picture: no wake-up any more', 'picture: 0 frames still out'])
 
 
 if __name__ == '__main__':
