@@ -33,6 +33,7 @@ var media = (function () {
     var video = null;
     var objectsMade = 0;
     var playing = null; // the clip that the object was made for
+    var shown = null; // the one whose title is shown
     var speed = 1; // what the set was told last
     var speedChanges = 0;
     var notice = '';
@@ -106,6 +107,12 @@ var media = (function () {
         var length = isPlaying ? video.playTime : 0;
         var playState = isPlaying ? video.playState : state.STOPPED;
         var clip = isPlaying ? presented() : null;
+        if (clip !== shown) {
+            // Also of the queue, whose clips begin without a change of state.
+            shown = clip;
+            notice = '';
+            wake();
+        }
         tv.say('media-title', clip ? clip.title : 'Choose a clip');
         tv.say('media-state', isPlaying ? describeState() : '');
         tv.byId('media-state').className = playState === state.ERROR ? 'error' : '';
@@ -122,8 +129,9 @@ var media = (function () {
     }
 
     function tell(text) {
-        notice = text;
         update();
+        notice = text;
+        tv.say('media-notice', notice);
     }
 
     // ---- Playing

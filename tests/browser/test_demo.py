@@ -451,6 +451,136 @@ class Device(Demonstration):
         self.assertNotIn('Remote control', device)
 
 
+# What the desk broadcasts: the programmes of the test multiplex by channel.
+PROGRAMMES = {'Telix One': ('Morning Patterns', 'The Colour Hour', 'News at the Minute'),
+              'Telix Two': ('Bars of the World', 'Night of the Test Card'),
+              'Telix Three': ('Gradients', 'Slow Colours', 'Fast Colours', 'Colours Live')}
+
+
+def columns(picture):
+    """The colour of most of some columns of a picture that fills the screen, where no sheet covers them."""
+    def middle(values):
+        return sorted(values)[len(values) // 2]
+    return [tuple(middle([picture.colour(x, y)[part] for y in range(130, 440)]) for part in range(3))
+            for x in (30, 680, 950, 1250)]
+
+
+def is_striped(picture):
+    """The pattern of the first channel, and of the first clip: stripes of full colours that stay in their places."""
+    wanted = ((255, 0, 0), (0, 0, 255), (255, 0, 255), (0, 255, 255))
+    return all(abs(part - other) < 60 for colour, stripe in zip(columns(picture), wanted)
+               for part, other in zip(colour, stripe))
+
+
+def has_bars(picture):
+    """The bars of the second channel wander; they are of three quarters of the full colours, or grey."""
+    return all(all(part < 30 or 160 < part < 230 for part in colour) or all(90 < part < 112 for part in colour)
+               for colour in columns(picture))
+
+
+def is_dark(picture):
+    """The third channel has clouds of dark colours."""
+    return all(20 < max(colour) < 150 for colour in columns(picture))
+
+
+class OnTheDesk(Demonstration):
+    """All of it with the desk's own platform library: pictures that are received and decoded, and media over HTTP."""
+    plugin = 'TELIX_DESK_PLUGIN'
+
+    @classmethod
+    def setUpClass(cls):
+        super().setUpClass()
+        server = MediaServer({'': os.path.join(ROOT, 'apps'), 'media': os.environ['TELIX_CLIPS']})
+        cls.addClassCleanup(server.close)
+        cls.page = server.address + '/demo/index.html'
+
+    def watch(self, name, *parts):
+        """Goes through the steps; gives the notes and the picture of the window."""
+        file_name = os.path.join(os.environ['TELIX_SCREENSHOTS'], f'demo-desk-{name}.png')
+        run = self.run_demo('--wait-for', steps(*parts), '--eval', 'notes', '--screenshot', file_name, page=self.page)
+        return run.value, Picture(file_name)
+
+    def assert_programmes(self, channel, now, following):
+        for programme in (now, following):
+            self.assertRegex(programme, r'^\d\d:\d\d.\d\d:\d\d (' + '|'.join(PROGRAMMES[channel]) + ')$')
+
+    def assert_seen(self, pattern, picture):
+        self.assertEqual([each for each in (is_striped, has_bars, is_dark) if each(picture)], [pattern], columns(picture))
+
+    received = shows('banner-next', '\u2013')  # with its times
+    programmes = tuple(Note(text(f'banner-{part}')) for part in ('name', 'now', 'next'))
+
+    def on_channel(self, name):
+        return f'{shows("banner-name", name)} && {self.received}'
+
+    def test_the_picture_of_each_channel_with_its_banner(self):
+        # The list, the arrow and the digit lead there.
+        ways = {'Telix One': (['3', self.on_channel('Telix Three'), 'left', 'down', 'ok'],
+                              is_striped),
+                'Telix Two': (['up'], has_bars), 'Telix Three': (['3'], is_dark)}
+        for channel, (keys, pattern) in ways.items():
+            with self.subTest(channel):
+                notes, picture = self.watch(channel.split()[1].lower(), self.received, *keys, self.on_channel(channel),
+                                            *self.programmes)
+                self.assertEqual(notes[0], channel)
+                self.assert_programmes(channel, *notes[1:])
+                self.assert_seen(pattern, picture)
+
+    def test_programmes_follow_the_broadcast(self):
+        # Programmes of four seconds: the one that is next becomes the one that is on.
+        notes, _ = self.watch('programmes', self.received, f'(window.next = {text("banner-next")}) !== ""',
+                              f'{text("banner-now")} === next', Note(text('banner-name')))
+        self.assertEqual(notes, ['Telix One'])
+
+    def test_sound_and_subtitles_of_each_channel(self):
+        notes, _ = self.watch(
+            'choice', self.received, 'green', 'down', 'ok', 'down', 'down', 'ok', Note(text('choice')), 'back',
+            '2', self.on_channel('Telix Two'), 'green', 'down', 'ok', Note(text('choice')))
+        self.assertEqual(notes, ['Sound German \u2713English Subtitles Off \u2713German English',
+                                 'Sound German \u2713German, audio description Subtitles \u2713Off German English'])
+
+    def test_a_stream_event_of_the_broadcast(self):
+        notes, picture = self.watch(
+            'announcement', self.received, shows('notice', 'Red button on Telix One'), 'red', Note(text('more')),
+            'back', '2', self.on_channel('Telix Two'), shows('notice', 'Red button on Telix Two'))
+        self.assertRegex(notes[0], '^Red button on Telix One Telix One .* A programme of Telix One. Next ')
+        self.assert_seen(has_bars, picture)
+
+    def test_a_clip_plays_and_broadcast_comes_back(self):
+        time = 'document.getElementById("media-time").textContent'
+        playing = ['yellow', 'ok', media_state('Playing')]
+        notes, picture = self.watch('clip', *playing, 'right', f'parseInt({time}.substr(2), 10) >= 6', Note(time))
+        self.assertRegex(notes[0], '^0:0[6-9] / 0:20$')
+        self.assert_seen(is_striped, picture)
+        notes, picture = self.watch(
+            'back', *playing, 'pause', media_state('Paused'), 'play', media_state('Playing'), 'fast-forward',
+            media_state('2\u00d7'), Note('(window.start = Date.now()) > 0'), f'parseInt({time}.substr(2), 10) >= 8',
+            Note('Date.now() - start'), 'back', is_hidden('media'), self.on_channel('Telix One'), 'left', 'back',
+            'up', self.on_channel('Telix Two'))
+        # Some seven seconds of the clip at twice the speed.
+        self.assertLess(notes[1], 6000)
+        self.assert_seen(has_bars, picture)
+
+    def test_other_media(self):
+        notes, _ = self.watch(
+            'media', 'yellow', 'down', 'down', 'ok', media_state('Playing'), 'green', 'down', 'ok',
+            Note(text('choice-audio')), 'back', 'down', 'ok', shows('media-title', 'A tune'), media_state('Playing'),
+            'down', 'ok', shows('media-title', 'Adaptive'), media_state('Playing'), 'down', 'ok',
+            shows('media-track', 'Track 1 of 2'), media_state('Playing'), 'blue', shows('media-track', 'Track 2 of 2'),
+            media_state('Playing'), media_state('Finished'))
+        self.assertEqual(notes, ['German \u2713English'])
+
+    def test_a_queued_clip_follows(self):
+        self.watch('queue', 'yellow', 'down', 'ok', media_state('Playing'), 'up', 'yellow',
+                   shows('media-notice', 'Next: Running clock'), shows('media-title', 'Running clock'),
+                   media_state('Playing'))
+
+    def test_each_kind_of_error_has_its_words(self):
+        self.watch('errors', 'yellow', *['up'] * 3, 'ok', media_state('The content is not available.'), 'down', 'ok',
+                   media_state('The connection failed.'), 'down', 'ok', media_state('The set cannot play this format.'),
+                   'down', 'ok', media_state('Playing'))
+
+
 class Look(Demonstration):
     """Everything is in the safe area, whole, and large enough to be read from afar, on every page."""
 
