@@ -42,7 +42,8 @@ var choice = (function () {
         var active = toArray(object.getCurrentActiveComponents(section.type));
         var activeOnes = active.map(identity);
         var made = toArray(object.getComponents(section.type)).map(function (component) {
-            return { section: section, text: describe(component), isActive: activeOnes.indexOf(identity(component)) >= 0,
+            return { section: section, text: describe(component),
+                     isActive: activeOnes.indexOf(identity(component)) >= 0,
                      choose: function () { object.selectComponent(component); } };
         });
         if (section.off && made.length > 0) {

@@ -6,8 +6,8 @@
 var keys = (function () {
     'use strict';
 
-    // The browser says which codes the keys have; the numbers stand for one that does not. Channel keys step through the
-    // channels as the arrows do.
+    // The browser says which codes the keys have; the numbers stand for one that does not. Channel keys step through
+    // the channels as the arrows do.
     var codes = [['VK_UP', 38, 'up'], ['VK_DOWN', 40, 'down'], ['VK_LEFT', 37, 'left'], ['VK_RIGHT', 39, 'right'],
                  ['VK_ENTER', 13, 'ok'], ['VK_BACK', 461, 'back'], ['VK_INFO', 457, 'info'], ['VK_RED', 403, 'red'],
                  ['VK_GREEN', 404, 'green'], ['VK_YELLOW', 405, 'yellow'], ['VK_BLUE', 406, 'blue'],

@@ -37,7 +37,8 @@
         }
         // Nothing to zap through, but the other pages have something to tell all the same.
         if (television.isThere()) {
-            showMessage('No television here', 'The set has no channels: its platform library is missing, or has no tuner.');
+            showMessage('No television here',
+                        'The set has no channels: its platform library is missing, or has no tuner.');
         } else {
             showMessage('The plug-in is missing', 'This page has an object of type video/broadcast, and the browser ' +
                                                   'knows nothing that handles it.');

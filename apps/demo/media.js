@@ -15,7 +15,8 @@ var media = (function () {
                       'The set could not play it, and does not say why.', 'The set has not enough resources.',
                       'The content is damaged.', 'The content is not available.', 'The content is not available now.'];
 
-    // A playlist starts by itself when it has been read. The type is that of the element: the set takes it for a promise.
+    // A playlist starts by itself when it has been read. The type is that of the element: the set takes it for a
+    // promise.
     var clips = [
         { title: 'Running clock', detail: 'MP4', type: 'video/mp4', url: 'clip.mp4' },
         { title: 'Second clip', detail: 'MP4', type: 'video/mp4', url: 'second.mp4' },
@@ -25,7 +26,8 @@ var media = (function () {
         { title: 'Playlist of two clips', detail: 'ASX', type: 'video/mp4', url: 'playlist.asx', isPlaylist: true },
         { title: 'A clip that is not there', detail: 'MP4', type: 'video/mp4', url: 'absent.mp4' },
         // Port 9 is for discarding what comes, and nowadays nobody listens on it.
-        { title: 'A server that is switched off', detail: 'MP4', type: 'video/mp4', url: 'http://127.0.0.1:9/clip.mp4' },
+        { title: 'A server that is switched off', detail: 'MP4', type: 'video/mp4',
+          url: 'http://127.0.0.1:9/clip.mp4' },
         { title: 'A page, which is no clip', detail: 'HTML', type: 'video/mp4', url: '../demo/index.html' }
     ];
 
@@ -121,7 +123,8 @@ var media = (function () {
         tv.byId('media-played').style.width = (length > 0 ? Math.min(100, position / length * 100) : 0) + '%';
         tv.say('media-notice', notice);
         // The picture is beneath: the ground covers it where there is none to be seen.
-        var hasPicture = isPlaying && !clip.isAudio && [state.PLAYING, state.PAUSED, state.BUFFERING].indexOf(playState) >= 0;
+        var hasPicture = isPlaying && !clip.isAudio &&
+                         [state.PLAYING, state.PAUSED, state.BUFFERING].indexOf(playState) >= 0;
         tv.setVisible('ground', !hasPicture);
         if (playState !== state.PLAYING) {
             tv.byId('media').className = '';

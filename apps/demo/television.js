@@ -51,8 +51,8 @@ var television = (function () {
         former = [];
     }
 
-    // An object keeps the lists of components that it has once handed out, also on another channel. So every channel gets
-    // an object of its own.
+    // An object keeps the lists of components that it has once handed out, also on another channel. So every channel
+    // gets an object of its own.
     function renew() {
         if (object) {
             ['onChannelChangeSucceeded', 'onChannelChangeError', 'onPlayStateChange', 'onProgrammesChanged',
@@ -171,8 +171,8 @@ var television = (function () {
                  rating: copyRating(programme.parentalRating) };
     }
 
-    // The programmes too are kept by an object that has once handed them out. One that is made for the moment has those of
-    // now.
+    // The programmes too are kept by an object that has once handed them out. One that is made for the moment has those
+    // of now.
     function readProgrammes() {
         if (!state.isTuned) {
             return;

@@ -125,7 +125,7 @@ var tv = (function () {
     }
 
     return { byId: byId, element: element, fill: fill, say: say, setVisible: setVisible, isVisible: isVisible,
-             table: table, linesAround: linesAround, timeOfDay: timeOfDay, duration: duration, languageName: languageName,
-             describe: describe, describeApplication: describeApplication, ownerApplication: ownerApplication,
-             onKeys: onKeys, makeObject: makeObject, removeObject: removeObject };
+             table: table, linesAround: linesAround, timeOfDay: timeOfDay, duration: duration,
+             languageName: languageName, describe: describe, describeApplication: describeApplication,
+             ownerApplication: ownerApplication, onKeys: onKeys, makeObject: makeObject, removeObject: removeObject };
 }());

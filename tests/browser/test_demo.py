@@ -50,8 +50,8 @@ class Note:
 
 
 def steps(*parts):
-    """An expression to wait for: it goes through names of keys, which are pressed, conditions, which are waited for, and
-    notes, and is true at the end. The value of `notes` is then what was noted."""
+    """An expression to wait for: it goes through names of keys, which are pressed, conditions, which are waited for,
+    and notes, and is true at the end. The value of `notes` is then what was noted."""
     actions = []
     for part in parts:
         if isinstance(part, Note):
@@ -124,7 +124,8 @@ class Channels(Demonstration):
     def test_the_banner_says_what_is_on_and_goes_by_itself(self):
         *texts, width = self.notes(
             TUNED, *(Note(text(f'banner-{part}')) for part in ('number', 'name', 'rating', 'now', 'next')),
-            Note('document.getElementById("banner-played").style.width'), is_hidden('banner'), 'info', is_seen('banner'))
+            Note('document.getElementById("banner-played").style.width'), is_hidden('banner'),
+            'info', is_seen('banner'))
         self.assertEqual(texts[:3], ['1', 'One', '12+'])
         # The times are those of the viewer's clock: half an hour and an hour and a half.
         self.assertRegex(texts[3], r'^\d\d:[14]3.\d\d:[14]3 News$')
@@ -291,14 +292,16 @@ class Media(Demonstration):
 
     def test_each_speed_reaches_the_set(self):
         notes, calls = self.play(
-            'ok', media_state('Playing'), 'fast-forward', media_state('2\u00d7'), 'fast-forward', media_state('4\u00d7'),
-            'rewind', 'rewind', media_state('Playing'), 'rewind', media_state('0.5\u00d7'), 'rewind',
+            'ok', media_state('Playing'), 'fast-forward', media_state('2\u00d7'),
+            'fast-forward', media_state('4\u00d7'), 'rewind', 'rewind', media_state('Playing'),
+            'rewind', media_state('0.5\u00d7'), 'rewind',
             media_state('Backward 1\u00d7'), 'play', media_state('Playing'), Note('1'))
         speeds = [call for call in calls if call.startswith('SetPlaySpeed(')]
         # What the set was told last before each new speed.
         told = [(1, 2, 0), (1, 4, 0), (1, 2, 0), (1, 1, 0), (1, 0, 5), (0, 1, 0), (1, 1, 0)]
         reached = [speeds[index] for index in range(len(speeds)) if index == 0 or speeds[index] != speeds[index - 1]]
-        self.assertEqual(reached, ['SetPlaySpeed(1, 1, 1, 0)'] + [f'SetPlaySpeed(1, {a}, {b}, {c})' for a, b, c in told])
+        self.assertEqual(reached, ['SetPlaySpeed(1, 1, 1, 0)'] +
+                         [f'SetPlaySpeed(1, {positive}, {whole}, {tenths})' for positive, whole, tenths in told])
 
     def test_a_clip_is_queued(self):
         notes, calls = self.play('ok', media_state('Playing'), 'down', 'yellow', Note(text('media-notice')))
@@ -505,7 +508,8 @@ class OnTheDesk(Demonstration):
             self.assertRegex(programme, r'^\d\d:\d\d.\d\d:\d\d (' + '|'.join(PROGRAMMES[channel]) + ')$')
 
     def assert_seen(self, pattern, picture):
-        self.assertEqual([each for each in (is_striped, has_bars, is_dark) if each(picture)], [pattern], columns(picture))
+        seen = [each for each in (is_striped, has_bars, is_dark) if each(picture)]
+        self.assertEqual(seen, [pattern], columns(picture))
 
     received = shows('banner-next', '\u2013')  # with its times
     programmes = tuple(Note(text(f'banner-{part}')) for part in ('name', 'now', 'next'))
@@ -584,12 +588,14 @@ class OnTheDesk(Demonstration):
 class Look(Demonstration):
     """Everything is in the safe area, whole, and large enough to be read from afar, on every page."""
 
-    # Sheets and boxes outside the safe area, with something cut off, and texts of small letters. Only what has its end in
-    # an ellipsis may be cut.
+    # Sheets and boxes outside the safe area, with something cut off, and texts of small letters. Only what has its end
+    # in an ellipsis may be cut.
     FAULTS = '''(function () {
         var faults = [];
         function isSeen(element) { return element.offsetWidth > 0; }
-        function note(element, fault) { faults.push((element.id || element.className || element.tagName) + ' ' + fault); }
+        function note(element, fault) {
+            faults.push((element.id || element.className || element.tagName) + ' ' + fault);
+        }
         Array.prototype.filter.call(document.querySelectorAll('.sheet, .screen > *, .small, #device-content > *'),
             isSeen).forEach(function (element) {
             var box = element.getBoundingClientRect();
@@ -611,7 +617,8 @@ class Look(Demonstration):
     def check(self, name, parts, **options):
         with self.subTest(name):
             file_name = os.path.join(os.environ['TELIX_SCREENSHOTS'], f'demo-{name}.png')
-            run = self.run_demo('--wait-for', steps(*parts), '--screenshot', file_name, '--eval', self.FAULTS, **options)
+            run = self.run_demo('--wait-for', steps(*parts), '--screenshot', file_name, '--eval', self.FAULTS,
+                                **options)
             self.assertEqual(run.value, [])
             self.assertGreater(len(Picture(file_name).colours()), COLOURS_OF_A_PAGE)
 
