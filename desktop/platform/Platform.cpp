@@ -19,13 +19,11 @@ struct Repeated {
     static void destroy(gpointer data) { delete static_cast<Repeated*>(data); }
 };
 
-// Makes GStreamer's own source the first choice for media over HTTP. The browser engine shares the process,
-// and when it starts with media of its own it registers a source with a rank of 100 above the ordinary one,
-// which works only for it.
+// A browser in this process may offer a source of its own for HTTP, which works inside of that browser alone.
+// Ours goes before it, whenever it comes.
 void preferOwnHttpSource() {
-    GstPluginFeature* source = gst_registry_lookup_feature(gst_registry_get(), "souphttpsrc");
-    if (source) {
-        gst_plugin_feature_set_rank(source, GST_RANK_PRIMARY + 200);
+    if (GstPluginFeature* source = gst_registry_lookup_feature(gst_registry_get(), "souphttpsrc")) {
+        gst_plugin_feature_set_rank(source, GST_RANK_PRIMARY * 4);
         gst_object_unref(source);
     }
 }
