@@ -315,6 +315,10 @@ struct Format {
     bool hasPicture;
 };
 
+void PrintTo(const Format& format, std::ostream* out) {
+    *out << format.clip;
+}
+
 class MediaFormatTest : public MediaTest, public testing::WithParamInterface<std::tuple<Format, bool>> {};
 
 TEST_P(MediaFormatTest, PlaysToItsEnd) {
