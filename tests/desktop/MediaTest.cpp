@@ -204,7 +204,13 @@ std::string textOf(char* text) {
 
 class MediaTest : public Test {
 protected:
-    void SetUp() override { m_player = newPlayer(); }
+    void SetUp() override {
+        {
+            std::lock_guard<std::mutex> lock(messagesMutex);
+            messages.clear();
+        }
+        m_player = newPlayer();
+    }
 
     void TearDown() override {
         for (const TELIX_JS_AV_HANDLE player : m_players) {
@@ -308,6 +314,10 @@ struct Format {
     uint32_t tolerance;
     bool hasPicture;
 };
+
+void PrintTo(const Format& format, std::ostream* out) {
+    *out << format.clip;
+}
 
 class MediaFormatTest : public MediaTest, public testing::WithParamInterface<std::tuple<Format, bool>> {};
 
