@@ -90,7 +90,7 @@ done
 if [ ! -f "$build/CMakeCache.txt" ]; then
     cmake -S "$top" -B "$build" -G Ninja -DTELIX_BUILD_TESTS=OFF -DTELIX_BUILD_BENCH=OFF
 fi
-cmake --build "$build" --target telix-tv nptelixjs_desktop telix
+cmake --build "$build" --target telix-tv nptelixjs_desktop telix telixctl
 
 if [ ${#channels[@]} -gt 0 ]; then
     TELIX_CHANNELS=$(IFS=';' && echo "${channels[*]}")

@@ -49,6 +49,7 @@ Picture::Token Picture::take(const View& view, std::function<void()> lost, std::
         std::lock_guard<std::mutex> lock(m_mutex);
         token = m_current = ++m_last;
         m_view = view;
+        m_isHidden = false;
         formerSample = std::exchange(m_sample, nullptr);
         formerLost = std::exchange(m_lost, std::move(lost));
         m_shown = std::move(shown);
@@ -98,6 +99,17 @@ void Picture::blank(Token token) {
         formerSample = std::exchange(m_sample, nullptr);
     }
     giveBack(formerSample);
+    wake();
+}
+
+void Picture::hide(Token token, bool isHidden) {
+    {
+        std::lock_guard<std::mutex> lock(m_mutex);
+        if (token == 0 || token != m_current || m_isHidden == isHidden) {
+            return;
+        }
+        m_isHidden = isHidden;
+    }
     wake();
 }
 
@@ -177,7 +189,7 @@ void Picture::acquire(telix_desktop_frame& frame) {
         frame.areaWidth = m_view.width;
         frame.areaHeight = m_view.height;
         frame.fullScreen = m_view.fullScreen ? 1 : 0;
-        frame.visible = m_current != 0 && m_sample ? 1 : 0;
+        frame.visible = m_current != 0 && m_sample && !m_isHidden ? 1 : 0;
         frame.serial = m_serial;
         if (frame.visible) {
             sample = gst_sample_ref(m_sample); // the record's, until it is released

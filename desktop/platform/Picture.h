@@ -41,6 +41,9 @@ public:
     // Removes the frame, as between two channels. Any thread.
     void blank(Token token);
 
+    // Takes the picture from sight, or gives it back: what is shown meanwhile is there then. Any thread.
+    void hide(Token token, bool isHidden);
+
     // Shows a sample of BGRx video, of which a reference is kept. GStreamer's threads.
     void show(Token token, GstSample* sample);
 
@@ -59,6 +62,7 @@ private:
     Token m_last = 0;
     Token m_current = 0;
     View m_view;
+    bool m_isHidden = false;
     GstSample* m_sample = nullptr; // one reference
     uint64_t m_serial = 0;
     std::function<void()> m_lost;

@@ -1,6 +1,8 @@
 // Start of the set, its thread, and how work gets there.
 #include "desktop/platform/Platform.h"
 
+#include "desktop/platform/Control.h"
+
 #include <cstdio>
 #include <gst/gst.h>
 #include <thread>
@@ -19,6 +21,15 @@ struct Repeated {
     static void destroy(gpointer data) { delete static_cast<Repeated*>(data); }
 };
 
+// A browser in this process may offer a source of its own for HTTP, which works inside of that browser alone.
+// Ours goes before it, whenever it comes.
+void preferOwnHttpSource() {
+    if (GstPluginFeature* source = gst_registry_lookup_feature(gst_registry_get(), "souphttpsrc")) {
+        gst_plugin_feature_set_rank(source, GST_RANK_PRIMARY * 4);
+        gst_object_unref(source);
+    }
+}
+
 } // namespace
 
 Platform& Platform::instance() {
@@ -30,6 +41,7 @@ Platform::Platform() : m_context(g_main_context_new()), m_configuration(Configur
     std::thread(&Platform::run, this).detach(); // ends with the process
     std::unique_lock<std::mutex> lock(m_startMutex);
     m_started.wait(lock, [this] { return m_isStarted; });
+    post(Control::start); // runs when this object is complete
 }
 
 void Platform::run() {
@@ -39,6 +51,8 @@ void Platform::run() {
         std::fprintf(stderr, "libtelix: no pictures and no sound: %s\n",
                      error ? error->message : "GStreamer");
         g_clear_error(&error);
+    } else {
+        preferOwnHttpSource();
     }
     {
         std::lock_guard<std::mutex> lock(m_startMutex);

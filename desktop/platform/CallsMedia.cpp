@@ -1,0 +1,238 @@
+// The calls of the A/V control object.
+#include "desktop/platform/Output.h"
+#include "desktop/platform/Players.h"
+
+using namespace desktop;
+
+namespace {
+
+Players& players() {
+    return Players::instance();
+}
+
+TELIX_RETCODE_ENUM_T resultOf(bool isTaken) {
+    return isTaken ? TELIX_RETCODE_SUCCESS : refused;
+}
+
+template <typename Give>
+TELIX_RETCODE_ENUM_T ofComponent(TELIX_JS_AVCOMPHANDLE handle, TELIX_JS_AVCOMPTYPE type, Give give) {
+    const auto stream = players().findComponent(handle, type);
+    return stream ? give(*stream) : refused;
+}
+
+TELIX_RETCODE_ENUM_T giveNo(TELIX_JS_AVCOMPHANDLE handle, TELIX_JS_AVCOMPTYPE type, ___UINT8* flag) {
+    return ofComponent(handle, type, [=](const Player::Stream&) {
+        *flag = 0;
+        return TELIX_RETCODE_SUCCESS;
+    });
+}
+
+TELIX_RETCODE_ENUM_T giveComponents(std::vector<TELIX_JS_AVCOMPHANDLE>& kept, TELIX_JS_AV_HANDLE player,
+                                    TELIX_JS_AVCOMPTYPE type, bool activeOnly,
+                                    TELIX_JS_AVCOMPHANDLE** components, uint32_t* count) {
+    const auto found = players().components(player, type, activeOnly);
+    if (!found) {
+        return refused;
+    }
+    kept = *found;
+    kept.reserve(1); // also an empty array is somewhere
+    *components = kept.data();
+    *count = static_cast<uint32_t>(kept.size());
+    return TELIX_RETCODE_SUCCESS;
+}
+
+} // namespace
+
+// What the MIME type and the URL promise makes no difference: the media itself tells what it is.
+TELIX_RETCODE_ENUM_T TELIX_JS_AV_CreatePlayer(TELIX_JS_AV_HANDLE* player, int32_t containerCode,
+                                              int32_t audioCodecCode, uint32_t memoryAudio) {
+    (void)containerCode;
+    (void)audioCodecCode;
+    (void)memoryAudio;
+    *player = players().create();
+    return TELIX_RETCODE_SUCCESS;
+}
+
+TELIX_RETCODE_ENUM_T TELIX_JS_AV_DestroyPlayer(TELIX_JS_AV_HANDLE player) {
+    return resultOf(players().destroy(player));
+}
+
+TELIX_RETCODE_ENUM_T TELIX_JS_AV_RegisterOnPlayStateChange(TELIX_JS_AV_HANDLE player,
+                                                           TELIX_JS_AV_PLAYSTATE_CB callback) {
+    return resultOf(players().setCallback(player, callback));
+}
+
+// The registrations of a player have ended with it, and those of all others go on: nothing is left to do
+// here.
+TELIX_RETCODE_ENUM_T TELIX_JS_AV_UnregisterOnPlayStateChange(TELIX_JS_AV_PLAYSTATE_CB callback) {
+    (void)callback;
+    return TELIX_RETCODE_SUCCESS;
+}
+
+TELIX_RETCODE_ENUM_T TELIX_JS_AV_RegisterOnDRMRightsError(TELIX_JS_AV_HANDLE player,
+                                                          TELIX_JS_AV_DRM_RIGHTS_CB callback) {
+    return resultOf(players().setCallback(player, callback));
+}
+
+TELIX_RETCODE_ENUM_T TELIX_JS_AV_UnregisterOnDRMRightsError(TELIX_JS_AV_DRM_RIGHTS_CB callback) {
+    (void)callback;
+    return TELIX_RETCODE_SUCCESS;
+}
+
+TELIX_RETCODE_ENUM_T TELIX_JS_AV_Play(TELIX_JS_AV_HANDLE player, const char* url, uint32_t playCount,
+                                      int32_t sourceCode, int32_t containerCode, int32_t audioCodecCode,
+                                      uint32_t reserved32, uint16_t reserved16) {
+    (void)sourceCode; // all kinds of media are fetched alike, and once
+    (void)containerCode;
+    (void)audioCodecCode;
+    (void)reserved32;
+    (void)reserved16;
+    return resultOf(url && players().play(player, url, playCount));
+}
+
+TELIX_RETCODE_ENUM_T TELIX_JS_AV_Queue(TELIX_JS_AV_HANDLE player, const char* url, uint32_t playCount,
+                                       int32_t sourceCode, int32_t containerCode, int32_t audioCodecCode,
+                                       uint32_t reserved32, uint16_t reserved16) {
+    (void)sourceCode;
+    (void)containerCode;
+    (void)audioCodecCode;
+    (void)reserved32;
+    (void)reserved16;
+    return resultOf(url ? players().queue(player, url, playCount) : players().withdraw(player));
+}
+
+// The plug-in looks it up and never calls it, so no meaning of its values is known.
+TELIX_RETCODE_ENUM_T TELIX_JS_AV_PlaySound(uint32_t value1, uint32_t value2, uint32_t value3, uint32_t value4,
+                                           uint32_t value5, uint32_t value6, uint32_t value7) {
+    (void)value1;
+    (void)value2;
+    (void)value3;
+    (void)value4;
+    (void)value5;
+    (void)value6;
+    (void)value7;
+    return TELIX_RETCODE_NOT_AVAILABLE;
+}
+
+TELIX_RETCODE_ENUM_T TELIX_JS_AV_Stop(TELIX_JS_AV_HANDLE player) {
+    return resultOf(players().stop(player));
+}
+
+TELIX_RETCODE_ENUM_T TELIX_JS_AV_Pause(TELIX_JS_AV_HANDLE player) {
+    return resultOf(players().pause(player));
+}
+
+TELIX_RETCODE_ENUM_T TELIX_JS_AV_Resume(TELIX_JS_AV_HANDLE player) {
+    return resultOf(players().resume(player));
+}
+
+TELIX_RETCODE_ENUM_T TELIX_JS_AV_SetVolume(TELIX_JS_AV_HANDLE player, uint32_t volume) {
+    return resultOf(players().setVolume(player, volume));
+}
+
+TELIX_RETCODE_ENUM_T TELIX_JS_AV_SetFullScreen(TELIX_JS_AV_HANDLE player, ___UINT8 fullScreen) {
+    return resultOf(
+        players().changeView(player, [=](Picture::View& view) { view.fullScreen = fullScreen != 0; }));
+}
+
+TELIX_RETCODE_ENUM_T TELIX_JS_AV_SetPlaySpeed(TELIX_JS_AV_HANDLE player, ___UINT8 positive,
+                                              int16_t integerPart, uint16_t tenths) {
+    if (integerPart < 0 || tenths > 9) {
+        return refused;
+    }
+    const double speed = (integerPart * 10 + tenths) / 10.0;
+    return resultOf(players().setSpeed(player, positive != 0 ? speed : -speed));
+}
+
+TELIX_RETCODE_ENUM_T TELIX_JS_AV_SetDisplayArea(TELIX_JS_AV_HANDLE player,
+                                                const TELIX_JS_DISPLAY_AREA* area) {
+    return resultOf(players().changeView(player, [=](Picture::View& view) {
+        view.x = area->x;
+        view.y = area->y;
+        view.width = area->width;
+        view.height = area->height;
+    }));
+}
+
+TELIX_RETCODE_ENUM_T TELIX_JS_AV_GetPlayInfo(TELIX_JS_AV_HANDLE player, TELIX_JS_AV_PLAY_INFO** info) {
+    TELIX_JS_AV_PLAY_INFO* record = players().playInfo(player);
+    if (record) {
+        *info = record;
+    }
+    return resultOf(record != nullptr);
+}
+
+TELIX_RETCODE_ENUM_T TELIX_JS_AV_Seek(TELIX_JS_AV_HANDLE player, uint32_t milliseconds) {
+    return resultOf(players().seek(player, milliseconds));
+}
+
+TELIX_RETCODE_ENUM_T TELIX_JS_AV_GetComponents(TELIX_JS_AV_HANDLE player, TELIX_JS_AVCOMPTYPE type,
+                                               TELIX_JS_AVCOMPHANDLE** components, uint32_t* count) {
+    static std::vector<TELIX_JS_AVCOMPHANDLE> kept; // valid until the next call
+    return giveComponents(kept, player, type, false, components, count);
+}
+
+TELIX_RETCODE_ENUM_T TELIX_JS_AV_GetCurrActiveComponents(TELIX_JS_AV_HANDLE player, TELIX_JS_AVCOMPTYPE type,
+                                                         TELIX_JS_AVCOMPHANDLE** components,
+                                                         uint32_t* count) {
+    static std::vector<TELIX_JS_AVCOMPHANDLE> kept; // valid until the next call
+    return giveComponents(kept, player, type, true, components, count);
+}
+
+TELIX_RETCODE_ENUM_T TELIX_JS_AV_SelectComponent(TELIX_JS_AV_HANDLE player, TELIX_JS_AVCOMPHANDLE component,
+                                                 TELIX_JS_AVCOMPTYPE type) {
+    return resultOf(players().select(player, component, type, true));
+}
+
+TELIX_RETCODE_ENUM_T TELIX_JS_AV_UnselectComponent(TELIX_JS_AV_HANDLE player, TELIX_JS_AVCOMPHANDLE component,
+                                                   TELIX_JS_AVCOMPTYPE type) {
+    return resultOf(players().select(player, component, type, false));
+}
+
+TELIX_RETCODE_ENUM_T TELIX_JS_AV_AVComponent_GetEncoding(TELIX_JS_AVCOMPHANDLE component,
+                                                         TELIX_JS_AVCOMPTYPE type, char** encoding) {
+    return ofComponent(component, type,
+                       [=](const Player::Stream& stream) { return giveText(encoding, stream.encoding); });
+}
+
+// What needs a key cannot be played, so nothing that has components does. Neither do files tell what their
+// sound is for.
+TELIX_RETCODE_ENUM_T TELIX_JS_AV_AVComponent_GetEncrypted(TELIX_JS_AVCOMPHANDLE component,
+                                                          TELIX_JS_AVCOMPTYPE type, ___UINT8* encrypted) {
+    return giveNo(component, type, encrypted);
+}
+
+TELIX_RETCODE_ENUM_T TELIX_JS_AV_AVComponent_GetAspectRatio(TELIX_JS_AVCOMPHANDLE component,
+                                                            TELIX_JS_AVCOMPTYPE type, float* aspectRatio) {
+    return ofComponent(component, type, [=](const Player::Stream& stream) {
+        *aspectRatio = stream.aspectRatio;
+        return resultOf(stream.aspectRatio > 0);
+    });
+}
+
+TELIX_RETCODE_ENUM_T TELIX_JS_AV_AVComponent_GetLanguage(TELIX_JS_AVCOMPHANDLE component,
+                                                         TELIX_JS_AVCOMPTYPE type, char** language) {
+    return ofComponent(component, type,
+                       [=](const Player::Stream& stream) { return giveText(language, stream.language); });
+}
+
+TELIX_RETCODE_ENUM_T TELIX_JS_AV_AVComponent_GetAudioDescription(TELIX_JS_AVCOMPHANDLE component,
+                                                                 TELIX_JS_AVCOMPTYPE type,
+                                                                 ___UINT8* audioDescription) {
+    return giveNo(component, type, audioDescription);
+}
+
+TELIX_RETCODE_ENUM_T TELIX_JS_AV_AVComponent_GetAudioChannels(TELIX_JS_AVCOMPHANDLE component,
+                                                              TELIX_JS_AVCOMPTYPE type,
+                                                              uint32_t* audioChannels) {
+    return ofComponent(component, type, [=](const Player::Stream& stream) {
+        *audioChannels = stream.audioChannels;
+        return resultOf(stream.audioChannels > 0);
+    });
+}
+
+TELIX_RETCODE_ENUM_T TELIX_JS_AV_AVComponent_GetHearingImpaired(TELIX_JS_AVCOMPHANDLE component,
+                                                                TELIX_JS_AVCOMPTYPE type,
+                                                                ___UINT8* hearingImpaired) {
+    return giveNo(component, type, hearingImpaired);
+}

@@ -1,0 +1,901 @@
+// Media players through the calls of the plug-in: real clips, from files and from a server of the test's own.
+#include "desktop/platform/Players.h"
+#include "desktop/platform/telix_picture.h"
+#include "telix/telix_platform.h"
+
+#include <chrono>
+#include <condition_variable>
+#include <csignal>
+#include <cstdlib>
+#include <future>
+#include <gtest/gtest.h>
+#include <netinet/in.h>
+#include <set>
+#include <sys/socket.h>
+#include <sys/wait.h>
+#include <thread>
+#include <unistd.h>
+
+using namespace desktop;
+using testing::Test;
+
+namespace {
+
+constexpr TELIX_AV_CB_MSG playStart = TELIX_AV_CB_MSG_PLAYSTART;
+constexpr TELIX_AV_CB_MSG playEnd = TELIX_AV_CB_MSG_PLAYEND;
+
+// What the callbacks were given.
+struct Message {
+    TELIX_JS_AV_HANDLE player = 0;
+    TELIX_AV_CB_MSG message = 0;
+    std::string text; // of a rights error
+};
+
+std::mutex messagesMutex;
+std::condition_variable messageCame;
+std::vector<Message> messages;
+std::set<std::thread::id> threads;
+
+TELIX_RETCODE_ENUM_T record(Message message) {
+    {
+        std::lock_guard<std::mutex> lock(messagesMutex);
+        messages.push_back(std::move(message));
+        threads.insert(std::this_thread::get_id());
+    }
+    messageCame.notify_all();
+    return 0;
+}
+
+TELIX_RETCODE_ENUM_T onMessage(TELIX_JS_AV_HANDLE player, TELIX_AV_CB_MSG message) {
+    return record({player, message, ""});
+}
+
+TELIX_RETCODE_ENUM_T onRights(TELIX_JS_AV_HANDLE player, TELIX_AV_DRM_ERR_STATE_ENUM_T state,
+                              ___UINT8* contentId, ___UINT8* drmSystemId, ___UINT8* rightsIssuerUrl) {
+    const auto text = [](___UINT8* bytes) { return std::string(reinterpret_cast<char*>(bytes)); };
+    return record({player, 0,
+                   std::to_string(state) + "/" + text(contentId) + "/" + text(drmSystemId) + "/" +
+                       text(rightsIssuerUrl)});
+}
+
+TELIX_RETCODE_ENUM_T onChannelChange(TELIX_JS_VB_HANDLE object, TELIX_JS_CM_HANDLE) {
+    return record({object, 0, "channel"});
+}
+
+bool waitUntil(const std::function<bool()>& isSo, int seconds = 12) {
+    const auto end = std::chrono::steady_clock::now() + std::chrono::seconds(seconds);
+    while (!isSo()) {
+        if (std::chrono::steady_clock::now() > end) {
+            return false;
+        }
+        std::this_thread::sleep_for(std::chrono::milliseconds(10));
+    }
+    return true;
+}
+
+double secondsSince(std::chrono::steady_clock::time_point begin) {
+    return std::chrono::duration<double>(std::chrono::steady_clock::now() - begin).count();
+}
+
+std::string folderOfClips() {
+    const char* folder = std::getenv("TELIX_CLIPS");
+    return folder ? folder : "";
+}
+
+std::string file(const std::string& name) {
+    return "file://" + folderOfClips() + "/" + name;
+}
+
+// The clips on a web server, for as long as the object lasts.
+class Server {
+public:
+    Server() {
+        int ends[2];
+        if (pipe(ends) != 0) {
+            return;
+        }
+        const std::string folder = "=" + folderOfClips();
+        m_process = fork();
+        if (m_process == 0) {
+            dup2(ends[1], STDOUT_FILENO);
+            close(ends[0]);
+            close(ends[1]);
+            execlp("python3", "python3", "-B", std::getenv("TELIX_MEDIA_SERVER"), "--until-parent-ends",
+                   folder.c_str(), nullptr);
+            _exit(127);
+        }
+        close(ends[1]);
+        if (FILE* output = fdopen(ends[0], "r")) {
+            char line[256];
+            if (std::fgets(line, sizeof(line), output)) {
+                m_address = line;
+                m_address.erase(m_address.find_last_not_of('\n') + 1);
+            }
+            std::fclose(output);
+        }
+    }
+    ~Server() { end(); }
+    Server(const Server&) = delete;
+    Server& operator=(const Server&) = delete;
+
+    // The connections are cut.
+    void end() {
+        if (m_process > 0) {
+            kill(m_process, SIGKILL);
+            waitpid(m_process, nullptr, 0);
+            m_process = -1;
+        }
+    }
+
+    std::string operator()(const std::string& name) const { return m_address + "/" + name; }
+
+private:
+    pid_t m_process = -1;
+    std::string m_address;
+};
+
+// A port at which nobody listens, because it is kept.
+class ClosedPort {
+public:
+    ClosedPort() : m_socket(socket(AF_INET, SOCK_STREAM, 0)) {
+        sockaddr_in address{};
+        address.sin_family = AF_INET;
+        address.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
+        socklen_t size = sizeof(address);
+        EXPECT_EQ(bind(m_socket, reinterpret_cast<sockaddr*>(&address), size), 0);
+        EXPECT_EQ(getsockname(m_socket, reinterpret_cast<sockaddr*>(&address), &size), 0);
+        m_number = ntohs(address.sin_port);
+    }
+    ~ClosedPort() { close(m_socket); }
+    ClosedPort(const ClosedPort&) = delete;
+    ClosedPort& operator=(const ClosedPort&) = delete;
+
+    // From now on connections are taken, and nothing is ever answered.
+    void listenAndBeSilent() { EXPECT_EQ(listen(m_socket, 8), 0); }
+
+    std::string url() const { return "http://127.0.0.1:" + std::to_string(m_number) + "/clip.mp4"; }
+
+private:
+    int m_socket;
+    unsigned int m_number = 0;
+};
+
+struct Shot {
+    uint64_t serial = 0;
+    bool isVisible = false;
+    std::vector<uint8_t> pixels; // of the line in the middle
+    int32_t areaX = 0;
+    uint32_t areaWidth = 0;
+    bool isFullScreen = false;
+};
+
+Shot takeShot() {
+    telix_desktop_frame frame{};
+    telix_desktop_acquire_frame(&frame);
+    Shot shot{frame.serial, frame.visible != 0, {}, frame.areaX, frame.areaWidth, frame.fullScreen != 0};
+    if (frame.pixels) {
+        const uint8_t* line = frame.pixels + size_t{frame.height} / 2 * frame.stride;
+        shot.pixels.assign(line, line + size_t{frame.width} * 4);
+    }
+    telix_desktop_release_frame(&frame);
+    return shot;
+}
+
+// The bars of second.mp4 stand still: its line in the middle begins in dark grey.
+bool showsSecondClip(const Shot& shot) {
+    bool isGrey = shot.pixels.size() > 64;
+    for (size_t colour = 40; isGrey && colour < 43; ++colour) {
+        isGrey = shot.pixels[colour] > 80 && shot.pixels[colour] < 130;
+    }
+    return isGrey;
+}
+
+std::optional<Player::Sound> sound() {
+    std::promise<std::optional<Player::Sound>> result;
+    Platform::instance().post([&] { result.set_value(Players::instance().sound()); });
+    return result.get_future().get();
+}
+
+std::string textOf(char* text) {
+    std::string copy = text ? text : "";
+    std::free(text);
+    return copy;
+}
+
+class MediaTest : public Test {
+protected:
+    void SetUp() override { m_player = newPlayer(); }
+
+    void TearDown() override {
+        for (const TELIX_JS_AV_HANDLE player : m_players) {
+            TELIX_JS_AV_Stop(player);
+            TELIX_JS_AV_DestroyPlayer(player);
+            TELIX_JS_AV_UnregisterOnPlayStateChange(onMessage);
+        }
+        std::lock_guard<std::mutex> lock(messagesMutex);
+        EXPECT_LE(threads.size(), 1U) << "messages come from several threads";
+        EXPECT_EQ(threads.count(std::this_thread::get_id()), 0U);
+    }
+
+    TELIX_JS_AV_HANDLE newPlayer() {
+        TELIX_JS_AV_HANDLE player = 0;
+        EXPECT_EQ(TELIX_JS_AV_CreatePlayer(&player, 512, 0, 0), 0);
+        EXPECT_EQ(TELIX_JS_AV_RegisterOnPlayStateChange(player, onMessage), 0);
+        EXPECT_EQ(TELIX_JS_AV_RegisterOnDRMRightsError(player, onRights), 0);
+        m_players.push_back(player);
+        return player;
+    }
+
+    static TELIX_RETCODE_ENUM_T start(TELIX_JS_AV_HANDLE player, const std::string& url, uint32_t count = 1) {
+        return TELIX_JS_AV_Play(player, url.c_str(), count, 6, 512, 0, 0, 0);
+    }
+
+    static TELIX_RETCODE_ENUM_T queue(TELIX_JS_AV_HANDLE player, const std::string& url, uint32_t count = 1) {
+        return TELIX_JS_AV_Queue(player, url.c_str(), count, 6, 512, 0, 0, 0);
+    }
+
+    // All messages of all players so far.
+    static std::vector<TELIX_AV_CB_MSG> seen() {
+        std::lock_guard<std::mutex> lock(messagesMutex);
+        std::vector<TELIX_AV_CB_MSG> values;
+        for (const Message& each : messages) {
+            values.push_back(each.message);
+        }
+        return values;
+    }
+
+    // Waits until there are as many messages as expected, which are these.
+    static void expectMessages(const std::vector<TELIX_AV_CB_MSG>& expected, int seconds = 12) {
+        waitUntil([&] { return seen().size() >= expected.size(); }, seconds);
+        ASSERT_EQ(seen(), expected);
+    }
+
+    static TELIX_JS_AV_PLAY_INFO info(TELIX_JS_AV_HANDLE player) {
+        TELIX_JS_AV_PLAY_INFO* record = nullptr;
+        EXPECT_EQ(TELIX_JS_AV_GetPlayInfo(player, &record), 0);
+        return record ? *record : TELIX_JS_AV_PLAY_INFO{};
+    }
+    TELIX_JS_AV_PLAY_INFO info() const { return info(m_player); }
+
+    static Players::State stateOf(TELIX_JS_AV_HANDLE player) {
+        for (const Players::State& state : Players::instance().states()) {
+            if (state.player == player) {
+                return state;
+            }
+        }
+        return {};
+    }
+
+    void play(const std::string& url, uint32_t count = 1) {
+        const size_t before = seen().size();
+        ASSERT_EQ(start(m_player, url, count), 0);
+        ASSERT_TRUE(waitUntil([&] { return seen().size() > before; }));
+        ASSERT_EQ(seen().back(), playStart);
+    }
+
+    // The position moves on, at `speed` within wide limits.
+    void expectSpeed(double speed) {
+        const uint32_t from = info().playPosition;
+        EXPECT_TRUE(waitUntil([&] { return info().playPosition != from; }));
+        const uint32_t first = info().playPosition;
+        const auto begin = std::chrono::steady_clock::now();
+        std::this_thread::sleep_for(std::chrono::milliseconds(1000));
+        const double moved = (static_cast<double>(info().playPosition) - first) / 1000 / secondsSince(begin);
+        EXPECT_NEAR(moved, speed, std::abs(speed) * 0.35);
+    }
+
+    std::vector<TELIX_JS_AVCOMPHANDLE> components(TELIX_JS_AVCOMPTYPE type, bool activeOnly = false) const {
+        TELIX_JS_AVCOMPHANDLE* handles = nullptr;
+        uint32_t count = 0;
+        EXPECT_EQ((activeOnly ? TELIX_JS_AV_GetCurrActiveComponents
+                              : TELIX_JS_AV_GetComponents)(m_player, type, &handles, &count),
+                  0);
+        return handles ? std::vector<TELIX_JS_AVCOMPHANDLE>(handles, handles + count)
+                       : std::vector<TELIX_JS_AVCOMPHANDLE>();
+    }
+
+    TELIX_JS_AV_HANDLE m_player = 0;
+    std::vector<TELIX_JS_AV_HANDLE> m_players;
+};
+
+// ---- Playing
+
+struct Format {
+    const char* name;
+    const char* clip;
+    uint32_t length;   // milliseconds
+    uint32_t duration; // as it is told: a plain stream of AAC does not say
+    uint32_t tolerance;
+    bool hasPicture;
+};
+
+class MediaFormatTest : public MediaTest, public testing::WithParamInterface<std::tuple<Format, bool>> {};
+
+TEST_P(MediaFormatTest, PlaysToItsEnd) {
+    const auto& [format, isNetwork] = GetParam();
+    std::optional<Server> server;
+    if (isNetwork) {
+        server.emplace();
+    }
+    play(isNetwork ? (*server)(format.clip) : file(format.clip));
+    if (format.hasPicture) {
+        EXPECT_TRUE(waitUntil([] { return takeShot().isVisible; }));
+    }
+    EXPECT_TRUE(waitUntil([&] { return info().playPosition > 300; })) << "the position stands still";
+    EXPECT_NEAR(info().duration, format.duration, format.tolerance);
+    EXPECT_EQ(takeShot().isVisible, format.hasPicture);
+    const uint32_t goal = format.length - 1500;
+    ASSERT_EQ(TELIX_JS_AV_Seek(m_player, goal), 0);
+    EXPECT_EQ(info().playPosition, goal);
+    const auto begin = std::chrono::steady_clock::now();
+    expectMessages({playStart, playEnd});
+    EXPECT_GT(secondsSince(begin), 1) << "the rest was not played";
+    EXPECT_TRUE(waitUntil([] { return !takeShot().isVisible; }));
+    EXPECT_EQ(stateOf(m_player).state, "finished");
+    EXPECT_EQ(info().state, 0U);
+}
+
+INSTANTIATE_TEST_SUITE_P(Files, MediaFormatTest,
+                         testing::Combine(testing::Values(Format{"mp4", "second.mp4", 8000, 8000, 100, true},
+                                                          Format{"mp3", "tune.mp3", 3000, 3000, 150, false},
+                                                          Format{"aac", "tune.aac", 3000, 0, 0, false},
+                                                          Format{"wav", "tune.wav", 3000, 3000, 50, false},
+                                                          Format{"hls", "hls/index.m3u8", 6000, 6000, 200,
+                                                                 true}),
+                                          testing::Bool()),
+                         [](const auto& each) {
+                             return std::string(std::get<0>(each.param).name) +
+                                    (std::get<1>(each.param) ? "OverHttp" : "FromAFile");
+                         });
+
+TEST_F(MediaTest, PlaysAsOftenAsItIsToldTo) {
+    const auto begin = std::chrono::steady_clock::now();
+    play(file("tune.wav"), 2);
+    expectMessages({playStart, playEnd});
+    EXPECT_GT(secondsSince(begin), 5.5);
+}
+
+TEST_F(MediaTest, GoesOnWithWhatIsQueued) {
+    ASSERT_EQ(TELIX_JS_AV_Seek(m_player, 18500), 0); // for the first clip
+    play(file("clip.mp4"));
+    ASSERT_EQ(queue(m_player, file("second.mp4")), 0);
+    ASSERT_EQ(queue(m_player, file("tune.mp3")), 0);
+    expectMessages({playStart, playStart});
+    EXPECT_TRUE(waitUntil([] { return showsSecondClip(takeShot()); }));
+    EXPECT_EQ(stateOf(m_player).url, file("second.mp4"));
+    ASSERT_EQ(TELIX_JS_AV_Seek(m_player, 7200), 0);
+    expectMessages({playStart, playStart, playStart});
+    EXPECT_FALSE(takeShot().isVisible);
+    ASSERT_EQ(TELIX_JS_AV_Seek(m_player, 2500), 0);
+    expectMessages({playStart, playStart, playStart, playEnd});
+}
+
+TEST_F(MediaTest, ForgetsWhatWasQueuedWhenItIsWithdrawn) {
+    play(file("tune.wav"));
+    ASSERT_EQ(queue(m_player, file("second.mp4")), 0);
+    ASSERT_EQ(TELIX_JS_AV_Queue(m_player, nullptr, 1, 6, 512, 0, 0, 0), 0);
+    ASSERT_EQ(TELIX_JS_AV_Seek(m_player, 2500), 0);
+    expectMessages({playStart, playEnd});
+    ASSERT_EQ(queue(m_player, file("tune.mp3")), 0); // nothing plays: at once
+    expectMessages({playStart, playEnd, playStart});
+}
+
+TEST_F(MediaTest, StandsStillWhilePaused) {
+    play(file("clip.mp4"));
+    ASSERT_TRUE(waitUntil([&] { return info().playPosition > 200; }));
+    ASSERT_EQ(TELIX_JS_AV_Pause(m_player), 0);
+    EXPECT_EQ(stateOf(m_player).state, "paused");
+    std::this_thread::sleep_for(std::chrono::milliseconds(300)); // the last frames
+    const uint32_t position = info().playPosition;
+    const Shot still = takeShot();
+    EXPECT_TRUE(still.isVisible);
+    std::this_thread::sleep_for(std::chrono::milliseconds(700));
+    EXPECT_EQ(info().playPosition, position);
+    EXPECT_EQ(takeShot().serial, still.serial);
+    ASSERT_EQ(TELIX_JS_AV_Seek(m_player, 10000), 0);
+    EXPECT_TRUE(waitUntil([&] { return takeShot().serial > still.serial; })) << "the new place is not seen";
+    EXPECT_EQ(stateOf(m_player).state, "paused");
+    EXPECT_EQ(info().playPosition, 10000U);
+    ASSERT_EQ(TELIX_JS_AV_Resume(m_player), 0);
+    EXPECT_TRUE(waitUntil([&] { return info().playPosition > 10300; }));
+    expectMessages({playStart});
+}
+
+TEST_F(MediaTest, KeepsStillUntilItIsResumedWhenItIsPausedAtOnce) {
+    ASSERT_EQ(start(m_player, file("second.mp4")), 0);
+    ASSERT_EQ(TELIX_JS_AV_Pause(m_player), 0);
+    EXPECT_TRUE(waitUntil([] { return takeShot().isVisible; })); // its first picture
+    std::this_thread::sleep_for(std::chrono::milliseconds(300));
+    expectMessages({});
+    ASSERT_EQ(TELIX_JS_AV_Resume(m_player), 0);
+    expectMessages({playStart});
+}
+
+TEST_F(MediaTest, PlaysAtOtherSpeedsForwardAndBackward) {
+    Server server;
+    play(server("clip.mp4"));
+    EXPECT_FALSE(sound()->isMuted);
+    ASSERT_EQ(TELIX_JS_AV_SetPlaySpeed(m_player, 1, 2, 0), 0);
+    EXPECT_EQ(stateOf(m_player).speed, 2.0);
+    EXPECT_TRUE(waitUntil([] { return sound()->isMuted; }));
+    expectSpeed(2);
+    ASSERT_EQ(TELIX_JS_AV_SetPlaySpeed(m_player, 1, 0, 5), 0);
+    expectSpeed(0.5);
+    ASSERT_EQ(TELIX_JS_AV_SetPlaySpeed(m_player, 1, 1, 5), 0);
+    expectSpeed(1.5);
+    ASSERT_EQ(TELIX_JS_AV_Seek(m_player, 15000), 0);
+    ASSERT_EQ(TELIX_JS_AV_SetPlaySpeed(m_player, 0, 1, 0), 0);
+    expectSpeed(-1);
+    ASSERT_EQ(TELIX_JS_AV_SetPlaySpeed(m_player, 1, 1, 0), 0);
+    EXPECT_TRUE(waitUntil([] { return !sound()->isMuted; }));
+    expectSpeed(1);
+    expectMessages({playStart});
+}
+
+TEST_F(MediaTest, EndsAtTheStartWhenItPlaysBackward) {
+    play(file("clip.mp4"), 3);
+    ASSERT_EQ(TELIX_JS_AV_Seek(m_player, 1500), 0);
+    ASSERT_EQ(TELIX_JS_AV_SetPlaySpeed(m_player, 0, 2, 0), 0);
+    expectMessages({playStart, playEnd});
+}
+
+TEST_F(MediaTest, RefusesSpeedsThatCannotBe) {
+    EXPECT_NE(TELIX_JS_AV_SetPlaySpeed(m_player, 0, 1, 0), 0); // nothing to play backward
+    play(file("clip.mp4"));
+    EXPECT_NE(TELIX_JS_AV_SetPlaySpeed(m_player, 1, 100, 0), 0);
+    EXPECT_NE(TELIX_JS_AV_SetPlaySpeed(m_player, 1, -1, 0), 0);
+    EXPECT_NE(TELIX_JS_AV_SetPlaySpeed(m_player, 1, 1, 10), 0);
+    EXPECT_EQ(stateOf(m_player).speed, 1.0);
+    EXPECT_NE(TELIX_JS_AV_Seek(m_player, 20001), 0);
+    Server server;
+    play(server("hls/index.m3u8")); // of live streaming nothing is kept
+    EXPECT_NE(TELIX_JS_AV_SetPlaySpeed(m_player, 0, 1, 0), 0);
+}
+
+TEST_F(MediaTest, GoesNoFurtherThanWhatIsHeldWhereTheServerGivesNoParts) {
+    Server server;
+    ASSERT_EQ(TELIX_JS_AV_Seek(m_player, 19000), 0); // to begin with
+    play(server("clip.mp4?ranges=no&rate=400000"));
+    EXPECT_LT(info().playPosition, 1000U);
+    ASSERT_LT(info().bufferedEnd, 15U);
+    EXPECT_NE(TELIX_JS_AV_Seek(m_player, 18000), 0);
+    EXPECT_TRUE(waitUntil([&] { return info().playPosition > 200; })); // and plays on
+    EXPECT_TRUE(waitUntil([&] { return info().bufferedEnd == 20; }));
+    ASSERT_EQ(TELIX_JS_AV_Seek(m_player, 19000), 0);
+    expectMessages({playStart, playEnd});
+}
+
+TEST_F(MediaTest, GoesOnAtAPositionThatItWasGivenWhileStopped) {
+    Server server;
+    play(server("tune.mp3"));
+    ASSERT_EQ(queue(m_player, server("second.mp4")), 0);
+    ASSERT_EQ(TELIX_JS_AV_Stop(m_player), 0);
+    ASSERT_EQ(TELIX_JS_AV_Seek(m_player, 1500), 0);
+    ASSERT_EQ(start(m_player, server("tune.mp3")), 0);
+    const auto begin = std::chrono::steady_clock::now();
+    expectMessages({playStart, playStart});
+    EXPECT_GE(info().playPosition, 1500U);
+    expectMessages({playStart, playStart, playStart}); // what had been queued
+    EXPECT_LT(secondsSince(begin), 2.8) << "it has played from the start";
+    ASSERT_EQ(TELIX_JS_AV_Stop(m_player), 0);
+    ASSERT_EQ(TELIX_JS_AV_Seek(m_player, 1500), 0);
+    ASSERT_EQ(TELIX_JS_AV_Stop(m_player), 0); // forgets it
+    play(server("tune.mp3"));
+    EXPECT_LT(info().playPosition, 1000U);
+}
+
+// ---- What goes wrong
+
+class MediaErrorTest : public MediaTest {
+protected:
+    void expectError(const std::string& url, TELIX_AV_CB_MSG message) {
+        const size_t before = seen().size();
+        ASSERT_EQ(start(m_player, url), 0);
+        ASSERT_TRUE(waitUntil([&] { return seen().size() > before; })) << url;
+        EXPECT_EQ(seen().back(), message) << url;
+        EXPECT_EQ(stateOf(m_player).state, "error");
+        ASSERT_EQ(TELIX_JS_AV_Stop(m_player), 0);
+        EXPECT_EQ(seen().size(), before + 1) << url;
+    }
+};
+
+TEST_F(MediaErrorTest, TellsWhatIsWrong) {
+    Server server;
+    expectError(server("nothing.mp4"), TELIX_AV_CB_MSG_ERR_NOT_FOUND);
+    expectError(file("nothing.mp4"), TELIX_AV_CB_MSG_ERR_NOT_FOUND);
+    expectError(server("clip.mp4?status=503"), TELIX_AV_CB_MSG_ERR_PLAYING);
+    expectError(server("playlist.asx"), TELIX_AV_CB_MSG_ERR_CODEC_NOT_SUPPORTED);
+    expectError("unheardof://somewhere/clip.mp4", TELIX_AV_CB_MSG_ERR_CODEC_NOT_SUPPORTED);
+    ClosedPort port;
+    expectError(port.url(), TELIX_AV_CB_MSG_ERR_NET_CANNOT_CONNECT);
+    play(file("tune.wav")); // and is good for another
+}
+
+TEST_F(MediaErrorTest, TakesNoRubbishForMedia) {
+    char name[] = "rubbish.XXXXXX";
+    const int descriptor = mkstemp(name);
+    ASSERT_GE(descriptor, 0);
+    std::vector<uint8_t> rubbish(100000);
+    uint32_t random = 1;
+    for (uint8_t& byte : rubbish) {
+        random = random * 1664525 + 1013904223;
+        byte = static_cast<uint8_t>(random >> 24);
+    }
+    ASSERT_EQ(write(descriptor, rubbish.data(), rubbish.size()), static_cast<ssize_t>(rubbish.size()));
+    gchar* path = g_canonicalize_filename(name, nullptr);
+    expectError(std::string("file://") + path, TELIX_AV_CB_MSG_ERR_CODEC_NOT_SUPPORTED);
+    ASSERT_EQ(ftruncate(descriptor, 0), 0);
+    expectError(std::string("file://") + path, TELIX_AV_CB_MSG_ERR_CODEC_NOT_SUPPORTED);
+    g_free(path);
+    close(descriptor);
+    unlink(name);
+}
+
+TEST_F(MediaErrorTest, TellsWhenTheConnectionIsLost) {
+    Server server;
+    play(server("clip.mp4?rate=150000"));
+    server.end();
+    expectMessages({playStart, TELIX_AV_CB_MSG_ERR_NET_DISCONNECTED});
+    EXPECT_EQ(stateOf(m_player).state, "error");
+}
+
+TEST_F(MediaErrorTest, MakesAnEqualErrorADifferentMessage) {
+    ASSERT_EQ(start(m_player, file("nothing.mp4")), 0);
+    expectMessages({TELIX_AV_CB_MSG_ERR_NOT_FOUND});
+    ASSERT_EQ(start(m_player, file("nothing.mp4")), 0);
+    expectMessages({TELIX_AV_CB_MSG_ERR_NOT_FOUND, 0, TELIX_AV_CB_MSG_ERR_NOT_FOUND});
+}
+
+TEST_F(MediaErrorTest, StopsAtOnceWhileAServerIsSilent) {
+    ClosedPort port;
+    port.listenAndBeSilent();
+    ASSERT_EQ(start(m_player, port.url()), 0);
+    std::this_thread::sleep_for(std::chrono::milliseconds(300));
+    EXPECT_EQ(stateOf(m_player).state, "connecting");
+    const auto begin = std::chrono::steady_clock::now();
+    ASSERT_EQ(TELIX_JS_AV_Stop(m_player), 0);
+    EXPECT_LT(secondsSince(begin), 0.2);
+    play(file("tune.wav"));
+    EXPECT_LT(secondsSince(begin), 3);
+}
+
+// ---- Sound and picture
+
+TEST_F(MediaTest, IsAsLoudAsItIsToldTo) {
+    ASSERT_EQ(TELIX_JS_AV_SetVolume(m_player, 30), 0);
+    play(file("clip.mp4"));
+    EXPECT_NEAR(sound()->volume, 0.3, 0.001);
+    ASSERT_EQ(TELIX_JS_AV_SetVolume(m_player, 100), 0);
+    EXPECT_TRUE(waitUntil([] { return sound()->volume > 0.999; }));
+    ASSERT_EQ(TELIX_JS_AV_SetVolume(m_player, 0), 0);
+    EXPECT_TRUE(waitUntil([] { return sound()->volume < 0.001; }));
+    EXPECT_NE(TELIX_JS_AV_SetVolume(m_player, 101), 0);
+    EXPECT_EQ(stateOf(m_player).volume, 0U);
+}
+
+TEST_F(MediaTest, PlacesThePictureWhereThePageWantsIt) {
+    TELIX_JS_DISPLAY_AREA area{100, 50, 640, 360};
+    ASSERT_EQ(TELIX_JS_AV_SetDisplayArea(m_player, &area), 0);
+    play(file("clip.mp4"));
+    EXPECT_TRUE(waitUntil([] { return takeShot().isVisible; }));
+    EXPECT_EQ(takeShot().areaX, 100);
+    EXPECT_EQ(takeShot().areaWidth, 640U);
+    area.x = 200;
+    ASSERT_EQ(TELIX_JS_AV_SetDisplayArea(m_player, &area), 0);
+    EXPECT_EQ(takeShot().areaX, 200);
+    ASSERT_EQ(TELIX_JS_AV_SetFullScreen(m_player, 1), 0);
+    EXPECT_TRUE(takeShot().isFullScreen);
+    ASSERT_EQ(TELIX_JS_AV_SetFullScreen(m_player, 0), 0);
+    EXPECT_FALSE(takeShot().isFullScreen);
+    const Shot shot = takeShot();
+    EXPECT_TRUE(waitUntil([&] { return takeShot().serial > shot.serial + 20; }))
+        << "the picture stands still";
+    EXPECT_NE(takeShot().pixels, shot.pixels);
+}
+
+TEST_F(MediaTest, LetsTheComponentsBeSeenAndHeardThatAreSelected) {
+    TELIX_JS_AVCOMPHANDLE* none = nullptr;
+    uint32_t count = 0;
+    EXPECT_NE(TELIX_JS_AV_GetComponents(m_player, TELIX_JS_AVCOMPTYPE_AUDIO, &none, &count), 0);
+    Server server;
+    play(server("languages.mp4"));
+    const auto video = components(TELIX_JS_AVCOMPTYPE_VIDEO);
+    const auto audio = components(TELIX_JS_AVCOMPTYPE_AUDIO);
+    const auto subtitles = components(TELIX_JS_AVCOMPTYPE_SUBTITLE);
+    ASSERT_EQ(video.size(), 1U);
+    ASSERT_EQ(audio.size(), 2U);
+    ASSERT_EQ(subtitles.size(), 1U);
+    EXPECT_TRUE(components(99).empty());
+
+    const auto encodingOf = [](TELIX_JS_AVCOMPHANDLE component, TELIX_JS_AVCOMPTYPE type) {
+        char* text = nullptr;
+        EXPECT_EQ(TELIX_JS_AV_AVComponent_GetEncoding(component, type, &text), 0);
+        return textOf(text);
+    };
+    const auto languageOf = [](TELIX_JS_AVCOMPHANDLE component, TELIX_JS_AVCOMPTYPE type) {
+        char* text = nullptr;
+        EXPECT_EQ(TELIX_JS_AV_AVComponent_GetLanguage(component, type, &text), 0);
+        return textOf(text);
+    };
+    EXPECT_EQ(encodingOf(video[0], TELIX_JS_AVCOMPTYPE_VIDEO), "AVC");
+    EXPECT_EQ(encodingOf(audio[0], TELIX_JS_AVCOMPTYPE_AUDIO), "HEAAC");
+    EXPECT_EQ(languageOf(audio[0], TELIX_JS_AVCOMPTYPE_AUDIO), "deu");
+    EXPECT_EQ(languageOf(audio[1], TELIX_JS_AVCOMPTYPE_AUDIO), "eng");
+    EXPECT_EQ(languageOf(subtitles[0], TELIX_JS_AVCOMPTYPE_SUBTITLE), "eng");
+    float aspectRatio = 0;
+    EXPECT_EQ(TELIX_JS_AV_AVComponent_GetAspectRatio(video[0], TELIX_JS_AVCOMPTYPE_VIDEO, &aspectRatio), 0);
+    EXPECT_NEAR(aspectRatio, 16.0 / 9.0, 0.001);
+    uint32_t channels = 0;
+    EXPECT_EQ(TELIX_JS_AV_AVComponent_GetAudioChannels(audio[0], TELIX_JS_AVCOMPTYPE_AUDIO, &channels), 0);
+    EXPECT_EQ(channels, 2U);
+    ___UINT8 flag = 7;
+    EXPECT_EQ(TELIX_JS_AV_AVComponent_GetEncrypted(audio[0], TELIX_JS_AVCOMPTYPE_AUDIO, &flag), 0);
+    EXPECT_EQ(flag, 0);
+    char* text = nullptr;
+    EXPECT_NE(TELIX_JS_AV_AVComponent_GetLanguage(audio[0], TELIX_JS_AVCOMPTYPE_VIDEO, &text), 0);
+
+    EXPECT_EQ(sound()->audio, 0);
+    EXPECT_EQ(components(TELIX_JS_AVCOMPTYPE_AUDIO, true), std::vector{audio[0]});
+    ASSERT_EQ(TELIX_JS_AV_SelectComponent(m_player, audio[1], TELIX_JS_AVCOMPTYPE_AUDIO), 0);
+    EXPECT_TRUE(waitUntil([] { return sound()->audio == 1; }));
+    EXPECT_EQ(components(TELIX_JS_AVCOMPTYPE_AUDIO, true), std::vector{audio[1]});
+    ASSERT_EQ(TELIX_JS_AV_UnselectComponent(m_player, audio[1], TELIX_JS_AVCOMPTYPE_AUDIO), 0);
+    EXPECT_TRUE(waitUntil([] { return sound()->isMuted; }));
+    EXPECT_TRUE(components(TELIX_JS_AVCOMPTYPE_AUDIO, true).empty());
+
+    ASSERT_EQ(TELIX_JS_AV_UnselectComponent(m_player, video[0], TELIX_JS_AVCOMPTYPE_VIDEO), 0);
+    EXPECT_TRUE(waitUntil([] { return !takeShot().isVisible; }));
+    ASSERT_EQ(TELIX_JS_AV_SelectComponent(m_player, video[0], TELIX_JS_AVCOMPTYPE_VIDEO), 0);
+    EXPECT_TRUE(waitUntil([] { return takeShot().isVisible; }));
+    EXPECT_NE(TELIX_JS_AV_SelectComponent(m_player, 4711, TELIX_JS_AVCOMPTYPE_VIDEO), 0);
+    EXPECT_NE(TELIX_JS_AV_SelectComponent(m_player, audio[0], 99), 0);
+    expectMessages({playStart});
+}
+
+TEST_F(MediaTest, ShowsSubtitlesOnlyWhileTheyAreSelected) {
+    const auto whitePixels = [] {
+        telix_desktop_frame frame{};
+        telix_desktop_acquire_frame(&frame);
+        size_t count = 0;
+        for (uint32_t y = frame.height / 2; frame.pixels && y < frame.height; ++y) {
+            for (uint32_t x = 0; x < frame.width; ++x) {
+                const uint8_t* pixel = frame.pixels + size_t{y} * frame.stride + size_t{x} * 4;
+                count += pixel[0] > 200 && pixel[1] > 200 && pixel[2] > 200 ? 1 : 0;
+            }
+        }
+        telix_desktop_release_frame(&frame);
+        return count;
+    };
+    play(file("languages.mp4")); // the lower half has nothing white
+    const auto subtitles = components(TELIX_JS_AVCOMPTYPE_SUBTITLE);
+    ASSERT_EQ(subtitles.size(), 1U);
+    EXPECT_TRUE(waitUntil([] { return takeShot().isVisible; }));
+    EXPECT_EQ(whitePixels(), 0U);
+    ASSERT_EQ(TELIX_JS_AV_SelectComponent(m_player, subtitles[0], TELIX_JS_AVCOMPTYPE_SUBTITLE), 0);
+    EXPECT_TRUE(waitUntil([&] { return whitePixels() > 200; }, 5));
+    ASSERT_EQ(TELIX_JS_AV_UnselectComponent(m_player, subtitles[0], TELIX_JS_AVCOMPTYPE_SUBTITLE), 0);
+    EXPECT_TRUE(waitUntil([&] { return whitePixels() == 0; }, 3));
+}
+
+// ---- What is held ahead
+
+TEST_F(MediaTest, TellsHowMuchIsHeldAhead) {
+    Server server;
+    ASSERT_EQ(start(m_player, server("clip.mp4?rate=300000")), 0);
+    EXPECT_EQ(info().state, 1U);
+    EXPECT_EQ(info().duration, 0U);
+    EXPECT_EQ(info().buffered, 0U);
+    ASSERT_TRUE(waitUntil([&] { return info().duration > 0; }));
+    EXPECT_EQ(info().state, 2U);
+    const uint32_t early = info().bufferedEnd;
+    EXPECT_LT(early, 19U);
+    EXPECT_TRUE(waitUntil([&] { return info().bufferedEnd > early + 1; }));
+    EXPECT_TRUE(waitUntil([&] { return info().bufferedEnd == 20; }));
+    const TELIX_JS_AV_PLAY_INFO all = info();
+    EXPECT_NEAR(all.buffered, 20 - all.playPosition / 1000.0, 1.5);
+    expectMessages({playStart});
+    play(file("clip.mp4"));
+    EXPECT_EQ(info().buffered, noBufferReport);
+}
+
+TEST_F(MediaTest, WaitsForMediaThatComesSlowlyAndGoesOn) {
+    Server server;
+    ASSERT_EQ(start(m_player, server("second.mp4?rate=60000")), 0); // plays 48 kB a second
+    EXPECT_TRUE(waitUntil([&] { return stateOf(m_player).state == "buffering"; }));
+    ASSERT_EQ(TELIX_JS_AV_Pause(m_player), 0);
+    EXPECT_EQ(stateOf(m_player).state, "paused");
+    ASSERT_EQ(TELIX_JS_AV_Resume(m_player), 0);
+    expectMessages({playStart});
+    EXPECT_TRUE(waitUntil([&] { return info().playPosition > 1000; }));
+    EXPECT_EQ(stateOf(m_player).state, "playing");
+}
+
+TEST_F(MediaTest, AnswersOtherThreadsWhileItPlays) {
+    Server server;
+    ASSERT_EQ(start(m_player, server("clip.mp4")), 0);
+    std::atomic<bool> isOver{false};
+    std::atomic<unsigned int> answers{0};
+    std::vector<std::thread> watchers;
+    for (int index = 0; index < 3; ++index) {
+        watchers.emplace_back([&, index] {
+            while (!isOver) {
+                TELIX_JS_AV_PLAY_INFO* record = nullptr;
+                TELIX_JS_AV_GetPlayInfo(m_player, &record);
+                TELIX_JS_AV_Pause(m_player);
+                TELIX_JS_AV_Resume(m_player);
+                if (index == 0 && ++answers % 100 == 0) {
+                    TELIX_JS_AV_Stop(m_player);
+                }
+            }
+        });
+    }
+    for (int round = 0; round < 20; ++round) {
+        start(m_player, server("clip.mp4"));
+        TELIX_JS_AV_Seek(m_player, 5000);
+        TELIX_JS_AV_SetPlaySpeed(m_player, 1, 2, 0);
+        std::this_thread::sleep_for(std::chrono::milliseconds(50));
+    }
+    TELIX_JS_AV_PLAY_INFO* record = nullptr;
+    ASSERT_EQ(TELIX_JS_AV_GetPlayInfo(m_player, &record), 0);
+    TELIX_JS_AV_DestroyPlayer(m_player);
+    isOver = true;
+    for (std::thread& watcher : watchers) {
+        watcher.join();
+    }
+    EXPECT_LE(record->playPosition, 20000U); // who is late reads something still
+    EXPECT_GT(answers, 100U);
+    m_player = newPlayer();
+    const size_t before = seen().size();
+    ASSERT_EQ(start(m_player, file("tune.wav")), 0);
+    EXPECT_TRUE(waitUntil([&] { return seen().size() > before && seen().back() == playStart; }));
+}
+
+// ---- Turns of the pipeline
+
+TEST_F(MediaTest, TakesThePipelineFromAnotherPlayer) {
+    const TELIX_JS_AV_HANDLE other = newPlayer();
+    play(file("clip.mp4"));
+    ASSERT_EQ(start(other, file("second.mp4")), 0);
+    expectMessages({playStart, playStart}); // and nothing of the first: it would be taken for the second's
+    EXPECT_EQ(messages.back().player, other);
+    EXPECT_TRUE(waitUntil([] { return showsSecondClip(takeShot()); }));
+    EXPECT_EQ(stateOf(m_player).state, "stopped");
+    EXPECT_NE(TELIX_JS_AV_Pause(m_player), 0);
+    EXPECT_EQ(TELIX_JS_AV_Stop(m_player), 0); // of one that has nothing
+    std::this_thread::sleep_for(std::chrono::milliseconds(200));
+    EXPECT_EQ(stateOf(other).state, "playing");
+    ASSERT_EQ(TELIX_JS_AV_DestroyPlayer(m_player), 0);
+    TELIX_JS_AV_UnregisterOnPlayStateChange(onMessage); // the other goes on expecting its messages
+    ASSERT_EQ(TELIX_JS_AV_Seek(other, 7000), 0);
+    expectMessages({playStart, playStart, playEnd});
+}
+
+TEST_F(MediaTest, TakesThePictureFromBroadcastAndLosesItToATune) {
+    TELIX_JS_VB_HANDLE object = 0;
+    ASSERT_EQ(TELIX_JS_VB_GetHandle(&object), 0);
+    TELIX_JS_VB_RegisterOnChannelChangeSucceeded(onChannelChange);
+    const auto isTuned = [&](size_t times) {
+        std::lock_guard<std::mutex> lock(messagesMutex);
+        return static_cast<size_t>(std::count_if(messages.begin(), messages.end(), [](const Message& each) {
+                   return each.text == "channel";
+               })) == times;
+    };
+    ASSERT_EQ(TELIX_JS_VB_BindToCurrChannel(object), 0);
+    ASSERT_TRUE(waitUntil([&] { return isTuned(1); }));
+    play(file("second.mp4"));
+    EXPECT_TRUE(waitUntil([] { return showsSecondClip(takeShot()); }));
+    TELIX_PLAYSTATE_ENUM_T state = -1;
+    EXPECT_EQ(TELIX_JS_VB_GetPlayBackState(object, &state), 0);
+    EXPECT_EQ(state, TELIX_PLAYSTATE_STOPPED);
+    ASSERT_EQ(TELIX_JS_VB_BindToCurrChannel(object), 0);
+    ASSERT_TRUE(waitUntil([&] { return isTuned(2); }));
+    EXPECT_EQ(stateOf(m_player).state, "error");
+    EXPECT_FALSE(showsSecondClip(takeShot()));
+    expectMessages({0, playStart, TELIX_AV_CB_MSG_ERR_PLAYING, 0});
+    play(file("second.mp4")); // and back, cleanly
+    ASSERT_EQ(TELIX_JS_AV_Stop(m_player), 0);
+    ASSERT_EQ(TELIX_JS_VB_BindToCurrChannel(object), 0);
+    ASSERT_TRUE(waitUntil([&] { return isTuned(3); }));
+    EXPECT_TRUE(takeShot().isVisible);
+    expectMessages({0, playStart, TELIX_AV_CB_MSG_ERR_PLAYING, 0, playStart, 0});
+    TELIX_JS_VB_Release(object);
+    TELIX_JS_VB_UnRegisterOnChannelChangeSucceeded(onChannelChange);
+}
+
+TEST_F(MediaTest, StartsAndStopsThirtyTimesAndPlaysTheLast) {
+    Server server;
+    constexpr int times = 30;
+    const auto begin = std::chrono::steady_clock::now();
+    for (int index = 0; index < times; ++index) {
+        ASSERT_EQ(start(m_player, index % 2 == 0 ? server("clip.mp4") : file("second.mp4")), 0);
+        std::this_thread::sleep_for(
+            std::chrono::milliseconds(index * 5)); // each gets further than the one before
+        ASSERT_EQ(TELIX_JS_AV_Stop(m_player), 0);
+    }
+    const size_t before = seen().size();
+    ASSERT_EQ(start(m_player, server("second.mp4")), 0);
+    EXPECT_TRUE(waitUntil([&] { return seen().size() > before; }));
+    EXPECT_EQ(seen().back(), playStart);
+    EXPECT_TRUE(waitUntil([] { return showsSecondClip(takeShot()); }));
+    EXPECT_LT(secondsSince(begin), 12);
+}
+
+TEST_F(MediaTest, IsSilentAfterItWasDestroyed) {
+    play(file("tune.wav"));
+    ASSERT_EQ(TELIX_JS_AV_Seek(m_player, 2700), 0);
+    ASSERT_EQ(TELIX_JS_AV_DestroyPlayer(m_player), 0);
+    TELIX_JS_AV_UnregisterOnPlayStateChange(onMessage);
+    std::this_thread::sleep_for(std::chrono::milliseconds(700));
+    expectMessages({playStart});
+    EXPECT_FALSE(takeShot().isVisible);
+    EXPECT_NE(start(m_player, file("tune.wav")), 0);
+}
+
+TEST_F(MediaTest, RefusesHandlesThatItNeverGave) {
+    for (const uint32_t nonsense : {0U, 4711U, 0xFFFFFFFFU}) {
+        uint32_t number = 0;
+        float ratio = 0;
+        ___UINT8 flag = 0;
+        char* text = nullptr;
+        uint32_t* array = nullptr;
+        TELIX_JS_AV_PLAY_INFO* record = nullptr;
+        const TELIX_JS_DISPLAY_AREA area{};
+        EXPECT_NE(TELIX_JS_AV_DestroyPlayer(nonsense), 0);
+        EXPECT_NE(TELIX_JS_AV_RegisterOnPlayStateChange(nonsense, onMessage), 0);
+        EXPECT_NE(TELIX_JS_AV_RegisterOnDRMRightsError(nonsense, onRights), 0);
+        EXPECT_NE(start(nonsense, file("clip.mp4")), 0);
+        EXPECT_NE(queue(nonsense, file("clip.mp4")), 0);
+        EXPECT_NE(TELIX_JS_AV_Queue(nonsense, nullptr, 1, 6, 512, 0, 0, 0), 0);
+        EXPECT_NE(TELIX_JS_AV_Stop(nonsense), 0);
+        EXPECT_NE(TELIX_JS_AV_Pause(nonsense), 0);
+        EXPECT_NE(TELIX_JS_AV_Resume(nonsense), 0);
+        EXPECT_NE(TELIX_JS_AV_SetVolume(nonsense, 50), 0);
+        EXPECT_NE(TELIX_JS_AV_SetFullScreen(nonsense, 1), 0);
+        EXPECT_NE(TELIX_JS_AV_SetPlaySpeed(nonsense, 1, 1, 0), 0);
+        EXPECT_NE(TELIX_JS_AV_SetPlaySpeed(nonsense, 1, 0, 0), 0);
+        EXPECT_NE(TELIX_JS_AV_SetDisplayArea(nonsense, &area), 0);
+        EXPECT_NE(TELIX_JS_AV_GetPlayInfo(nonsense, &record), 0);
+        EXPECT_NE(TELIX_JS_AV_Seek(nonsense, 0), 0);
+        EXPECT_NE(TELIX_JS_AV_GetComponents(nonsense, 0, &array, &number), 0);
+        EXPECT_NE(TELIX_JS_AV_GetCurrActiveComponents(nonsense, 0, &array, &number), 0);
+        EXPECT_NE(TELIX_JS_AV_SelectComponent(nonsense, nonsense, nonsense), 0);
+        EXPECT_NE(TELIX_JS_AV_UnselectComponent(nonsense, nonsense, nonsense), 0);
+        EXPECT_NE(TELIX_JS_AV_AVComponent_GetEncoding(nonsense, 0, &text), 0);
+        EXPECT_NE(TELIX_JS_AV_AVComponent_GetLanguage(nonsense, 1, &text), 0);
+        EXPECT_NE(TELIX_JS_AV_AVComponent_GetAspectRatio(nonsense, nonsense, &ratio), 0);
+        EXPECT_NE(TELIX_JS_AV_AVComponent_GetAudioChannels(nonsense, 1, &number), 0);
+        EXPECT_NE(TELIX_JS_AV_AVComponent_GetEncrypted(nonsense, 1, &flag), 0);
+        EXPECT_EQ(text, nullptr);
+        EXPECT_EQ(array, nullptr);
+        EXPECT_EQ(record, nullptr);
+    }
+    EXPECT_NE(start(m_player, ""), 0);
+    EXPECT_NE(TELIX_JS_AV_Pause(m_player), 0); // nothing to pause
+    EXPECT_NE(TELIX_JS_AV_Resume(m_player), 0);
+    EXPECT_EQ(TELIX_JS_AV_PlaySound(0, 0, 0, 0, 0, 0, 0), TELIX_RETCODE_NOT_AVAILABLE);
+    expectMessages({});
+}
+
+// ---- Provoked from outside
+
+TEST_F(MediaTest, GivesOnWhatIsProvoked) {
+    Players& players = Players::instance();
+    EXPECT_FALSE(players.injectMessage(TELIX_AV_CB_MSG_ERR_NET_BUSY));
+    EXPECT_FALSE(players.injectRightsError(1, "", "", ""));
+    play(file("clip.mp4"));
+    EXPECT_TRUE(players.injectMessage(TELIX_AV_CB_MSG_ERR_NET_BUSY));
+    expectMessages({playStart, TELIX_AV_CB_MSG_ERR_NET_BUSY});
+    EXPECT_TRUE(players.injectRightsError(2, "content", "system", "issuer"));
+    expectMessages({playStart, TELIX_AV_CB_MSG_ERR_NET_BUSY, 0});
+    EXPECT_EQ(messages.back().text, "2/content/system/issuer");
+    EXPECT_EQ(messages.back().player, m_player);
+    EXPECT_TRUE(players.injectBuffered(0xFF000003));
+    EXPECT_EQ(info().buffered, 0xFF000003U);
+    EXPECT_TRUE(players.injectBuffered(std::nullopt));
+    EXPECT_EQ(info().buffered, noBufferReport);
+    ASSERT_EQ(TELIX_JS_AV_Stop(m_player), 0);
+    EXPECT_TRUE(players.injectMessage(TELIX_AV_CB_MSG_ERR_NET_BUSY)); // to the one that played last
+    expectMessages({playStart, TELIX_AV_CB_MSG_ERR_NET_BUSY, 0, TELIX_AV_CB_MSG_ERR_NET_BUSY});
+}
+
+} // namespace
