@@ -110,9 +110,7 @@ void ApplicationView::paintEvent(QPaintEvent* event) {
 }
 
 // The engine would lay the page out anew.
-void ApplicationView::resizeEvent(QResizeEvent* event) {
-    QWidget::resizeEvent(event);
-}
+void ApplicationView::resizeEvent(QResizeEvent*) {}
 
 // The event as the engine should see it.
 QMouseEvent ApplicationView::onPage(const QMouseEvent& event) const {
