@@ -5,7 +5,7 @@
 #   languages.mp4  8 s with German and English sound (low and high) and English subtitles, one a second
 #   tune.mp3, tune.aac, tune.wav   3 s of sound
 #   hls/index.m3u8 6 s in three segments, for HTTP live streaming
-#   playlist.asx   clip.mp4 and second.mp4
+#   playlist.asx   clip.mp4 and second.mp4; the address of their folder comes from media_server.py
 set -euo pipefail
 
 if [ $# -ne 1 ] || [ "${1#-}" != "$1" ]; then
@@ -73,6 +73,7 @@ if [ ! -e "$folder/playlist.asx" ]; then
     cat >"$work/playlist.asx" <<'PLAYLIST'
 <ASX VERSION="3.0">
   <TITLE>Clips of the demonstration</TITLE>
+  <BASE HREF="@FOLDER@"/>
   <ENTRY><TITLE>Clip</TITLE><REF HREF="clip.mp4"/></ENTRY>
   <ENTRY><TITLE>Second clip</TITLE><REF HREF="second.mp4"/></ENTRY>
 </ASX>
