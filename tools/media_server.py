@@ -2,7 +2,7 @@
 """Serves folders over HTTP on this machine alone, as a broadcaster's server would: with byte ranges, and on request
 slow, without ranges or with an error. For ./run.sh, the demonstration and the tests.
 
-What a response is like may be asked for in the address: ?rate=BYTES sends so many bytes a second, ?ranges=no offers no
+What a response is like may be asked for in the address: ?rate=BYTES sends so many bytes a second, ?ranges=no refuses
 byte ranges, ?status=NUMBER answers with that status, ?cut=BYTES closes the connection after so many bytes of the body.
 
 In a playlist (.asx), whose clips need whole addresses, @FOLDER@ stands for the address of the folder that it is in."""
@@ -148,8 +148,7 @@ class Handler(http.server.BaseHTTPRequestHandler):
         self.send_response(206 if asked else 200)
         self.send_header('Content-Type', content_type(file))
         self.send_header('Content-Length', str(end - begin + 1))
-        if wishes.ranges:
-            self.send_header('Accept-Ranges', 'bytes')
+        self.send_header('Accept-Ranges', 'bytes' if wishes.ranges else 'none')
         if asked:
             self.send_header('Content-Range', f'bytes {begin}-{end}/{size}')
         self.end_headers()

@@ -715,13 +715,6 @@ void Broadcast::deliverEvent(uint8_t tag, const StreamEvent& event) {
         std::lock_guard<std::mutex> lock(m_platform.mutex());
         holder = m_holder;
     }
-    // The data travels in hexadecimal digits.
-    std::string data;
-    for (const uint8_t byte : event.data) {
-        char digits[3];
-        std::snprintf(digits, sizeof(digits), "%02x", byte);
-        data += digits;
-    }
     std::lock_guard<std::recursive_mutex> lock(m_subscriptionsMutex);
     std::vector<Subscription> due;
     for (Subscription& each : m_subscriptions) {
@@ -731,11 +724,23 @@ void Broadcast::deliverEvent(uint8_t tag, const StreamEvent& event) {
             due.push_back(each);
         }
     }
-    char status[] = "trigger";
-    for (Subscription& each : due) {
-        each.callback(each.object, nullptr, nullptr, reinterpret_cast<___UINT8*>(each.name.data()),
-                      reinterpret_cast<___UINT8*>(data.data()), static_cast<___UINT32>(data.size()),
-                      reinterpret_cast<___UINT8*>(status));
+    deliver(due, event.data, "trigger");
+}
+
+// Under the mutex of the subscriptions.
+void Broadcast::deliver(const std::vector<Subscription>& due, const Bytes& data, std::string status) {
+    // The data travels in hexadecimal digits.
+    std::string text;
+    for (const uint8_t byte : data) {
+        char digits[3];
+        std::snprintf(digits, sizeof(digits), "%02x", byte);
+        text += digits;
+    }
+    for (const Subscription& each : due) {
+        std::string name = each.name;
+        each.callback(each.object, nullptr, nullptr, reinterpret_cast<___UINT8*>(name.data()),
+                      reinterpret_cast<___UINT8*>(text.data()), static_cast<___UINT32>(text.size()),
+                      reinterpret_cast<___UINT8*>(status.data()));
     }
 }
 
@@ -752,23 +757,60 @@ bool Broadcast::injectChannelError(TELIX_ERR_STATE_ENUM_T error) {
     return true;
 }
 
-bool Broadcast::injectRating(const std::string& region, uint8_t broadcast) {
-    const TELIX_JS_SI_PARENTALRATING_HANDLE rating = m_programmes.addRating(region, broadcast);
+bool Broadcast::zap(TELIX_JS_CM_HANDLE channel) {
+    const bool isKnown = m_channels.find(channel).has_value();
     std::lock_guard<std::mutex> lock(m_platform.mutex());
-    if (m_holder == 0) {
+    if (!isKnown) {
         return false;
     }
-    m_platform.post([this, rating] { tellRating(rating); });
+    if (m_holder != 0) {
+        requestLocked(m_holder, channel);
+    } else {
+        m_current = channel;
+    }
     return true;
 }
 
-bool Broadcast::injectStreamEvent(uint8_t tag, const StreamEvent& event) {
+// It comes also if the rating was the same before.
+bool Broadcast::injectRating(const std::string& region, uint8_t broadcast) {
+    const TELIX_JS_SI_PARENTALRATING_HANDLE rating =
+        broadcast == 0 ? 0 : m_programmes.addRating(region, broadcast);
     std::lock_guard<std::mutex> lock(m_platform.mutex());
     if (m_holder == 0) {
         return false;
     }
-    m_platform.post([this, tag, event] { deliverEvent(tag, event); });
+    m_platform.post([this, rating] {
+        m_hasRating = true;
+        m_rating = ~rating; // never the one that comes
+        tellRating(rating);
+    });
     return true;
+}
+
+bool Broadcast::injectRatingError(std::string contentId, std::string drmSystemId) {
+    std::lock_guard<std::mutex> lock(m_platform.mutex());
+    if (m_holder == 0) {
+        return false;
+    }
+    m_platform.post([this, object = m_holder, contentId, drmSystemId]() mutable {
+        onRatingError.call(object, reinterpret_cast<___UINT8*>(contentId.data()),
+                           TELIX_JS_SI_PARENTALRATING_HANDLE{0},
+                           reinterpret_cast<___UINT8*>(drmSystemId.data()));
+    });
+    return true;
+}
+
+size_t Broadcast::injectStreamEvent(const InjectedEvent& event) {
+    std::lock_guard<std::recursive_mutex> lock(m_subscriptionsMutex);
+    std::vector<Subscription> due;
+    std::copy_if(m_subscriptions.begin(), m_subscriptions.end(), std::back_inserter(due),
+                 [&](const Subscription& each) {
+                     return event.id.value_or(each.eventId) == each.eventId &&
+                            event.tag.value_or(each.tag) == each.tag &&
+                            event.name.value_or(each.name) == each.name;
+                 });
+    deliver(due, event.data, event.status);
+    return due.size();
 }
 
 bool Broadcast::injectFullScreen(bool on) {
@@ -782,6 +824,30 @@ bool Broadcast::injectFullScreen(bool on) {
     }
     m_platform.post([this, object] { onFullScreen.call(object); });
     return true;
+}
+
+// ---- What there is now
+
+Broadcast::State Broadcast::state() const {
+    State state{};
+    {
+        std::lock_guard<std::mutex> lock(m_platform.mutex());
+        state.channel = m_current;
+        for (const auto& [handle, object] : m_objects) {
+            state.objects.push_back({handle, object.state, object.channel, object.view, handle == m_holder});
+        }
+        for (const TELIX_JS_AVCOMPHANDLE handle : m_available) {
+            const Component& component = m_components[handle - 1];
+            state.components.push_back({handle, component, m_active[component.type] == handle});
+        }
+        state.present = m_present;
+        state.following = m_following;
+    }
+    std::lock_guard<std::recursive_mutex> lock(m_subscriptionsMutex);
+    for (const Subscription& each : m_subscriptions) {
+        state.watches.push_back({each.object, each.eventId, each.tag, each.name});
+    }
+    return state;
 }
 
 } // namespace desktop

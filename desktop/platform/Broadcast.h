@@ -101,10 +101,56 @@ public:
     // ---- What may be provoked from outside, as if broadcast or the viewer had done it. Each concerns the
     // object that holds the tuner, and is false if there is none.
 
+    // Tunes to a channel. Without an object the set remembers it for the one that binds next: also true.
+    bool zap(TELIX_JS_CM_HANDLE channel);
+
     bool injectChannelError(TELIX_ERR_STATE_ENUM_T error);
-    bool injectRating(const std::string& region, uint8_t broadcast);
-    bool injectStreamEvent(uint8_t tag, const StreamEvent& event);
     bool injectFullScreen(bool on);
+
+    // A rating as in EitRating: an age, or with any other number but 0 an error. With 0 there is none.
+    bool injectRating(const std::string& region, uint8_t broadcast);
+    bool injectRatingError(std::string contentId, std::string drmSystemId);
+
+    // An event that reaches the watchers of all objects for which the criteria hold; it gives their number.
+    // Platform thread.
+    struct InjectedEvent {
+        std::optional<uint16_t> id;
+        std::optional<uint8_t> tag;
+        std::optional<std::string> name;
+        Bytes data;
+        std::string status = "trigger";
+    };
+    size_t injectStreamEvent(const InjectedEvent& event);
+
+    // ---- What there is now
+
+    struct State {
+        struct Object {
+            TELIX_JS_VB_HANDLE handle;
+            TELIX_PLAYSTATE_ENUM_T playState;
+            TELIX_JS_CM_HANDLE channel;
+            Picture::View view;
+            bool holdsTuner;
+        };
+        struct Available {
+            TELIX_JS_AVCOMPHANDLE handle;
+            Component component;
+            bool isActive;
+        };
+        struct Watch {
+            TELIX_JS_VB_HANDLE object;
+            uint16_t eventId;
+            uint8_t tag;
+            std::string name;
+        };
+        TELIX_JS_CM_HANDLE channel; // of the set
+        std::vector<Object> objects;
+        std::vector<Available> components;
+        std::vector<Watch> watches;
+        TELIX_JS_SI_HANDLE present; // 0: none
+        TELIX_JS_SI_HANDLE following;
+    };
+    State state() const;
 
     // The PID of the audio that the pipeline lets through. Platform thread.
     std::optional<uint16_t> heardAudio() const;
@@ -162,6 +208,7 @@ private:
     void takeProgrammes(uint64_t number, const Eit& eit);
     void tellRating(TELIX_JS_SI_PARENTALRATING_HANDLE rating);
     void deliverEvent(uint8_t tag, const StreamEvent& event);
+    void deliver(const std::vector<Subscription>& due, const Bytes& data, std::string status);
     void applySelection();
     void readShape();
     void makeTestFile();
@@ -189,7 +236,7 @@ private:
     Picture::Token m_token = 0;
 
     // Held while a stream event is delivered, so that none comes after its end.
-    std::recursive_mutex m_subscriptionsMutex;
+    mutable std::recursive_mutex m_subscriptionsMutex;
     std::list<Subscription> m_subscriptions;
 
     // Platform thread.

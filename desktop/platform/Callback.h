@@ -43,6 +43,44 @@ private:
     Function m_function = nullptr;
 };
 
+// A callback that several register and give up, each for itself: it is called once as long as one of them is
+// left.
+template <typename Function>
+class CountedCallback {
+public:
+    void set(Function function) {
+        std::lock_guard<std::recursive_mutex> lock(m_mutex);
+        m_count = function == m_function ? m_count + 1 : 1; // another one takes the place
+        m_function = function;
+    }
+
+    // As with Callback, once the last one has gone.
+    void clear(Function function) {
+        std::lock_guard<std::recursive_mutex> lock(m_mutex);
+        if (m_function == function && m_count > 0 && --m_count == 0) {
+            m_function = nullptr;
+        }
+    }
+
+    bool isSet() const {
+        std::lock_guard<std::recursive_mutex> lock(m_mutex);
+        return m_function != nullptr;
+    }
+
+    template <typename... Arguments>
+    void call(Arguments... arguments) const {
+        std::lock_guard<std::recursive_mutex> lock(m_mutex);
+        if (m_function) {
+            m_function(arguments...);
+        }
+    }
+
+private:
+    mutable std::recursive_mutex m_mutex;
+    Function m_function = nullptr;
+    unsigned int m_count = 0;
+};
+
 } // namespace desktop
 
 #endif

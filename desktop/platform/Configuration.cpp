@@ -1,6 +1,9 @@
 // Reading of the key file. The parser tells no line numbers, so they are found in the text afterwards.
 #include "desktop/platform/Configuration.h"
 
+#include "desktop/platform/Capabilities.h"
+
+#include <algorithm>
 #include <cstdio>
 #include <functional>
 #include <glib.h>
@@ -134,7 +137,155 @@ std::string readSources(const std::string& value, const std::string& folder,
     return "";
 }
 
+// The items between semicolons, without the blanks around them.
+std::vector<std::string> itemsOf(const std::string& value) {
+    std::vector<std::string> items;
+    std::unique_ptr<char*, void (*)(char**)> parts(g_strsplit(value.c_str(), ";", -1), g_strfreev);
+    for (char** part = parts.get(); *part; ++part) {
+        items.push_back(trimmed(*part));
+    }
+    if (!items.empty() && items.back().empty()) { // a semicolon at the end ends the last item
+        items.pop_back();
+    }
+    return items;
+}
+
+Reader keysReader(uint32_t& mask) {
+    return [&mask](const std::string& value) -> std::string {
+        uint32_t read = 0;
+        for (const std::string& item : itemsOf(value)) {
+            const auto group = std::find_if(keyGroups().begin(), keyGroups().end(),
+                                            [&](const KeyGroup& each) { return each.name == item; });
+            if (group == keyGroups().end()) {
+                return "\"" + item + "\" is no group of keys";
+            }
+            read |= group->bit;
+        }
+        mask = read;
+        return "";
+    };
+}
+
+Reader textReader(std::string& text) {
+    return [&text](const std::string& value) {
+        text = value;
+        return std::string();
+    };
+}
+
+// A group of the file: its keys, and what can be said only when all of them are read.
+struct Group {
+    struct Fault {
+        std::string key; // empty: the group as a whole
+        std::string reason;
+    };
+    std::map<std::string, Reader> keys;
+    std::function<std::optional<Fault>()> finish;
+};
+
+// The scheme and the threshold live in `schemes` and in the functions.
+Group schemeGroup(const std::string& name, std::vector<Configuration::RatingScheme>& schemes) {
+    auto scheme = std::make_shared<Configuration::RatingScheme>();
+    auto threshold = std::make_shared<std::string>();
+    auto hasIcons = std::make_shared<bool>(false);
+    scheme->name = name;
+    Group group;
+    group.keys = {{"ratings",
+                   [scheme](const std::string& value) -> std::string {
+                       scheme->ratings = itemsOf(value);
+                       const auto& all = scheme->ratings;
+                       for (auto each = all.begin(); each != all.end(); ++each) {
+                           if (each->empty()) {
+                               return "a rating has no name";
+                           }
+                           if (std::find(all.begin(), each, *each) != each) {
+                               return "\"" + *each + "\" is given twice";
+                           }
+                       }
+                       return "";
+                   }},
+                  {"icons",
+                   [scheme, hasIcons](const std::string& value) {
+                       std::unique_ptr<char*, void (*)(char**)> parts(g_strsplit(value.c_str(), ";", -1),
+                                                                      g_strfreev);
+                       for (char** part = parts.get(); *part; ++part) {
+                           scheme->icons.push_back(trimmed(*part));
+                       }
+                       *hasIcons = true;
+                       return std::string();
+                   }},
+                  {"threshold", textReader(*threshold)}}; // `finish` keeps it alive
+    group.finish = [scheme, threshold, hasIcons, &schemes]() -> std::optional<Group::Fault> {
+        const auto& ratings = scheme->ratings;
+        if (scheme->name == "dvb-si") {
+            return Group::Fault{"", "the scheme dvb-si is built in"};
+        }
+        if (ratings.empty()) {
+            return Group::Fault{"", "the scheme has no ratings"};
+        }
+        for (const Configuration::RatingScheme& each : schemes) {
+            if (each.name == scheme->name) {
+                return Group::Fault{"", "the scheme is given twice"};
+            }
+        }
+        if (*hasIcons && scheme->icons.size() == ratings.size() + 1 && scheme->icons.back().empty()) {
+            scheme->icons.pop_back(); // a semicolon at the end
+        }
+        if (*hasIcons && scheme->icons.size() != ratings.size()) {
+            return Group::Fault{"icons", "icons: " + std::to_string(scheme->icons.size()) + " for " +
+                                             std::to_string(ratings.size()) + " ratings"};
+        }
+        scheme->icons.resize(ratings.size());
+        scheme->threshold = static_cast<uint32_t>(ratings.size() - 1);
+        if (!threshold->empty()) {
+            const auto found = std::find(ratings.begin(), ratings.end(), *threshold);
+            if (found == ratings.end()) {
+                return Group::Fault{"threshold", "threshold: \"" + *threshold + "\" is none of the ratings"};
+            }
+            scheme->threshold = static_cast<uint32_t>(found - ratings.begin());
+        }
+        schemes.push_back(*scheme);
+        return std::nullopt;
+    };
+    return group;
+}
+
+Group drmGroup(const std::string& id, std::vector<Configuration::DrmSystem>& systems) {
+    auto system = std::make_shared<Configuration::DrmSystem>();
+    auto result = std::make_shared<uint32_t>(0);
+    system->id = id;
+    Group group;
+    group.keys = {
+        {"result", numberReader(*result, 0, G_MAXINT32)},
+        {"message", textReader(system->message)},
+    };
+    group.finish = [system, result, &systems]() -> std::optional<Group::Fault> {
+        for (const Configuration::DrmSystem& each : systems) {
+            if (each.id == system->id) {
+                return Group::Fault{"", "the DRM system is given twice"};
+            }
+        }
+        system->result = static_cast<int32_t>(*result);
+        systems.push_back(*system);
+        return std::nullopt;
+    };
+    return group;
+}
+
+// The name behind the first word of a group's header; empty if there is none or another word.
+std::string nameBehind(const std::string& header, const std::string& word) {
+    const bool isMeant = header.compare(0, word.size() + 1, word + " ") == 0;
+    return isMeant ? trimmed(header.substr(word.size() + 1)) : "";
+}
+
 } // namespace
+
+const std::vector<KeyGroup>& keyGroups() {
+    static const auto& groups = *new std::vector<KeyGroup>{
+        {"red", 0x1},  {"green", 0x2},   {"yellow", 0x4}, {"blue", 0x8},      {"navigation", 0x10},
+        {"vcr", 0x20}, {"scroll", 0x40}, {"info", 0x80},  {"numeric", 0x100}, {"alpha", 0x200}};
+    return groups;
+}
 
 std::string Configuration::Error::text() const {
     return line == 0 ? file + ": " + reason : file + ":" + std::to_string(line) + ": " + reason;
@@ -186,24 +337,35 @@ std::optional<Configuration::Error> Configuration::load(const std::string& file,
          {{"free-memory", numberReader(read.freeMemory, 0, G_MAXUINT32)},
           {"capabilities",
            [&](const std::string& value) {
-               read.capabilitiesFile = Text(g_canonicalize_filename(value.c_str(), folder.c_str())).get();
-               return std::string();
+               const Text base(g_canonicalize_filename(folder.c_str(), nullptr));
+               read.capabilitiesFile = Text(g_canonicalize_filename(value.c_str(), base.get())).get();
+               std::string wrong;
+               Capabilities::load(read.capabilitiesFile, wrong);
+               return wrong;
            }},
           {"extra-sd-video-decodes", numberReader(read.extraSdVideoDecodes, 0, 16)},
-          {"extra-hd-video-decodes", numberReader(read.extraHdVideoDecodes, 0, 16)}}},
+          {"extra-hd-video-decodes", numberReader(read.extraHdVideoDecodes, 0, 16)},
+          {"keys", keysReader(read.keys)},
+          {"key-set", keysReader(read.keySet)}}},
     };
 
     std::unique_ptr<char*, void (*)(char**)> groups(g_key_file_get_groups(keys.get(), nullptr), g_strfreev);
     for (char** group = groups.get(); *group; ++group) {
-        const auto section = known.find(*group);
-        if (section == known.end()) {
+        Group section;
+        if (const std::string scheme = nameBehind(*group, "parental-scheme"); !scheme.empty()) {
+            section = schemeGroup(scheme, read.ratingSchemes);
+        } else if (const std::string system = nameBehind(*group, "drm"); !system.empty()) {
+            section = drmGroup(system, read.drmSystems);
+        } else if (const auto found = known.find(*group); found != known.end()) {
+            section.keys = found->second;
+        } else {
             return Error{file, lineOf(text, *group, ""), std::string("unknown group [") + *group + "]"};
         }
         std::unique_ptr<char*, void (*)(char**)> names(
             g_key_file_get_keys(keys.get(), *group, nullptr, nullptr), g_strfreev);
         for (char** name = names.get(); *name; ++name) {
-            const auto reader = section->second.find(*name);
-            if (reader == section->second.end()) {
+            const auto reader = section.keys.find(*name);
+            if (reader == section.keys.end()) {
                 return Error{file, lineOf(text, *group, *name),
                              std::string("unknown key \"") + *name + "\" in [" + *group + "]"};
             }
@@ -217,7 +379,11 @@ std::optional<Configuration::Error> Configuration::load(const std::string& file,
                 return Error{file, lineOf(text, *group, *name), std::string(*name) + ": " + wrong};
             }
         }
+        if (const auto fault = section.finish ? section.finish() : std::nullopt) {
+            return Error{file, lineOf(text, *group, fault->key), fault->reason};
+        }
     }
+    read.keySet &= read.keys;
     configuration = read;
     return std::nullopt;
 }

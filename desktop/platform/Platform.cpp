@@ -1,6 +1,8 @@
 // Start of the set, its thread, and how work gets there.
 #include "desktop/platform/Platform.h"
 
+#include "desktop/platform/Control.h"
+
 #include <cstdio>
 #include <gst/gst.h>
 #include <thread>
@@ -39,6 +41,7 @@ Platform::Platform() : m_context(g_main_context_new()), m_configuration(Configur
     std::thread(&Platform::run, this).detach(); // ends with the process
     std::unique_lock<std::mutex> lock(m_startMutex);
     m_started.wait(lock, [this] { return m_isStarted; });
+    post(Control::start); // runs when this object is complete
 }
 
 void Platform::run() {

@@ -107,7 +107,7 @@ std::string languageOf(const GstTagList* tags) {
     }
     // Of the two codes of three letters, broadcast and pages use that of the language's own name.
     const char* ofThree = gst_tag_get_language_code_iso_639_2T(code);
-    const std::string language = ofThree ? ofThree : "";
+    std::string language = ofThree ? ofThree : "";
     g_free(code);
     return language;
 }
@@ -329,6 +329,11 @@ void Player::handle(GstMessage* message) {
         }
         break;
     }
+    case GST_MESSAGE_ELEMENT:
+        if (gst_message_has_name(message, "http-headers")) {
+            readHeaders(gst_message_get_structure(message));
+        }
+        break;
     case GST_MESSAGE_CLOCK_LOST:
         if (m_state == GST_STATE_PLAYING) {
             gst_element_set_state(m_pipeline, GST_STATE_PAUSED);
@@ -342,33 +347,49 @@ void Player::handle(GstMessage* message) {
 
 // ---- Errors
 
-void Player::fail(TELIX_AV_CB_MSG message, const std::string& reason) {
-    m_hasFailed = true;
-    m_listener.failed(message, reason);
+TELIX_AV_CB_MSG Player::kindOf(GstMessage* message, const GError& error) const {
+    const uint32_t status = httpStatusOf(message);
+    const bool isMissing =
+        (status >= 400 && status < 500) ||
+        (!m_isNetwork && g_error_matches(&error, GST_RESOURCE_ERROR, GST_RESOURCE_ERROR_NOT_FOUND));
+    if (isMissing) {
+        return TELIX_AV_CB_MSG_ERR_NOT_FOUND;
+    }
+    const bool isOfConnection =
+        m_isNetwork && status == 0 && (error.domain == GST_RESOURCE_ERROR || isDriedUp(message, error));
+    if (isOfConnection) {
+        return m_hasData ? TELIX_AV_CB_MSG_ERR_NET_DISCONNECTED : TELIX_AV_CB_MSG_ERR_NET_CANNOT_CONNECT;
+    }
+    // Data that does not flow before anything is presented has not been understood.
+    const bool isNotUnderstood =
+        (error.domain == GST_STREAM_ERROR && (!m_hasBegun || error.code != GST_STREAM_ERROR_FAILED)) ||
+        g_error_matches(&error, GST_CORE_ERROR, GST_CORE_ERROR_MISSING_PLUGIN);
+    return isNotUnderstood ? TELIX_AV_CB_MSG_ERR_CODEC_NOT_SUPPORTED : TELIX_AV_CB_MSG_ERR_PLAYING;
 }
 
 void Player::handleError(GstMessage* message) {
     GError* error = nullptr;
     gst_message_parse_error(message, &error, nullptr);
-    const uint32_t status = httpStatusOf(message);
-    TELIX_AV_CB_MSG kind = TELIX_AV_CB_MSG_ERR_PLAYING;
-    if (status >= 400 && status < 500) {
-        kind = TELIX_AV_CB_MSG_ERR_NOT_FOUND;
-    } else if (status >= 500) {
-        kind = TELIX_AV_CB_MSG_ERR_PLAYING; // the server's own trouble
-    } else if (m_isNetwork && (error->domain == GST_RESOURCE_ERROR || isDriedUp(message, *error))) {
-        kind = m_hasData ? TELIX_AV_CB_MSG_ERR_NET_DISCONNECTED : TELIX_AV_CB_MSG_ERR_NET_CANNOT_CONNECT;
-    } else if (g_error_matches(error, GST_RESOURCE_ERROR, GST_RESOURCE_ERROR_NOT_FOUND)) {
-        kind = TELIX_AV_CB_MSG_ERR_NOT_FOUND;
-    } else if (error->domain == GST_STREAM_ERROR && (!m_hasBegun || error->code != GST_STREAM_ERROR_FAILED)) {
-        // Data that does not flow before anything is presented has not been understood.
-        kind = TELIX_AV_CB_MSG_ERR_CODEC_NOT_SUPPORTED;
-    } else if (error->domain == GST_CORE_ERROR && error->code == GST_CORE_ERROR_MISSING_PLUGIN) {
-        kind = TELIX_AV_CB_MSG_ERR_CODEC_NOT_SUPPORTED;
-    }
-    const std::string reason = error->message;
+    m_hasFailed = true;
+    m_listener.failed(kindOf(message, *error), error->message);
     g_error_free(error);
-    fail(kind, reason);
+}
+
+void Player::readHeaders(const GstStructure* headers) {
+    const GValue* response = gst_structure_get_value(headers, "response-headers");
+    if (!response || !GST_VALUE_HOLDS_STRUCTURE(response)) {
+        return;
+    }
+    gst_structure_foreach(
+        gst_value_get_structure(response),
+        [](GQuark name, const GValue* value, gpointer hasRanges) -> gboolean {
+            const bool isGiven = g_ascii_strcasecmp(g_quark_to_string(name), "accept-ranges") == 0 &&
+                                 G_VALUE_HOLDS_STRING(value) &&
+                                 g_ascii_strcasecmp(g_value_get_string(value), "bytes") == 0;
+            *static_cast<bool*>(hasRanges) = *static_cast<bool*>(hasRanges) || isGiven;
+            return TRUE;
+        },
+        &m_hasRanges);
 }
 
 // ---- States
@@ -411,7 +432,9 @@ void Player::becomeKnown() {
         media.canSeek = canSeek != FALSE;
     }
     gst_query_unref(query);
-    media.canReverse = media.canSeek && (!m_isNetwork || usesStore());
+    m_hasStore = usesStore();
+    media.canSeekAhead = media.canSeek && (!m_hasStore || m_hasRanges);
+    media.canReverse = media.canSeek && (!m_isNetwork || m_hasStore);
     m_listener.known(media);
 }
 
@@ -445,7 +468,15 @@ void Player::setPaused(bool isPaused) {
 
 // ---- Seeks
 
+// A server that does not give parts is not asked for one: it would cut the media off, or leave it hanging.
+bool Player::canReach(uint32_t milliseconds) {
+    return !m_hasStore || m_hasRanges || milliseconds / 1000 <= progress().bufferedEnd;
+}
+
 bool Player::applySeek(double speed, uint32_t milliseconds) {
+    if (!canReach(milliseconds)) {
+        return false;
+    }
     const auto at = static_cast<gint64>(milliseconds) * GST_MSECOND;
     const auto flags = static_cast<GstSeekFlags>(GST_SEEK_FLAG_FLUSH | GST_SEEK_FLAG_ACCURATE);
     const bool isForward = speed > 0;

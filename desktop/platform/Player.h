@@ -35,7 +35,8 @@ public:
     struct Media {
         std::vector<Stream> streams;
         bool canSeek = false;
-        bool canReverse = false; // what has been played is still there
+        bool canSeekAhead = false; // also beyond what is held: the server gives any part
+        bool canReverse = false;   // what has been played is still there
     };
 
     // Called on the platform thread, inside of the player's own work: do not end the player in them.
@@ -106,7 +107,7 @@ private:
     static void onStore(GObject* store, GParamSpec* property, gpointer data);
     void handle(GstMessage* message);
     void handleError(GstMessage* message);
-    void fail(TELIX_AV_CB_MSG message, const std::string& reason);
+    TELIX_AV_CB_MSG kindOf(GstMessage* message, const GError& error) const;
     void takeBuffering(int percent);
     void settle();
     void becomeKnown();
@@ -115,12 +116,16 @@ private:
     void applySound();
     void applySubtitle();
     bool usesStore() const;
+    bool canReach(uint32_t milliseconds);
+    void readHeaders(const GstStructure* headers);
     void readBuffering(Progress& progress);
 
     Listener m_listener;
     GstElement* m_pipeline = nullptr;
     bool m_isNetwork = false;
     bool m_isLive = false;
+    bool m_hasRanges = false; // the server gives any part
+    bool m_hasStore = false;  // what has been fetched is kept
     bool m_hasFailed = false;
     bool m_isKnown = false;
     bool m_isReady = false; // at the place and speed where it is to begin

@@ -98,6 +98,7 @@ void Players::forgetMedia(Entry& entry) {
     entry.isHeld = false;
     entry.isKnown = false;
     entry.canSeek = false;
+    entry.canSeekAhead = false;
     entry.canReverse = false;
     entry.progress = {};
     entry.available.clear();
@@ -227,8 +228,10 @@ bool Players::seek(TELIX_JS_AV_HANDLE player, uint32_t milliseconds) {
         }
     }
     const auto change = [milliseconds](Entry& entry) {
-        const bool isBeyond = entry.progress.duration > 0 && milliseconds > entry.progress.duration;
-        if (entry.isKnown && (!entry.canSeek || isBeyond)) {
+        const Player::Progress& progress = entry.progress;
+        const bool isBeyond = progress.duration > 0 && milliseconds > progress.duration;
+        const bool isHeld = entry.canSeekAhead || milliseconds / 1000 <= progress.bufferedEnd;
+        if (entry.isKnown && (!entry.canSeek || isBeyond || !isHeld)) {
             return false;
         }
         entry.progress.position = milliseconds; // pages see the goal at once
@@ -578,6 +581,7 @@ void Players::takeMedia(uint64_t session, const Player::Media& media) {
         }
         entry->isKnown = true;
         entry->canSeek = media.canSeek;
+        entry->canSeekAhead = media.canSeekAhead;
         entry->canReverse = media.canReverse;
         entry->available.clear();
         for (const Player::Stream& stream : media.streams) {

@@ -37,6 +37,30 @@ TEST_F(ConfigurationTest, SetsWhatItNamesAndLeavesTheRestAtItsDefaults) {
     EXPECT_EQ(m_configuration.sources[2].service, 7);
 }
 
+TEST_F(ConfigurationTest, KnowsRatingSchemesDrmSystemsAndKeys) {
+    const auto error = load("[parental-scheme films]\nthreshold=PG\nratings=G; PG;R;\nicons=;pg.png;;\n"
+                            "[parental-scheme games]\nratings=3;18\n"
+                            "[drm urn:dvb:casystemid:1]\nresult=4\nmessage=no; not now\n[drm other]\n"
+                            "[set]\nkey-set=red;alpha\nkeys=red;blue;vcr\n");
+    ASSERT_FALSE(error) << error->text();
+    ASSERT_EQ(m_configuration.ratingSchemes.size(), 2U);
+    const Configuration::RatingScheme& films = m_configuration.ratingSchemes[0];
+    EXPECT_EQ(films.name, "films");
+    EXPECT_EQ(films.ratings, (std::vector<std::string>{"G", "PG", "R"}));
+    EXPECT_EQ(films.icons, (std::vector<std::string>{"", "pg.png", ""}));
+    EXPECT_EQ(films.threshold, 1U);
+    EXPECT_EQ(m_configuration.ratingSchemes[1].icons, (std::vector<std::string>{"", ""}));
+    EXPECT_EQ(m_configuration.ratingSchemes[1].threshold, 1U); // the highest: nothing is kept away
+    ASSERT_EQ(m_configuration.drmSystems.size(), 2U);
+    EXPECT_EQ(m_configuration.drmSystems[0].id, "urn:dvb:casystemid:1");
+    EXPECT_EQ(m_configuration.drmSystems[0].result, 4);
+    EXPECT_EQ(m_configuration.drmSystems[0].message, "no; not now");
+    EXPECT_EQ(m_configuration.drmSystems[1].id, "other");
+    EXPECT_EQ(m_configuration.drmSystems[1].result, 0);
+    EXPECT_EQ(m_configuration.keys, 0x29U);
+    EXPECT_EQ(m_configuration.keySet, 0x1U); // no letters on this remote control
+}
+
 TEST_F(ConfigurationTest, NamesFileLineAndReasonOfEveryFault) {
     const struct {
         const char* text;
@@ -53,6 +77,20 @@ TEST_F(ConfigurationTest, NamesFileLineAndReasonOfEveryFault) {
         {"[set]\nfree-memory=4294967296\n", 2, "free-memory"},
         {"[channels]\nsources= ; \n", 2, "no channel source is given"},
         {"[channels]\nsources=a.ts#0\n", 2, "service of \"a.ts#0\""},
+        {"[parental-scheme films]\n", 1, "the scheme has no ratings"},
+        {"\n[parental-scheme dvb-si]\nratings=1\n", 2, "the scheme dvb-si is built in"},
+        {"[parental-scheme films]\nthreshold=X\nratings=G;PG\n", 2, "\"X\" is none of the ratings"},
+        {"[parental-scheme films]\nratings=G;;PG\n", 2, "a rating has no name"},
+        {"[parental-scheme films]\nratings=G;PG;G\n", 2, "\"G\" is given twice"},
+        {"[parental-scheme films]\nratings=G;PG\nicons=a;b;c\n", 3, "icons: 3 for 2 ratings"},
+        {"[parental-scheme films]\nratings=G\ncolour=red\n", 3, "unknown key \"colour\""},
+        {"[parental-scheme a]\nratings=G\n[parental-scheme  a]\nratings=G\n", 3, "given twice"},
+        {"[parental-scheme ]\nratings=G\n", 1, "unknown group"},
+        {"[drm a]\nresult=-1\n", 2, "result"},
+        {"[drm a]\nanswer=1\n", 2, "unknown key \"answer\""},
+        {"[drm a]\n[drm  a]\n", 2, "given twice"},
+        {"[set]\nkeys=red;pink\n", 2, "\"pink\" is no group of keys"},
+        {"[set]\ncapabilities=missing.xml\n", 2, "missing.xml"},
     };
     for (const auto& fault : faults) {
         const auto error = load(fault.text);
@@ -66,6 +104,20 @@ TEST_F(ConfigurationTest, NamesFileLineAndReasonOfEveryFault) {
     ASSERT_TRUE(error);
     EXPECT_EQ(error->line, 0U);
     EXPECT_NE(error->reason, "");
+}
+
+TEST_F(ConfigurationTest, ChecksTheDocumentOfTheCapabilities) {
+    const std::string document = m_file + ".xml";
+    const std::string setting = "[set]\ncapabilities=" + document.substr(document.rfind('/') + 1) + "\n";
+    std::ofstream(document) << "<profilelist/>";
+    EXPECT_FALSE(load(setting));
+    EXPECT_EQ(m_configuration.capabilitiesFile, document); // beside the file
+    std::ofstream(document) << "<profilelist><open></profilelist>";
+    const auto error = load(setting);
+    ASSERT_TRUE(error);
+    EXPECT_EQ(error->line, 2U);
+    EXPECT_NE(error->reason.find(document), std::string::npos) << error->reason;
+    std::remove(document.c_str());
 }
 
 } // namespace

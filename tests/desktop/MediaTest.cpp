@@ -452,6 +452,19 @@ TEST_F(MediaTest, RefusesSpeedsThatCannotBe) {
     EXPECT_NE(TELIX_JS_AV_SetPlaySpeed(m_player, 0, 1, 0), 0);
 }
 
+TEST_F(MediaTest, GoesNoFurtherThanWhatIsHeldWhereTheServerGivesNoParts) {
+    Server server;
+    ASSERT_EQ(TELIX_JS_AV_Seek(m_player, 19000), 0); // to begin with
+    play(server("clip.mp4?ranges=no&rate=400000"));
+    EXPECT_LT(info().playPosition, 1000U);
+    ASSERT_LT(info().bufferedEnd, 15U);
+    EXPECT_NE(TELIX_JS_AV_Seek(m_player, 18000), 0);
+    EXPECT_TRUE(waitUntil([&] { return info().playPosition > 200; })); // and plays on
+    EXPECT_TRUE(waitUntil([&] { return info().bufferedEnd == 20; }));
+    ASSERT_EQ(TELIX_JS_AV_Seek(m_player, 19000), 0);
+    expectMessages({playStart, playEnd});
+}
+
 TEST_F(MediaTest, GoesOnAtAPositionThatItWasGivenWhileStopped) {
     Server server;
     play(server("tune.mp3"));

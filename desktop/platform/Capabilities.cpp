@@ -1,0 +1,170 @@
+// Profile lists: written from the configuration, and read.
+#include "desktop/platform/Capabilities.h"
+
+#include <algorithm>
+#include <cstring>
+#include <glib.h>
+#include <memory>
+#include <utility>
+
+namespace desktop {
+
+namespace {
+
+struct MediaProfile {
+    const char* element;
+    const char* name;
+    const char* type;
+};
+// What the pipelines of this library play.
+const MediaProfile mediaProfiles[] = {
+    {"audio_profile", "MPEG1_L3", "audio/mpeg"},
+    {"audio_profile", "HEAAC", "audio/mp4"},
+    {"video_profile", "TS_AVC_SD_25_HEAAC", "video/mpeg"},
+    {"video_profile", "TS_AVC_HD_25_HEAAC", "video/mpeg"},
+    {"video_profile", "TS_AVC_SD_25_MPEG1_L3", "video/mpeg"},
+    {"video_profile", "TS_AVC_HD_25_MPEG1_L3", "video/mpeg"},
+    {"video_profile", "MP4_AVC_SD_25_HEAAC", "video/mp4"},
+    {"video_profile", "MP4_AVC_HD_25_HEAAC", "video/mp4"},
+    {"video_profile", "MP4_AVC_SD_25_MPEG1_L3", "video/mp4"},
+    {"video_profile", "MP4_AVC_HD_25_MPEG1_L3", "video/mp4"},
+};
+
+std::string escaped(const std::string& text) {
+    char* copy = g_markup_escape_text(text.c_str(), -1);
+    std::string result = copy;
+    g_free(copy);
+    return result;
+}
+
+} // namespace
+
+// What the markup parser fills in.
+struct CapabilitiesParser {
+    Capabilities read;
+    bool hasRoot = false;
+
+    static void startElement(GMarkupParseContext* context, const gchar* element, const gchar** names,
+                             const gchar** values, gpointer data, GError** error) {
+        (void)context;
+        auto* self = static_cast<CapabilitiesParser*>(data);
+        const char* colon = std::strchr(element, ':'); // behind a prefix of a namespace
+        const std::string local = colon ? colon + 1 : element;
+        if (!std::exchange(self->hasRoot, true) && local != "profilelist") {
+            g_set_error(error, G_MARKUP_ERROR, G_MARKUP_ERROR_INVALID_CONTENT,
+                        "the document is <%s> and no <profilelist>", element);
+            return;
+        }
+        for (size_t index = 0; names[index]; ++index) {
+            if (std::strcmp(names[index], "name") != 0) {
+                continue;
+            }
+            if (local == "ui_profile") {
+                self->read.m_uiProfiles.push_back(Capabilities::split(values[index]));
+            } else if (local == "video_profile" || local == "audio_profile") {
+                self->read.m_mediaProfiles.insert(values[index]);
+            }
+        }
+    }
+};
+
+Capabilities::UiProfile Capabilities::split(const std::string& name) {
+    UiProfile profile;
+    std::unique_ptr<char*, void (*)(char**)> parts(g_strsplit(name.c_str(), "+", -1), g_strfreev);
+    for (char** part = parts.get(); *part; ++part) {
+        if (part == parts.get()) {
+            profile.base = *part;
+        } else {
+            profile.fragments.insert(*part);
+        }
+    }
+    return profile;
+}
+
+std::optional<Capabilities> Capabilities::parse(const std::string& document, std::string& error) {
+    CapabilitiesParser parser;
+    const GMarkupParser functions{CapabilitiesParser::startElement, nullptr, nullptr, nullptr, nullptr};
+    std::unique_ptr<GMarkupParseContext, void (*)(GMarkupParseContext*)> context(
+        g_markup_parse_context_new(&functions, G_MARKUP_DEFAULT_FLAGS, &parser, nullptr),
+        g_markup_parse_context_free);
+    GError* fault = nullptr;
+    if (!g_markup_parse_context_parse(context.get(), document.data(), static_cast<gssize>(document.size()),
+                                      &fault) ||
+        !g_markup_parse_context_end_parse(context.get(), &fault)) {
+        error = fault->message;
+        g_error_free(fault);
+        return std::nullopt;
+    }
+    if (document.find('\0') != std::string::npos) { // no text of the calls could hold it
+        error = "the document holds a zero byte";
+        return std::nullopt;
+    }
+    parser.read.m_document = document;
+    return std::move(parser.read);
+}
+
+std::optional<Capabilities> Capabilities::load(const std::string& file, std::string& error) {
+    char* contents = nullptr;
+    gsize length = 0;
+    GError* fault = nullptr;
+    if (!g_file_get_contents(file.c_str(), &contents, &length, &fault)) {
+        error = fault->message;
+        g_error_free(fault);
+        return std::nullopt;
+    }
+    const std::string document(contents, length);
+    g_free(contents);
+    std::optional<Capabilities> read = parse(document, error);
+    if (!read) {
+        error = file + ": " + error;
+    }
+    return read;
+}
+
+Capabilities Capabilities::builtIn(const Configuration& configuration) {
+    std::string schemes = "dvb-si";
+    for (const Configuration::RatingScheme& scheme : configuration.ratingSchemes) {
+        schemes += " " + scheme.name;
+    }
+    std::string drm;
+    for (const Configuration::DrmSystem& system : configuration.drmSystems) {
+        drm += "    <drm DRMSystemID=\"" + escaped(system.id) + "\">TS MP4</drm>\n";
+    }
+    std::string document = "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n"
+                           "<profilelist xmlns=\"urn:hbbtv:config:oitf:oitfCapabilities:2011-1\">\n"
+                           "  <ui_profile name=\"OITF_HD_UIPROF+META_SI+TRICKMODE+AVCAD";
+    document += drm.empty() ? "" : "+DRM";
+    document += "+DVB_S\">\n"
+                "    <ext>\n"
+                "      <colorkeys>true</colorkeys>\n"
+                "      <video_broadcast type=\"ID_DVB_S\" scaling=\"arbitrary\" minSize=\"0\">true"
+                "</video_broadcast>\n"
+                "      <parentalcontrol schemes=\"" +
+                escaped(schemes) +
+                "\">true</parentalcontrol>\n"
+                "    </ext>\n" +
+                drm + "  </ui_profile>\n";
+    for (const MediaProfile& profile : mediaProfiles) {
+        document += std::string("  <") + profile.element + " name=\"" + profile.name + "\" type=\"" +
+                    profile.type + "\"/>\n";
+    }
+    document += "</profilelist>\n";
+    std::string error;
+    const auto read = parse(document, error);
+    g_assert(read);
+    return *read;
+}
+
+bool Capabilities::has(const std::string& name) const {
+    if (m_mediaProfiles.count(name) != 0) {
+        return true;
+    }
+    const UiProfile wanted = split(name);
+    return std::any_of(m_uiProfiles.begin(), m_uiProfiles.end(), [&](const UiProfile& each) {
+        const bool isBase = wanted.base == each.base || (wanted.base.empty() && !wanted.fragments.empty());
+        return isBase && std::includes(each.fragments.begin(), each.fragments.end(), wanted.fragments.begin(),
+                                       wanted.fragments.end());
+    });
+}
+
+} // namespace desktop

@@ -1,0 +1,242 @@
+// The set itself through the calls of the plug-in: settings, keys, memory, capabilities, rating schemes, DRM.
+#include "desktop/platform/Device.h"
+
+#include <condition_variable>
+#include <cstdlib>
+#include <gtest/gtest.h>
+#include <set>
+#include <thread>
+
+using namespace desktop;
+using testing::Test;
+
+namespace {
+
+struct Answer {
+    std::string id;
+    std::string message;
+    int32_t result;
+    std::thread::id thread;
+};
+
+std::mutex answersMutex;
+std::condition_variable answerCame;
+std::vector<Answer> answers;
+int lowMemoryCalls = 0;
+
+TELIX_RETCODE_ENUM_T onAnswer(___UINT8* id, ___UINT8* message, TELIX_DRM_RESULT_CODE_ENUM_T result) {
+    {
+        std::lock_guard<std::mutex> lock(answersMutex);
+        answers.push_back({reinterpret_cast<char*>(id), reinterpret_cast<char*>(message), result,
+                           std::this_thread::get_id()});
+    }
+    answerCame.notify_all();
+    return 0;
+}
+
+TELIX_RETCODE_ENUM_T onLowMemory() {
+    {
+        std::lock_guard<std::mutex> lock(answersMutex);
+        ++lowMemoryCalls;
+    }
+    answerCame.notify_all();
+    return 0;
+}
+
+template <typename Condition>
+bool waitFor(Condition isSo) {
+    std::unique_lock<std::mutex> lock(answersMutex);
+    return answerCame.wait_for(lock, std::chrono::seconds(10), isSo);
+}
+
+std::string taken(char* text) {
+    std::string copy = text ? text : "";
+    std::free(text);
+    return copy;
+}
+
+std::string send(const std::string& system) {
+    char* id = nullptr;
+    EXPECT_EQ(TELIX_JS_DRM_SendDRMMessage("application/x-any", "<any/>", system.c_str(), &id), 0);
+    return taken(id);
+}
+
+bool has(const char* profile) {
+    ___UINT8 supported = 0;
+    EXPECT_EQ(TELIX_JS_CAP_HasCapability(profile, &supported), 0);
+    return supported != 0;
+}
+
+TEST(DeviceTest, GivesTheViewersChoiceInAFreshTextAtEachCall) {
+    char* first = nullptr;
+    char* second = nullptr;
+    ASSERT_EQ(TELIX_JS_APP_Config_GetPreferredAudioLanguage(&first), 0);
+    ASSERT_EQ(TELIX_JS_APP_Config_GetPreferredAudioLanguage(&second), 0);
+    EXPECT_NE(first, second);
+    EXPECT_EQ(taken(first), "deu");
+    EXPECT_EQ(taken(second), "deu");
+    char* subtitle = nullptr;
+    ASSERT_EQ(TELIX_JS_APP_Config_GetPreferredSubtitleLanguage(&subtitle), 0);
+    EXPECT_EQ(taken(subtitle), "deu");
+    char* country = nullptr;
+    ASSERT_EQ(TELIX_JS_APP_Config_GetCountryId(&country), 0);
+    EXPECT_EQ(taken(country), "DEU");
+}
+
+TEST(DeviceTest, GrantsOnlyTheKeysThatTheRemoteControlHas) {
+    uint32_t mask = 0;
+    ASSERT_EQ(TELIX_JS_APP_GetKeySetValue(&mask), 0);
+    EXPECT_EQ(mask, 0x11U);
+    uint32_t granted = 0xDEAD;
+    ASSERT_EQ(TELIX_JS_APP_SetKeySetValue(0xFFFFFFFF, &granted), 0);
+    EXPECT_EQ(granted, 0x1BFU); // no scroll keys, no letters
+    ASSERT_EQ(TELIX_JS_APP_GetKeySetValue(&mask), 0);
+    EXPECT_EQ(mask, 0x1BFU);
+    ASSERT_EQ(TELIX_JS_APP_SetKeySetValue(0, &granted), 0);
+    EXPECT_EQ(granted, 0U);
+}
+
+TEST(DeviceTest, TellsOfFreeMemoryAndOfItsShortage) {
+    uint32_t amount = 0;
+    ASSERT_EQ(TELIX_JS_APP_GetFreeMem(&amount), 0);
+    EXPECT_EQ(amount, 123456U);
+    Device& device = Device::instance();
+    EXPECT_FALSE(device.injectLowMemory()); // nobody asked
+    TELIX_JS_APP_RegisterLowMemory(onLowMemory);
+    EXPECT_TRUE(device.injectLowMemory());
+    EXPECT_TRUE(waitFor([] { return lowMemoryCalls == 1; }));
+    TELIX_JS_APP_UnRegisterLowMemory(onLowMemory);
+    EXPECT_FALSE(device.injectLowMemory());
+    device.setFreeMemory(99);
+    ASSERT_EQ(TELIX_JS_APP_GetFreeMem(&amount), 0);
+    EXPECT_EQ(amount, 99U);
+}
+
+TEST(DeviceTest, DescribesItselfInAProfileList) {
+    char* xml = nullptr;
+    ASSERT_EQ(TELIX_JS_CAP_GetXmlCapabilities(&xml), 0);
+    const std::string document = taken(xml);
+    EXPECT_NE(document.find("<profilelist xmlns=\"urn:hbbtv:config:oitf:oitfCapabilities:2011-1\">"),
+              std::string::npos);
+    EXPECT_NE(document.find("<parentalcontrol schemes=\"dvb-si films\">true</parentalcontrol>"),
+              std::string::npos);
+    EXPECT_NE(document.find("<drm DRMSystemID=\"urn:dvb:casystemid:2\">"), std::string::npos);
+
+    EXPECT_TRUE(has("OITF_HD_UIPROF"));
+    EXPECT_TRUE(has("OITF_HD_UIPROF+DVB_S+META_SI")); // in any order
+    EXPECT_TRUE(has("+TRICKMODE"));
+    EXPECT_TRUE(has("+DRM"));
+    EXPECT_TRUE(has("MP4_AVC_HD_25_HEAAC"));
+    EXPECT_FALSE(has("+PVR"));
+    EXPECT_FALSE(has("OITF_HD_UIPROF+PVR"));
+    EXPECT_FALSE(has("OITF_SDEU_UIPROF"));
+    EXPECT_FALSE(has("OITF_HD"));
+    EXPECT_FALSE(has("+"));
+    EXPECT_FALSE(has("MP4_AVC"));
+
+    uint32_t count = 77;
+    ASSERT_EQ(TELIX_JS_CAP_GetExtraSDVideoDecodes(&count), 0);
+    EXPECT_EQ(count, 1U);
+    ASSERT_EQ(TELIX_JS_CAP_GetExtraHDVideoDecodes(&count), 0);
+    EXPECT_EQ(count, 0U);
+}
+
+TEST(DeviceTest, ReadsTheProfilesOfADocument) {
+    std::string error;
+    const auto read = Capabilities::parse("<?xml version=\"1.0\"?><!-- mine -->"
+                                          "<o:profilelist xmlns:o=\"urn:x\"><o:ui_profile name=\"A+B+C\"/>"
+                                          "<o:ui_profile name=\"D+E\"/><o:video_profile name=\"V\"/>"
+                                          "<o:other name=\"W\"/></o:profilelist>",
+                                          error);
+    ASSERT_TRUE(read) << error;
+    EXPECT_TRUE(read->has("A+C"));
+    EXPECT_TRUE(read->has("+E"));
+    EXPECT_TRUE(read->has("V"));
+    EXPECT_FALSE(read->has("A+E")); // of two profiles
+    EXPECT_FALSE(read->has("W"));
+    for (const char* document : {"", "<profilelist>", "<profilelist></other>", "<capabilities/>", "plain"}) {
+        error.clear();
+        EXPECT_FALSE(Capabilities::parse(document, error)) << document;
+        EXPECT_NE(error, "") << document;
+    }
+    EXPECT_FALSE(Capabilities::parse(std::string("<profilelist/>\0", 15), error));
+}
+
+TEST(DeviceTest, ListsItsRatingSchemesWithThresholds) {
+    uint32_t count = 0;
+    PARENTALRATTINGSCHEME_STRUCT_T_TAG* schemes = nullptr;
+    ASSERT_EQ(TELIX_JS_SI_PARENTALCONTROL_GetParentalRatingSchemes(&count, &schemes), 0);
+    ASSERT_EQ(count, 2U);
+    EXPECT_STREQ(schemes[0].szName, "dvb-si");
+    EXPECT_EQ(schemes[0].count, 0U);
+    EXPECT_NE(schemes[0].ratingNames, nullptr);
+    EXPECT_NE(schemes[0].iconUris, nullptr);
+    EXPECT_STREQ(schemes[1].szName, "films");
+    ASSERT_EQ(schemes[1].count, 3U);
+    EXPECT_STREQ(schemes[1].ratingNames[0], "G");
+    EXPECT_STREQ(schemes[1].ratingNames[1], "PG");
+    EXPECT_STREQ(schemes[1].ratingNames[2], "R");
+    EXPECT_STREQ(schemes[1].iconUris[0], "");
+    EXPECT_STREQ(schemes[1].iconUris[1], "http://127.0.0.1/pg.png");
+    EXPECT_STREQ(schemes[1].iconUris[2], "");
+
+    int32_t threshold = -1;
+    ASSERT_EQ(TELIX_JS_SI_PARENTALRATINGSCHEME_GetThreshold(schemes[0].handle, &threshold), 0);
+    EXPECT_EQ(threshold, 12);
+    ASSERT_EQ(TELIX_JS_SI_PARENTALRATINGSCHEME_GetThreshold(schemes[1].handle, &threshold), 0);
+    EXPECT_EQ(threshold, 1); // PG
+    for (const uint32_t nonsense : {0U, schemes[1].handle + 1, 0xFFFFFFFFU}) {
+        threshold = 4711;
+        EXPECT_NE(TELIX_JS_SI_PARENTALRATINGSCHEME_GetThreshold(nonsense, &threshold), 0);
+        EXPECT_EQ(threshold, 4711);
+    }
+}
+
+TEST(DeviceTest, AnswersDrmMessagesAsConfiguredUnderTheirIdsInTheirOrder) {
+    TELIX_JS_DRM_RegisterOnDRMMessageResult(onAnswer);
+    const std::string first = send("urn:dvb:casystemid:1");
+    const std::string second = send("urn:dvb:casystemid:2");
+    const std::string third = send("urn:dvb:casystemid:3");
+    EXPECT_EQ((std::set<std::string>{first, second, third, ""}).size(), 4U);
+    ASSERT_TRUE(waitFor([] { return answers.size() == 3; }));
+    EXPECT_EQ(answers[0].id, first);
+    EXPECT_EQ(answers[0].message, "granted");
+    EXPECT_EQ(answers[0].result, 0);
+    EXPECT_EQ(answers[1].id, second);
+    EXPECT_EQ(answers[1].message, "ask the viewer: \"may it?\"");
+    EXPECT_EQ(answers[1].result, 4);
+    EXPECT_EQ(answers[2].id, third);
+    EXPECT_EQ(answers[2].result, drmUnknownSystem);
+    EXPECT_NE(answers[0].thread, std::this_thread::get_id());
+    EXPECT_EQ(Device::instance().lastDrmMessage(), third);
+    TELIX_JS_DRM_UnregisterOnDRMMessageResult(onAnswer);
+}
+
+TEST(DeviceTest, AnswersOnceAsLongAsOneOfSeveralAgentsIsLeft) {
+    TELIX_JS_DRM_RegisterOnDRMMessageResult(onAnswer);
+    TELIX_JS_DRM_RegisterOnDRMMessageResult(onAnswer);
+    TELIX_JS_DRM_UnregisterOnDRMMessageResult(onAnswer);
+    send("urn:dvb:casystemid:1");
+    ASSERT_TRUE(waitFor([] { return !answers.empty(); }));
+    TELIX_JS_DRM_UnregisterOnDRMMessageResult(onAnswer);
+    send("urn:dvb:casystemid:1");
+    EXPECT_FALSE(Device::instance().injectDrmResult("any", "text", 0));
+    // The answer would come before anything that is posted behind it.
+    bool isPast = false;
+    Platform::instance().post([&] {
+        {
+            std::lock_guard<std::mutex> lock(answersMutex);
+            isPast = true;
+        }
+        answerCame.notify_all();
+    });
+    ASSERT_TRUE(waitFor([&] { return isPast; }));
+    EXPECT_EQ(answers.size(), 1U);
+    TELIX_JS_DRM_UnregisterOnDRMMessageResult(onAnswer); // one too many does no harm
+}
+
+TEST(DeviceTest, HasNoChannelHandleByValue) {
+    EXPECT_EQ(TELIX_JS_CM_GetChannelHandle(1), TELIX_RETCODE_NOT_AVAILABLE);
+}
+
+} // namespace

@@ -1,0 +1,2 @@
+/* A platform library without functions. */
+int telix_test_nothing;
