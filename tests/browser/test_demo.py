@@ -640,6 +640,8 @@ class Look(Demonstration):
         for steps_down in range(10):
             self.check(f'set-{steps_down}', ['blue', *['down'] * steps_down, 'ok', 'yellow'] if steps_down != 5
                        else ['blue', *['down'] * 5], plugin='TELIX_DEVICE_PLUGIN')
+        # With all that the desk tells of itself.
+        self.check('set-desk', ['blue', 'down'], plugin='TELIX_DESK_PLUGIN')
         self.check('set-schemes', ['blue', 'down', 'down', 'right'], plugin='TELIX_BROADCAST_PLUGIN')
 
     def test_the_second_application(self):
