@@ -31,6 +31,10 @@ var banner = (function () {
         return timeAt(programme.start) + '\u2013' + timeAt(programme.start + programme.seconds) + '  ' + programme.name;
     }
 
+    function describeState() {
+        return television.state.error || (television.state.isTuned ? 'No programme information' : 'Tuning \u2026');
+    }
+
     function update() {
         var channel = television.state.channel;
         var now = television.state.programmes[0];
@@ -39,8 +43,7 @@ var banner = (function () {
         tv.say('clock', tv.timeOfDay(new Date()));
         tv.say('banner-number', channel ? String(channel.number) : '');
         tv.say('banner-name', channel ? channel.name : '');
-        tv.say('banner-now', now ? describeProgramme(now) : television.state.isTuned ? 'No programme information'
-                                                                                     : 'Tuning \u2026');
+        tv.say('banner-now', now ? describeProgramme(now) : describeState());
         tv.say('banner-next', next ? describeProgramme(next) : '');
         tv.say('banner-rating', now ? describeRating(now.rating) : '');
         tv.setVisible('banner-rating', !!now && !!now.rating);

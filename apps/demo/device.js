@@ -9,6 +9,9 @@ var device = (function () {
     var applicationMethods = ['createApplication', 'destroyApplication', 'show', 'hide'];
     var keyGroups = ['RED', 'GREEN', 'YELLOW', 'BLUE', 'NAVIGATION', 'VCR', 'SCROLL', 'INFO', 'NUMERIC', 'ALPHA'];
     var profileNames = ['OITF_HD_UIPROF', 'OITF_SD_UIPROF'];
+    var drmSystems = ['urn:dvb:casystemid:0', 'urn:dvb:casystemid:4096', 'urn:dvb:casystemid:19219'];
+    var drmResults = ['successful', 'unknown error', 'cannot process the request', 'unknown type of message',
+                      'consent of the viewer needed', 'unknown DRM system'];
     var linesOfPanel = 9;
 
     var manager = tv.byId('manager');
@@ -16,6 +19,8 @@ var device = (function () {
     var leave = null; // called at the way back
     var focused = 0;
     var scheme = 0;
+    var profile = 0; // the first one that is listed
+    var drmSystem = 0;
     var hidden = false;
     var lastKey = null;
     var created = null;
@@ -39,10 +44,6 @@ var device = (function () {
 
     function hexadecimal(number) {
         return '0x' + number.toString(16);
-    }
-
-    function megabytes(bytes) {
-        return bytes > 0 ? String(bytes) : 'not known';
     }
 
     // ---- Handlers. One function for all: what counts here is that the object keeps it.
@@ -107,24 +108,33 @@ var device = (function () {
         return [['Country', value(settings.countryId)],
                 ['Audio language', value(settings.preferredAudioLanguage)],
                 ['Subtitle language', value(settings.preferredSubtitleLanguage)],
-                ['Free memory', megabytes(application.privateData.getFreeMem())]];
+                ['Free memory', value(application.privateData.getFreeMem() || null)]];
     }
 
-    // The document has the profiles of the user interface, of video and of audio.
+    // The profiles of the user interface, of video and of audio in the set's document.
+    function describedProfiles() {
+        var description = tv.byId('capabilities').xmlCapabilities;
+        return description && description.documentElement ? description.documentElement.children : [];
+    }
+
     function capabilityRows() {
         var capabilities = tv.byId('capabilities');
-        var description = capabilities.xmlCapabilities;
-        var profiles = description && description.documentElement ? description.documentElement.children : [];
+        var profiles = describedProfiles();
         var rows = profileNames.map(function (name) {
             return [name, capabilities.hasCapability(name) ? 'yes' : 'no'];
         });
         rows.push(['More decoders, SD and HD', capabilities.extraSDVideoDecodes + ' and ' +
                                                capabilities.extraHDVideoDecodes]);
         rows.push(['Profiles described', profiles.length > 0 ? String(profiles.length) : 'not known']);
-        Array.prototype.slice.call(profiles, 0, linesOfPanel - rows.length).forEach(function (profile) {
-            rows.push([profile.getAttribute('name') || profile.nodeName, profile.getAttribute('type') || '']);
+        Array.prototype.slice.call(profiles, profile, profile + linesOfPanel - rows.length).forEach(function (each) {
+            rows.push([each.getAttribute('name') || each.nodeName, each.getAttribute('type') || '']);
         });
         return rows;
+    }
+
+    // The number beside `number` in the direction of `step`, round and round.
+    function stepped(number, step, count) {
+        return count > 0 ? (number + step + count) % count : 0;
     }
 
     // ---- Parental control
@@ -138,9 +148,9 @@ var device = (function () {
         if (!all || all.length === 0) {
             return [tv.element('h2', 'Parental control'), tv.element('p', 'The set knows no schemes of ratings.')];
         }
-        var shown = all.item(scheme % all.length);
+        var shown = all.item(scheme);
         var threshold = shown.threshold;
-        var rows = [['Scheme', scheme % all.length + 1 + ' of ' + all.length],
+        var rows = [['Scheme', scheme + 1 + ' of ' + all.length],
                     ['Threshold', threshold ? threshold.name : 'not known']];
         for (var i = 0; i < shown.length && rows.length < linesOfPanel; i++) {
             rows.push(['Rating ' + (i + 1), value(shown.item(i))]);
@@ -176,7 +186,7 @@ var device = (function () {
 
     function sendDrmMessage() {
         drm = { sent: 'Hello, set', id: null, result: null, code: null };
-        drm.id = tv.byId('agent').sendDRMMessage('text/plain', drm.sent, 'urn:dvb:casystemid:0');
+        drm.id = tv.byId('agent').sendDRMMessage('text/plain', drm.sent, drmSystems[drmSystem]);
         log('sendDRMMessage() gives ' + value(drm.id));
     }
 
@@ -188,7 +198,13 @@ var device = (function () {
         update();
     }
 
-    // ---- The menu: a title, what the panel shows, and what OK does.
+    function drmRows() {
+        return [['DRM system', drmSystems[drmSystem]], ['Message', value(drm.sent)], ['Id', value(drm.id)],
+                ['Result', value(drm.result)],
+                ['Code', value(drm.code) + (drmResults[drm.code] ? ', ' + drmResults[drm.code] : '')]];
+    }
+
+    // ---- The menu: a title, what the panel shows, what OK does, and for some what the arrows to left and right do.
 
     var menu = [
         {
@@ -199,12 +215,17 @@ var device = (function () {
         {
             title: 'Capabilities',
             panel: function () { return [tv.element('h2', 'What the set can do'), tv.table(capabilityRows())]; },
-            ok: function () { log('nothing to do here'); }
+            ok: function () { log('left and right show other profiles'); },
+            turn: function (step) { profile = stepped(profile, step, describedProfiles().length); }
         },
         {
             title: 'Parental control',
             panel: parentalPanel,
-            ok: function () { scheme++; }
+            ok: function () { log('left and right show other schemes'); },
+            turn: function (step) {
+                var all = schemes();
+                scheme = stepped(scheme, step, all ? all.length : 0);
+            }
         },
         {
             title: 'Keys',
@@ -218,10 +239,10 @@ var device = (function () {
             title: 'DRM messages',
             panel: function () {
                 return [tv.element('h2', 'OK sends a message to the set'),
-                        tv.table([['Message', value(drm.sent)], ['Id', value(drm.id)], ['Result', value(drm.result)],
-                                  ['Code', value(drm.code)]])];
+                        tv.table(drmRows()), tv.element('p', 'Left and right choose the system.')];
             },
-            ok: sendDrmMessage
+            ok: sendDrmMessage,
+            turn: function (step) { drmSystem = stepped(drmSystem, step, drmSystems.length); }
         },
         {
             title: 'Second page',
@@ -280,7 +301,13 @@ var device = (function () {
     }
 
     function moveFocus(step) {
-        focused = (focused + step + menu.length) % menu.length;
+        focused = stepped(focused, step, menu.length);
+    }
+
+    function turn(step) {
+        if (menu[focused].turn) {
+            menu[focused].turn(step);
+        }
     }
 
     // ---- The page
@@ -308,6 +335,8 @@ var device = (function () {
     var whenThere = {
         up: thenUpdate(moveFocus, -1),
         down: thenUpdate(moveFocus, 1),
+        left: thenUpdate(turn, -1),
+        right: thenUpdate(turn, 1),
         ok: thenUpdate(function () { menu[focused].ok(); }),
         red: thenUpdate(hideOrShow),
         green: thenUpdate(openSecond),

@@ -88,7 +88,10 @@
         keys: {
             up: withChannels(function () { television.zap(1); }),
             down: withChannels(function () { television.zap(-1); }),
-            digit: withChannels(function (digit) { channels.enterDigit(digit); }),
+            digit: withChannels(function (digit) {
+                announcement.hideNotice();
+                channels.enterDigit(digit);
+            }),
             left: withChannels(function () { clearScreen(); channels.openList(); }),
             ok: withChannels(function () {
                 if (channels.isEntering()) {

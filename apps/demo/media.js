@@ -24,6 +24,8 @@ var media = (function () {
         { title: 'A tune', detail: 'MP3', type: 'audio/mpeg', url: 'tune.mp3', isAudio: true },
         { title: 'Adaptive streaming', detail: 'HLS', type: 'application/vnd.apple.mpegurl', url: 'hls/index.m3u8' },
         { title: 'Playlist of two clips', detail: 'ASX', type: 'video/mp4', url: 'playlist.asx', isPlaylist: true },
+        // Slower than it is played: 60 kilobytes a second.
+        { title: 'A slow connection', detail: 'MP4', type: 'video/mp4', url: 'clip.mp4?rate=60000' },
         { title: 'A clip that is not there', detail: 'MP4', type: 'video/mp4', url: 'absent.mp4' },
         // Port 9 is for discarding what comes, and nowadays nobody listens on it.
         { title: 'A server that is switched off', detail: 'MP4', type: 'video/mp4',

@@ -18,7 +18,7 @@ var television = (function () {
     var former = []; // the objects before it, which present until it does
     var objectsMade = 0;
     var timer = 0;
-    var state = { channels: [], channel: null, isTuned: false, programmes: [] };
+    var state = { channels: [], channel: null, isTuned: false, error: '', programmes: [] };
 
     // The plug-in ends what it has handed out together with the object that it came from, so values are copied.
     function copyChannel(channel, index) {
@@ -81,6 +81,7 @@ var television = (function () {
         clearTimeout(timer);
         state.channel = channel;
         state.isTuned = false;
+        state.error = '';
         state.programmes = [];
         on.tuning();
     }
@@ -92,6 +93,8 @@ var television = (function () {
     function end(text) {
         clearTimeout(timer);
         state.isTuned = false;
+        state.error = text;
+        state.programmes = [];
         on.failed(text);
     }
 

@@ -41,12 +41,17 @@ var tv = (function () {
         return byId(id).style.display === 'block';
     }
 
-    // A table of two columns, one row for each pair of texts.
+    // A table of two columns, one row for each pair of texts. With an empty second one the first has both columns.
     function table(rows) {
         var made = document.createElement('table');
         rows.forEach(function (row) {
             var line = document.createElement('tr');
-            row.forEach(function (text) { line.appendChild(element('td', text)); });
+            line.appendChild(element('td', row[0]));
+            if (row[1] === '') {
+                line.firstChild.colSpan = 2;
+            } else {
+                line.appendChild(element('td', row[1]));
+            }
             made.appendChild(line);
         });
         return made;

@@ -205,9 +205,10 @@ class Channels(Demonstration):
         self.assertIn('Film', noted[0])
 
     def test_an_error_is_told_until_a_channel_is_there(self):
-        noted = self.notes(TUNED, occurs(5, 0), is_seen('message'), Note(text('message')), 'up', TUNED,
+        noted = self.notes(TUNED, occurs(5, 0), is_seen('message'), Note(text('message')),
+                           Note(text('banner-now')), 'up', TUNED,
                            is_hidden('message'))
-        self.assertEqual(noted, ['One The channel is not known.'])
+        self.assertEqual(noted, ['One The channel is not known.', 'The channel is not known.'])
 
     def test_the_way_to_the_set_and_back(self):
         self.notes(TUNED, 'blue', shows('device', 'Settings'), is_hidden('banner'), 'back', is_hidden('device'),
@@ -386,7 +387,7 @@ class Device(Demonstration):
     def test_the_schemes_of_parental_ratings_are_shown_one_after_the_other(self):
         self.assertRegex(self.panel('down,down', plugin='TELIX_BROADCAST_PLUGIN'),
                          r'^dvb-si\s+Scheme\t1 of 4\s+Threshold\t12\s*$')
-        self.assertRegex(self.panel('down,down,ok', plugin='TELIX_BROADCAST_PLUGIN'),
+        self.assertRegex(self.panel('down,down,right', plugin='TELIX_BROADCAST_PLUGIN'),
                          r'^fsk\s+Scheme\t2 of 4\s+Threshold\tnot known\s+Rating 1\tFSK 0\s+Rating 2\tFSK 6\s+'
                          r'Rating 3\tFSK 16\s*$')
 
@@ -398,8 +399,9 @@ class Device(Demonstration):
                 self.assertIn(groups, panel)
 
     def test_a_drm_message_comes_back_turned_round(self):
-        panel = self.panel('down,down,down,down,ok', '--wait-for', shows('panel', 'tes ,olleH'),
+        panel = self.panel('down,down,down,down,right,ok', '--wait-for', shows('panel', 'tes ,olleH'),
                            plugin='TELIX_DEVICE_PLUGIN')
+        self.assertIn('DRM system\turn:dvb:casystemid:4096', panel)
         self.assertIn('Id\tmessage 1', panel)
         self.assertIn('Code\t0', panel)
 
@@ -638,7 +640,9 @@ class Look(Demonstration):
         for steps_down in range(10):
             self.check(f'set-{steps_down}', ['blue', *['down'] * steps_down, 'ok', 'yellow'] if steps_down != 5
                        else ['blue', *['down'] * 5], plugin='TELIX_DEVICE_PLUGIN')
-        self.check('set-schemes', ['blue', 'down', 'down', 'ok'], plugin='TELIX_BROADCAST_PLUGIN')
+        # With all that the desk tells of itself.
+        self.check('set-desk', ['blue', 'down'], plugin='TELIX_DESK_PLUGIN')
+        self.check('set-schemes', ['blue', 'down', 'down', 'right'], plugin='TELIX_BROADCAST_PLUGIN')
 
     def test_the_second_application(self):
         distance = '''document.querySelector('.small .legend').getBoundingClientRect().top -
