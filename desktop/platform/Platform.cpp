@@ -21,15 +21,6 @@ struct Repeated {
     static void destroy(gpointer data) { delete static_cast<Repeated*>(data); }
 };
 
-// A browser in this process may offer a source of its own for HTTP, which works inside of that browser alone.
-// Ours goes before it, whenever it comes.
-void preferOwnHttpSource() {
-    if (GstPluginFeature* source = gst_registry_lookup_feature(gst_registry_get(), "souphttpsrc")) {
-        gst_plugin_feature_set_rank(source, GST_RANK_PRIMARY * 4);
-        gst_object_unref(source);
-    }
-}
-
 } // namespace
 
 Platform& Platform::instance() {
@@ -51,8 +42,6 @@ void Platform::run() {
         std::fprintf(stderr, "libtelix: no pictures and no sound: %s\n",
                      error ? error->message : "GStreamer");
         g_clear_error(&error);
-    } else {
-        preferOwnHttpSource();
     }
     {
         std::lock_guard<std::mutex> lock(m_startMutex);
