@@ -2,10 +2,10 @@
 # Makes the short clips of the demonstration and of the tests: tools/make-clips.sh FOLDER. What is there already stays.
 #   clip.mp4       20 s of picture with a running clock, and a tone: H.264, AAC
 #   second.mp4     8 s, another picture
-#   languages.mp4  8 s with German and English sound (low and high) and English subtitles
+#   languages.mp4  8 s with German and English sound (low and high) and English subtitles, one a second
 #   tune.mp3, tune.aac, tune.wav   3 s of sound
 #   hls/index.m3u8 6 s in three segments, for HTTP live streaming
-#   playlist.asx   clip.mp4 and second.mp4
+#   playlist.asx   clip.mp4 and second.mp4; the address of their folder comes from media_server.py
 set -euo pipefail
 
 if [ $# -ne 1 ] || [ "${1#-}" != "$1" ]; then
@@ -48,7 +48,9 @@ make clip.mp4 -f lavfi -i "testsrc2=size=$size:rate=25,$(label 'Telix clip')" \
 make second.mp4 -f lavfi -i "smptehdbars=size=$size:rate=25,$(label 'Second clip')" \
     -f lavfi -i sine=frequency=660:sample_rate=48000,volume=0.2 -t 8 "${video[@]}" "${audio[@]}" -movflags +faststart
 
-printf '1\n00:00:00,000 --> 00:00:08,000\nSubtitles of the clip\n' >"$work/english.srt"
+for second in 0 1 2 3 4 5 6 7; do
+    printf '%d\n00:00:0%d,000 --> 00:00:0%d,900\nSubtitle number %d\n\n' $((second + 1)) $second $second $((second + 1))
+done >"$work/english.srt"
 make languages.mp4 -f lavfi -i "color=c=navy:size=$size:rate=25,$(label 'Two languages')" \
     -f lavfi -i sine=frequency=440:sample_rate=48000,volume=0.2 -f lavfi -i sine=frequency=880:sample_rate=48000,volume=0.2 \
     -i "$work/english.srt" -map 0:v -map 1:a -map 2:a -map 3:s -t 8 "${video[@]}" "${audio[@]}" -c:s mov_text \
@@ -71,6 +73,7 @@ if [ ! -e "$folder/playlist.asx" ]; then
     cat >"$work/playlist.asx" <<'PLAYLIST'
 <ASX VERSION="3.0">
   <TITLE>Clips of the demonstration</TITLE>
+  <BASE HREF="@FOLDER@"/>
   <ENTRY><TITLE>Clip</TITLE><REF HREF="clip.mp4"/></ENTRY>
   <ENTRY><TITLE>Second clip</TITLE><REF HREF="second.mp4"/></ENTRY>
 </ASX>

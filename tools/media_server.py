@@ -2,12 +2,15 @@
 """Serves folders over HTTP on this machine alone, as a broadcaster's server would: with byte ranges, and on request
 slow, without ranges or with an error. For ./run.sh, the demonstration and the tests.
 
-What a response is like may be asked for in the address: ?rate=BYTES sends so many bytes a second, ?ranges=no offers no
-byte ranges, ?status=NUMBER answers with that status, ?cut=BYTES closes the connection after so many bytes of the body."""
+What a response is like may be asked for in the address: ?rate=BYTES sends so many bytes a second, ?ranges=no refuses
+byte ranges, ?status=NUMBER answers with that status, ?cut=BYTES closes the connection after so many bytes of the body.
+
+In a playlist (.asx), whose clips need whole addresses, @FOLDER@ stands for the address of the folder that it is in."""
 
 import argparse
 import contextlib
 import http.server
+import io
 import mimetypes
 import os
 import re
@@ -119,14 +122,21 @@ class Handler(http.server.BaseHTTPRequestHandler):
         else:
             try:
                 with open(file, 'rb') as source:
-                    self._send(source, file, wishes, with_body)
+                    self._send(self._filled_in(source, file, path), file, wishes, with_body)
             except OSError as error:
                 if isinstance(error, (ConnectionError, TimeoutError)):
                     raise
                 self._refuse(404, 'the file cannot be read', with_body)
 
+    def _filled_in(self, source, file, path):
+        """What is to be sent: a playlist with the address of its folder."""
+        if not file.lower().endswith('.asx'):
+            return source
+        folder = f'http://127.0.0.1:{self.server.server_address[1]}{path.rpartition("/")[0]}'
+        return io.BytesIO(source.read().replace(b'@FOLDER@', folder.encode()))
+
     def _send(self, source, file, wishes, with_body):
-        size = os.fstat(source.fileno()).st_size
+        size = source.seek(0, os.SEEK_END)
         asked = None
         # No response names its version, so a condition on one never holds.
         if wishes.ranges and 'Range' in self.headers and 'If-Range' not in self.headers:
@@ -138,8 +148,7 @@ class Handler(http.server.BaseHTTPRequestHandler):
         self.send_response(206 if asked else 200)
         self.send_header('Content-Type', content_type(file))
         self.send_header('Content-Length', str(end - begin + 1))
-        if wishes.ranges:
-            self.send_header('Accept-Ranges', 'bytes')
+        self.send_header('Accept-Ranges', 'bytes' if wishes.ranges else 'none')
         if asked:
             self.send_header('Content-Range', f'bytes {begin}-{end}/{size}')
         self.end_headers()

@@ -8,7 +8,6 @@
 
 #include <QContextMenuEvent>
 #include <QCoreApplication>
-#include <QImage>
 #include <QKeyEvent>
 #include <QMouseEvent>
 #include <QPaintEvent>
@@ -42,6 +41,12 @@ QString textOf(const RemoteKey& key) {
     return hasText ? QString(QChar(key.keyCode)) : QString();
 }
 
+void endPluginsBefore(QWebFrame& frame) {
+    callPageScript(frame, QStringLiteral("endplugins"), {});
+    for (QWebFrame* child : frame.childFrames())
+        endPluginsBefore(*child);
+}
+
 } // namespace
 
 ApplicationView::ApplicationView(const QString& userAgent, QWidget* parent)
@@ -65,16 +70,10 @@ ApplicationView::ApplicationView(const QString& userAgent, QWidget* parent)
 }
 
 ApplicationView::~ApplicationView() {
-    // Plug-ins are told that their windows shrink while the page is taken apart, and they ask it then where
-    // they stand. If the page has changed since it was last painted, the engine would lay out what is half
-    // gone, and crash. Painting brings the layout of all frames up to date.
-    QImage nowhere(1, 1, QImage::Format_ARGB32_Premultiplied);
-    QPainter painter(&nowhere);
-    m_page->mainFrame()->render(&painter, QRegion(nowhere.rect()));
-    painter.end();
-    // What the layout has left to a later turn; without it the engine forgets plug-ins that have moved, and
-    // they never end.
-    QCoreApplication::sendPostedEvents();
+    // While a page is taken apart, the engine tells plug-ins that their windows shrink, and they ask the page
+    // where they stand. It would lay out what is half gone, and crash or forget some of the plug-ins, which
+    // then never end.
+    endPluginsBefore(*m_page->mainFrame());
 }
 
 void ApplicationView::onLoadFinished(bool ok) {
@@ -111,9 +110,7 @@ void ApplicationView::paintEvent(QPaintEvent* event) {
 }
 
 // The engine would lay the page out anew.
-void ApplicationView::resizeEvent(QResizeEvent* event) {
-    QWidget::resizeEvent(event);
-}
+void ApplicationView::resizeEvent(QResizeEvent*) {}
 
 // The event as the engine should see it.
 QMouseEvent ApplicationView::onPage(const QMouseEvent& event) const {

@@ -33,8 +33,12 @@ GstFlowReturn showSample(GstAppSink* sink, GstSample* sample, gpointer data) {
     (void)sink;
     const auto* target = static_cast<Target*>(data);
     if (sample) {
-        target->picture.show(target->token, sample);
+        // One of our own: the sink uses its sample again, and could not change one that somebody holds.
+        GstSample* own = gst_sample_new(gst_sample_get_buffer(sample), gst_sample_get_caps(sample),
+                                        gst_sample_get_segment(sample), nullptr);
         gst_sample_unref(sample);
+        target->picture.show(target->token, own);
+        gst_sample_unref(own);
     }
     return GST_FLOW_OK;
 }

@@ -9,6 +9,7 @@
 #include <gst/audio/audio.h>
 #include <gst/tag/tag.h>
 #include <gst/video/video.h>
+#include <unistd.h>
 
 namespace desktop {
 
@@ -16,8 +17,10 @@ namespace {
 
 // "download" keeps what has come from a network in a temporary file: it tells how much is held, and only so
 // can such media be played backward.
-const char* const pictureAndSound = "video+audio+soft-volume+download";
-const char* const pictureSoundAndText = "video+audio+text+soft-volume+download";
+const char* const playFlags = "video+audio+text+soft-volume+download";
+
+const char* const storeElement = "downloadbuffer";
+const char* const subtitleElement = "subtitleoverlay";
 
 constexpr guint networkSilence = 10;           // seconds without data after which a connection counts as lost
 constexpr gint64 bufferAhead = 2 * GST_SECOND; // media that is there before presentation begins
@@ -104,7 +107,7 @@ std::string languageOf(const GstTagList* tags) {
     }
     // Of the two codes of three letters, broadcast and pages use that of the language's own name.
     const char* ofThree = gst_tag_get_language_code_iso_639_2T(code);
-    const std::string language = ofThree ? ofThree : "";
+    std::string language = ofThree ? ofThree : "";
     g_free(code);
     return language;
 }
@@ -177,6 +180,12 @@ uint32_t httpStatusOf(GstMessage* message) {
     return status;
 }
 
+// Data stops coming from the source itself, which has not said why.
+bool isDriedUp(GstMessage* message, const GError& error) {
+    return g_error_matches(&error, GST_STREAM_ERROR, GST_STREAM_ERROR_FAILED) &&
+           GST_OBJECT_FLAG_IS_SET(GST_MESSAGE_SRC(message), GST_ELEMENT_FLAG_SOURCE);
+}
+
 bool hasProperty(GstElement* element, const char* name) {
     return g_object_class_find_property(G_OBJECT_GET_CLASS(element), name) != nullptr;
 }
@@ -209,10 +218,11 @@ bool Player::start(Picture& picture, Picture::Token token, const Setup& setup, s
         m_newSpeed = setup.speed;
     }
     m_volume = setup.volume / 100.0;
-    gst_util_set_object_arg(G_OBJECT(m_pipeline), "flags", pictureAndSound);
+    gst_util_set_object_arg(G_OBJECT(m_pipeline), "flags", playFlags);
     g_object_set(m_pipeline, "uri", setup.url.c_str(), "video-sink", pictureSink, "audio-sink", audioSink,
                  "buffer-duration", bufferAhead, nullptr);
     g_signal_connect(m_pipeline, "source-setup", G_CALLBACK(onSource), this);
+    g_signal_connect(m_pipeline, "element-setup", G_CALLBACK(onElement), this);
     applySound();
 
     GstBus* bus = gst_element_get_bus(m_pipeline);
@@ -257,6 +267,32 @@ void Player::onSource(GstElement* playbin, GstElement* source, gpointer player) 
     }
 }
 
+// On GStreamer's threads.
+void Player::onElement(GstElement* playbin, GstElement* element, gpointer player) {
+    (void)playbin;
+    const GstElementFactory* factory = gst_element_get_factory(element);
+    const gchar* name = factory ? GST_OBJECT_NAME(factory) : "";
+    if (std::strcmp(name, subtitleElement) == 0) {
+        g_object_set(element, "silent", static_cast<Player*>(player)->m_showsSubtitle ? FALSE : TRUE,
+                     nullptr);
+    } else if (std::strcmp(name, storeElement) == 0) {
+        g_signal_connect(element, "notify::temp-location", G_CALLBACK(onStore), nullptr);
+    }
+}
+
+// The file of what has been fetched has been opened. Without a name it goes with the process, however that
+// ends.
+void Player::onStore(GObject* store, GParamSpec* property, gpointer data) {
+    (void)property;
+    (void)data;
+    gchar* file = nullptr;
+    g_object_get(store, "temp-location", &file, nullptr);
+    if (file) {
+        unlink(file);
+    }
+    g_free(file);
+}
+
 gboolean Player::onMessage(GstBus* bus, GstMessage* message, gpointer player) {
     (void)bus;
     static_cast<Player*>(player)->handle(message);
@@ -293,6 +329,11 @@ void Player::handle(GstMessage* message) {
         }
         break;
     }
+    case GST_MESSAGE_ELEMENT:
+        if (gst_message_has_name(message, "http-headers")) {
+            readHeaders(gst_message_get_structure(message));
+        }
+        break;
     case GST_MESSAGE_CLOCK_LOST:
         if (m_state == GST_STATE_PLAYING) {
             gst_element_set_state(m_pipeline, GST_STATE_PAUSED);
@@ -306,33 +347,49 @@ void Player::handle(GstMessage* message) {
 
 // ---- Errors
 
-void Player::fail(TELIX_AV_CB_MSG message, const std::string& reason) {
-    m_hasFailed = true;
-    m_listener.failed(message, reason);
+TELIX_AV_CB_MSG Player::kindOf(GstMessage* message, const GError& error) const {
+    const uint32_t status = httpStatusOf(message);
+    const bool isMissing =
+        (status >= 400 && status < 500) ||
+        (!m_isNetwork && g_error_matches(&error, GST_RESOURCE_ERROR, GST_RESOURCE_ERROR_NOT_FOUND));
+    if (isMissing) {
+        return TELIX_AV_CB_MSG_ERR_NOT_FOUND;
+    }
+    const bool isOfConnection =
+        m_isNetwork && status == 0 && (error.domain == GST_RESOURCE_ERROR || isDriedUp(message, error));
+    if (isOfConnection) {
+        return m_hasData ? TELIX_AV_CB_MSG_ERR_NET_DISCONNECTED : TELIX_AV_CB_MSG_ERR_NET_CANNOT_CONNECT;
+    }
+    // Data that does not flow before anything is presented has not been understood.
+    const bool isNotUnderstood =
+        (error.domain == GST_STREAM_ERROR && (!m_hasBegun || error.code != GST_STREAM_ERROR_FAILED)) ||
+        g_error_matches(&error, GST_CORE_ERROR, GST_CORE_ERROR_MISSING_PLUGIN);
+    return isNotUnderstood ? TELIX_AV_CB_MSG_ERR_CODEC_NOT_SUPPORTED : TELIX_AV_CB_MSG_ERR_PLAYING;
 }
 
 void Player::handleError(GstMessage* message) {
     GError* error = nullptr;
     gst_message_parse_error(message, &error, nullptr);
-    const uint32_t status = httpStatusOf(message);
-    TELIX_AV_CB_MSG kind = TELIX_AV_CB_MSG_ERR_PLAYING;
-    if (status >= 400 && status < 500) {
-        kind = TELIX_AV_CB_MSG_ERR_NOT_FOUND;
-    } else if (status >= 500) {
-        kind = TELIX_AV_CB_MSG_ERR_PLAYING; // the server's own trouble
-    } else if (error->domain == GST_RESOURCE_ERROR && m_isNetwork) {
-        kind = m_hasData ? TELIX_AV_CB_MSG_ERR_NET_DISCONNECTED : TELIX_AV_CB_MSG_ERR_NET_CANNOT_CONNECT;
-    } else if (g_error_matches(error, GST_RESOURCE_ERROR, GST_RESOURCE_ERROR_NOT_FOUND)) {
-        kind = TELIX_AV_CB_MSG_ERR_NOT_FOUND;
-    } else if (error->domain == GST_STREAM_ERROR && (!m_hasBegun || error->code != GST_STREAM_ERROR_FAILED)) {
-        // Data that does not flow before anything is presented has not been understood.
-        kind = TELIX_AV_CB_MSG_ERR_CODEC_NOT_SUPPORTED;
-    } else if (error->domain == GST_CORE_ERROR && error->code == GST_CORE_ERROR_MISSING_PLUGIN) {
-        kind = TELIX_AV_CB_MSG_ERR_CODEC_NOT_SUPPORTED;
-    }
-    const std::string reason = error->message;
+    m_hasFailed = true;
+    m_listener.failed(kindOf(message, *error), error->message);
     g_error_free(error);
-    fail(kind, reason);
+}
+
+void Player::readHeaders(const GstStructure* headers) {
+    const GValue* response = gst_structure_get_value(headers, "response-headers");
+    if (!response || !GST_VALUE_HOLDS_STRUCTURE(response)) {
+        return;
+    }
+    gst_structure_foreach(
+        gst_value_get_structure(response),
+        [](GQuark name, const GValue* value, gpointer hasRanges) -> gboolean {
+            const bool isGiven = g_ascii_strcasecmp(g_quark_to_string(name), "accept-ranges") == 0 &&
+                                 G_VALUE_HOLDS_STRING(value) &&
+                                 g_ascii_strcasecmp(g_value_get_string(value), "bytes") == 0;
+            *static_cast<bool*>(hasRanges) = *static_cast<bool*>(hasRanges) || isGiven;
+            return TRUE;
+        },
+        &m_hasRanges);
 }
 
 // ---- States
@@ -375,28 +432,21 @@ void Player::becomeKnown() {
         media.canSeek = canSeek != FALSE;
     }
     gst_query_unref(query);
-    media.canReverse = media.canSeek && (!m_isNetwork || usesStore());
+    m_hasStore = usesStore();
+    media.canSeekAhead = media.canSeek && (!m_hasStore || m_hasRanges);
+    media.canReverse = media.canSeek && (!m_isNetwork || m_hasStore);
     m_listener.known(media);
 }
 
 // What has been fetched is kept in a file.
 bool Player::usesStore() const {
-    bool isUsed = false;
-    GstIterator* queues = gst_bin_iterate_all_by_element_factory_name(GST_BIN(m_pipeline), "queue2");
+    GstIterator* stores = gst_bin_iterate_all_by_element_factory_name(GST_BIN(m_pipeline), storeElement);
     GValue value = G_VALUE_INIT;
-    while (queues && gst_iterator_next(queues, &value) == GST_ITERATOR_OK) {
-        gchar* file = nullptr;
-        g_object_get(g_value_get_object(&value), "temp-location", &file, nullptr);
-        isUsed = isUsed || file;
-        g_free(file);
-        g_value_reset(&value);
-    }
-    if (G_IS_VALUE(&value)) {
+    const bool isUsed = gst_iterator_next(stores, &value) == GST_ITERATOR_OK;
+    if (isUsed) {
         g_value_unset(&value);
     }
-    if (queues) {
-        gst_iterator_free(queues);
-    }
+    gst_iterator_free(stores);
     return isUsed;
 }
 
@@ -418,7 +468,15 @@ void Player::setPaused(bool isPaused) {
 
 // ---- Seeks
 
+// A server that does not give parts is not asked for one: it would cut the media off, or leave it hanging.
+bool Player::canReach(uint32_t milliseconds) {
+    return !m_hasStore || m_hasRanges || milliseconds / 1000 <= progress().bufferedEnd;
+}
+
 bool Player::applySeek(double speed, uint32_t milliseconds) {
+    if (!canReach(milliseconds)) {
+        return false;
+    }
     const auto at = static_cast<gint64>(milliseconds) * GST_MSECOND;
     const auto flags = static_cast<GstSeekFlags>(GST_SEEK_FLAG_FLUSH | GST_SEEK_FLAG_ACCURATE);
     const bool isForward = speed > 0;
@@ -475,14 +533,26 @@ void Player::applySound() {
 }
 
 void Player::selectSubtitle(std::optional<int> number) {
-    if (number == m_subtitle) {
-        return;
-    }
-    m_subtitle = number;
-    if (number) {
+    gint current = -1;
+    g_object_get(m_pipeline, "current-text", &current, nullptr);
+    if (number && *number != current) { // a choice that changes nothing would still drop the text that is due
         g_object_set(m_pipeline, "current-text", *number, nullptr);
     }
-    gst_util_set_object_arg(G_OBJECT(m_pipeline), "flags", number ? pictureSoundAndText : pictureAndSound);
+    m_showsSubtitle = number.has_value();
+    applySubtitle();
+}
+
+// The element that draws subtitles is there if the media has any; it is told whether to. What it was given
+// before it was told stays unseen: the next text is the first.
+void Player::applySubtitle() {
+    GstIterator* overlays = gst_bin_iterate_all_by_element_factory_name(GST_BIN(m_pipeline), subtitleElement);
+    gst_iterator_foreach(
+        overlays,
+        [](const GValue* overlay, gpointer isSilent) {
+            g_object_set(g_value_get_object(overlay), "silent", GPOINTER_TO_INT(isSilent), nullptr);
+        },
+        GINT_TO_POINTER(m_showsSubtitle ? FALSE : TRUE));
+    gst_iterator_free(overlays);
 }
 
 Player::Sound Player::sound() const {

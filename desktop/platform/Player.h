@@ -35,7 +35,8 @@ public:
     struct Media {
         std::vector<Stream> streams;
         bool canSeek = false;
-        bool canReverse = false; // what has been played is still there
+        bool canSeekAhead = false; // also beyond what is held: the server gives any part
+        bool canReverse = false;   // what has been played is still there
     };
 
     // Called on the platform thread, inside of the player's own work: do not end the player in them.
@@ -102,22 +103,29 @@ public:
 private:
     static gboolean onMessage(GstBus* bus, GstMessage* message, gpointer player);
     static void onSource(GstElement* playbin, GstElement* source, gpointer player);
+    static void onElement(GstElement* playbin, GstElement* element, gpointer player);
+    static void onStore(GObject* store, GParamSpec* property, gpointer data);
     void handle(GstMessage* message);
     void handleError(GstMessage* message);
-    void fail(TELIX_AV_CB_MSG message, const std::string& reason);
+    TELIX_AV_CB_MSG kindOf(GstMessage* message, const GError& error) const;
     void takeBuffering(int percent);
     void settle();
     void becomeKnown();
     bool applySeek(double speed, uint32_t milliseconds);
     void applyState();
     void applySound();
+    void applySubtitle();
     bool usesStore() const;
+    bool canReach(uint32_t milliseconds);
+    void readHeaders(const GstStructure* headers);
     void readBuffering(Progress& progress);
 
     Listener m_listener;
     GstElement* m_pipeline = nullptr;
     bool m_isNetwork = false;
     bool m_isLive = false;
+    bool m_hasRanges = false; // the server gives any part
+    bool m_hasStore = false;  // what has been fetched is kept
     bool m_hasFailed = false;
     bool m_isKnown = false;
     bool m_isReady = false; // at the place and speed where it is to begin
@@ -126,7 +134,6 @@ private:
     bool m_isPaused = false; // by wish, not by want of media
     bool m_isHeld = false;   // by want of media
     bool m_hasSound = true;
-    std::optional<int> m_subtitle;
     double m_speed = 1;
     double m_volume = 1;
     std::optional<uint32_t> m_goal;    // of a seek that waits
@@ -134,7 +141,10 @@ private:
     GstState m_state = GST_STATE_NULL; // that was asked for
     uint32_t m_position = 0;
     uint32_t m_duration = 0;
-    std::atomic<bool> m_hasData{false}; // the source has given something; written on GStreamer's thread
+
+    // These are shared with GStreamer's threads.
+    std::atomic<bool> m_showsSubtitle{false};
+    std::atomic<bool> m_hasData{false}; // the source has given something
 };
 
 } // namespace desktop

@@ -23,6 +23,15 @@ constexpr uint32_t stateNothing = 0;
 constexpr uint32_t stateUnknown = 1;
 constexpr uint32_t statePresenting = 2;
 
+// A web engine in the process brings an element of its own for web addresses, which works for the engine
+// alone.
+void preferTheSetsOwnSource() {
+    if (GstPluginFeature* source = gst_registry_lookup_feature(gst_registry_get(), "souphttpsrc")) {
+        gst_plugin_feature_set_rank(source, GST_RANK_PRIMARY + 1000);
+        gst_object_unref(source);
+    }
+}
+
 } // namespace
 
 Players& Players::instance() {
@@ -30,7 +39,9 @@ Players& Players::instance() {
     return *players;
 }
 
-Players::Players() : m_platform(Platform::instance()) {}
+Players::Players() : m_platform(Platform::instance()) {
+    preferTheSetsOwnSource();
+}
 
 // ---- The table
 
@@ -98,6 +109,7 @@ void Players::forgetMedia(Entry& entry) {
     entry.isHeld = false;
     entry.isKnown = false;
     entry.canSeek = false;
+    entry.canSeekAhead = false;
     entry.canReverse = false;
     entry.progress = {};
     entry.available.clear();
@@ -227,8 +239,10 @@ bool Players::seek(TELIX_JS_AV_HANDLE player, uint32_t milliseconds) {
         }
     }
     const auto change = [milliseconds](Entry& entry) {
-        const bool isBeyond = entry.progress.duration > 0 && milliseconds > entry.progress.duration;
-        if (entry.isKnown && (!entry.canSeek || isBeyond)) {
+        const Player::Progress& progress = entry.progress;
+        const bool isBeyond = progress.duration > 0 && milliseconds > progress.duration;
+        const bool isHeld = entry.canSeekAhead || milliseconds / 1000 <= progress.bufferedEnd;
+        if (entry.isKnown && (!entry.canSeek || isBeyond || !isHeld)) {
             return false;
         }
         entry.progress.position = milliseconds; // pages see the goal at once
@@ -578,6 +592,7 @@ void Players::takeMedia(uint64_t session, const Player::Media& media) {
         }
         entry->isKnown = true;
         entry->canSeek = media.canSeek;
+        entry->canSeekAhead = media.canSeekAhead;
         entry->canReverse = media.canReverse;
         entry->available.clear();
         for (const Player::Stream& stream : media.streams) {

@@ -128,6 +128,7 @@ private:
         bool isHeld = false; // waits for media
         bool isKnown = false;
         bool canSeek = false;
+        bool canSeekAhead = false;
         bool canReverse = false;
         unsigned int seeksOnTheWay = 0;
         Player::Progress progress;

@@ -835,6 +835,16 @@ class PictureBeneath(TelixTv):
         run = self.run_tv(self.page(), '--wait-for-picture')
         self.assertEqual(run.status, 0, run)
 
+    def test_a_page_that_ends_has_its_objects_until_its_last_listener(self):
+        for frame in ('page.html', 'outer.html'):
+            page = self.page(script='addEventListener("unload", function () { tv.release(); }, false)')
+            self.write('<iframe src="page.html"></iframe>', 'outer.html')
+            run = self.run_tv(os.path.join(os.path.dirname(page), frame), '--wait-for-picture',
+                              environment={'LOG_MODULE': '6'})
+            self.assertEqual(run.status, 0, run)
+            # The page's own and the end of the object.
+            self.assertEqual(run.output.count('TELIX_JS_VB_Release is called'), 2, run)
+
     def test_wake_ups_without_end_leave_the_page_its_time_and_end_with_the_window(self):
         page = self.page(shape='16, 9, 3', script='ticks = 0; setInterval(function () { ticks += 1; }, 10)')
         file_name = os.path.join(self.folder, 'picture.png')

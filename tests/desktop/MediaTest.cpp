@@ -181,11 +181,13 @@ Shot takeShot() {
     return shot;
 }
 
-// Colours of the bars of second.mp4 stand still: its line in the middle begins in light grey.
+// The bars of second.mp4 stand still: its line in the middle begins in dark grey.
 bool showsSecondClip(const Shot& shot) {
-    return shot.pixels.size() > 64 && shot.pixels[40] > 150 &&
-           std::abs(shot.pixels[40] - shot.pixels[41]) < 12 &&
-           std::abs(shot.pixels[41] - shot.pixels[42]) < 12;
+    bool isGrey = shot.pixels.size() > 64;
+    for (size_t colour = 40; isGrey && colour < 43; ++colour) {
+        isGrey = shot.pixels[colour] > 80 && shot.pixels[colour] < 130;
+    }
+    return isGrey;
 }
 
 std::optional<Player::Sound> sound() {
@@ -202,7 +204,13 @@ std::string textOf(char* text) {
 
 class MediaTest : public Test {
 protected:
-    void SetUp() override { m_player = newPlayer(); }
+    void SetUp() override {
+        {
+            std::lock_guard<std::mutex> lock(messagesMutex);
+            messages.clear();
+        }
+        m_player = newPlayer();
+    }
 
     void TearDown() override {
         for (const TELIX_JS_AV_HANDLE player : m_players) {
@@ -301,10 +309,15 @@ protected:
 struct Format {
     const char* name;
     const char* clip;
-    uint32_t duration; // milliseconds
+    uint32_t length;   // milliseconds
+    uint32_t duration; // as it is told: a plain stream of AAC does not say
     uint32_t tolerance;
     bool hasPicture;
 };
+
+void PrintTo(const Format& format, std::ostream* out) {
+    *out << format.clip;
+}
 
 class MediaFormatTest : public MediaTest, public testing::WithParamInterface<std::tuple<Format, bool>> {};
 
@@ -318,10 +331,10 @@ TEST_P(MediaFormatTest, PlaysToItsEnd) {
     if (format.hasPicture) {
         EXPECT_TRUE(waitUntil([] { return takeShot().isVisible; }));
     }
-    EXPECT_NEAR(info().duration, format.duration, format.tolerance);
     EXPECT_TRUE(waitUntil([&] { return info().playPosition > 300; })) << "the position stands still";
+    EXPECT_NEAR(info().duration, format.duration, format.tolerance);
     EXPECT_EQ(takeShot().isVisible, format.hasPicture);
-    const uint32_t goal = format.duration - 1500;
+    const uint32_t goal = format.length - 1500;
     ASSERT_EQ(TELIX_JS_AV_Seek(m_player, goal), 0);
     EXPECT_EQ(info().playPosition, goal);
     const auto begin = std::chrono::steady_clock::now();
@@ -333,11 +346,12 @@ TEST_P(MediaFormatTest, PlaysToItsEnd) {
 }
 
 INSTANTIATE_TEST_SUITE_P(Files, MediaFormatTest,
-                         testing::Combine(testing::Values(Format{"mp4", "second.mp4", 8000, 100, true},
-                                                          Format{"mp3", "tune.mp3", 3000, 150, false},
-                                                          Format{"aac", "tune.aac", 3000, 600, false},
-                                                          Format{"wav", "tune.wav", 3000, 50, false},
-                                                          Format{"hls", "hls/index.m3u8", 6000, 200, true}),
+                         testing::Combine(testing::Values(Format{"mp4", "second.mp4", 8000, 8000, 100, true},
+                                                          Format{"mp3", "tune.mp3", 3000, 3000, 150, false},
+                                                          Format{"aac", "tune.aac", 3000, 0, 0, false},
+                                                          Format{"wav", "tune.wav", 3000, 3000, 50, false},
+                                                          Format{"hls", "hls/index.m3u8", 6000, 6000, 200,
+                                                                 true}),
                                           testing::Bool()),
                          [](const auto& each) {
                              return std::string(std::get<0>(each.param).name) +
@@ -446,6 +460,19 @@ TEST_F(MediaTest, RefusesSpeedsThatCannotBe) {
     Server server;
     play(server("hls/index.m3u8")); // of live streaming nothing is kept
     EXPECT_NE(TELIX_JS_AV_SetPlaySpeed(m_player, 0, 1, 0), 0);
+}
+
+TEST_F(MediaTest, GoesNoFurtherThanWhatIsHeldWhereTheServerGivesNoParts) {
+    Server server;
+    ASSERT_EQ(TELIX_JS_AV_Seek(m_player, 19000), 0); // to begin with
+    play(server("clip.mp4?ranges=no&rate=400000"));
+    EXPECT_LT(info().playPosition, 1000U);
+    ASSERT_LT(info().bufferedEnd, 15U);
+    EXPECT_NE(TELIX_JS_AV_Seek(m_player, 18000), 0);
+    EXPECT_TRUE(waitUntil([&] { return info().playPosition > 200; })); // and plays on
+    EXPECT_TRUE(waitUntil([&] { return info().bufferedEnd == 20; }));
+    ASSERT_EQ(TELIX_JS_AV_Seek(m_player, 19000), 0);
+    expectMessages({playStart, playEnd});
 }
 
 TEST_F(MediaTest, GoesOnAtAPositionThatItWasGivenWhileStopped) {
