@@ -581,6 +581,10 @@ class OnTheDesk(Demonstration):
                    shows('media-notice', 'Next: Running clock'), shows('media-title', 'Running clock'),
                    media_state('Playing'))
 
+    def test_a_slow_connection_makes_it_wait(self):
+        self.watch('slow', 'yellow', *['up'] * 4, 'ok', media_state('Playing'), media_state('Buffering \u2026'),
+                   is_seen('media-bar'), media_state('Playing'))
+
     def test_each_kind_of_error_has_its_words(self):
         self.watch('errors', 'yellow', *['up'] * 3, 'ok', media_state('The content is not available.'), 'down', 'ok',
                    media_state('The connection failed.'), 'down', 'ok', media_state('The set cannot play this format.'),
