@@ -38,6 +38,7 @@ var media = (function () {
     var objectsMade = 0;
     var playing = null; // the clip that the object was made for
     var shown = null; // the one whose title is shown
+    var hasBegun = false; // it has presented something
     var speed = 1; // what the set was told last
     var speedChanges = 0;
     var notice = '';
@@ -124,8 +125,9 @@ var media = (function () {
         tv.say('media-time', length > 0 ? tv.duration(position) + ' / ' + tv.duration(length) : '');
         tv.byId('media-played').style.width = (length > 0 ? Math.min(100, position / length * 100) : 0) + '%';
         tv.say('media-notice', notice);
+        hasBegun = hasBegun || playState === state.PLAYING;
         // The picture is beneath: the ground covers it where there is none to be seen.
-        var hasPicture = isPlaying && !clip.isAudio &&
+        var hasPicture = isPlaying && hasBegun && !clip.isAudio &&
                          [state.PLAYING, state.PAUSED, state.BUFFERING].indexOf(playState) >= 0;
         tv.setVisible('ground', !hasPicture);
         if (playState !== state.PLAYING) {
@@ -185,6 +187,7 @@ var media = (function () {
     function open() {
         var clip = clips[focused];
         dropVideo();
+        hasBegun = false;
         speed = 1;
         notice = '';
         clearTimeout(openTimer);

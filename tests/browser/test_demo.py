@@ -499,10 +499,11 @@ class OnTheDesk(Demonstration):
         cls.addClassCleanup(server.close)
         cls.page = server.address + '/demo/index.html'
 
-    def watch(self, name, *parts):
+    def watch(self, name, *parts, environment=None):
         """Goes through the steps; gives the notes and the picture of the window."""
         file_name = os.path.join(os.environ['TELIX_SCREENSHOTS'], f'demo-desk-{name}.png')
-        run = self.run_demo('--wait-for', steps(*parts), '--eval', 'notes', '--screenshot', file_name, page=self.page)
+        run = self.run_demo('--wait-for', steps(*parts), '--eval', 'notes', '--screenshot', file_name, page=self.page,
+                            environment=environment)
         return run.value, Picture(file_name)
 
     def assert_programmes(self, channel, now, following):
@@ -531,6 +532,16 @@ class OnTheDesk(Demonstration):
                 self.assertEqual(notes[0], channel)
                 self.assert_programmes(channel, *notes[1:])
                 self.assert_seen(pattern, picture)
+
+    def test_numbers_of_two_digits_and_a_list_longer_than_the_screen(self):
+        number = Note(text('banner-number'))
+        tuned = '!/Tuning/.test(' + text('banner-now') + ') && ' + is_hidden('number')
+        notes, _ = self.watch(
+            'fifteen', tuned, '1', '2', tuned, number, '1', 'ok', tuned, number, '1', is_seen('number'), tuned, number,
+            '4', tuned, number, '1', '6', shows('number', 'No channel 16'), 'left', *['up'] * 6,
+            Note(text('channel-list')), environment={'TELIX_CHANNELS': ';'.join(['test'] * 5)})
+        self.assertEqual(notes[:4], ['12', '1', '1', '4'])
+        self.assertRegex(notes[4], '^9.*13.*15Telix Three$')
 
     def test_programmes_follow_the_broadcast(self):
         # Programmes of four seconds: the one that is next becomes the one that is on.
@@ -580,6 +591,10 @@ class OnTheDesk(Demonstration):
         self.watch('queue', 'yellow', 'down', 'ok', media_state('Playing'), 'up', 'yellow',
                    shows('media-notice', 'Next: Running clock'), shows('media-title', 'Running clock'),
                    media_state('Playing'))
+
+    def test_a_slow_connection_makes_it_wait(self):
+        self.watch('slow', 'yellow', *['up'] * 4, 'ok', media_state('Playing'), media_state('Buffering \u2026'),
+                   is_seen('media-bar'), media_state('Playing'))
 
     def test_each_kind_of_error_has_its_words(self):
         self.watch('errors', 'yellow', *['up'] * 3, 'ok', media_state('The content is not available.'), 'down', 'ok',
