@@ -87,7 +87,8 @@ void channelChange(benchmark::State& state) {
             state.SkipWithError("there are no channels to change between");
             return;
         }
-        // Right after a picture that stands for itself the next one is furthest away: viewers zap at any time.
+        // Right after a picture that stands for itself the next one is furthest away: viewers zap at any
+        // time.
         std::this_thread::sleep_for(std::chrono::milliseconds(next * 137 % 500));
         const auto begin = Clock::now();
         TELIX_JS_VB_SetChannel(set.object, set.channels[next++ % set.count], 0);

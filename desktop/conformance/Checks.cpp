@@ -4,12 +4,6 @@
 #include <cstdlib>
 #include <glib.h>
 
-void expect(bool isSo, const std::string& otherwise) {
-    if (!isSo) {
-        throw Failure{otherwise};
-    }
-}
-
 void Means::check(const std::string& text, std::initializer_list<Need> needs,
                   const std::function<void()>& body) const {
     for (const Need& need : needs) {
@@ -58,7 +52,7 @@ std::string takeText(const std::string& name, const std::function<TELIX_RETCODE_
         return "";
     }
     const bool isAgain = call(&second) == 0;
-    const std::string text = first ? first : "";
+    std::string text = first ? first : "";
     const bool isGood = isUtf8(text.c_str());
     const bool isFresh = !isAgain || !first || first != second;
     if (isFresh) {

@@ -19,7 +19,11 @@ struct Skip {
     std::string reason;
 };
 
-void expect(bool isSo, const std::string& otherwise);
+inline void expect(bool isSo, const std::string& otherwise) {
+    if (!isSo) {
+        throw Failure{otherwise};
+    }
+}
 
 // A function that a check calls; see NEED.
 struct Need {

@@ -66,7 +66,7 @@ std::string send(const Means& m) {
     if (result != 0 || !id) {
         throw Skip{"the library takes no DRM messages"};
     }
-    const std::string text = id;
+    std::string text = id;
     std::free(id);
     expect(!text.empty() && isUtf8(text.c_str()), "the id is no text");
     return text;

@@ -63,7 +63,7 @@ std::string controlFolder(std::string& error) {
         }
         return folder;
     }
-    const std::string folder = std::string(g_get_tmp_dir()) + "/telix-" + std::to_string(geteuid());
+    std::string folder = std::string(g_get_tmp_dir()) + "/telix-" + std::to_string(geteuid());
     if (mkdir(folder.c_str(), 0700) != 0 && errno != EEXIST) {
         error = folder + ": " + g_strerror(errno);
         return "";

@@ -101,7 +101,7 @@ std::string Device::sendDrmMessage(const std::string& systemId) {
         }
     }
     std::lock_guard<std::mutex> lock(m_platform.mutex());
-    const std::string id = drmMessageId(++m_lastDrmMessage);
+    std::string id = drmMessageId(++m_lastDrmMessage);
     m_platform.post([this, id, message, result] { answerDrm(id, message, result); });
     return id;
 }

@@ -4,7 +4,6 @@
 #include "desktop/platform/AudioSink.h"
 
 #include <algorithm>
-#include <cmath>
 #include <cstring>
 #include <gst/audio/audio.h>
 #include <gst/tag/tag.h>
@@ -408,15 +407,17 @@ void Player::settle() {
     if (!m_isKnown) {
         becomeKnown();
     }
-    if (m_goal || m_newSpeed) {
+    const std::optional<uint32_t> goal = m_goal && canReach(*m_goal) ? m_goal : std::nullopt;
+    if (goal || m_newSpeed) {
         const double speed = m_newSpeed.value_or(m_speed);
-        const uint32_t goal = m_goal ? *m_goal : progress().position;
+        const uint32_t position = goal ? *goal : progress().position;
         m_goal.reset();
         m_newSpeed.reset();
-        if (applySeek(speed, goal)) {
+        if (applySeek(speed, position)) {
             return; // comes again when it is done
         }
     }
+    m_goal.reset();
     m_isReady = true;
     applyState();
 }
