@@ -19,16 +19,42 @@ PROGRAM_LIMIT = 270
 
 # The display as its user has it: the mouse, and what is on the screen. The library comes with Qt.
 X11 = ctypes.CDLL('libX11.so.6')
-X11.XOpenDisplay.restype = X11.XGetImage.restype = ctypes.c_void_p
-X11.XDefaultRootWindow.restype = X11.XGetPixel.restype = ctypes.c_ulong
+X11.XOpenDisplay.restype = ctypes.c_void_p
+X11.XDefaultRootWindow.restype = ctypes.c_ulong
 X11.XDefaultRootWindow.argtypes = X11.XCloseDisplay.argtypes = X11.XDestroyImage.argtypes = [ctypes.c_void_p]
 X11.XSync.argtypes = [ctypes.c_void_p, ctypes.c_int]
 X11.XWarpPointer.argtypes = [ctypes.c_void_p, ctypes.c_ulong, ctypes.c_ulong] + 2 * [ctypes.c_int] + \
     2 * [ctypes.c_uint] + 2 * [ctypes.c_int]
 X11.XGetImage.argtypes = [ctypes.c_void_p, ctypes.c_ulong] + 2 * [ctypes.c_int] + 2 * [ctypes.c_uint] + \
     [ctypes.c_ulong, ctypes.c_int]
-X11.XGetPixel.argtypes = [ctypes.c_void_p, ctypes.c_int, ctypes.c_int]
+X11.XGetImage.restype = ctypes.c_void_p
 ZPIXMAP = 2
+
+
+class XImage(ctypes.Structure):  # pylint: disable=too-few-public-methods
+    """The beginning of Xlib's record."""
+    _fields_ = [*((name, ctypes.c_int) for name in ('width', 'height', 'xoffset', 'format')),
+                ('data', ctypes.c_void_p),
+                *((name, ctypes.c_int) for name in ('byte_order', 'bitmap_unit', 'bitmap_bit_order', 'bitmap_pad',
+                                                    'depth', 'bytes_per_line', 'bits_per_pixel'))]
+
+
+class Screen:
+    """What a display shows at one moment, with the interface of Picture."""
+
+    def __init__(self, display, width, height):
+        address = X11.XGetImage(display, X11.XDefaultRootWindow(display), 0, 0, width, height, ctypes.c_ulong(-1),
+                                ZPIXMAP)
+        image = XImage.from_address(address)
+        self.width, self.height, self._length = width, height, image.bytes_per_line
+        self._step = image.bits_per_pixel // 8
+        self._data = ctypes.string_at(image.data, image.bytes_per_line * height)
+        X11.XDestroyImage(address)
+
+    def colour(self, x, y):
+        start = y * self._length + x * self._step
+        blue, green, red = self._data[start:start + 3]
+        return red, green, blue
 
 
 def give_up(*_):
@@ -46,6 +72,7 @@ class Television:
     def __init__(self, browser, width=1920, height=1080):
         self._browser = browser
         self._connection = None
+        self._size = width, height
         self._folder = tempfile.mkdtemp(prefix='telix-tv-test-')
         receiver, sender = os.pipe()
         self._server = subprocess.Popen(
@@ -89,18 +116,15 @@ class Television:
     def shows(self, place, colour):
         """Whether the screen has that colour there now or within ten seconds."""
         end = time.monotonic() + 10
-        while self._colour_on_screen(*place) != colour:
+        while self.screen().colour(*place) != colour:
             if time.monotonic() > end:
                 return False
             time.sleep(0.02)
         return True
 
-    def _colour_on_screen(self, x, y):
-        display = self._display()
-        image = X11.XGetImage(display, X11.XDefaultRootWindow(display), x, y, 1, 1, ctypes.c_ulong(-1), ZPIXMAP)
-        pixel = X11.XGetPixel(image, 0, 0)
-        X11.XDestroyImage(image)
-        return pixel >> 16 & 255, pixel >> 8 & 255, pixel & 255
+    def screen(self):
+        """What is on the screen now."""
+        return Screen(self._display(), *self._size)
 
     def _display(self):
         if not self._connection:

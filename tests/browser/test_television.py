@@ -1,0 +1,309 @@
+"""Television on the desk as a whole: browser, plug-in and platform library with real pictures. What the page is told, what
+the pipeline does and what the screen shows are held against the rules of the test multiplex."""
+
+import contextlib
+import http.server
+import json
+import os
+import queue
+import subprocess
+import threading
+import time
+import unittest
+
+from television import Television, temporary_folder
+from test_demo import has_bars, is_dark, is_striped
+
+TOP = os.path.abspath(__file__).rsplit('/tests/', 1)[0]
+PAGES = os.path.join(TOP, 'tests', 'browser', 'pages')
+LIMIT = 20  # seconds for anything to come true
+
+# The services of the test multiplex: the titles of their programmes, one after the other, and the pattern.
+SERVICES = {
+    'Telix One': (['Morning Patterns', 'The Colour Hour', 'News at the Minute'], is_striped),
+    'Telix Two': (['Bars of the World', 'Night of the Test Card'], has_bars),
+    'Telix Three': (['Gradients', 'Slow Colours', 'Fast Colours', 'Colours Live'], is_dark),
+}
+PROGRAMME_SECONDS = 4  # as tests/desktop/tv.conf says
+# Of the first service.
+GERMAN_SOUND, ENGLISH_SOUND = 0x111, 0x112
+# Of the third.
+GERMAN_SUBTITLES = 0x133
+UNKNOWN_CHANNEL = 5
+
+
+class Handler(http.server.BaseHTTPRequestHandler):
+    """The page's files, and the two ends of the line to it."""
+
+    # Qt asks a second time when an answer has no length and its end is that of the connection.
+    protocol_version = 'HTTP/1.1'
+    FILES = {'/television.xhtml': (os.path.join(PAGES, 'television.xhtml'), 'application/vnd.hbbtv.xhtml+xml'),
+             '/television.js': (os.path.join(PAGES, 'television.js'), 'application/javascript'),
+             '/streamevent.xml': (os.path.join(TOP, 'apps', 'demo', 'streamevent.xml'), 'application/xml')}
+
+    def do_GET(self):  # pylint: disable=invalid-name
+        if self.path.startswith('/command?'):
+            try:
+                self.reply(200, 'text/plain; charset=utf-8', self.server.commands.get(timeout=1).encode())
+            except queue.Empty:
+                self.reply(204, 'text/plain', b'')
+        elif self.path in self.FILES:
+            name, kind = self.FILES[self.path]
+            with open(name, 'rb') as file:
+                self.reply(200, kind, file.read())
+        else:
+            self.reply(404, 'text/plain', b'')
+
+    def do_POST(self):  # pylint: disable=invalid-name
+        body = self.rfile.read(int(self.headers['Content-Length']))
+        self.reply(204, 'text/plain', b'')
+        self.server.answers.put(json.loads(body))
+
+    def reply(self, status, kind, body):
+        with contextlib.suppress(ConnectionError):
+            self.send_response(status)
+            self.send_header('Content-Type', kind)
+            self.send_header('Content-Length', str(len(body)))
+            self.end_headers()
+            self.wfile.write(body)
+
+    def log_message(self, *_):
+        pass
+
+
+@contextlib.contextmanager
+def line_to_page():
+    with http.server.ThreadingHTTPServer(('127.0.0.1', 0), Handler) as server:
+        server.commands, server.answers = queue.Queue(), queue.Queue()
+        thread = threading.Thread(target=server.serve_forever)
+        thread.start()
+        try:
+            yield server
+        finally:
+            server.shutdown()
+            thread.join()
+
+
+class OnTheDesk(unittest.TestCase):
+    """Base of all: one television for all tests of the class."""
+
+    environment = {}
+
+    @classmethod
+    def setUpClass(cls):
+        stack = contextlib.ExitStack()
+        cls.addClassCleanup(stack.close)
+        cls.television = stack.enter_context(Television(os.environ['TELIX_TV']))
+        cls.line = stack.enter_context(line_to_page())
+        cls.process = cls.television.start(
+            '--plugin', os.environ['TELIX_DESK_PLUGIN'],
+            f'http://127.0.0.1:{cls.line.server_port}/television.xhtml', environment=cls.environment)
+        stack.callback(cls.end_of_television)
+
+    @classmethod
+    def end_of_television(cls):
+        cls.process.terminate()
+        try:
+            _, errors = cls.process.communicate(timeout=LIMIT)
+        except subprocess.TimeoutExpired:
+            cls.process.kill()
+            raise
+        if cls.process.returncode != 128 + 15 or 'television.js:' in errors:
+            raise RuntimeError(f'telix-tv ended with {cls.process.returncode}\n{errors}')
+
+    def setUp(self):
+        self.value('renew()')
+
+    def value(self, expression):
+        """The value of an expression in the page."""
+        self.line.commands.put(expression)
+        answer = self.line.answers.get(timeout=LIMIT)
+        self.assertNotIn('error', answer, expression)
+        return answer['value']
+
+    def wait(self, condition, message):
+        """Gives the first value of the function that is true."""
+        end = time.monotonic() + LIMIT
+        while True:
+            value = condition()
+            if value:
+                return value
+            self.assertLess(time.monotonic(), end, message() if callable(message) else message)
+            time.sleep(0.05)
+
+    def wait_for(self, expression):
+        return self.wait(lambda: self.value(expression), lambda: f'{expression}: {self.value("events")}')
+
+    def tune(self, name):
+        self.value(f'tune({json.dumps(name)})')
+        self.wait_for(f'hasTuned({json.dumps(name)})')
+
+    def telixctl(self, *arguments):
+        run = subprocess.run([os.environ['TELIX_TELIXCTL'], '--json', *arguments], env=self.television.environment,
+                             stdin=subprocess.DEVNULL, capture_output=True, text=True, check=False)
+        self.assertEqual(run.returncode, 0, run)
+        return json.loads(run.stdout)
+
+    def wait_for_state(self, key, value):
+        self.wait(lambda: self.telixctl('state')[key] == value, lambda: f'{key}: {self.telixctl("state")[key]}')
+
+    def patterns(self):
+        """The services of the test multiplex whose pattern the screen may show."""
+        screen = self.television.screen()
+        return [name for name, (_, pattern) in SERVICES.items() if pattern(screen)]
+
+
+class Broadcast(OnTheDesk):
+    def test_each_channel_has_its_name_and_its_picture(self):
+        self.assertEqual(self.value('channels().map(function (each) { return each.name; })'), list(SERVICES))
+        for name in [*SERVICES, 'Telix One']:
+            self.tune(name)
+            self.assertEqual(self.value('tv.currentChannel.name'), name)
+            self.wait(lambda name=name: self.patterns() == [name], lambda name=name: f'{name}: {self.patterns()}')
+            self.assertEqual(self.telixctl('state')['channel']['name'], name)
+
+    def test_the_viewer_changes_the_channel_as_well(self):
+        self.tune('Telix One')
+        self.telixctl('channel', '2')
+        self.wait_for('hasTuned("Telix Two")')
+        self.wait(lambda: self.patterns() == ['Telix Two'], self.patterns)
+
+    def present_and_next(self, name):
+        """Tunes with a new object, which keeps the programmes that it sees first. Empty when the table of the next one has
+        not come by then."""
+        self.value('renew()')
+        self.tune(name)
+        self.wait_for('tv.programmes && tv.programmes.length > 0')
+        programmes = self.value('programmes()')
+        return programmes if len(programmes) > 1 else []
+
+    def assert_scheduled(self, name):
+        """What is on now and next is what the time says; gives the number of the present one since 1970."""
+        titles = SERVICES[name][0]
+        programmes, now = self.wait(lambda: self.present_and_next(name), 'no next programme'), time.time()
+        # The tables come twice a second, and the object may have been there a moment before.
+        self.assertLessEqual(programmes[0][1], now)
+        self.assertLess(now, programmes[0][1] + PROGRAMME_SECONDS + 2)
+        slot = programmes[0][1] // PROGRAMME_SECONDS
+        self.assertEqual(programmes, [[titles[each % len(titles)], each * PROGRAMME_SECONDS, PROGRAMME_SECONDS,
+                                       f'A programme of {name}.'] for each in (slot, slot + 1)])
+        return slot
+
+    def test_now_and_next_are_those_of_the_tables_and_follow_the_time(self):
+        for name in SERVICES:
+            first = self.assert_scheduled(name)
+            known = len(self.value('events'))
+            # A programme ends, and the page is told.
+            self.wait(lambda first=first: time.time() > (first + 1) * PROGRAMME_SECONDS + 1, 'the clock stands')
+            self.wait_for(f'events.slice({known}).some(function (each) {{ return each[0] === "programmes"; }})')
+            self.assertGreater(self.assert_scheduled(name), first)
+
+    def test_sound_of_another_language_is_heard_when_it_is_selected(self):
+        self.tune('Telix One')
+        self.wait_for_state('heardAudio', GERMAN_SOUND)
+        self.assertEqual(self.value('active(1)'), ['deu'])
+        for language, pid in (('eng', ENGLISH_SOUND), ('deu', GERMAN_SOUND)):
+            self.value(f'tv.selectComponent(component(1, "{language}"))')
+            self.wait_for_state('heardAudio', pid)
+            self.assertEqual(self.value('active(1)'), [language])
+
+    def letters(self):
+        """How many pixels are white where subtitles stand; the third service has none of its own there."""
+        screen = self.television.screen()
+        return sum(min(screen.colour(x, y)) > 200 for y in range(560, 720, 3) for x in range(200, 1080, 3))
+
+    def assert_no_subtitles(self):
+        # The pauses between them are shorter.
+        end = time.monotonic() + 2
+        while time.monotonic() < end:
+            self.assertEqual(self.letters(), 0)
+            time.sleep(0.1)
+
+    def test_subtitles_are_on_the_screen_while_they_are_selected(self):
+        self.tune('Telix Three')
+        self.wait(lambda: self.patterns() == ['Telix Three'], self.patterns)
+        self.assertEqual((self.value('active(2)'), self.telixctl('state')['shownSubtitle']), ([], None))
+        self.assert_no_subtitles()
+        self.value('tv.selectComponent(component(2, "deu"))')
+        self.wait_for_state('shownSubtitle', GERMAN_SUBTITLES)
+        self.assertEqual(self.value('active(2)'), ['deu'])
+        self.wait(lambda: self.letters() > 100, 'no subtitles')
+        self.value('tv.unselectComponent(component(2, "deu"))')
+        self.wait_for_state('shownSubtitle', None)
+        self.wait(lambda: self.letters() == 0, 'subtitles')
+        self.assert_no_subtitles()
+
+    def test_stream_events_of_the_channel_reach_the_page(self):
+        for name in ('Telix One', 'Telix Two'):
+            self.value('renew()')
+            self.tune(name)
+            self.value('watchStreamEvents()')
+            event = json.dumps(['streamEvent', 'red-button', f'Red button on {name}', 'trigger'])
+            count = f'events.filter(function (each) {{ return JSON.stringify(each) === {json.dumps(event)}' \
+                    '.replace(/, /g, ","); }).length'
+            # One a second: each of them once, and no end of them.
+            self.wait_for(f'{count} >= 2')
+            self.assertEqual({each[2] for each in self.value('events') if each[0] == 'streamEvent'},
+                             {f'Red button on {name}'})
+
+    def test_a_channel_that_is_not_known_is_an_error(self):
+        self.tune('Telix One')
+        self.value('events = []; tv.setChannelByTriplet(1, 2, 3)')
+        self.wait_for('events.some(function (each) { return each[0] === "failed"; })')
+        self.assertEqual([each[-1] for each in self.value('events') if each[0] == 'failed'], [UNKNOWN_CHANNEL])
+
+    def test_the_picture_stands_where_the_page_wants_it(self):
+        self.tune('Telix One')
+        self.wait(lambda: self.patterns() == ['Telix One'], self.patterns)
+        self.value('tv.style.cssText = "left: 640px; top: 360px; width: 640px; height: 360px"')
+        # The first and the last stripe, and black where there was one.
+        for place, colour in (((1270, 700), (0, 255, 255)), ((660, 700), (255, 0, 0)), ((30, 300), (0, 0, 0))):
+            self.wait(lambda place=place, colour=colour: self.is_near(place, colour), f'{place} is not {colour}')
+        self.assertEqual(self.telixctl('state')['picture']['area'], {'x': 640, 'y': 360, 'width': 640, 'height': 360})
+        self.telixctl('full-screen', 'on')
+        self.wait(lambda: self.patterns() == ['Telix One'], self.patterns)
+        self.wait_for('events.some(function (each) { return each[0] === "fullScreen"; })')
+        self.assertEqual(self.value('tv.fullScreen'), True)
+
+    def is_near(self, place, colour):
+        return all(abs(part - other) < 40 for part, other in zip(self.television.screen().colour(*place), colour))
+
+    def test_a_released_picture_is_black(self):
+        self.tune('Telix One')
+        self.wait(lambda: self.patterns() == ['Telix One'], self.patterns)
+        self.value('tv.release()')
+        self.wait(lambda: self.is_near((300, 300), (0, 0, 0)) and self.is_near((1200, 300), (0, 0, 0)), 'not black')
+
+
+class Files(OnTheDesk):
+    """Transport streams of one colour each in a folder."""
+
+    COLOURS = {'Sea': (32, 64, 192), 'Meadow': (32, 160, 64)}
+
+    @classmethod
+    def setUpClass(cls):
+        folder = temporary_folder()
+        cls.addClassCleanup(folder.__exit__, None, None, None)
+        path = folder.__enter__()
+        for name, colour in cls.COLOURS.items():
+            subprocess.run(['ffmpeg', '-hide_banner', '-loglevel', 'error', '-nostdin', '-f', 'lavfi', '-i',
+                            'color=c=0x%02x%02x%02x:s=640x360:r=25:d=3' % colour, '-c:v', 'mpeg2video', '-q:v', '2',
+                            '-metadata', f'service_name={name}', '-f', 'mpegts', f'{path}/{name.lower()}.ts'],
+                           stdin=subprocess.DEVNULL, check=True)
+        cls.environment = {'TELIX_CHANNELS': path}
+        super().setUpClass()
+
+    def test_each_file_is_a_channel_with_its_name_and_its_picture(self):
+        self.assertEqual(self.value('channels().map(function (each) { return each.name; }).sort()'),
+                         sorted(self.COLOURS))
+        for name in [*self.COLOURS, 'Sea']:
+            self.tune(name)
+            for place in ((5, 5), (640, 360), (1275, 715)):
+                self.wait(lambda name=name, place=place: all(
+                    abs(part - other) < 12
+                    for part, other in zip(self.television.screen().colour(*place), self.COLOURS[name])),
+                    f'{name} at {place}')
+
+
+if __name__ == '__main__':
+    unittest.main()

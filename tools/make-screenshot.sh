@@ -1,0 +1,16 @@
+#!/usr/bin/env bash
+# Renews docs/television.png, the picture of the demonstration in README.md, or makes FILE.png instead of it.
+# Usage: tools/make-screenshot.sh [FILE.png]
+set -euo pipefail
+if [ $# -gt 1 ] || [[ ${1:-} == -* ]]; then
+    echo "Usage: $0 [FILE.png]" >&2
+    exit 2
+fi
+top=$(cd "$(dirname "${BASH_SOURCE[0]}")/.." && pwd)
+
+# The third service some seconds after the change of the channel, with what is on. No settings of the viewer's.
+ready='document.getElementById("banner-name").textContent === "Telix Three" &&
+    document.getElementById("banner-next").textContent &&
+    Date.now() > (window.readySince = window.readySince || Date.now()) + 2500'
+exec env -u DISPLAY TELIX_CHANNELS=test TELIX_CONFIG=/dev/null "$top/run.sh" --keys 3 --wait-for "$ready" \
+    --screenshot "${1:-$top/docs/television.png}"
