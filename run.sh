@@ -91,6 +91,8 @@ if [ ! -f "$build/CMakeCache.txt" ]; then
     cmake -S "$top" -B "$build" -G Ninja -DTELIX_BUILD_TESTS=OFF -DTELIX_BUILD_BENCH=OFF
 fi
 cmake --build "$build" --target telix-tv nptelixjs_desktop telix telixctl
+# The library would fall back to its defaults; here the viewer can still mend the file.
+"$build/desktop/telixctl" check-config >/dev/null
 
 if [ ${#channels[@]} -gt 0 ]; then
     TELIX_CHANNELS=$(IFS=';' && echo "${channels[*]}")
