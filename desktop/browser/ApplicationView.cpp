@@ -5,9 +5,11 @@
 #include "desktop/browser/PageGeometry.h"
 #include "desktop/browser/PageScript.h"
 #include "desktop/browser/RemoteControl.h"
+#include "desktop/browser/StyleSheet.h"
 
 #include <QContextMenuEvent>
 #include <QCoreApplication>
+#include <QImage>
 #include <QKeyEvent>
 #include <QMouseEvent>
 #include <QPaintEvent>
@@ -41,10 +43,11 @@ QString textOf(const RemoteKey& key) {
     return hasText ? QString(QChar(key.keyCode)) : QString();
 }
 
-void endPluginsBefore(QWebFrame& frame) {
-    callPageScript(frame, QStringLiteral("endplugins"), {});
+// Tells the documents in the frame and in those within.
+void tellUnloaded(QWebFrame& frame) {
+    callPageScript(frame, QStringLiteral("unload"), {});
     for (QWebFrame* child : frame.childFrames())
-        endPluginsBefore(*child);
+        tellUnloaded(*child);
 }
 
 } // namespace
@@ -72,8 +75,17 @@ ApplicationView::ApplicationView(const QString& userAgent, QWidget* parent)
 ApplicationView::~ApplicationView() {
     // While a page is taken apart, the engine tells plug-ins that their windows shrink, and they ask the page
     // where they stand. It would lay out what is half gone, and crash or forget some of the plug-ins, which
-    // then never end.
-    endPluginsBefore(*m_page->mainFrame());
+    // then never end. A page that asks for its layout when it is told of its end would crash the same way. So
+    // it is told before, and then the plug-ins end: without a box, an element has none once the layout of all
+    // frames is up to date, as it is when the page has been painted.
+    tellUnloaded(*m_page->mainFrame());
+    QWebSettings* settings = m_page->settings();
+    settings->setAttribute(QWebSettings::JavascriptEnabled, false);
+    settings->setUserStyleSheetUrl(
+        styleSheetUrl(QStringLiteral("object, embed, applet { display: none !important; }")));
+    QImage nowhere(1, 1, QImage::Format_ARGB32_Premultiplied);
+    QPainter painter(&nowhere);
+    m_page->mainFrame()->render(&painter, QRegion(nowhere.rect()));
 }
 
 void ApplicationView::onLoadFinished(bool ok) {

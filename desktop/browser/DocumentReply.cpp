@@ -32,7 +32,8 @@ bool DocumentReply::isNeededFor(const QNetworkRequest& request) {
 }
 
 DocumentReply::DocumentReply(QNetworkReply* reply, QObject* parent) : QNetworkReply(parent), m_reply(reply) {
-    reply->setParent(this);
+    // The manager ends all replies among its descendants, one by one: it must not meet this one twice.
+    reply->setParent(nullptr);
     setOperation(reply->operation());
     setRequest(reply->request());
     setUrl(reply->url());

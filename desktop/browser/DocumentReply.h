@@ -5,6 +5,8 @@
 
 #include <QNetworkReply>
 
+#include <memory>
+
 // Passes on everything that the reply within gives.
 class DocumentReply : public QNetworkReply {
     Q_OBJECT
@@ -30,7 +32,7 @@ private:
     void takeHead();
     void onFinished();
 
-    QNetworkReply* m_reply;
+    std::unique_ptr<QNetworkReply> m_reply;
 };
 
 #endif

@@ -4,6 +4,7 @@
 #include "desktop/browser/LoadCheck.h"
 #include "desktop/browser/PluginFolder.h"
 #include "desktop/browser/ScriptedRun.h"
+#include "desktop/browser/StyleSheet.h"
 #include "desktop/browser/TvWindow.h"
 
 #include <QAbstractEventDispatcher>
@@ -26,8 +27,7 @@ QUrl styleSheetThatHides(const QStringList& mimeTypes) {
         style += QStringLiteral("object[type=\"%1\" i], embed[type=\"%1\" i] { opacity: 0 !important; }\n")
                      .arg(type);
     }
-    return QUrl(QLatin1String("data:text/css;charset=utf-8;base64,") +
-                QLatin1String(style.toUtf8().toBase64()));
+    return styleSheetUrl(style);
 }
 
 void configureEngine(const PluginFolder& folder, bool inspect) {
