@@ -837,7 +837,8 @@ class PictureBeneath(TelixTv):
 
     def test_a_page_that_ends_has_its_objects_until_its_last_listener(self):
         for frame in ('page.html', 'outer.html'):
-            page = self.page(script='addEventListener("unload", function () { tv.release(); }, false)')
+            page = self.page(script='addEventListener("unload", function () { document.body.style.margin = "9px"; '
+                                    'tv.style.left = "9px"; document.body.offsetWidth; tv.release(); }, false)')
             self.write('<iframe src="page.html"></iframe>', 'outer.html')
             run = self.run_tv(os.path.join(os.path.dirname(page), frame), '--wait-for-picture',
                               environment={'LOG_MODULE': '6'})
