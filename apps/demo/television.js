@@ -49,21 +49,37 @@ var television = (function () {
     function dropFormer() {
         former.forEach(tv.removeObject);
         former = [];
+        document.body.offsetWidth; // the browser ends them now
     }
 
     // An object keeps the lists of components that it has once handed out, also on another channel. So every channel
-    // gets an object of its own.
+    // gets an object of its own. Its events go to listeners of the page: browsers keep a handler that is set on an object
+    // of the plug-in by any such object of the page, and lose it when that one is taken away. Only what an event
+    // does not tell, why something failed, is left to handlers.
     function renew() {
         if (object) {
-            ['onChannelChangeSucceeded', 'onChannelChangeError', 'onPlayStateChange', 'onProgrammesChanged',
-             'onParentalRatingChange'].forEach(function (name) { object[name] = null; });
+            object.onChannelChangeError = object.onPlayStateChange = null;
             former.push(object);
         }
-        object = tv.makeObject('video/broadcast', 'broadcast-' + ++objectsMade);
+        var made = object = tv.makeObject('video/broadcast', 'broadcast-' + ++objectsMade);
         if (!object.isThere) {
             return;
         }
-        object.onChannelChangeSucceeded = succeed;
+        function listen(type, action) {
+            made.addEventListener(type, function () {
+                if (made === object) {
+                    action();
+                }
+            }, false);
+        }
+        listen('ChannelChangeSucceded', succeed); // in the plug-in's spelling
+        listen('ChannelChangeError', function () {
+            if (!state.error) {
+                end('The channel cannot be shown.');
+            }
+        });
+        listen('ProgrammesChanged', readProgrammes);
+        listen('ParentalRatingChange', function () { on.programmes(); });
         object.onChannelChangeError = function (channel, error) { fail(error); };
         object.onPlayStateChange = function (playState, error) {
             // Also told behind an error of the tuning; then it is a repetition.
@@ -71,8 +87,6 @@ var television = (function () {
                 fail(error);
             }
         };
-        object.onProgrammesChanged = readProgrammes;
-        object.onParentalRatingChange = function () { on.programmes(); };
     }
 
     // ---- Tuning
@@ -98,15 +112,23 @@ var television = (function () {
         on.failed(text);
     }
 
-    function succeed(channel) {
+    function succeed() {
+        var presenting = object;
         clearTimeout(timer);
-        state.channel = known(channel) || state.channel;
+        state.channel = known(object.currentChannel) || state.channel;
         state.isTuned = true;
-        // Later: this is a call from the plug-in, of which the objects are.
-        setTimeout(dropFormer, 0);
+        // Later: this is a call from the plug-in, of which the objects are. And then in this order: a listener that the
+        // plug-in is given goes with an object that is taken away.
+        setTimeout(function () {
+            dropFormer();
+            setTimeout(function () {
+                if (presenting === object && state.isTuned) {
+                    watchForAnnouncements();
+                }
+            }, 0);
+        }, 0);
         on.tuned();
         readProgrammes();
-        watchForAnnouncements();
     }
 
     function fail(error) {
