@@ -488,8 +488,8 @@ def is_dark(picture):
     return all(20 < max(colour) < 150 for colour in columns(picture))
 
 
-class OnTheDesk(Demonstration):
-    """All of it with the desk's own platform library: pictures that are received and decoded, and media over HTTP."""
+class Desk(Demonstration):
+    """With the desk's own platform library: pictures that are received and decoded, and media over HTTP."""
     plugin = 'TELIX_DESK_PLUGIN'
 
     @classmethod
@@ -520,6 +520,8 @@ class OnTheDesk(Demonstration):
     def on_channel(self, name):
         return f'{shows("banner-name", name)} && {self.received}'
 
+
+class BroadcastOnTheDesk(Desk):
     def test_the_picture_of_each_channel_with_its_banner(self):
         # The list, the arrow and the digit lead there.
         ways = {'Telix One': (['3', self.on_channel('Telix Three'), 'left', 'down', 'ok'],
@@ -563,6 +565,8 @@ class OnTheDesk(Demonstration):
         self.assertRegex(notes[0], '^Red button on Telix One Telix One .* A programme of Telix One. Next ')
         self.assert_seen(has_bars, picture)
 
+
+class MediaOnTheDesk(Desk):
     def test_a_clip_plays_and_broadcast_comes_back(self):
         time = 'document.getElementById("media-time").textContent'
         playing = ['yellow', 'ok', media_state('Playing')]
