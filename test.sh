@@ -5,7 +5,7 @@ set -euo pipefail
 cd "$(dirname "${BASH_SOURCE[0]}")"
 
 tools/install-packages.sh run test
-jobs=$((2 * $(nproc))) # many tests wait for pictures and sound
+jobs=$(($(nproc) + 1)) # some tests wait for pictures and sound
 
 cmake --preset asan >/dev/null
 cmake --build --preset asan -- -k 0
