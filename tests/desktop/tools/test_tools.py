@@ -266,7 +266,7 @@ class Conformance(ToolTest):
     def test_our_own_library_passes_everything(self):
         result = self.check('--media', 'file://' + os.environ['TELIX_CLIP'], os.path.dirname(os.environ['TELIX_LIBRARY']))
         lines = result.stdout.splitlines()
-        self.assertEqual([line for line in lines[:-1] if not line.startswith('ok ')], [])
+        self.assertEqual([line for line in lines[:-1] if not line.startswith('ok ')], [], result.stderr)
         self.assertEqual(result.returncode, 0, result.stdout)
         self.assertEqual(sum('  has TELIX_JS_' in line for line in lines), 120)
         self.assertEqual(lines[-1], f'{len(lines) - 1} ok, 0 failed, 0 skipped')
