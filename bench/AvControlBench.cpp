@@ -116,18 +116,12 @@ void completeTable(NPNetscapeFuncs& table) {
 
 int main(int argc, char** argv) {
     completeTable(benchBrowserTable());
-    NPPluginFuncs plugin{};
-    plugin.size = sizeof(plugin);
-    if (NP_Initialize(&benchBrowserTable(), &plugin) != NPERR_NO_ERROR) {
-        return 2;
-    }
-    benchmark::Initialize(&argc, argv);
-    benchmark::RegisterBenchmark("message/bare hop", bareHop);
-    benchmark::RegisterBenchmark("message/state event", [&](benchmark::State& s) { stateEvent(s, plugin); });
-    benchmark::RegisterBenchmark("playPosition/platform call", platformCall);
-    benchmark::RegisterBenchmark("playPosition/read",
-                                 [&](benchmark::State& s) { readPlayPosition(s, plugin); });
-    benchmark::RunSpecifiedBenchmarks();
-    NP_Shutdown();
-    return 0;
+    return runBenchmarks(argc, argv, [](NPPluginFuncs& plugin) {
+        benchmark::RegisterBenchmark("message/bare hop", bareHop);
+        benchmark::RegisterBenchmark("message/state event",
+                                     [&](benchmark::State& s) { stateEvent(s, plugin); });
+        benchmark::RegisterBenchmark("playPosition/platform call", platformCall);
+        benchmark::RegisterBenchmark("playPosition/read",
+                                     [&](benchmark::State& s) { readPlayPosition(s, plugin); });
+    });
 }

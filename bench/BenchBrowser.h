@@ -3,11 +3,14 @@
 #ifndef TELIX_BENCH_BENCHBROWSER_H
 #define TELIX_BENCH_BENCHBROWSER_H
 
+#include <benchmark/benchmark.h>
+
 #include <cstdlib>
 #include <cstring>
 #include <set>
 #include <string>
 
+#include "common/PluginExports.h"
 #include "npapi/npfunctions.h"
 
 // A table for NP_Initialize; lives as long as the process.
@@ -68,6 +71,33 @@ inline NPNetscapeFuncs& benchBrowserTable() {
         return t;
     }();
     return table;
+}
+
+// Runs the benchmarks that `add(plugin)` registers, with the plug-in loaded; `plugin` is its table. Gives the
+// exit status of the program.
+template <typename Add>
+int runBenchmarks(int argc, char** argv, Add add) {
+    NPPluginFuncs plugin{};
+    plugin.size = sizeof(plugin);
+    if (NP_Initialize(&benchBrowserTable(), &plugin) != NPERR_NO_ERROR) {
+        return 2;
+    }
+    benchmark::Initialize(&argc, argv);
+    add(plugin);
+    benchmark::RunSpecifiedBenchmarks();
+    NP_Shutdown();
+    return 0;
+}
+
+// The same with benchmarks that `registerAll(name, level)` registers, for each state of the log.
+inline int runWithAndWithoutLog(int argc, char** argv,
+                                void (*registerAll)(const std::string& name, const char* level)) {
+    return runBenchmarks(argc, argv, [=](NPPluginFuncs&) {
+        registerAll("log unset", nullptr);
+        // Behind those, since a level other than 0 stays for good. No module has this number: nothing is
+        // printed.
+        registerAll("log set", "99");
+    });
 }
 
 #endif

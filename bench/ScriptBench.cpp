@@ -193,16 +193,5 @@ void registerAll(const std::string& log, const char* level) {
 } // namespace
 
 int main(int argc, char** argv) {
-    NPPluginFuncs plugin{};
-    plugin.size = sizeof(plugin);
-    if (NP_Initialize(&benchBrowserTable(), &plugin) != NPERR_NO_ERROR) {
-        return 2;
-    }
-    benchmark::Initialize(&argc, argv);
-    registerAll("log unset", nullptr);
-    // Behind those, since a level other than 0 stays for good. No module has this number: nothing is printed.
-    registerAll("log set", "99");
-    benchmark::RunSpecifiedBenchmarks();
-    NP_Shutdown();
-    return 0;
+    return runWithAndWithoutLog(argc, argv, registerAll);
 }

@@ -630,12 +630,12 @@ Broadcast::components(TELIX_JS_VB_HANDLE object, TELIX_JS_AVCOMPTYPE type, bool 
     return m_holder == object ? ofKindLocked(type, activeOnly) : std::vector<TELIX_JS_AVCOMPHANDLE>();
 }
 
-std::optional<Component> Broadcast::findComponent(TELIX_JS_AVCOMPHANDLE component,
-                                                  TELIX_JS_AVCOMPTYPE type) const {
+std::optional<ComponentTraits> Broadcast::findComponent(TELIX_JS_AVCOMPHANDLE component,
+                                                        TELIX_JS_AVCOMPTYPE type) const {
     std::lock_guard<std::mutex> lock(m_platform.mutex());
     const bool isKnown =
         component != 0 && component <= m_components.size() && m_components[component - 1].type == type;
-    return isKnown ? std::optional(m_components[component - 1]) : std::nullopt;
+    return isKnown ? std::optional<ComponentTraits>(m_components[component - 1]) : std::nullopt;
 }
 
 bool Broadcast::select(TELIX_JS_VB_HANDLE object, TELIX_JS_AVCOMPHANDLE component, TELIX_JS_AVCOMPTYPE type,

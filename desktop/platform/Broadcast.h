@@ -5,6 +5,7 @@
 
 #include "desktop/platform/Callback.h"
 #include "desktop/platform/Channels.h"
+#include "desktop/platform/ComponentTraits.h"
 #include "desktop/platform/HeadEnd.h"
 #include "desktop/platform/Platform.h"
 #include "desktop/platform/Programmes.h"
@@ -23,17 +24,9 @@ constexpr TELIX_ERR_STATE_ENUM_T errorUnknownChannel = 5;
 constexpr TELIX_ERR_STATE_ENUM_T errorInterrupted = 6;
 
 // A component of broadcast. Handles are given for life: equal components have the same one.
-struct Component {
-    TELIX_JS_AVCOMPTYPE type = 0;
+struct Component : ComponentTraits {
     TELIX_JS_CM_HANDLE channel = 0;
     uint16_t pid = 0;
-    std::string encoding;
-    std::string language;
-    bool isEncrypted = false;
-    bool isAudioDescription = false;
-    bool isForHearingImpaired = false;
-    float aspectRatio = 0;      // 0 as long as it is not known
-    uint32_t audioChannels = 0; // the same
 };
 
 // The functions are called on any thread unless said otherwise, and answer at once. Those that take an object
@@ -87,7 +80,8 @@ public:
     // All of one kind, or those that are presented, of an object's channel.
     std::optional<std::vector<TELIX_JS_AVCOMPHANDLE>>
     components(TELIX_JS_VB_HANDLE object, TELIX_JS_AVCOMPTYPE type, bool activeOnly) const;
-    std::optional<Component> findComponent(TELIX_JS_AVCOMPHANDLE component, TELIX_JS_AVCOMPTYPE type) const;
+    std::optional<ComponentTraits> findComponent(TELIX_JS_AVCOMPHANDLE component,
+                                                 TELIX_JS_AVCOMPTYPE type) const;
     bool select(TELIX_JS_VB_HANDLE object, TELIX_JS_AVCOMPHANDLE component, TELIX_JS_AVCOMPTYPE type,
                 bool on);
 

@@ -38,7 +38,7 @@ public:
         }
     }
 
-private:
+protected:
     mutable std::recursive_mutex m_mutex;
     Function m_function = nullptr;
 };
@@ -46,7 +46,7 @@ private:
 // A callback that several register and give up, each for itself: it is called once as long as one of them is
 // left.
 template <typename Function>
-class CountedCallback {
+class CountedCallback : private Callback<Function> {
 public:
     void set(Function function) {
         std::lock_guard<std::recursive_mutex> lock(m_mutex);
@@ -62,22 +62,13 @@ public:
         }
     }
 
-    bool isSet() const {
-        std::lock_guard<std::recursive_mutex> lock(m_mutex);
-        return m_function != nullptr;
-    }
-
-    template <typename... Arguments>
-    void call(Arguments... arguments) const {
-        std::lock_guard<std::recursive_mutex> lock(m_mutex);
-        if (m_function) {
-            m_function(arguments...);
-        }
-    }
+    using Callback<Function>::isSet;
+    using Callback<Function>::call;
 
 private:
-    mutable std::recursive_mutex m_mutex;
-    Function m_function = nullptr;
+    using Callback<Function>::m_function;
+    using Callback<Function>::m_mutex;
+
     unsigned int m_count = 0;
 };
 

@@ -10,10 +10,6 @@ Broadcast& broadcast() {
     return Broadcast::instance();
 }
 
-TELIX_RETCODE_ENUM_T resultOf(bool isTaken) {
-    return isTaken ? TELIX_RETCODE_SUCCESS : refused;
-}
-
 template <typename Function>
 TELIX_RETCODE_ENUM_T registered(Callback<Function>& callback, Function function) {
     callback.set(function);
@@ -23,31 +19,6 @@ TELIX_RETCODE_ENUM_T registered(Callback<Function>& callback, Function function)
 template <typename Function>
 TELIX_RETCODE_ENUM_T unregistered(Callback<Function>& callback, Function function) {
     callback.clear(function);
-    return TELIX_RETCODE_SUCCESS;
-}
-
-template <typename Give>
-TELIX_RETCODE_ENUM_T ofComponent(TELIX_JS_AVCOMPHANDLE handle, TELIX_JS_AVCOMPTYPE type, Give give) {
-    const auto component = broadcast().findComponent(handle, type);
-    return component ? give(*component) : refused;
-}
-
-TELIX_RETCODE_ENUM_T giveFlag(___UINT8* out, bool flag) {
-    *out = flag ? 1 : 0;
-    return TELIX_RETCODE_SUCCESS;
-}
-
-TELIX_RETCODE_ENUM_T giveComponents(std::vector<TELIX_JS_AVCOMPHANDLE>& kept, TELIX_JS_VB_HANDLE object,
-                                    TELIX_JS_AVCOMPTYPE type, bool activeOnly,
-                                    TELIX_JS_AVCOMPHANDLE** components, uint32_t* count) {
-    const auto found = broadcast().components(object, type, activeOnly);
-    if (!found) {
-        return refused;
-    }
-    kept = *found;
-    kept.reserve(1); // also an empty array is somewhere
-    *components = kept.data();
-    *count = static_cast<uint32_t>(kept.size());
     return TELIX_RETCODE_SUCCESS;
 }
 
@@ -266,14 +237,14 @@ TELIX_RETCODE_ENUM_T TELIX_JS_VB_UnRegisterStreamEvent(TELIX_JS_VB_HANDLE object
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_GetComponents(TELIX_JS_VB_HANDLE object, TELIX_JS_AVCOMPTYPE type,
                                                TELIX_JS_AVCOMPHANDLE** components, uint32_t* count) {
     static std::vector<TELIX_JS_AVCOMPHANDLE> kept; // valid until the next call
-    return giveComponents(kept, object, type, false, components, count);
+    return giveComponents(kept, broadcast().components(object, type, false), components, count);
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_GetCurrActiveComponents(TELIX_JS_VB_HANDLE object, TELIX_JS_AVCOMPTYPE type,
                                                          TELIX_JS_AVCOMPHANDLE** components,
                                                          uint32_t* count) {
     static std::vector<TELIX_JS_AVCOMPHANDLE> kept; // valid until the next call
-    return giveComponents(kept, object, type, true, components, count);
+    return giveComponents(kept, broadcast().components(object, type, true), components, count);
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_SelectComponent(TELIX_JS_VB_HANDLE object, TELIX_JS_AVCOMPHANDLE component,
@@ -288,53 +259,41 @@ TELIX_RETCODE_ENUM_T TELIX_JS_VB_UnselectComponent(TELIX_JS_VB_HANDLE object, TE
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_AVComponent_GetEncoding(TELIX_JS_AVCOMPHANDLE component,
                                                          TELIX_JS_AVCOMPTYPE type, char** encoding) {
-    return ofComponent(component, type,
-                       [=](const Component& found) { return giveText(encoding, found.encoding); });
+    return giveTrait(broadcast().findComponent(component, type), &ComponentTraits::encoding, encoding);
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_AVComponent_GetEncrypted(TELIX_JS_AVCOMPHANDLE component,
                                                           TELIX_JS_AVCOMPTYPE type, ___UINT8* encrypted) {
-    return ofComponent(component, type,
-                       [=](const Component& found) { return giveFlag(encrypted, found.isEncrypted); });
+    return giveTrait(broadcast().findComponent(component, type), &ComponentTraits::isEncrypted, encrypted);
 }
 
-// Asked for until it is given, so it is refused until a frame has shown it.
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_AVComponent_GetAspectRatio(TELIX_JS_AVCOMPHANDLE component,
                                                             TELIX_JS_AVCOMPTYPE type, float* aspectRatio) {
-    return ofComponent(component, type, [=](const Component& found) {
-        *aspectRatio = found.aspectRatio;
-        return resultOf(found.aspectRatio > 0);
-    });
+    return giveTrait(broadcast().findComponent(component, type), &ComponentTraits::aspectRatio, aspectRatio);
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_AVComponent_GetLanguage(TELIX_JS_AVCOMPHANDLE component,
                                                          TELIX_JS_AVCOMPTYPE type, char** language) {
-    return ofComponent(component, type,
-                       [=](const Component& found) { return giveText(language, found.language); });
+    return giveTrait(broadcast().findComponent(component, type), &ComponentTraits::language, language);
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_AVComponent_GetAudioDescription(TELIX_JS_AVCOMPHANDLE component,
                                                                  TELIX_JS_AVCOMPTYPE type,
                                                                  ___UINT8* audioDescription) {
-    return ofComponent(component, type, [=](const Component& found) {
-        return giveFlag(audioDescription, found.isAudioDescription);
-    });
+    return giveTrait(broadcast().findComponent(component, type), &ComponentTraits::isAudioDescription,
+                     audioDescription);
 }
 
-// Refused until the sound has been decoded, as the aspect ratio.
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_AVComponent_GetAudioChannels(TELIX_JS_AVCOMPHANDLE component,
                                                               TELIX_JS_AVCOMPTYPE type,
                                                               uint32_t* audioChannels) {
-    return ofComponent(component, type, [=](const Component& found) {
-        *audioChannels = found.audioChannels;
-        return resultOf(found.audioChannels > 0);
-    });
+    return giveTrait(broadcast().findComponent(component, type), &ComponentTraits::audioChannels,
+                     audioChannels);
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_AVComponent_GetHearingImpaired(TELIX_JS_AVCOMPHANDLE component,
                                                                 TELIX_JS_AVCOMPTYPE type,
                                                                 ___UINT8* hearingImpaired) {
-    return ofComponent(component, type, [=](const Component& found) {
-        return giveFlag(hearingImpaired, found.isForHearingImpaired);
-    });
+    return giveTrait(broadcast().findComponent(component, type), &ComponentTraits::isForHearingImpaired,
+                     hearingImpaired);
 }

@@ -88,5 +88,5 @@ TELIX_RETCODE_ENUM_T TELIX_JS_CM_GetChannelByTriplet(uint32_t onid, uint32_t tsi
 
 TELIX_RETCODE_ENUM_T TELIX_JS_APP_GetCurrentChannel(TELIX_JS_CM_HANDLE* channel) {
     *channel = Broadcast::instance().currentChannel();
-    return *channel != 0 ? TELIX_RETCODE_SUCCESS : refused;
+    return resultOf(*channel != 0);
 }

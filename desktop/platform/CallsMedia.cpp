@@ -10,37 +10,6 @@ Players& players() {
     return Players::instance();
 }
 
-TELIX_RETCODE_ENUM_T resultOf(bool isTaken) {
-    return isTaken ? TELIX_RETCODE_SUCCESS : refused;
-}
-
-template <typename Give>
-TELIX_RETCODE_ENUM_T ofComponent(TELIX_JS_AVCOMPHANDLE handle, TELIX_JS_AVCOMPTYPE type, Give give) {
-    const auto stream = players().findComponent(handle, type);
-    return stream ? give(*stream) : refused;
-}
-
-TELIX_RETCODE_ENUM_T giveNo(TELIX_JS_AVCOMPHANDLE handle, TELIX_JS_AVCOMPTYPE type, ___UINT8* flag) {
-    return ofComponent(handle, type, [=](const Player::Stream&) {
-        *flag = 0;
-        return TELIX_RETCODE_SUCCESS;
-    });
-}
-
-TELIX_RETCODE_ENUM_T giveComponents(std::vector<TELIX_JS_AVCOMPHANDLE>& kept, TELIX_JS_AV_HANDLE player,
-                                    TELIX_JS_AVCOMPTYPE type, bool activeOnly,
-                                    TELIX_JS_AVCOMPHANDLE** components, uint32_t* count) {
-    const auto found = players().components(player, type, activeOnly);
-    if (!found) {
-        return refused;
-    }
-    kept = *found;
-    kept.reserve(1); // also an empty array is somewhere
-    *components = kept.data();
-    *count = static_cast<uint32_t>(kept.size());
-    return TELIX_RETCODE_SUCCESS;
-}
-
 } // namespace
 
 // What the MIME type and the URL promise makes no difference: the media itself tells what it is.
@@ -169,14 +138,14 @@ TELIX_RETCODE_ENUM_T TELIX_JS_AV_Seek(TELIX_JS_AV_HANDLE player, uint32_t millis
 TELIX_RETCODE_ENUM_T TELIX_JS_AV_GetComponents(TELIX_JS_AV_HANDLE player, TELIX_JS_AVCOMPTYPE type,
                                                TELIX_JS_AVCOMPHANDLE** components, uint32_t* count) {
     static std::vector<TELIX_JS_AVCOMPHANDLE> kept; // valid until the next call
-    return giveComponents(kept, player, type, false, components, count);
+    return giveComponents(kept, players().components(player, type, false), components, count);
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_AV_GetCurrActiveComponents(TELIX_JS_AV_HANDLE player, TELIX_JS_AVCOMPTYPE type,
                                                          TELIX_JS_AVCOMPHANDLE** components,
                                                          uint32_t* count) {
     static std::vector<TELIX_JS_AVCOMPHANDLE> kept; // valid until the next call
-    return giveComponents(kept, player, type, true, components, count);
+    return giveComponents(kept, players().components(player, type, true), components, count);
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_AV_SelectComponent(TELIX_JS_AV_HANDLE player, TELIX_JS_AVCOMPHANDLE component,
@@ -191,48 +160,41 @@ TELIX_RETCODE_ENUM_T TELIX_JS_AV_UnselectComponent(TELIX_JS_AV_HANDLE player, TE
 
 TELIX_RETCODE_ENUM_T TELIX_JS_AV_AVComponent_GetEncoding(TELIX_JS_AVCOMPHANDLE component,
                                                          TELIX_JS_AVCOMPTYPE type, char** encoding) {
-    return ofComponent(component, type,
-                       [=](const Player::Stream& stream) { return giveText(encoding, stream.encoding); });
+    return giveTrait(players().findComponent(component, type), &ComponentTraits::encoding, encoding);
 }
 
-// What needs a key cannot be played, so nothing that has components does. Neither do files tell what their
-// sound is for.
 TELIX_RETCODE_ENUM_T TELIX_JS_AV_AVComponent_GetEncrypted(TELIX_JS_AVCOMPHANDLE component,
                                                           TELIX_JS_AVCOMPTYPE type, ___UINT8* encrypted) {
-    return giveNo(component, type, encrypted);
+    return giveTrait(players().findComponent(component, type), &ComponentTraits::isEncrypted, encrypted);
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_AV_AVComponent_GetAspectRatio(TELIX_JS_AVCOMPHANDLE component,
                                                             TELIX_JS_AVCOMPTYPE type, float* aspectRatio) {
-    return ofComponent(component, type, [=](const Player::Stream& stream) {
-        *aspectRatio = stream.aspectRatio;
-        return resultOf(stream.aspectRatio > 0);
-    });
+    return giveTrait(players().findComponent(component, type), &ComponentTraits::aspectRatio, aspectRatio);
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_AV_AVComponent_GetLanguage(TELIX_JS_AVCOMPHANDLE component,
                                                          TELIX_JS_AVCOMPTYPE type, char** language) {
-    return ofComponent(component, type,
-                       [=](const Player::Stream& stream) { return giveText(language, stream.language); });
+    return giveTrait(players().findComponent(component, type), &ComponentTraits::language, language);
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_AV_AVComponent_GetAudioDescription(TELIX_JS_AVCOMPHANDLE component,
                                                                  TELIX_JS_AVCOMPTYPE type,
                                                                  ___UINT8* audioDescription) {
-    return giveNo(component, type, audioDescription);
+    return giveTrait(players().findComponent(component, type), &ComponentTraits::isAudioDescription,
+                     audioDescription);
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_AV_AVComponent_GetAudioChannels(TELIX_JS_AVCOMPHANDLE component,
                                                               TELIX_JS_AVCOMPTYPE type,
                                                               uint32_t* audioChannels) {
-    return ofComponent(component, type, [=](const Player::Stream& stream) {
-        *audioChannels = stream.audioChannels;
-        return resultOf(stream.audioChannels > 0);
-    });
+    return giveTrait(players().findComponent(component, type), &ComponentTraits::audioChannels,
+                     audioChannels);
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_AV_AVComponent_GetHearingImpaired(TELIX_JS_AVCOMPHANDLE component,
                                                                 TELIX_JS_AVCOMPTYPE type,
                                                                 ___UINT8* hearingImpaired) {
-    return giveNo(component, type, hearingImpaired);
+    return giveTrait(players().findComponent(component, type), &ComponentTraits::isForHearingImpaired,
+                     hearingImpaired);
 }

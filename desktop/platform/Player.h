@@ -2,8 +2,8 @@
 #ifndef TELIX_DESKTOP_PLAYER_H
 #define TELIX_DESKTOP_PLAYER_H
 
+#include "desktop/platform/ComponentTraits.h"
 #include "desktop/platform/Picture.h"
-#include "telix/telix_platform.h"
 
 #include <array>
 #include <atomic>
@@ -22,13 +22,9 @@ constexpr uint32_t noBufferReport = 0xFFFFFFFF;
 class Player {
 public:
     // One video, audio or subtitle stream. Streams of a kind are numbered from 0.
-    struct Stream {
-        TELIX_JS_AVCOMPTYPE type = 0;
+    // What needs a key cannot be played, and files do not tell what their sound is for, so no flag is set.
+    struct Stream : ComponentTraits {
         int number = 0;
-        std::string encoding;       // empty where it has no name
-        std::string language;       // ISO code of three letters; empty if it is not known
-        uint32_t audioChannels = 0; // 0 if it is not known
-        float aspectRatio = 0;      // the same
     };
 
     // What is known of the media as soon as it could be presented.

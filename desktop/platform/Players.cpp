@@ -638,12 +638,12 @@ Players::components(TELIX_JS_AV_HANDLE player, TELIX_JS_AVCOMPTYPE type, bool ac
     return ofKindLocked(*entry, type, activeOnly);
 }
 
-std::optional<Player::Stream> Players::findComponent(TELIX_JS_AVCOMPHANDLE component,
-                                                     TELIX_JS_AVCOMPTYPE type) const {
+std::optional<ComponentTraits> Players::findComponent(TELIX_JS_AVCOMPHANDLE component,
+                                                      TELIX_JS_AVCOMPTYPE type) const {
     std::lock_guard<std::mutex> lock(m_platform.mutex());
     const bool isKnown =
         component != 0 && component <= m_components.size() && m_components[component - 1].stream.type == type;
-    return isKnown ? std::optional(m_components[component - 1].stream) : std::nullopt;
+    return isKnown ? std::optional<ComponentTraits>(m_components[component - 1].stream) : std::nullopt;
 }
 
 bool Players::select(TELIX_JS_AV_HANDLE player, TELIX_JS_AVCOMPHANDLE component, TELIX_JS_AVCOMPTYPE type,

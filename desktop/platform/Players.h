@@ -82,8 +82,8 @@ public:
     // All of one kind, or those that are presented. Nothing as long as the media is not known.
     std::optional<std::vector<TELIX_JS_AVCOMPHANDLE>>
     components(TELIX_JS_AV_HANDLE player, TELIX_JS_AVCOMPTYPE type, bool activeOnly) const;
-    std::optional<Player::Stream> findComponent(TELIX_JS_AVCOMPHANDLE component,
-                                                TELIX_JS_AVCOMPTYPE type) const;
+    std::optional<ComponentTraits> findComponent(TELIX_JS_AVCOMPHANDLE component,
+                                                 TELIX_JS_AVCOMPTYPE type) const;
     bool select(TELIX_JS_AV_HANDLE player, TELIX_JS_AVCOMPHANDLE component, TELIX_JS_AVCOMPTYPE type,
                 bool on);
 

@@ -3,14 +3,12 @@
 #include "desktop/platform/Multiplex.h"
 #include "desktop/platform/telix_picture.h"
 #include "telix/telix_platform.h"
+#include "tests/desktop/Received.h"
 
 #include <chrono>
-#include <condition_variable>
 #include <ctime>
 #include <future>
 #include <gtest/gtest.h>
-#include <set>
-#include <thread>
 
 using namespace desktop;
 using testing::Test;
@@ -25,46 +23,32 @@ struct Event {
     int64_t second = 0;
     std::string text;
 };
-
-std::mutex eventsMutex;
-std::condition_variable eventCame;
-std::vector<Event> events;
-std::set<std::thread::id> threads;
-
-TELIX_RETCODE_ENUM_T record(Event event) {
-    {
-        std::lock_guard<std::mutex> lock(eventsMutex);
-        events.push_back(std::move(event));
-        threads.insert(std::this_thread::get_id());
-    }
-    eventCame.notify_all();
-    return 0;
-}
+Received<Event> events;
 
 TELIX_RETCODE_ENUM_T onChange(TELIX_JS_VB_HANDLE object, TELIX_JS_CM_HANDLE channel) {
-    return record({"change", object, channel, 0, ""});
+    return events.add({"change", object, channel, 0, ""});
 }
 TELIX_RETCODE_ENUM_T onError(TELIX_JS_VB_HANDLE object, TELIX_JS_CM_HANDLE channel,
                              TELIX_ERR_STATE_ENUM_T error) {
-    return record({"error", object, channel, error, ""});
+    return events.add({"error", object, channel, error, ""});
 }
 TELIX_RETCODE_ENUM_T onState(TELIX_JS_VB_HANDLE object, uint32_t, TELIX_PLAYSTATE_ENUM_T state,
                              TELIX_ERR_STATE_ENUM_T error) {
-    return record({"state", object, state, error, ""});
+    return events.add({"state", object, state, error, ""});
 }
 TELIX_RETCODE_ENUM_T onProgrammes(TELIX_JS_VB_HANDLE object) {
-    return record({"programmes", object, 0, 0, ""});
+    return events.add({"programmes", object, 0, 0, ""});
 }
 TELIX_RETCODE_ENUM_T onRating(TELIX_JS_VB_HANDLE object, ___UINT8*, TELIX_JS_SI_PARENTALRATING_HANDLE rating,
                               ___UINT8*) {
-    return record({"rating", object, rating, 0, ""});
+    return events.add({"rating", object, rating, 0, ""});
 }
 TELIX_RETCODE_ENUM_T onStreamEvent(TELIX_JS_VB_HANDLE object, ___UINT8*, ___UINT8*, ___UINT8* name,
                                    ___UINT8* data, ___UINT32 length, ___UINT8* status) {
-    return record({"event", object, 0, 0,
-                   std::string(reinterpret_cast<char*>(name)) + "/" +
-                       std::string(reinterpret_cast<char*>(data), length) + "/" +
-                       reinterpret_cast<char*>(status)});
+    return events.add({"event", object, 0, 0,
+                       std::string(reinterpret_cast<char*>(name)) + "/" +
+                           std::string(reinterpret_cast<char*>(data), length) + "/" +
+                           reinterpret_cast<char*>(status)});
 }
 
 // The newest frame, copied.
@@ -107,23 +91,6 @@ double difference(const Shot& left, const Shot& right, double from, double to) {
     return static_cast<double>(count) / static_cast<double>(end - begin);
 }
 
-bool waitUntil(const std::function<bool()>& isSo, int seconds = 12) {
-    const auto end = std::chrono::steady_clock::now() + std::chrono::seconds(seconds);
-    while (!isSo()) {
-        if (std::chrono::steady_clock::now() > end) {
-            return false;
-        }
-        std::this_thread::sleep_for(std::chrono::milliseconds(10));
-    }
-    return true;
-}
-
-std::string textOf(char* text) {
-    std::string copy = text ? text : "";
-    std::free(text);
-    return copy;
-}
-
 class BroadcastTest : public Test {
 protected:
     void SetUp() override {
@@ -148,29 +115,25 @@ protected:
         TELIX_JS_VB_UnRegisterOnParentalRatingChange(onRating);
     }
 
-    static size_t countOf(const std::string& kind) {
-        std::lock_guard<std::mutex> lock(eventsMutex);
-        return static_cast<size_t>(std::count_if(events.begin(), events.end(),
-                                                 [&](const Event& each) { return each.kind == kind; }));
+    static std::vector<Event> ofKind(const std::string& kind) {
+        std::vector<Event> found;
+        for (const Event& each : events.all()) {
+            if (each.kind == kind) {
+                found.push_back(each);
+            }
+        }
+        return found;
     }
+
+    static size_t countOf(const std::string& kind) { return ofKind(kind).size(); }
 
     // Waits for the event number `index` of a kind, from 0.
     static Event waitFor(const std::string& kind, size_t index = 0) {
-        std::unique_lock<std::mutex> lock(eventsMutex);
-        Event found;
-        const auto isThere = [&] {
-            size_t seen = 0;
-            for (const Event& each : events) {
-                if (each.kind == kind && seen++ == index) {
-                    found = each;
-                    return true;
-                }
-            }
-            return false;
-        };
-        EXPECT_TRUE(eventCame.wait_for(lock, std::chrono::seconds(12), isThere))
-            << "no " << kind << " " << index;
-        return found;
+        if (!waitUntil([&] { return countOf(kind) > index; })) {
+            ADD_FAILURE() << "no " << kind << " " << index;
+            return {};
+        }
+        return ofKind(kind)[index];
     }
 
     void tune(TELIX_JS_CM_HANDLE channel) {
@@ -207,9 +170,7 @@ TEST_F(BroadcastTest, ShowsADifferentMovingPictureOnEachOfItsChannels) {
     EXPECT_GT(difference(shots[0], shots[1], 0, 1), 0.2);
     EXPECT_GT(difference(shots[1], shots[2], 0, 1), 0.2);
     EXPECT_GT(difference(shots[0], shots[2], 0, 1), 0.2);
-    std::lock_guard<std::mutex> lock(eventsMutex);
-    EXPECT_EQ(threads.size(), 1U);
-    EXPECT_EQ(threads.count(std::this_thread::get_id()), 0U);
+    EXPECT_TRUE(events.cameOnOneOtherThread());
 }
 
 TEST_F(BroadcastTest, ListsItsChannelsWithIdsNamesAndDescriptor) {
@@ -505,20 +466,12 @@ TEST_F(BroadcastTest, AnswersFiftyQuickTunesAndShowsTheLast) {
             std::this_thread::sleep_for(std::chrono::milliseconds(100)); // some get as far as a pipeline
         }
     }
-    EXPECT_TRUE(waitUntil([&] { return countOf("change") + countOf("error") == tunes; }, 20));
-    {
-        std::lock_guard<std::mutex> lock(eventsMutex);
-        std::vector<int64_t> changes;
-        for (const Event& each : events) {
-            if (each.kind == "change") {
-                changes.push_back(each.first);
-            } else if (each.kind == "error") {
-                EXPECT_EQ(each.second, errorInterrupted);
-            }
-        }
-        ASSERT_FALSE(changes.empty());
-        EXPECT_EQ(changes.back(), m_channels[(tunes - 1) % m_channels.size()]);
+    EXPECT_TRUE(waitUntil([&] { return countOf("change") + countOf("error") == tunes; }));
+    for (const Event& error : ofKind("error")) {
+        EXPECT_EQ(error.second, errorInterrupted);
     }
+    ASSERT_GT(countOf("change"), 0U);
+    EXPECT_EQ(ofKind("change").back().first, m_channels[(tunes - 1) % m_channels.size()]);
     EXPECT_TRUE(takeShot().visible);
 }
 

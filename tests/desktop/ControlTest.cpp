@@ -4,8 +4,8 @@
 #include "desktop/platform/ControlSocket.h"
 #include "desktop/platform/Device.h"
 #include "telix/telix_platform.h"
+#include "tests/desktop/Received.h"
 
-#include <condition_variable>
 #include <csignal>
 #include <cstdlib>
 #include <fcntl.h>
@@ -17,7 +17,6 @@
 #include <sys/stat.h>
 #include <sys/syscall.h>
 #include <sys/wait.h>
-#include <thread>
 #include <unistd.h>
 
 using namespace desktop;
@@ -27,31 +26,20 @@ using testing::Test;
 namespace {
 
 // What the callbacks were given, as texts.
-std::mutex eventsMutex;
-std::condition_variable eventCame;
-std::vector<std::string> events;
+Received<std::string> events;
 
-TELIX_RETCODE_ENUM_T record(const std::string& event) {
-    {
-        std::lock_guard<std::mutex> lock(eventsMutex);
-        events.push_back(event);
-    }
-    eventCame.notify_all();
-    return 0;
-}
-
-std::string textOf(const ___UINT8* text) {
+std::string given(const ___UINT8* text) {
     return text ? reinterpret_cast<const char*>(text) : "null";
 }
 
 TELIX_RETCODE_ENUM_T onChange(TELIX_JS_VB_HANDLE, TELIX_JS_CM_HANDLE channel) {
-    return record("change " + std::to_string(channel));
+    return events.add("change " + std::to_string(channel));
 }
 TELIX_RETCODE_ENUM_T onError(TELIX_JS_VB_HANDLE, TELIX_JS_CM_HANDLE channel, TELIX_ERR_STATE_ENUM_T error) {
-    return record("error " + std::to_string(channel) + " " + std::to_string(error));
+    return events.add("error " + std::to_string(channel) + " " + std::to_string(error));
 }
 TELIX_RETCODE_ENUM_T onFullScreen(TELIX_JS_VB_HANDLE) {
-    return record("full screen");
+    return events.add("full screen");
 }
 TELIX_RETCODE_ENUM_T onRating(TELIX_JS_VB_HANDLE, ___UINT8*, TELIX_JS_SI_PARENTALRATING_HANDLE rating,
                               ___UINT8*) {
@@ -59,41 +47,29 @@ TELIX_RETCODE_ENUM_T onRating(TELIX_JS_VB_HANDLE, ___UINT8*, TELIX_JS_SI_PARENTA
     char* region = nullptr;
     TELIX_JS_SI_PARENTALRATING_GetValue(rating, &value);
     TELIX_JS_SI_PARENTALRATING_GetRegion(rating, &region);
-    const std::string text = region ? region : "none";
-    std::free(region);
-    return record("rating " + std::to_string(value) + " " + text);
+    return events.add("rating " + std::to_string(value) + " " + (region ? textOf(region) : "none"));
 }
 TELIX_RETCODE_ENUM_T onRatingError(TELIX_JS_VB_HANDLE, ___UINT8* contentId, TELIX_JS_SI_PARENTALRATING_HANDLE,
                                    ___UINT8* drmSystemId) {
-    return record("rating error " + textOf(contentId) + " " + textOf(drmSystemId));
+    return events.add("rating error " + given(contentId) + " " + given(drmSystemId));
 }
 TELIX_RETCODE_ENUM_T onStreamEvent(TELIX_JS_VB_HANDLE, ___UINT8*, ___UINT8*, ___UINT8* name, ___UINT8* data,
                                    ___UINT32 length, ___UINT8* status) {
-    return record("event " + textOf(name) + " " + std::string(reinterpret_cast<char*>(data), length) + " " +
-                  textOf(status));
+    return events.add("event " + given(name) + " " + std::string(reinterpret_cast<char*>(data), length) +
+                      " " + given(status));
 }
 TELIX_RETCODE_ENUM_T onLowMemory() {
-    return record("low memory");
+    return events.add("low memory");
 }
 TELIX_RETCODE_ENUM_T onDrmResult(___UINT8* id, ___UINT8* message, TELIX_DRM_RESULT_CODE_ENUM_T result) {
-    return record("drm " + textOf(id) + " " + textOf(message) + " " + std::to_string(result));
+    return events.add("drm " + given(id) + " " + given(message) + " " + std::to_string(result));
 }
 
 bool waitForEvent(const std::string& event) {
-    std::unique_lock<std::mutex> lock(eventsMutex);
-    return eventCame.wait_for(lock, std::chrono::seconds(12),
-                              [&] { return std::find(events.begin(), events.end(), event) != events.end(); });
-}
-
-bool waitUntil(const std::function<bool()>& isSo) {
-    const auto end = std::chrono::steady_clock::now() + std::chrono::seconds(12);
-    while (!isSo()) {
-        if (std::chrono::steady_clock::now() > end) {
-            return false;
-        }
-        std::this_thread::sleep_for(std::chrono::milliseconds(10));
-    }
-    return true;
+    return waitUntil([&] {
+        const std::vector<std::string> all = events.all();
+        return std::find(all.begin(), all.end(), event) != all.end();
+    });
 }
 
 // One connection to the television of this process.
@@ -292,10 +268,7 @@ TEST_F(ControlTest, ProvokesWhatBroadcastAndTheViewerMayDo) {
     EXPECT_EQ(client.ask(R"({"command":"channel-error","error":2})"), done);
     EXPECT_TRUE(waitForEvent("error 1 2"));
     for (int time = 0; time < 2; ++time) { // the same rating comes again
-        {
-            std::lock_guard<std::mutex> lock(eventsMutex);
-            events.clear();
-        }
+        events.clear();
         EXPECT_EQ(client.ask(R"({"command":"rating","age":7,"region":"FRA"})"), done);
         EXPECT_TRUE(waitForEvent("rating 7 FRA"));
     }

@@ -1,11 +1,11 @@
 // The set itself through the calls of the plug-in: settings, keys, memory, capabilities, rating schemes, DRM.
 #include "desktop/platform/Device.h"
+#include "tests/desktop/Received.h"
 
-#include <condition_variable>
+#include <atomic>
 #include <cstdlib>
 #include <gtest/gtest.h>
 #include <set>
-#include <thread>
 
 using namespace desktop;
 using testing::Test;
@@ -16,49 +16,25 @@ struct Answer {
     std::string id;
     std::string message;
     int32_t result;
-    std::thread::id thread;
 };
 
-std::mutex answersMutex;
-std::condition_variable answerCame;
-std::vector<Answer> answers;
-int lowMemoryCalls = 0;
+Received<Answer> answers;
 
 TELIX_RETCODE_ENUM_T onAnswer(___UINT8* id, ___UINT8* message, TELIX_DRM_RESULT_CODE_ENUM_T result) {
-    {
-        std::lock_guard<std::mutex> lock(answersMutex);
-        answers.push_back({reinterpret_cast<char*>(id), reinterpret_cast<char*>(message), result,
-                           std::this_thread::get_id()});
-    }
-    answerCame.notify_all();
-    return 0;
+    return answers.add({reinterpret_cast<char*>(id), reinterpret_cast<char*>(message), result});
 }
+
+std::atomic<int> lowMemoryCalls{0};
 
 TELIX_RETCODE_ENUM_T onLowMemory() {
-    {
-        std::lock_guard<std::mutex> lock(answersMutex);
-        ++lowMemoryCalls;
-    }
-    answerCame.notify_all();
+    ++lowMemoryCalls;
     return 0;
-}
-
-template <typename Condition>
-bool waitFor(Condition isSo) {
-    std::unique_lock<std::mutex> lock(answersMutex);
-    return answerCame.wait_for(lock, std::chrono::seconds(10), isSo);
-}
-
-std::string taken(char* text) {
-    std::string copy = text ? text : "";
-    std::free(text);
-    return copy;
 }
 
 std::string send(const std::string& system) {
     char* id = nullptr;
     EXPECT_EQ(TELIX_JS_DRM_SendDRMMessage("application/x-any", "<any/>", system.c_str(), &id), 0);
-    return taken(id);
+    return textOf(id);
 }
 
 bool has(const char* profile) {
@@ -73,14 +49,14 @@ TEST(DeviceTest, GivesTheViewersChoiceInAFreshTextAtEachCall) {
     ASSERT_EQ(TELIX_JS_APP_Config_GetPreferredAudioLanguage(&first), 0);
     ASSERT_EQ(TELIX_JS_APP_Config_GetPreferredAudioLanguage(&second), 0);
     EXPECT_NE(first, second);
-    EXPECT_EQ(taken(first), "deu");
-    EXPECT_EQ(taken(second), "deu");
+    EXPECT_EQ(textOf(first), "deu");
+    EXPECT_EQ(textOf(second), "deu");
     char* subtitle = nullptr;
     ASSERT_EQ(TELIX_JS_APP_Config_GetPreferredSubtitleLanguage(&subtitle), 0);
-    EXPECT_EQ(taken(subtitle), "deu");
+    EXPECT_EQ(textOf(subtitle), "deu");
     char* country = nullptr;
     ASSERT_EQ(TELIX_JS_APP_Config_GetCountryId(&country), 0);
-    EXPECT_EQ(taken(country), "DEU");
+    EXPECT_EQ(textOf(country), "DEU");
 }
 
 TEST(DeviceTest, GrantsOnlyTheKeysThatTheRemoteControlHas) {
@@ -104,7 +80,7 @@ TEST(DeviceTest, TellsOfFreeMemoryAndOfItsShortage) {
     EXPECT_FALSE(device.injectLowMemory()); // nobody asked
     TELIX_JS_APP_RegisterLowMemory(onLowMemory);
     EXPECT_TRUE(device.injectLowMemory());
-    EXPECT_TRUE(waitFor([] { return lowMemoryCalls == 1; }));
+    EXPECT_TRUE(waitUntil([] { return lowMemoryCalls == 1; }));
     TELIX_JS_APP_UnRegisterLowMemory(onLowMemory);
     EXPECT_FALSE(device.injectLowMemory());
     device.setFreeMemory(99);
@@ -115,7 +91,7 @@ TEST(DeviceTest, TellsOfFreeMemoryAndOfItsShortage) {
 TEST(DeviceTest, DescribesItselfInAProfileList) {
     char* xml = nullptr;
     ASSERT_EQ(TELIX_JS_CAP_GetXmlCapabilities(&xml), 0);
-    const std::string document = taken(xml);
+    const std::string document = textOf(xml);
     EXPECT_NE(document.find("<profilelist xmlns=\"urn:hbbtv:config:oitf:oitfCapabilities:2011-1\">"),
               std::string::npos);
     EXPECT_NE(document.find("<parentalcontrol schemes=\"dvb-si films\">true</parentalcontrol>"),
@@ -198,16 +174,17 @@ TEST(DeviceTest, AnswersDrmMessagesAsConfiguredUnderTheirIdsInTheirOrder) {
     const std::string second = send("urn:dvb:casystemid:2");
     const std::string third = send("urn:dvb:casystemid:3");
     EXPECT_EQ((std::set<std::string>{first, second, third, ""}).size(), 4U);
-    ASSERT_TRUE(waitFor([] { return answers.size() == 3; }));
-    EXPECT_EQ(answers[0].id, first);
-    EXPECT_EQ(answers[0].message, "granted");
-    EXPECT_EQ(answers[0].result, 0);
-    EXPECT_EQ(answers[1].id, second);
-    EXPECT_EQ(answers[1].message, "ask the viewer: \"may it?\"");
-    EXPECT_EQ(answers[1].result, 4);
-    EXPECT_EQ(answers[2].id, third);
-    EXPECT_EQ(answers[2].result, drmUnknownSystem);
-    EXPECT_NE(answers[0].thread, std::this_thread::get_id());
+    ASSERT_TRUE(waitUntil([] { return answers.all().size() == 3; }));
+    const std::vector<Answer> all = answers.all();
+    EXPECT_EQ(all[0].id, first);
+    EXPECT_EQ(all[0].message, "granted");
+    EXPECT_EQ(all[0].result, 0);
+    EXPECT_EQ(all[1].id, second);
+    EXPECT_EQ(all[1].message, "ask the viewer: \"may it?\"");
+    EXPECT_EQ(all[1].result, 4);
+    EXPECT_EQ(all[2].id, third);
+    EXPECT_EQ(all[2].result, drmUnknownSystem);
+    EXPECT_TRUE(answers.cameOnOneOtherThread());
     EXPECT_EQ(Device::instance().lastDrmMessage(), third);
     TELIX_JS_DRM_UnregisterOnDRMMessageResult(onAnswer);
 }
@@ -217,21 +194,15 @@ TEST(DeviceTest, AnswersOnceAsLongAsOneOfSeveralAgentsIsLeft) {
     TELIX_JS_DRM_RegisterOnDRMMessageResult(onAnswer);
     TELIX_JS_DRM_UnregisterOnDRMMessageResult(onAnswer);
     send("urn:dvb:casystemid:1");
-    ASSERT_TRUE(waitFor([] { return !answers.empty(); }));
+    ASSERT_TRUE(waitUntil([] { return !answers.all().empty(); }));
     TELIX_JS_DRM_UnregisterOnDRMMessageResult(onAnswer);
     send("urn:dvb:casystemid:1");
     EXPECT_FALSE(Device::instance().injectDrmResult("any", "text", 0));
     // The answer would come before anything that is posted behind it.
-    bool isPast = false;
-    Platform::instance().post([&] {
-        {
-            std::lock_guard<std::mutex> lock(answersMutex);
-            isPast = true;
-        }
-        answerCame.notify_all();
-    });
-    ASSERT_TRUE(waitFor([&] { return isPast; }));
-    EXPECT_EQ(answers.size(), 1U);
+    std::atomic<bool> isPast{false};
+    Platform::instance().post([&] { isPast = true; });
+    ASSERT_TRUE(waitUntil([&] { return isPast.load(); }));
+    EXPECT_EQ(answers.all().size(), 1U);
     TELIX_JS_DRM_UnregisterOnDRMMessageResult(onAnswer); // one too many does no harm
 }
 

@@ -3,10 +3,10 @@
 #include "desktop/platform/Broadcast.h"
 #include "desktop/platform/Multiplex.h"
 #include "telix/telix_platform.h"
+#include "tests/desktop/Received.h"
 
 #include <algorithm>
 #include <chrono>
-#include <condition_variable>
 #include <cstdlib>
 #include <gtest/gtest.h>
 #include <thread>
@@ -16,23 +16,14 @@ using namespace desktop;
 
 namespace {
 
-std::mutex outcomeMutex;
-std::condition_variable outcomeCame;
-std::vector<std::pair<TELIX_JS_CM_HANDLE, TELIX_ERR_STATE_ENUM_T>> outcomes;
+// Channels that were tuned to, each with what came of it.
+Received<std::pair<TELIX_JS_CM_HANDLE, TELIX_ERR_STATE_ENUM_T>> outcomes;
 
-TELIX_RETCODE_ENUM_T add(TELIX_JS_CM_HANDLE channel, TELIX_ERR_STATE_ENUM_T error) {
-    {
-        std::lock_guard<std::mutex> lock(outcomeMutex);
-        outcomes.emplace_back(channel, error);
-    }
-    outcomeCame.notify_all();
-    return 0;
-}
 TELIX_RETCODE_ENUM_T onChange(TELIX_JS_VB_HANDLE, TELIX_JS_CM_HANDLE channel) {
-    return add(channel, TELIX_ERR_STATE_NONE);
+    return outcomes.add({channel, TELIX_ERR_STATE_NONE});
 }
 TELIX_RETCODE_ENUM_T onError(TELIX_JS_VB_HANDLE, TELIX_JS_CM_HANDLE channel, TELIX_ERR_STATE_ENUM_T error) {
-    return add(channel, error);
+    return outcomes.add({channel, error});
 }
 
 // A set with a line-up of its own.
@@ -58,15 +49,14 @@ protected:
 
     // Tunes and gives what came of it.
     TELIX_ERR_STATE_ENUM_T tune(TELIX_JS_CM_HANDLE channel) {
-        std::unique_lock<std::mutex> lock(outcomeMutex);
-        const size_t before = outcomes.size();
+        const size_t before = outcomes.all().size();
         EXPECT_EQ(TELIX_JS_VB_SetChannel(m_object, channel, 0), 0);
-        if (!outcomeCame.wait_for(lock, std::chrono::seconds(12), [&] { return outcomes.size() > before; })) {
+        if (!waitUntil([&] { return outcomes.all().size() > before; })) {
             ADD_FAILURE() << "no outcome";
             return -1;
         }
-        EXPECT_EQ(outcomes[before].first, channel);
-        return outcomes[before].second;
+        EXPECT_EQ(outcomes.all()[before].first, channel);
+        return outcomes.all()[before].second;
     }
 
     TELIX_JS_VB_HANDLE m_object = 0;

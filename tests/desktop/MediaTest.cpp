@@ -2,18 +2,16 @@
 #include "desktop/platform/Players.h"
 #include "desktop/platform/telix_picture.h"
 #include "telix/telix_platform.h"
+#include "tests/desktop/Received.h"
 
 #include <chrono>
-#include <condition_variable>
 #include <csignal>
 #include <cstdlib>
 #include <future>
 #include <gtest/gtest.h>
 #include <netinet/in.h>
-#include <set>
 #include <sys/socket.h>
 #include <sys/wait.h>
-#include <thread>
 #include <unistd.h>
 
 using namespace desktop;
@@ -30,47 +28,22 @@ struct Message {
     TELIX_AV_CB_MSG message = 0;
     std::string text; // of a rights error
 };
-
-std::mutex messagesMutex;
-std::condition_variable messageCame;
-std::vector<Message> messages;
-std::set<std::thread::id> threads;
-
-TELIX_RETCODE_ENUM_T record(Message message) {
-    {
-        std::lock_guard<std::mutex> lock(messagesMutex);
-        messages.push_back(std::move(message));
-        threads.insert(std::this_thread::get_id());
-    }
-    messageCame.notify_all();
-    return 0;
-}
+Received<Message> messages;
 
 TELIX_RETCODE_ENUM_T onMessage(TELIX_JS_AV_HANDLE player, TELIX_AV_CB_MSG message) {
-    return record({player, message, ""});
+    return messages.add({player, message, ""});
 }
 
 TELIX_RETCODE_ENUM_T onRights(TELIX_JS_AV_HANDLE player, TELIX_AV_DRM_ERR_STATE_ENUM_T state,
                               ___UINT8* contentId, ___UINT8* drmSystemId, ___UINT8* rightsIssuerUrl) {
     const auto text = [](___UINT8* bytes) { return std::string(reinterpret_cast<char*>(bytes)); };
-    return record({player, 0,
-                   std::to_string(state) + "/" + text(contentId) + "/" + text(drmSystemId) + "/" +
-                       text(rightsIssuerUrl)});
+    return messages.add({player, 0,
+                         std::to_string(state) + "/" + text(contentId) + "/" + text(drmSystemId) + "/" +
+                             text(rightsIssuerUrl)});
 }
 
 TELIX_RETCODE_ENUM_T onChannelChange(TELIX_JS_VB_HANDLE object, TELIX_JS_CM_HANDLE) {
-    return record({object, 0, "channel"});
-}
-
-bool waitUntil(const std::function<bool()>& isSo, int seconds = 30) {
-    const auto end = std::chrono::steady_clock::now() + std::chrono::seconds(seconds);
-    while (!isSo()) {
-        if (std::chrono::steady_clock::now() > end) {
-            return false;
-        }
-        std::this_thread::sleep_for(std::chrono::milliseconds(10));
-    }
-    return true;
+    return messages.add({object, 0, "channel"});
 }
 
 double secondsSince(std::chrono::steady_clock::time_point begin) {
@@ -196,19 +169,10 @@ std::optional<Player::Sound> sound() {
     return result.get_future().get();
 }
 
-std::string textOf(char* text) {
-    std::string copy = text ? text : "";
-    std::free(text);
-    return copy;
-}
-
 class MediaTest : public Test {
 protected:
     void SetUp() override {
-        {
-            std::lock_guard<std::mutex> lock(messagesMutex);
-            messages.clear();
-        }
+        messages.clear();
         m_player = newPlayer();
     }
 
@@ -218,9 +182,7 @@ protected:
             TELIX_JS_AV_DestroyPlayer(player);
             TELIX_JS_AV_UnregisterOnPlayStateChange(onMessage);
         }
-        std::lock_guard<std::mutex> lock(messagesMutex);
-        EXPECT_LE(threads.size(), 1U) << "messages come from several threads";
-        EXPECT_EQ(threads.count(std::this_thread::get_id()), 0U);
+        EXPECT_TRUE(messages.cameOnOneOtherThread());
     }
 
     TELIX_JS_AV_HANDLE newPlayer() {
@@ -242,9 +204,8 @@ protected:
 
     // All messages of all players so far.
     static std::vector<TELIX_AV_CB_MSG> seen() {
-        std::lock_guard<std::mutex> lock(messagesMutex);
         std::vector<TELIX_AV_CB_MSG> values;
-        for (const Message& each : messages) {
+        for (const Message& each : messages.all()) {
             values.push_back(each.message);
         }
         return values;
@@ -776,7 +737,7 @@ TEST_F(MediaTest, TakesThePipelineFromAnotherPlayer) {
     play(file("clip.mp4"));
     ASSERT_EQ(start(other, file("second.mp4")), 0);
     expectMessages({playStart, playStart}); // and nothing of the first: it would be taken for the second's
-    EXPECT_EQ(messages.back().player, other);
+    EXPECT_EQ(messages.all().back().player, other);
     EXPECT_TRUE(waitUntil([] { return showsSecondClip(takeShot()); }));
     EXPECT_EQ(stateOf(m_player).state, "stopped");
     EXPECT_NE(TELIX_JS_AV_Pause(m_player), 0);
@@ -793,11 +754,10 @@ TEST_F(MediaTest, TakesThePictureFromBroadcastAndLosesItToATune) {
     TELIX_JS_VB_HANDLE object = 0;
     ASSERT_EQ(TELIX_JS_VB_GetHandle(&object), 0);
     TELIX_JS_VB_RegisterOnChannelChangeSucceeded(onChannelChange);
-    const auto isTuned = [&](size_t times) {
-        std::lock_guard<std::mutex> lock(messagesMutex);
-        return static_cast<size_t>(std::count_if(messages.begin(), messages.end(), [](const Message& each) {
-                   return each.text == "channel";
-               })) == times;
+    const auto isTuned = [&](long times) {
+        const std::vector<Message> all = messages.all();
+        return std::count_if(all.begin(), all.end(),
+                             [](const Message& each) { return each.text == "channel"; }) == times;
     };
     ASSERT_EQ(TELIX_JS_VB_BindToCurrChannel(object), 0);
     ASSERT_TRUE(waitUntil([&] { return isTuned(1); }));
@@ -904,8 +864,8 @@ TEST_F(MediaTest, GivesOnWhatIsProvoked) {
     expectMessages({playStart, TELIX_AV_CB_MSG_ERR_NET_BUSY});
     EXPECT_TRUE(players.injectRightsError(2, "content", "system", "issuer"));
     expectMessages({playStart, TELIX_AV_CB_MSG_ERR_NET_BUSY, 0});
-    EXPECT_EQ(messages.back().text, "2/content/system/issuer");
-    EXPECT_EQ(messages.back().player, m_player);
+    EXPECT_EQ(messages.all().back().text, "2/content/system/issuer");
+    EXPECT_EQ(messages.all().back().player, m_player);
     EXPECT_TRUE(players.injectBuffered(0xFF000003));
     EXPECT_EQ(info().buffered, 0xFF000003U);
     EXPECT_TRUE(players.injectBuffered(std::nullopt));
