@@ -17,33 +17,20 @@ struct Held {
     GstVideoFrame frame;
 };
 
-// What a sink needs to know, for as long as its callbacks may run.
-struct Target {
-    Picture& picture;
-    Picture::Token token;
-};
-
 void giveBack(GstSample* sample) {
     if (sample) {
         gst_sample_unref(sample);
     }
 }
 
-GstFlowReturn showSample(GstAppSink* sink, GstSample* sample, gpointer data) {
-    (void)sink;
-    const auto* target = static_cast<Target*>(data);
-    if (sample) {
-        // One of our own: the sink uses its sample again, and could not change one that somebody holds.
-        GstSample* own = gst_sample_new(gst_sample_get_buffer(sample), gst_sample_get_caps(sample),
-                                        gst_sample_get_segment(sample), nullptr);
-        gst_sample_unref(sample);
-        target->picture.show(target->token, own);
-        gst_sample_unref(own);
-    }
-    return GST_FLOW_OK;
-}
-
 } // namespace
+
+// What a sink needs to know, for as long as its callbacks may run.
+struct Picture::Target {
+    Picture& picture;
+    Token token;
+    uint64_t sink;
+};
 
 Picture::Token Picture::take(const View& view, std::function<void()> lost, std::function<void()> shown) {
     std::function<void()> formerLost;
@@ -117,12 +104,25 @@ void Picture::hide(Token token, bool isHidden) {
     wake();
 }
 
-void Picture::show(Token token, GstSample* sample) {
+// Takes the sample over.
+GstFlowReturn Picture::showSample(const Target& target, GstSample* sample) {
+    if (sample) {
+        // One of our own: the sink uses its sample again, and could not change one that somebody holds.
+        GstSample* own = gst_sample_new(gst_sample_get_buffer(sample), gst_sample_get_caps(sample),
+                                        gst_sample_get_segment(sample), nullptr);
+        gst_sample_unref(sample);
+        target.picture.show(target, own);
+        gst_sample_unref(own);
+    }
+    return GST_FLOW_OK;
+}
+
+void Picture::show(const Target& target, GstSample* sample) {
     std::function<void()> shown;
     GstSample* formerSample = nullptr;
     {
         std::lock_guard<std::mutex> lock(m_mutex);
-        if (token == 0 || token != m_current) {
+        if (target.token == 0 || target.token != m_current || target.sink != m_lastSink) {
             return;
         }
         formerSample = std::exchange(m_sample, gst_sample_ref(sample)); // kept until the next one
@@ -145,17 +145,28 @@ GstElement* Picture::makeSink(Token token) {
     if (!bin) {
         return nullptr;
     }
+    GstSample* formerSample = nullptr;
+    uint64_t number = 0;
+    {
+        std::lock_guard<std::mutex> lock(m_mutex);
+        number = ++m_lastSink;
+        if (token != 0 && token == m_current) {
+            formerSample = std::exchange(m_sample, nullptr);
+        }
+    }
+    giveBack(formerSample);
+    wake();
     GstElement* sink = gst_bin_get_by_name(GST_BIN(bin), "picture");
     GstAppSinkCallbacks callbacks{};
-    callbacks.new_sample = [](GstAppSink* appSink, gpointer data) {
-        return showSample(appSink, gst_app_sink_try_pull_sample(appSink, 0), data);
+    callbacks.new_sample = [](GstAppSink* appSink, gpointer target) {
+        return showSample(*static_cast<Target*>(target), gst_app_sink_try_pull_sample(appSink, 0));
     };
     // The first frame is shown while the pipeline still waits to begin.
-    callbacks.new_preroll = [](GstAppSink* appSink, gpointer data) {
-        return showSample(appSink, gst_app_sink_try_pull_preroll(appSink, 0), data);
+    callbacks.new_preroll = [](GstAppSink* appSink, gpointer target) {
+        return showSample(*static_cast<Target*>(target), gst_app_sink_try_pull_preroll(appSink, 0));
     };
-    gst_app_sink_set_callbacks(GST_APP_SINK(sink), &callbacks, new Target{*this, token},
-                               [](gpointer data) { delete static_cast<Target*>(data); });
+    gst_app_sink_set_callbacks(GST_APP_SINK(sink), &callbacks, new Target{*this, token, number},
+                               [](gpointer target) { delete static_cast<Target*>(target); });
     gst_object_unref(sink); // the bin keeps it
     return bin;
 }

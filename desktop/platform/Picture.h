@@ -38,17 +38,14 @@ public:
     // Places the picture. Any thread.
     void place(Token token, const View& view);
 
-    // Removes the frame, as between two channels. Any thread.
+    // Removes the frame. Any thread.
     void blank(Token token);
 
     // Takes the picture from sight, or gives it back: what is shown meanwhile is there then. Any thread.
     void hide(Token token, bool isHidden);
 
-    // Shows a sample of BGRx video, of which a reference is kept. GStreamer's threads.
-    void show(Token token, GstSample* sample);
-
-    // A sink for pipelines: takes raw video of any format and shows it as `token`. The reference is floating;
-    // null if an element is missing.
+    // A sink for pipelines: takes raw video of any format and shows it as `token`, in the place of the sink
+    // made before. Until then there is no frame. The reference is floating; null if an element is missing.
     GstElement* makeSink(Token token);
 
     // The exported functions.
@@ -56,11 +53,16 @@ public:
     void acquire(telix_desktop_frame& frame);
 
 private:
+    struct Target;
+
+    static GstFlowReturn showSample(const Target& target, GstSample* sample);
+    void show(const Target& target, GstSample* sample);
     void wake();
 
     std::mutex m_mutex;
     Token m_last = 0;
     Token m_current = 0;
+    uint64_t m_lastSink = 0; // by number
     View m_view;
     bool m_isHidden = false;
     GstSample* m_sample = nullptr; // one reference

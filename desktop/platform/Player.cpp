@@ -185,9 +185,67 @@ bool isDriedUp(GstMessage* message, const GError& error) {
            GST_OBJECT_FLAG_IS_SET(GST_MESSAGE_SRC(message), GST_ELEMENT_FLAG_SOURCE);
 }
 
+bool isHttpAnswer(GstMessage* message) {
+    return GST_MESSAGE_TYPE(message) == GST_MESSAGE_ELEMENT && gst_message_has_name(message, "http-headers");
+}
+
 bool hasProperty(GstElement* element, const char* name) {
     return g_object_class_find_property(G_OBJECT_GET_CLASS(element), name) != nullptr;
 }
+
+void end(GstElement* pipeline) {
+    GstBus* bus = gst_element_get_bus(pipeline);
+    gst_bus_remove_watch(bus);
+    gst_bus_set_flushing(bus, TRUE);
+    gst_object_unref(bus);
+    gst_element_set_state(pipeline, GST_STATE_NULL);
+    gst_object_unref(pipeline);
+}
+
+// A pipeline without its player, until the server has answered: the source crashes now and then if it is told
+// to give a request up at the moment of the answer.
+class Farewell {
+public:
+    // Takes the pipeline over. It deletes itself.
+    explicit Farewell(GstElement* pipeline)
+        : m_pipeline(pipeline), m_limit(g_timeout_source_new_seconds(2 * networkSilence)) {
+        GstBus* bus = gst_element_get_bus(pipeline);
+        gst_bus_remove_watch(bus);
+        gst_bus_add_watch(bus, onMessage, this);
+        gst_object_unref(bus);
+        g_source_set_callback(m_limit, onLimit, this, nullptr);
+        g_source_attach(m_limit, g_main_context_get_thread_default());
+        gst_element_set_state(pipeline, GST_STATE_PAUSED);
+    }
+    Farewell(const Farewell&) = delete;
+    Farewell& operator=(const Farewell&) = delete;
+
+private:
+    ~Farewell() {
+        g_source_destroy(m_limit);
+        g_source_unref(m_limit);
+        end(m_pipeline);
+    }
+
+    static gboolean onMessage(GstBus* bus, GstMessage* message, gpointer farewell) {
+        (void)bus;
+        const GstMessageType type = GST_MESSAGE_TYPE(message);
+        if (isHttpAnswer(message) || type == GST_MESSAGE_ERROR || type == GST_MESSAGE_ASYNC_DONE ||
+            type == GST_MESSAGE_EOS) {
+            delete static_cast<Farewell*>(farewell);
+            return G_SOURCE_REMOVE;
+        }
+        return G_SOURCE_CONTINUE;
+    }
+
+    static gboolean onLimit(gpointer farewell) {
+        delete static_cast<Farewell*>(farewell);
+        return G_SOURCE_REMOVE;
+    }
+
+    GstElement* m_pipeline;
+    GSource* m_limit;
+};
 
 } // namespace
 
@@ -211,6 +269,7 @@ bool Player::start(Picture& picture, Picture::Token token, const Setup& setup, s
     }
     const gchar* scheme = g_uri_peek_scheme(setup.url.c_str());
     m_isNetwork = scheme && std::strcmp(scheme, "file") != 0;
+    m_isHttp = scheme && g_str_has_prefix(scheme, "http");
     m_isPaused = setup.isPaused;
     m_goal = setup.position;
     if (setup.speed != 1) {
@@ -220,8 +279,11 @@ bool Player::start(Picture& picture, Picture::Token token, const Setup& setup, s
     gst_util_set_object_arg(G_OBJECT(m_pipeline), "flags", playFlags);
     g_object_set(m_pipeline, "uri", setup.url.c_str(), "video-sink", pictureSink, "audio-sink", audioSink,
                  "buffer-duration", bufferAhead, nullptr);
-    g_signal_connect(m_pipeline, "source-setup", G_CALLBACK(onSource), this);
-    g_signal_connect(m_pipeline, "element-setup", G_CALLBACK(onElement), this);
+    const auto release = [](gpointer shared, GClosure*) { delete static_cast<SharedPointer*>(shared); };
+    g_signal_connect_data(m_pipeline, "source-setup", G_CALLBACK(onSource), new SharedPointer(m_shared),
+                          release, {});
+    g_signal_connect_data(m_pipeline, "element-setup", G_CALLBACK(onElement), new SharedPointer(m_shared),
+                          release, {});
     applySound();
 
     GstBus* bus = gst_element_get_bus(m_pipeline);
@@ -237,19 +299,20 @@ bool Player::start(Picture& picture, Picture::Token token, const Setup& setup, s
 }
 
 Player::~Player() {
-    if (!m_pipeline) {
-        return;
+    if (m_pipeline && isAsking()) {
+        new Farewell(m_pipeline);
+    } else if (m_pipeline) {
+        end(m_pipeline);
     }
-    GstBus* bus = gst_element_get_bus(m_pipeline);
-    gst_bus_remove_watch(bus);
-    gst_bus_set_flushing(bus, TRUE);
-    gst_object_unref(bus);
-    gst_element_set_state(m_pipeline, GST_STATE_NULL);
-    gst_object_unref(m_pipeline);
+}
+
+// The answer to a request may come at any moment.
+bool Player::isAsking() const {
+    return m_isHttp && !m_hasFailed && (!m_hasAnswer || m_isSeeking);
 }
 
 // On GStreamer's thread.
-void Player::onSource(GstElement* playbin, GstElement* source, gpointer player) {
+void Player::onSource(GstElement* playbin, GstElement* source, gpointer shared) {
     (void)playbin;
     if (hasProperty(source, "timeout") && hasProperty(source, "user-agent")) {
         g_object_set(source, "timeout", networkSilence, nullptr);
@@ -258,21 +321,22 @@ void Player::onSource(GstElement* playbin, GstElement* source, gpointer player) 
         gst_pad_add_probe(
             pad, GST_PAD_PROBE_TYPE_BUFFER,
             [](GstPad*, GstPadProbeInfo*, gpointer data) {
-                static_cast<Player*>(data)->m_hasData = true;
+                (*static_cast<SharedPointer*>(data))->hasData = true;
                 return GST_PAD_PROBE_REMOVE;
             },
-            player, nullptr);
+            new SharedPointer(*static_cast<SharedPointer*>(shared)),
+            [](gpointer data) { delete static_cast<SharedPointer*>(data); });
         gst_object_unref(pad);
     }
 }
 
 // On GStreamer's threads.
-void Player::onElement(GstElement* playbin, GstElement* element, gpointer player) {
+void Player::onElement(GstElement* playbin, GstElement* element, gpointer shared) {
     (void)playbin;
     const GstElementFactory* factory = gst_element_get_factory(element);
     const gchar* name = factory ? GST_OBJECT_NAME(factory) : "";
     if (std::strcmp(name, subtitleElement) == 0) {
-        g_object_set(element, "silent", static_cast<Player*>(player)->m_showsSubtitle ? FALSE : TRUE,
+        g_object_set(element, "silent", (*static_cast<SharedPointer*>(shared))->showsSubtitle ? FALSE : TRUE,
                      nullptr);
     } else if (std::strcmp(name, storeElement) == 0) {
         g_signal_connect(element, "notify::temp-location", G_CALLBACK(onStore), nullptr);
@@ -329,7 +393,8 @@ void Player::handle(GstMessage* message) {
         break;
     }
     case GST_MESSAGE_ELEMENT:
-        if (gst_message_has_name(message, "http-headers")) {
+        if (isHttpAnswer(message)) {
+            m_hasAnswer = true;
             readHeaders(gst_message_get_structure(message));
         }
         break;
@@ -357,7 +422,8 @@ TELIX_AV_CB_MSG Player::kindOf(GstMessage* message, const GError& error) const {
     const bool isOfConnection =
         m_isNetwork && status == 0 && (error.domain == GST_RESOURCE_ERROR || isDriedUp(message, error));
     if (isOfConnection) {
-        return m_hasData ? TELIX_AV_CB_MSG_ERR_NET_DISCONNECTED : TELIX_AV_CB_MSG_ERR_NET_CANNOT_CONNECT;
+        return m_shared->hasData ? TELIX_AV_CB_MSG_ERR_NET_DISCONNECTED
+                                 : TELIX_AV_CB_MSG_ERR_NET_CANNOT_CONNECT;
     }
     // Data that does not flow before anything is presented has not been understood.
     const bool isNotUnderstood =
@@ -539,7 +605,7 @@ void Player::selectSubtitle(std::optional<int> number) {
     if (number && *number != current) { // a choice that changes nothing would still drop the text that is due
         g_object_set(m_pipeline, "current-text", *number, nullptr);
     }
-    m_showsSubtitle = number.has_value();
+    m_shared->showsSubtitle = number.has_value();
     applySubtitle();
 }
 
@@ -552,7 +618,7 @@ void Player::applySubtitle() {
         [](const GValue* overlay, gpointer isSilent) {
             g_object_set(g_value_get_object(overlay), "silent", GPOINTER_TO_INT(isSilent), nullptr);
         },
-        GINT_TO_POINTER(m_showsSubtitle ? FALSE : TRUE));
+        GINT_TO_POINTER(m_shared->showsSubtitle ? FALSE : TRUE));
     gst_iterator_free(overlays);
 }
 

@@ -9,6 +9,7 @@
 #include <atomic>
 #include <cstdint>
 #include <functional>
+#include <memory>
 #include <optional>
 #include <string>
 #include <vector>
@@ -69,6 +70,7 @@ public:
     };
 
     explicit Player(Listener listener);
+    // Nothing is seen or heard of it any more.
     ~Player();
     Player(const Player&) = delete;
     Player& operator=(const Player&) = delete;
@@ -97,10 +99,19 @@ public:
     Sound sound() const;
 
 private:
+    // What GStreamer's threads share. It may outlive the player.
+    struct Shared {
+        std::atomic<bool> showsSubtitle{false};
+        std::atomic<bool> hasData{false}; // the source has given something
+    };
+
+    using SharedPointer = std::shared_ptr<Shared>;
+
     static gboolean onMessage(GstBus* bus, GstMessage* message, gpointer player);
-    static void onSource(GstElement* playbin, GstElement* source, gpointer player);
-    static void onElement(GstElement* playbin, GstElement* element, gpointer player);
+    static void onSource(GstElement* playbin, GstElement* source, gpointer shared);
+    static void onElement(GstElement* playbin, GstElement* element, gpointer shared);
     static void onStore(GObject* store, GParamSpec* property, gpointer data);
+    bool isAsking() const;
     void handle(GstMessage* message);
     void handleError(GstMessage* message);
     TELIX_AV_CB_MSG kindOf(GstMessage* message, const GError& error) const;
@@ -120,6 +131,8 @@ private:
     GstElement* m_pipeline = nullptr;
     bool m_isNetwork = false;
     bool m_isLive = false;
+    bool m_isHttp = false;
+    bool m_hasAnswer = false; // the server has answered, to the first request at least
     bool m_hasRanges = false; // the server gives any part
     bool m_hasStore = false;  // what has been fetched is kept
     bool m_hasFailed = false;
@@ -137,10 +150,7 @@ private:
     GstState m_state = GST_STATE_NULL; // that was asked for
     uint32_t m_position = 0;
     uint32_t m_duration = 0;
-
-    // These are shared with GStreamer's threads.
-    std::atomic<bool> m_showsSubtitle{false};
-    std::atomic<bool> m_hasData{false}; // the source has given something
+    SharedPointer m_shared = std::make_shared<Shared>();
 };
 
 } // namespace desktop

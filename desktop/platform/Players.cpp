@@ -427,7 +427,6 @@ void Players::begin(uint64_t session, const Item& item) {
         std::lock_guard<std::mutex> lock(m_platform.mutex());
         m_token = token;
     } else {
-        m_platform.picture().blank(token);
         m_platform.picture().hide(token, false);
         m_platform.picture().place(token, view);
     }

@@ -10,6 +10,7 @@
 #include <future>
 #include <gtest/gtest.h>
 #include <netinet/in.h>
+#include <poll.h>
 #include <sys/socket.h>
 #include <sys/wait.h>
 #include <unistd.h>
@@ -125,6 +126,23 @@ public:
 
     // From now on connections are taken, and nothing is ever answered.
     void listenAndBeSilent() { EXPECT_EQ(listen(m_socket, 8), 0); }
+
+    // Waits for a connection and for its request. The socket, or -1; the caller closes it.
+    int takeRequest() const {
+        pollfd ready{m_socket, POLLIN, 0};
+        const int connection = poll(&ready, 1, 30'000) == 1 ? accept(m_socket, nullptr, nullptr) : -1;
+        std::string request;
+        ready.fd = connection;
+        while (request.find("\r\n\r\n") == std::string::npos && poll(&ready, 1, 30'000) == 1) {
+            char piece[512];
+            const ssize_t size = recv(connection, piece, sizeof(piece), 0);
+            if (size <= 0) {
+                break;
+            }
+            request.append(piece, static_cast<size_t>(size));
+        }
+        return connection;
+    }
 
     std::string url() const { return "http://127.0.0.1:" + std::to_string(m_number) + "/clip.mp4"; }
 
@@ -537,6 +555,28 @@ TEST_F(MediaErrorTest, StopsAtOnceWhileAServerIsSilent) {
     play(file("tune.wav"));
     EXPECT_LT(secondsSince(begin), 8)
         << "it has waited until the silence counted as the end of the connection";
+}
+
+// A request that is given up at the moment of its answer crashes the source of HTTP now and then.
+TEST_F(MediaErrorTest, LetsTheServerAnswerBehindAStoppedPlayer) {
+    ClosedPort port;
+    port.listenAndBeSilent();
+    ASSERT_EQ(start(m_player, port.url()), 0);
+    const int connection = port.takeRequest();
+    ASSERT_GE(connection, 0);
+    ASSERT_EQ(TELIX_JS_AV_Stop(m_player), 0);
+    EXPECT_EQ(stateOf(m_player).state, "stopped");
+    std::this_thread::sleep_for(std::chrono::milliseconds(300));
+    char byte = 0;
+    EXPECT_LT(recv(connection, &byte, 1, MSG_DONTWAIT), 0) << "it has hung up";
+    const std::string answer = "HTTP/1.1 404 Not Found\r\nContent-Length: 0\r\n\r\n";
+    EXPECT_EQ(send(connection, answer.data(), answer.size(), MSG_NOSIGNAL),
+              static_cast<ssize_t>(answer.size()));
+    EXPECT_TRUE(waitUntil([&] { return recv(connection, &byte, 1, MSG_DONTWAIT) == 0; }))
+        << "it does not hang up";
+    close(connection);
+    expectMessages({});
+    EXPECT_EQ(stateOf(m_player).state, "stopped");
 }
 
 // ---- Sound and picture
