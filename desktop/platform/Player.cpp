@@ -206,7 +206,14 @@ void end(GstElement* pipeline) {
 // to give a request up at the moment of the answer.
 class Farewell {
 public:
-    // Takes the pipeline over. It deletes itself.
+    // Takes the pipeline over.
+    static void begin(GstElement* pipeline) {
+        new Farewell(pipeline); // deletes itself
+    }
+    Farewell(const Farewell&) = delete;
+    Farewell& operator=(const Farewell&) = delete;
+
+private:
     explicit Farewell(GstElement* pipeline)
         : m_pipeline(pipeline), m_limit(g_timeout_source_new_seconds(2 * networkSilence)) {
         GstBus* bus = gst_element_get_bus(pipeline);
@@ -217,10 +224,6 @@ public:
         g_source_attach(m_limit, g_main_context_get_thread_default());
         gst_element_set_state(pipeline, GST_STATE_PAUSED);
     }
-    Farewell(const Farewell&) = delete;
-    Farewell& operator=(const Farewell&) = delete;
-
-private:
     ~Farewell() {
         g_source_destroy(m_limit);
         g_source_unref(m_limit);
@@ -300,7 +303,7 @@ bool Player::start(Picture& picture, Picture::Token token, const Setup& setup, s
 
 Player::~Player() {
     if (m_pipeline && isAsking()) {
-        new Farewell(m_pipeline);
+        Farewell::begin(m_pipeline);
     } else if (m_pipeline) {
         end(m_pipeline);
     }
