@@ -55,10 +55,10 @@ public:
         return m_events;
     }
 
-    // Nothing came on the caller's thread, and all on one.
-    bool cameOnOneOtherThread() const {
+    // On which it came, since the start of the test program.
+    std::set<std::thread::id> threads() const {
         std::lock_guard<std::mutex> lock(m_mutex);
-        return m_threads.size() <= 1 && m_threads.count(std::this_thread::get_id()) == 0;
+        return m_threads;
     }
 
 private:
