@@ -1,6 +1,8 @@
 // The choice of the audio sink, made once.
 #include "desktop/platform/AudioSink.h"
 
+#include "desktop/platform/ElementRank.h"
+
 #include <string>
 
 namespace desktop {
@@ -18,10 +20,7 @@ std::string chooseSink() {
     }
     gst_object_ref_sink(automatic);
     // It complains on standard error where there is no device, and plays through the other sinks' devices.
-    if (GstPluginFeature* openAl = gst_registry_lookup_feature(gst_registry_get(), "openalsink")) {
-        gst_plugin_feature_set_rank(openAl, GST_RANK_NONE);
-        gst_object_unref(openAl);
-    }
+    setRank("openalsink", GST_RANK_NONE);
     if (gst_element_set_state(automatic, GST_STATE_READY) != GST_STATE_CHANGE_FAILURE) {
         GstIterator* children = gst_bin_iterate_elements(GST_BIN(automatic));
         GValue value = G_VALUE_INIT;

@@ -1,6 +1,6 @@
 // A video, sound or subtitle stream as the calls of components tell it, be it of broadcast or of media.
-#ifndef TELIX_DESKTOP_COMPONENT_TRAITS_H
-#define TELIX_DESKTOP_COMPONENT_TRAITS_H
+#ifndef TELIX_DESKTOP_COMPONENTTRAITS_H
+#define TELIX_DESKTOP_COMPONENTTRAITS_H
 
 #include "telix/telix_platform.h"
 

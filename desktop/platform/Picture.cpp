@@ -145,17 +145,12 @@ GstElement* Picture::makeSink(Token token) {
     if (!bin) {
         return nullptr;
     }
-    GstSample* formerSample = nullptr;
     uint64_t number = 0;
     {
         std::lock_guard<std::mutex> lock(m_mutex);
         number = ++m_lastSink;
-        if (token != 0 && token == m_current) {
-            formerSample = std::exchange(m_sample, nullptr);
-        }
     }
-    giveBack(formerSample);
-    wake();
+    blank(token); // the sink before shows nothing more
     GstElement* sink = gst_bin_get_by_name(GST_BIN(bin), "picture");
     GstAppSinkCallbacks callbacks{};
     callbacks.new_sample = [](GstAppSink* appSink, gpointer target) {

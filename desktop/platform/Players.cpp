@@ -1,6 +1,8 @@
 // Turns of the pipeline, queues and repetitions, and what is told of them.
 #include "desktop/platform/Players.h"
 
+#include "desktop/platform/ElementRank.h"
+
 #include <algorithm>
 #include <cmath>
 #include <cstdio>
@@ -23,15 +25,6 @@ constexpr uint32_t stateNothing = 0;
 constexpr uint32_t stateUnknown = 1;
 constexpr uint32_t statePresenting = 2;
 
-// A web engine in the process brings an element of its own for web addresses, which works for the engine
-// alone.
-void preferTheSetsOwnSource() {
-    if (GstPluginFeature* source = gst_registry_lookup_feature(gst_registry_get(), "souphttpsrc")) {
-        gst_plugin_feature_set_rank(source, GST_RANK_PRIMARY + 1000);
-        gst_object_unref(source);
-    }
-}
-
 } // namespace
 
 Players& Players::instance() {
@@ -40,7 +33,9 @@ Players& Players::instance() {
 }
 
 Players::Players() : m_platform(Platform::instance()) {
-    preferTheSetsOwnSource();
+    // A web engine in the process brings an element of its own for web addresses, which works for the engine
+    // alone.
+    setRank("souphttpsrc", GST_RANK_PRIMARY + 1000);
 }
 
 // ---- The table

@@ -107,6 +107,14 @@ class Television:
         """What runs of telix-tv have left in the folder for temporary files."""
         return os.listdir(self._folder)
 
+    def telixctl(self, *arguments):
+        """What telixctl answers to a command that the running television does."""
+        run = subprocess.run([os.environ['TELIXCTL'], '--json', *map(str, arguments)], env=self.environment,
+                             stdin=subprocess.DEVNULL, capture_output=True, text=True, timeout=RUN_LIMIT, check=False)
+        if run.returncode != 0:
+            raise AssertionError(f'{arguments}: {run.stderr}')
+        return json.loads(run.stdout)
+
     def point_at(self, x, y):
         """Moves the mouse."""
         display = self._display()

@@ -1,8 +1,6 @@
 """What telixctl provokes in a television reaches the page: telix-tv, the plug-in and the desk's platform library."""
 
-import json
 import os
-import subprocess
 import threading
 import unittest
 
@@ -38,30 +36,21 @@ class Control(unittest.TestCase):
             self.assertTrue(self.came.wait_for(lambda: any(line.endswith(': ' + note) for line in self.lines),
                                                RUN_LIMIT / 4), f'no "{note}" in {self.lines}')
 
-    def ctl(self, *arguments):
-        run = subprocess.run([os.environ['TELIXCTL'], *map(str, arguments)], env=self.television.environment,
-                             capture_output=True, text=True, timeout=RUN_LIMIT)
-        self.assertEqual(run.returncode, 0, f'{arguments}: {run.stderr}')
-        return run.stdout
-
-    def state(self):
-        return json.loads(self.ctl('--json', 'state'))
-
     def test_events_reach_the_page(self):
         self.wait_for('channel Telix One')
-        self.ctl('channel', 3)
+        self.television.telixctl('channel', 3)
         self.wait_for('channel Telix Three')
-        self.ctl('channel-error', 1)
+        self.television.telixctl('channel-error', 1)
         self.wait_for('error Telix Three 1')
-        self.ctl('rating', 18, '--region', 'FRA')
+        self.television.telixctl('rating', 18, '--region', 'FRA')
         self.wait_for('rating 18 FRA')
-        self.ctl('full-screen', 'on')
+        self.television.telixctl('full-screen', 'on')
         self.wait_for('full screen true')
-        self.ctl('stream-event', '--id', 6, '--tag', 31, '--data', 'Hi')
+        self.television.telixctl('stream-event', '--id', 6, '--tag', 31, '--data', 'Hi')
         self.wait_for('event news Hi trigger')
-        self.ctl('drm-result', 3, '--id', 'm1', '--message', 'no')
+        self.television.telixctl('drm-result', 3, '--id', 'm1', '--message', 'no')
         self.wait_for('drm m1 no 3')
-        state = self.state()
+        state = self.television.telixctl('state')
         self.assertEqual(state['channel']['name'], 'Telix Three')
         self.assertTrue(state['picture']['fullScreen'])
 

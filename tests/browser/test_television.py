@@ -138,14 +138,16 @@ class OnTheDesk(unittest.TestCase):
         self.value(f'tune({json.dumps(name)})')
         self.wait_for(f'hasTuned({json.dumps(name)})')
 
-    def telixctl(self, *arguments):
-        run = subprocess.run([os.environ['TELIX_TELIXCTL'], '--json', *arguments], env=self.television.environment,
-                             stdin=subprocess.DEVNULL, capture_output=True, text=True, check=False)
-        self.assertEqual(run.returncode, 0, run)
-        return json.loads(run.stdout)
+    def state(self):
+        return self.television.telixctl('state')
 
     def wait_for_state(self, key, value):
-        self.wait(lambda: self.telixctl('state')[key] == value, lambda: f'{key}: {self.telixctl("state")[key]}')
+        self.wait(lambda: self.state()[key] == value, lambda: f'{key}: {self.state()[key]}')
+
+    def is_near(self, place, colour, distance=40):
+        """Whether the screen nearly has that colour there."""
+        return all(abs(part - other) < distance
+                   for part, other in zip(self.television.screen().colour(*place), colour))
 
     def patterns(self):
         """The services of the test multiplex whose pattern the screen may show."""
@@ -160,11 +162,11 @@ class Broadcast(OnTheDesk):
             self.tune(name)
             self.assertEqual(self.value('tv.currentChannel.name'), name)
             self.wait(lambda name=name: self.patterns() == [name], lambda name=name: f'{name}: {self.patterns()}')
-            self.assertEqual(self.telixctl('state')['channel']['name'], name)
+            self.assertEqual(self.state()['channel']['name'], name)
 
     def test_the_viewer_changes_the_channel_as_well(self):
         self.tune('Telix One')
-        self.telixctl('channel', '2')
+        self.television.telixctl('channel', '2')
         self.wait_for('hasTuned("Telix Two")')
         self.wait(lambda: self.patterns() == ['Telix Two'], self.patterns)
 
@@ -222,7 +224,7 @@ class Broadcast(OnTheDesk):
     def test_subtitles_are_on_the_screen_while_they_are_selected(self):
         self.tune('Telix Three')
         self.wait(lambda: self.patterns() == ['Telix Three'], self.patterns)
-        self.assertEqual((self.value('active(2)'), self.telixctl('state')['shownSubtitle']), ([], None))
+        self.assertEqual((self.value('active(2)'), self.state()['shownSubtitle']), ([], None))
         self.assert_no_subtitles()
         self.value('tv.selectComponent(component(2, "deu"))')
         self.wait_for_state('shownSubtitle', GERMAN_SUBTITLES)
@@ -259,14 +261,11 @@ class Broadcast(OnTheDesk):
         # The first and the last stripe, and black where there was one.
         for place, colour in (((1270, 700), (0, 255, 255)), ((660, 700), (255, 0, 0)), ((30, 300), (0, 0, 0))):
             self.wait(lambda place=place, colour=colour: self.is_near(place, colour), f'{place} is not {colour}')
-        self.assertEqual(self.telixctl('state')['picture']['area'], {'x': 640, 'y': 360, 'width': 640, 'height': 360})
-        self.telixctl('full-screen', 'on')
+        self.assertEqual(self.state()['picture']['area'], {'x': 640, 'y': 360, 'width': 640, 'height': 360})
+        self.television.telixctl('full-screen', 'on')
         self.wait(lambda: self.patterns() == ['Telix One'], self.patterns)
         self.wait_for('events.some(function (each) { return each[0] === "fullScreen"; })')
         self.assertEqual(self.value('tv.fullScreen'), True)
-
-    def is_near(self, place, colour):
-        return all(abs(part - other) < 40 for part, other in zip(self.television.screen().colour(*place), colour))
 
     def test_a_released_picture_is_black(self):
         self.tune('Telix One')
@@ -299,10 +298,8 @@ class Files(OnTheDesk):
         for name in [*self.COLOURS, 'Sea']:
             self.tune(name)
             for place in ((5, 5), (640, 360), (1275, 715)):
-                self.wait(lambda name=name, place=place: all(
-                    abs(part - other) < 12
-                    for part, other in zip(self.television.screen().colour(*place), self.COLOURS[name])),
-                    f'{name} at {place}')
+                self.wait(lambda name=name, place=place: self.is_near(place, self.COLOURS[name], 12),
+                          f'{name} at {place}')
 
 
 if __name__ == '__main__':

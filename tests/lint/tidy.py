@@ -18,15 +18,16 @@ import sys
 
 def read_dependencies(build):
     """The files from which the build has made each object, by the object's name."""
+    if not os.path.exists(os.path.join(build, 'build.ninja')):
+        return {}  # other build programs tell nothing
     output = subprocess.run(['ninja', '-C', build, '-t', 'deps'], capture_output=True, text=True, check=True).stdout
     dependencies = collections.defaultdict(list)
     name = None
     for line in output.splitlines():
-        if line.startswith('    '):
-            dependencies[name].append(os.path.join(build, line.strip()))
-        elif ': #deps ' in line:
+        if ': #deps ' in line:
             name = line.split(': #deps ', 1)[0] if line.endswith('(VALID)') else None
-    dependencies.pop(None, None)
+        elif name and line:
+            dependencies[name].append(os.path.join(build, line.strip()))
     return dependencies
 
 
