@@ -1,5 +1,6 @@
 // The calls of the video/broadcast object.
 #include "desktop/platform/Broadcast.h"
+#include "desktop/platform/ComponentCalls.h"
 #include "desktop/platform/Output.h"
 
 using namespace desktop;
@@ -67,7 +68,7 @@ TELIX_RETCODE_ENUM_T TELIX_JS_VB_GetCurrentChannel(TELIX_JS_VB_HANDLE object, TE
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_SetChannelByTriplet(TELIX_JS_VB_HANDLE object, int32_t onid, int32_t tsid,
                                                      int32_t sid) {
     if (!broadcast().exists(object)) {
-        return refused;
+        return kRefused;
     }
     const TELIX_JS_CM_HANDLE channel = broadcast().channels().makeByTriplet(
         static_cast<uint32_t>(onid), static_cast<uint32_t>(tsid), static_cast<uint32_t>(sid));
@@ -79,7 +80,7 @@ TELIX_RETCODE_ENUM_T TELIX_JS_VB_CreateChannelObjectByTriplet(TELIX_JS_VB_HANDLE
                                                               TELIX_JS_CM_HANDLE* channel) {
     (void)idType; // every kind of broadcast is the same file here
     if (!broadcast().exists(object)) {
-        return refused;
+        return kRefused;
     }
     *channel = broadcast().channels().makeByTriplet(onid, tsid, sid);
     return resultOf(*channel != 0);
@@ -90,7 +91,7 @@ TELIX_RETCODE_ENUM_T TELIX_JS_VB_CreateChannelObjectByDsd(TELIX_JS_VB_HANDLE obj
                                                           uint32_t sid, TELIX_JS_CM_HANDLE* channel) {
     (void)idType;
     if (!broadcast().exists(object)) {
-        return refused;
+        return kRefused;
     }
     *channel = broadcast().channels().makeByDescriptor(Bytes(descriptor, descriptor + length), sid);
     return resultOf(*channel != 0);
@@ -103,7 +104,7 @@ TELIX_RETCODE_ENUM_T TELIX_JS_VB_SetFullScreen(TELIX_JS_VB_HANDLE object, ___UIN
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_IsFullScreen(TELIX_JS_VB_HANDLE object, ___UINT8* fullScreen) {
     const auto view = broadcast().viewOf(object);
-    return view ? giveFlag(fullScreen, view->fullScreen) : refused;
+    return view ? returnFlag(fullScreen, view->fullScreen) : kRefused;
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_SetWidth(TELIX_JS_VB_HANDLE object, int32_t width) {
@@ -237,14 +238,14 @@ TELIX_RETCODE_ENUM_T TELIX_JS_VB_UnRegisterStreamEvent(TELIX_JS_VB_HANDLE object
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_GetComponents(TELIX_JS_VB_HANDLE object, TELIX_JS_AVCOMPTYPE type,
                                                TELIX_JS_AVCOMPHANDLE** components, uint32_t* count) {
     static std::vector<TELIX_JS_AVCOMPHANDLE> kept; // valid until the next call
-    return giveComponents(kept, broadcast().components(object, type, false), components, count);
+    return returnComponents(kept, broadcast().components(object, type, false), components, count);
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_GetCurrActiveComponents(TELIX_JS_VB_HANDLE object, TELIX_JS_AVCOMPTYPE type,
                                                          TELIX_JS_AVCOMPHANDLE** components,
                                                          uint32_t* count) {
     static std::vector<TELIX_JS_AVCOMPHANDLE> kept; // valid until the next call
-    return giveComponents(kept, broadcast().components(object, type, true), components, count);
+    return returnComponents(kept, broadcast().components(object, type, true), components, count);
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_SelectComponent(TELIX_JS_VB_HANDLE object, TELIX_JS_AVCOMPHANDLE component,
@@ -259,41 +260,42 @@ TELIX_RETCODE_ENUM_T TELIX_JS_VB_UnselectComponent(TELIX_JS_VB_HANDLE object, TE
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_AVComponent_GetEncoding(TELIX_JS_AVCOMPHANDLE component,
                                                          TELIX_JS_AVCOMPTYPE type, char** encoding) {
-    return giveTrait(broadcast().findComponent(component, type), &ComponentTraits::encoding, encoding);
+    return returnTrait(broadcast().findComponent(component, type), &ComponentTraits::encoding, encoding);
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_AVComponent_GetEncrypted(TELIX_JS_AVCOMPHANDLE component,
                                                           TELIX_JS_AVCOMPTYPE type, ___UINT8* encrypted) {
-    return giveTrait(broadcast().findComponent(component, type), &ComponentTraits::isEncrypted, encrypted);
+    return returnTrait(broadcast().findComponent(component, type), &ComponentTraits::isEncrypted, encrypted);
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_AVComponent_GetAspectRatio(TELIX_JS_AVCOMPHANDLE component,
                                                             TELIX_JS_AVCOMPTYPE type, float* aspectRatio) {
-    return giveTrait(broadcast().findComponent(component, type), &ComponentTraits::aspectRatio, aspectRatio);
+    return returnTrait(broadcast().findComponent(component, type), &ComponentTraits::aspectRatio,
+                       aspectRatio);
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_AVComponent_GetLanguage(TELIX_JS_AVCOMPHANDLE component,
                                                          TELIX_JS_AVCOMPTYPE type, char** language) {
-    return giveTrait(broadcast().findComponent(component, type), &ComponentTraits::language, language);
+    return returnTrait(broadcast().findComponent(component, type), &ComponentTraits::language, language);
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_AVComponent_GetAudioDescription(TELIX_JS_AVCOMPHANDLE component,
                                                                  TELIX_JS_AVCOMPTYPE type,
                                                                  ___UINT8* audioDescription) {
-    return giveTrait(broadcast().findComponent(component, type), &ComponentTraits::isAudioDescription,
-                     audioDescription);
+    return returnTrait(broadcast().findComponent(component, type), &ComponentTraits::isAudioDescription,
+                       audioDescription);
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_AVComponent_GetAudioChannels(TELIX_JS_AVCOMPHANDLE component,
                                                               TELIX_JS_AVCOMPTYPE type,
                                                               uint32_t* audioChannels) {
-    return giveTrait(broadcast().findComponent(component, type), &ComponentTraits::audioChannels,
-                     audioChannels);
+    return returnTrait(broadcast().findComponent(component, type), &ComponentTraits::audioChannels,
+                       audioChannels);
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_AVComponent_GetHearingImpaired(TELIX_JS_AVCOMPHANDLE component,
                                                                 TELIX_JS_AVCOMPTYPE type,
                                                                 ___UINT8* hearingImpaired) {
-    return giveTrait(broadcast().findComponent(component, type), &ComponentTraits::isForHearingImpaired,
-                     hearingImpaired);
+    return returnTrait(broadcast().findComponent(component, type), &ComponentTraits::isForHearingImpaired,
+                       hearingImpaired);
 }

@@ -10,7 +10,7 @@ namespace {
 template <typename Give>
 TELIX_RETCODE_ENUM_T ofChannel(TELIX_JS_CM_HANDLE handle, Give give) {
     const auto channel = Broadcast::instance().channels().find(handle);
-    return channel ? give(*channel) : refused;
+    return channel ? give(*channel) : kRefused;
 }
 
 } // namespace
@@ -59,7 +59,7 @@ TELIX_RETCODE_ENUM_T TELIX_JS_CM_GetDsd(TELIX_JS_CM_HANDLE channel, char** descr
         std::string text;
         for (const uint8_t byte : found.deliveryDescriptor) {
             if (byte == 0) {
-                return refused;
+                return kRefused;
             }
             if (byte < 0x80) {
                 text += static_cast<char>(byte);
@@ -68,19 +68,19 @@ TELIX_RETCODE_ENUM_T TELIX_JS_CM_GetDsd(TELIX_JS_CM_HANDLE channel, char** descr
                 text += static_cast<char>(0x80 | (byte & 0x3F));
             }
         }
-        return giveText(descriptor, text);
+        return returnString(descriptor, text);
     });
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_CM_GetName(TELIX_JS_CM_HANDLE channel, char** name) {
-    return ofChannel(channel, [=](const Channel& found) { return giveText(name, found.name); });
+    return ofChannel(channel, [=](const Channel& found) { return returnString(name, found.name); });
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_CM_GetChannelByTriplet(uint32_t onid, uint32_t tsid, uint32_t sid,
                                                      TELIX_JS_CM_HANDLE* channel) {
     const TELIX_JS_CM_HANDLE found = Broadcast::instance().channels().findByTriplet(onid, tsid, sid);
     if (found == 0) {
-        return refused;
+        return kRefused;
     }
     *channel = found;
     return TELIX_RETCODE_SUCCESS;

@@ -13,15 +13,15 @@ Device& device() {
 } // namespace
 
 TELIX_RETCODE_ENUM_T TELIX_JS_APP_Config_GetPreferredAudioLanguage(char** language) {
-    return giveText(language, device().configuration().audioLanguage);
+    return returnString(language, device().configuration().audioLanguage);
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_APP_Config_GetPreferredSubtitleLanguage(char** language) {
-    return giveText(language, device().configuration().subtitleLanguage);
+    return returnString(language, device().configuration().subtitleLanguage);
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_APP_Config_GetCountryId(char** country) {
-    return giveText(country, device().configuration().country);
+    return returnString(country, device().configuration().country);
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_APP_GetFreeMem(uint32_t* amount) {
@@ -51,13 +51,13 @@ TELIX_RETCODE_ENUM_T TELIX_JS_APP_SetKeySetValue(uint32_t mask, uint32_t* grante
 
 TELIX_RETCODE_ENUM_T TELIX_JS_CAP_GetXmlCapabilities(char** xml) {
     const auto& capabilities = device().capabilities();
-    return capabilities ? giveText(xml, capabilities->document()) : refused;
+    return capabilities ? returnString(xml, capabilities->document()) : kRefused;
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_CAP_HasCapability(const char* profile, ___UINT8* supported) {
     const auto& capabilities = device().capabilities();
     if (!capabilities) {
-        return refused;
+        return kRefused;
     }
     *supported = capabilities->has(profile) ? 1 : 0;
     return TELIX_RETCODE_SUCCESS;
@@ -78,7 +78,7 @@ TELIX_JS_SI_PARENTALRATINGSCHEME_GetThreshold(TELIX_JS_SI_PARENTALRATINGSCHEME_H
                                               int32_t* threshold) {
     const auto found = device().ratingThreshold(scheme);
     if (!found) {
-        return refused;
+        return kRefused;
     }
     *threshold = *found;
     return TELIX_RETCODE_SUCCESS;
@@ -107,7 +107,7 @@ TELIX_RETCODE_ENUM_T TELIX_JS_DRM_SendDRMMessage(const char* messageType, const 
                                                  const char* drmSystemId, char** messageId) {
     (void)messageType;
     (void)message;
-    return giveText(messageId, device().sendDrmMessage(drmSystemId));
+    return returnString(messageId, device().sendDrmMessage(drmSystemId));
 }
 
 // Looked up by the plug-in and never called.

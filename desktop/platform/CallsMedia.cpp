@@ -1,13 +1,14 @@
 // The calls of the A/V control object.
+#include "desktop/platform/ComponentCalls.h"
 #include "desktop/platform/Output.h"
-#include "desktop/platform/Players.h"
+#include "desktop/platform/PlayerRegistry.h"
 
 using namespace desktop;
 
 namespace {
 
-Players& players() {
-    return Players::instance();
+PlayerRegistry& players() {
+    return PlayerRegistry::instance();
 }
 
 } // namespace
@@ -107,7 +108,7 @@ TELIX_RETCODE_ENUM_T TELIX_JS_AV_SetFullScreen(TELIX_JS_AV_HANDLE player, ___UIN
 TELIX_RETCODE_ENUM_T TELIX_JS_AV_SetPlaySpeed(TELIX_JS_AV_HANDLE player, ___UINT8 positive,
                                               int16_t integerPart, uint16_t tenths) {
     if (integerPart < 0 || tenths > 9) {
-        return refused;
+        return kRefused;
     }
     const double speed = (integerPart * 10 + tenths) / 10.0;
     return resultOf(players().setSpeed(player, positive != 0 ? speed : -speed));
@@ -135,66 +136,4 @@ TELIX_RETCODE_ENUM_T TELIX_JS_AV_Seek(TELIX_JS_AV_HANDLE player, uint32_t millis
     return resultOf(players().seek(player, milliseconds));
 }
 
-TELIX_RETCODE_ENUM_T TELIX_JS_AV_GetComponents(TELIX_JS_AV_HANDLE player, TELIX_JS_AVCOMPTYPE type,
-                                               TELIX_JS_AVCOMPHANDLE** components, uint32_t* count) {
-    static std::vector<TELIX_JS_AVCOMPHANDLE> kept; // valid until the next call
-    return giveComponents(kept, players().components(player, type, false), components, count);
-}
-
-TELIX_RETCODE_ENUM_T TELIX_JS_AV_GetCurrActiveComponents(TELIX_JS_AV_HANDLE player, TELIX_JS_AVCOMPTYPE type,
-                                                         TELIX_JS_AVCOMPHANDLE** components,
-                                                         uint32_t* count) {
-    static std::vector<TELIX_JS_AVCOMPHANDLE> kept; // valid until the next call
-    return giveComponents(kept, players().components(player, type, true), components, count);
-}
-
-TELIX_RETCODE_ENUM_T TELIX_JS_AV_SelectComponent(TELIX_JS_AV_HANDLE player, TELIX_JS_AVCOMPHANDLE component,
-                                                 TELIX_JS_AVCOMPTYPE type) {
-    return resultOf(players().select(player, component, type, true));
-}
-
-TELIX_RETCODE_ENUM_T TELIX_JS_AV_UnselectComponent(TELIX_JS_AV_HANDLE player, TELIX_JS_AVCOMPHANDLE component,
-                                                   TELIX_JS_AVCOMPTYPE type) {
-    return resultOf(players().select(player, component, type, false));
-}
-
-TELIX_RETCODE_ENUM_T TELIX_JS_AV_AVComponent_GetEncoding(TELIX_JS_AVCOMPHANDLE component,
-                                                         TELIX_JS_AVCOMPTYPE type, char** encoding) {
-    return giveTrait(players().findComponent(component, type), &ComponentTraits::encoding, encoding);
-}
-
-TELIX_RETCODE_ENUM_T TELIX_JS_AV_AVComponent_GetEncrypted(TELIX_JS_AVCOMPHANDLE component,
-                                                          TELIX_JS_AVCOMPTYPE type, ___UINT8* encrypted) {
-    return giveTrait(players().findComponent(component, type), &ComponentTraits::isEncrypted, encrypted);
-}
-
-TELIX_RETCODE_ENUM_T TELIX_JS_AV_AVComponent_GetAspectRatio(TELIX_JS_AVCOMPHANDLE component,
-                                                            TELIX_JS_AVCOMPTYPE type, float* aspectRatio) {
-    return giveTrait(players().findComponent(component, type), &ComponentTraits::aspectRatio, aspectRatio);
-}
-
-TELIX_RETCODE_ENUM_T TELIX_JS_AV_AVComponent_GetLanguage(TELIX_JS_AVCOMPHANDLE component,
-                                                         TELIX_JS_AVCOMPTYPE type, char** language) {
-    return giveTrait(players().findComponent(component, type), &ComponentTraits::language, language);
-}
-
-TELIX_RETCODE_ENUM_T TELIX_JS_AV_AVComponent_GetAudioDescription(TELIX_JS_AVCOMPHANDLE component,
-                                                                 TELIX_JS_AVCOMPTYPE type,
-                                                                 ___UINT8* audioDescription) {
-    return giveTrait(players().findComponent(component, type), &ComponentTraits::isAudioDescription,
-                     audioDescription);
-}
-
-TELIX_RETCODE_ENUM_T TELIX_JS_AV_AVComponent_GetAudioChannels(TELIX_JS_AVCOMPHANDLE component,
-                                                              TELIX_JS_AVCOMPTYPE type,
-                                                              uint32_t* audioChannels) {
-    return giveTrait(players().findComponent(component, type), &ComponentTraits::audioChannels,
-                     audioChannels);
-}
-
-TELIX_RETCODE_ENUM_T TELIX_JS_AV_AVComponent_GetHearingImpaired(TELIX_JS_AVCOMPHANDLE component,
-                                                                TELIX_JS_AVCOMPTYPE type,
-                                                                ___UINT8* hearingImpaired) {
-    return giveTrait(players().findComponent(component, type), &ComponentTraits::isForHearingImpaired,
-                     hearingImpaired);
-}
+TELIX_DEFINE_COMPONENT_CALLS(TELIX_JS_AV, TELIX_JS_AV_HANDLE, PlayerRegistry)

@@ -9,20 +9,20 @@ namespace {
 template <typename Give>
 TELIX_RETCODE_ENUM_T ofProgramme(TELIX_JS_SI_HANDLE handle, Give give) {
     const auto programme = Broadcast::instance().programmes().find(handle);
-    return programme ? give(*programme) : refused;
+    return programme ? give(*programme) : kRefused;
 }
 
 template <typename Give>
 TELIX_RETCODE_ENUM_T ofRating(TELIX_JS_SI_PARENTALRATING_HANDLE handle, Give give) {
     const auto rating = Broadcast::instance().programmes().findRating(handle);
-    return rating ? give(*rating) : refused;
+    return rating ? give(*rating) : kRefused;
 }
 
 template <typename Value>
 TELIX_RETCODE_ENUM_T setProperty(TELIX_JS_SI_HANDLE programme, Value Programme::*property,
                                  const Value& value) {
     return Broadcast::instance().programmes().set(programme, property, value) ? TELIX_RETCODE_SUCCESS
-                                                                              : refused;
+                                                                              : kRefused;
 }
 
 // A text of at most 255 bytes, cut between characters; none for the length 0.
@@ -32,7 +32,7 @@ TELIX_RETCODE_ENUM_T giveShortText(char** text, ___UINT8* length, const std::str
         --size;
     }
     *length = static_cast<___UINT8>(size);
-    return size == 0 ? TELIX_RETCODE_SUCCESS : giveText(text, value.substr(0, size));
+    return size == 0 ? TELIX_RETCODE_SUCCESS : returnString(text, value.substr(0, size));
 }
 
 } // namespace
@@ -94,7 +94,7 @@ TELIX_RETCODE_ENUM_T TELIX_JS_SI_GetDuration(TELIX_JS_SI_HANDLE programme, uint3
 
 TELIX_RETCODE_ENUM_T TELIX_JS_SI_GetChannelID(TELIX_JS_SI_HANDLE programme, char** channelId) {
     return ofProgramme(programme,
-                       [=](const Programme& found) { return giveText(channelId, found.channelId); });
+                       [=](const Programme& found) { return returnString(channelId, found.channelId); });
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_SI_GetParentalRatingHandles(TELIX_JS_SI_HANDLE programme, uint32_t* count,
@@ -113,13 +113,13 @@ TELIX_RETCODE_ENUM_T TELIX_JS_SI_GetParentalRatingHandles(TELIX_JS_SI_HANDLE pro
 TELIX_RETCODE_ENUM_T TELIX_JS_SI_PARENTALRATING_GetName(TELIX_JS_SI_PARENTALRATING_HANDLE rating,
                                                         char** name) {
     return ofRating(rating, [=](const ParentalRating& found) {
-        return giveText(name, found.isAge() ? std::to_string(found.value()) : "");
+        return returnString(name, found.isAge() ? std::to_string(found.value()) : "");
     });
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_SI_PARENTALRATING_GetScheme(TELIX_JS_SI_PARENTALRATING_HANDLE rating,
                                                           char** scheme) {
-    return ofRating(rating, [=](const ParentalRating&) { return giveText(scheme, "dvb-si"); });
+    return ofRating(rating, [=](const ParentalRating&) { return returnString(scheme, "dvb-si"); });
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_SI_PARENTALRATING_GetValue(TELIX_JS_SI_PARENTALRATING_HANDLE rating,
@@ -141,5 +141,5 @@ TELIX_RETCODE_ENUM_T TELIX_JS_SI_PARENTALRATING_GetLabels(TELIX_JS_SI_PARENTALRA
 
 TELIX_RETCODE_ENUM_T TELIX_JS_SI_PARENTALRATING_GetRegion(TELIX_JS_SI_PARENTALRATING_HANDLE rating,
                                                           char** region) {
-    return ofRating(rating, [=](const ParentalRating& found) { return giveText(region, found.region); });
+    return ofRating(rating, [=](const ParentalRating& found) { return returnString(region, found.region); });
 }

@@ -3,7 +3,7 @@
 #include "desktop/platform/Control.h"
 #include "desktop/platform/ControlProtocol.h"
 #include "desktop/platform/Device.h"
-#include "desktop/platform/Players.h"
+#include "desktop/platform/PlayerRegistry.h"
 
 #include <algorithm>
 #include <cstring>
@@ -389,17 +389,17 @@ Object lowMemory(const Request& request) {
 const char noPlayer[] = "there is no player with media";
 
 Object rightsError(const Request& request) {
-    require(Players::instance().injectRightsError(static_cast<int32_t>(request.number("state")),
-                                                  request.text("content-id"), request.text("drm-system"),
-                                                  request.text("rights-issuer-url")),
+    require(PlayerRegistry::instance().injectRightsError(
+                static_cast<int32_t>(request.number("state")), request.text("content-id"),
+                request.text("drm-system"), request.text("rights-issuer-url")),
             noPlayer);
     return {};
 }
 
 Object buffered(const Request& request) {
-    Players::instance().injectBuffered(request.has("amount")
-                                           ? std::optional(static_cast<uint32_t>(request.number("amount")))
-                                           : std::nullopt);
+    PlayerRegistry::instance().injectBuffered(
+        request.has("amount") ? std::optional(static_cast<uint32_t>(request.number("amount")))
+                              : std::nullopt);
     return {};
 }
 
@@ -420,7 +420,7 @@ Object playerMessage(const Request& request) {
         }
         message = static_cast<TELIX_AV_CB_MSG>(number);
     }
-    require(Players::instance().injectMessage(*message), noPlayer);
+    require(PlayerRegistry::instance().injectMessage(*message), noPlayer);
     return {};
 }
 
@@ -428,7 +428,7 @@ Object playerMessage(const Request& request) {
 
 Array players() {
     Array list;
-    for (const Players::State& each : Players::instance().states()) {
+    for (const PlayerRegistry::State& each : PlayerRegistry::instance().states()) {
         Object player;
         player.number("handle", each.player)
             .text("url", each.url)

@@ -1,5 +1,5 @@
 // Media players through the calls of the plug-in: real clips, from files and from a server of the test's own.
-#include "desktop/platform/Players.h"
+#include "desktop/platform/PlayerRegistry.h"
 #include "desktop/platform/telix_picture.h"
 #include "telix/telix_platform.h"
 #include "tests/desktop/Received.h"
@@ -181,9 +181,9 @@ bool showsSecondClip(const Shot& shot) {
     return isGrey;
 }
 
-std::optional<Player::Sound> sound() {
-    std::promise<std::optional<Player::Sound>> result;
-    Platform::instance().post([&] { result.set_value(Players::instance().sound()); });
+std::optional<MediaPipeline::Sound> sound() {
+    std::promise<std::optional<MediaPipeline::Sound>> result;
+    Platform::instance().post([&] { result.set_value(PlayerRegistry::instance().sound()); });
     return result.get_future().get();
 }
 
@@ -243,8 +243,8 @@ protected:
     }
     TELIX_JS_AV_PLAY_INFO info() const { return info(m_player); }
 
-    static Players::State stateOf(TELIX_JS_AV_HANDLE player) {
-        for (const Players::State& state : Players::instance().states()) {
+    static PlayerRegistry::State stateOf(TELIX_JS_AV_HANDLE player) {
+        for (const PlayerRegistry::State& state : PlayerRegistry::instance().states()) {
             if (state.player == player) {
                 return state;
             }
@@ -897,7 +897,7 @@ TEST_F(MediaTest, RefusesHandlesThatItNeverGave) {
 // ---- Provoked from outside
 
 TEST_F(MediaTest, GivesOnWhatIsProvoked) {
-    Players& players = Players::instance();
+    PlayerRegistry& players = PlayerRegistry::instance();
     EXPECT_FALSE(players.injectMessage(TELIX_AV_CB_MSG_ERR_NET_BUSY));
     EXPECT_FALSE(players.injectRightsError(1, "", "", ""));
     play(file("clip.mp4"));

@@ -1,21 +1,23 @@
 // The players of the A/V control objects: a table of them, the one pipeline for which they take turns, and
 // what pages may know at once.
-#ifndef TELIX_DESKTOP_PLAYERS_H
-#define TELIX_DESKTOP_PLAYERS_H
-
-#include "desktop/platform/Callback.h"
-#include "desktop/platform/Platform.h"
-#include "desktop/platform/Player.h"
+#ifndef TELIX_DESKTOP_PLATFORM_PLAYERREGISTRY_H
+#define TELIX_DESKTOP_PLATFORM_PLAYERREGISTRY_H
 
 #include <deque>
 #include <map>
 #include <memory>
+#include <tuple>
+
+#include "desktop/platform/Callback.h"
+#include "desktop/platform/ComponentTable.h"
+#include "desktop/platform/MediaPipeline.h"
+#include "desktop/platform/Platform.h"
 
 namespace desktop {
 
 // The functions are called on any thread unless said otherwise, and answer at once. Those that take a player
 // give false if there is none with that handle.
-class Players {
+class PlayerRegistry {
 public:
     struct State {
         TELIX_JS_AV_HANDLE player;
@@ -29,10 +31,10 @@ public:
         uint32_t volume;
     };
 
-    static Players& instance(); // lives as long as the process, like the platform
+    static PlayerRegistry& instance(); // lives as long as the process, like the platform
 
-    Players(const Players&) = delete;
-    Players& operator=(const Players&) = delete;
+    PlayerRegistry(const PlayerRegistry&) = delete;
+    PlayerRegistry& operator=(const PlayerRegistry&) = delete;
 
     TELIX_JS_AV_HANDLE create();
 
@@ -84,8 +86,8 @@ public:
     components(TELIX_JS_AV_HANDLE player, TELIX_JS_AVCOMPTYPE type, bool activeOnly) const;
     std::optional<ComponentTraits> findComponent(TELIX_JS_AVCOMPHANDLE component,
                                                  TELIX_JS_AVCOMPTYPE type) const;
-    bool select(TELIX_JS_AV_HANDLE player, TELIX_JS_AVCOMPHANDLE component, TELIX_JS_AVCOMPTYPE type,
-                bool on);
+    bool selectComponent(TELIX_JS_AV_HANDLE player, TELIX_JS_AVCOMPHANDLE component, TELIX_JS_AVCOMPTYPE type,
+                         bool isActive);
 
     // ---- What may be provoked from outside
 
@@ -101,7 +103,7 @@ public:
     std::vector<State> states() const;
 
     // What the pipeline lets through; nothing if there is none. Platform thread.
-    std::optional<Player::Sound> sound() const;
+    std::optional<MediaPipeline::Sound> sound() const;
 
 private:
     struct Callbacks {
@@ -131,21 +133,31 @@ private:
         bool canSeekAhead = false;
         bool canReverse = false;
         unsigned int seeksOnTheWay = 0;
-        Player::Progress progress;
+        MediaPipeline::Progress progress;
         std::optional<uint32_t> nextPosition; // where what is played next begins
         std::deque<Item> waiting;
-        std::vector<TELIX_JS_AVCOMPHANDLE> available;
-        std::array<TELIX_JS_AVCOMPHANDLE, 3> active{}; // by kind
+        ComponentSelection components;
     };
 
-    // A component as it was given out. Handles are given for life: equal components have the same one.
-    struct Component {
+    // A stream of the media at one URL in one player.
+    struct Component : MediaPipeline::Stream {
+        Component(const MediaPipeline::Stream& stream, TELIX_JS_AV_HANDLE player, std::string url)
+            : Stream(stream), player(player), url(std::move(url)) {}
+
+        // A file may have changed between two requests: then its streams are other components.
+        bool operator==(const Component& other) const {
+            const auto key = [](const Component& each) {
+                return std::tie(each.player, each.url, each.type, each.number, each.encoding, each.language,
+                                each.audioChannels, each.aspectRatio);
+            };
+            return key(*this) == key(other);
+        }
+
         TELIX_JS_AV_HANDLE player;
         std::string url;
-        Player::Stream stream;
     };
 
-    Players();
+    PlayerRegistry();
 
     Entry* findLocked(TELIX_JS_AV_HANDLE player);
     const Entry* findLocked(TELIX_JS_AV_HANDLE player) const;
@@ -155,17 +167,14 @@ private:
     uint32_t bufferedOf(const Entry& entry) const;
     TELIX_JS_AV_HANDLE addresseeLocked() const;
     std::shared_ptr<Callbacks> callbacksOf(TELIX_JS_AV_HANDLE player) const;
-    TELIX_JS_AVCOMPHANDLE internLocked(const Component& component);
-    std::vector<TELIX_JS_AVCOMPHANDLE> ofKindLocked(const Entry& entry, TELIX_JS_AVCOMPTYPE type,
-                                                    bool activeOnly) const;
     bool apply(TELIX_JS_AV_HANDLE player, const std::function<bool(Entry& entry)>& change,
-               std::function<void(Player& pipeline)> follow);
+               std::function<void(MediaPipeline& pipeline)> follow);
 
     // Platform thread.
     void begin(uint64_t session, const Item& item);
     void end();
     void lose();
-    void takeMedia(uint64_t session, const Player::Media& media);
+    void takeMedia(uint64_t session, const MediaPipeline::Media& media);
     void tellBegin(uint64_t session);
     void takeEnd(uint64_t session);
     void fail(uint64_t session, TELIX_AV_CB_MSG message, const std::string& reason);
@@ -182,13 +191,13 @@ private:
     TELIX_JS_AV_HANDLE m_lastHandle = 0;
     TELIX_JS_AV_HANDLE m_owner = 0; // the player that has the pipeline, or will
     TELIX_JS_AV_HANDLE m_lastPlayed = 0;
-    uint64_t m_session = 0;              // changes with each wish to play or stop
-    std::vector<Component> m_components; // all that ever were; the handle is the index and 1
+    uint64_t m_session = 0; // changes with each wish to play or stop
+    ComponentTable<Component> m_components;
     std::optional<uint32_t> m_injectedBuffered;
     Picture::Token m_token = 0;
 
     // Platform thread.
-    std::unique_ptr<Player> m_pipeline;
+    std::unique_ptr<MediaPipeline> m_pipeline;
     uint64_t m_working = 0; // the session to which the pipeline belongs; 0: none
     Item m_item;
     bool m_isReading = false; // progress is read at intervals

@@ -1,5 +1,5 @@
 // Turns of the pipeline, queues and repetitions, and what is told of them.
-#include "desktop/platform/Players.h"
+#include "desktop/platform/PlayerRegistry.h"
 
 #include "desktop/platform/ElementRank.h"
 
@@ -27,12 +27,12 @@ constexpr uint32_t statePresenting = 2;
 
 } // namespace
 
-Players& Players::instance() {
-    static auto* const players = new Players; // kept until the process ends
+PlayerRegistry& PlayerRegistry::instance() {
+    static auto* const players = new PlayerRegistry; // kept until the process ends
     return *players;
 }
 
-Players::Players() : m_platform(Platform::instance()) {
+PlayerRegistry::PlayerRegistry() : m_platform(Platform::instance()) {
     // A web engine in the process brings an element of its own for web addresses, which works for the engine
     // alone.
     setRank("souphttpsrc", GST_RANK_PRIMARY + 1000);
@@ -40,17 +40,17 @@ Players::Players() : m_platform(Platform::instance()) {
 
 // ---- The table
 
-const Players::Entry* Players::findLocked(TELIX_JS_AV_HANDLE player) const {
+const PlayerRegistry::Entry* PlayerRegistry::findLocked(TELIX_JS_AV_HANDLE player) const {
     const auto found = m_entries.find(player);
     return found == m_entries.end() ? nullptr : &found->second;
 }
 
-Players::Entry* Players::findLocked(TELIX_JS_AV_HANDLE player) {
+PlayerRegistry::Entry* PlayerRegistry::findLocked(TELIX_JS_AV_HANDLE player) {
     const auto found = m_entries.find(player);
     return found == m_entries.end() ? nullptr : &found->second;
 }
 
-TELIX_JS_AV_HANDLE Players::create() {
+TELIX_JS_AV_HANDLE PlayerRegistry::create() {
     std::lock_guard<std::mutex> lock(m_platform.mutex());
     Entry& entry = m_entries[++m_lastHandle];
     entry.record = &m_records.emplace_back();
@@ -58,7 +58,7 @@ TELIX_JS_AV_HANDLE Players::create() {
     return m_lastHandle;
 }
 
-bool Players::destroy(TELIX_JS_AV_HANDLE player) {
+bool PlayerRegistry::destroy(TELIX_JS_AV_HANDLE player) {
     std::shared_ptr<Callbacks> callbacks;
     {
         std::lock_guard<std::mutex> lock(m_platform.mutex());
@@ -75,7 +75,7 @@ bool Players::destroy(TELIX_JS_AV_HANDLE player) {
     return true;
 }
 
-bool Players::setCallback(TELIX_JS_AV_HANDLE player, TELIX_JS_AV_PLAYSTATE_CB callback) {
+bool PlayerRegistry::setCallback(TELIX_JS_AV_HANDLE player, TELIX_JS_AV_PLAYSTATE_CB callback) {
     const auto callbacks = callbacksOf(player);
     if (callbacks) {
         callbacks->message.set(callback);
@@ -83,7 +83,7 @@ bool Players::setCallback(TELIX_JS_AV_HANDLE player, TELIX_JS_AV_PLAYSTATE_CB ca
     return callbacks != nullptr;
 }
 
-bool Players::setCallback(TELIX_JS_AV_HANDLE player, TELIX_JS_AV_DRM_RIGHTS_CB callback) {
+bool PlayerRegistry::setCallback(TELIX_JS_AV_HANDLE player, TELIX_JS_AV_DRM_RIGHTS_CB callback) {
     const auto callbacks = callbacksOf(player);
     if (callbacks) {
         callbacks->rights.set(callback);
@@ -91,7 +91,7 @@ bool Players::setCallback(TELIX_JS_AV_HANDLE player, TELIX_JS_AV_DRM_RIGHTS_CB c
     return callbacks != nullptr;
 }
 
-std::shared_ptr<Players::Callbacks> Players::callbacksOf(TELIX_JS_AV_HANDLE player) const {
+std::shared_ptr<PlayerRegistry::Callbacks> PlayerRegistry::callbacksOf(TELIX_JS_AV_HANDLE player) const {
     std::lock_guard<std::mutex> lock(m_platform.mutex());
     const Entry* entry = findLocked(player);
     return entry ? entry->callbacks : nullptr;
@@ -99,7 +99,7 @@ std::shared_ptr<Players::Callbacks> Players::callbacksOf(TELIX_JS_AV_HANDLE play
 
 // ---- Requests
 
-void Players::forgetMedia(Entry& entry) {
+void PlayerRegistry::forgetMedia(Entry& entry) {
     entry.isPaused = false;
     entry.isHeld = false;
     entry.isKnown = false;
@@ -107,12 +107,11 @@ void Players::forgetMedia(Entry& entry) {
     entry.canSeekAhead = false;
     entry.canReverse = false;
     entry.progress = {};
-    entry.available.clear();
-    entry.active = {};
+    entry.components.clear();
 }
 
 // Makes `player` the one that plays: `item` now, whatever played before.
-void Players::requestLocked(TELIX_JS_AV_HANDLE player, Entry& entry, const Item& item) {
+void PlayerRegistry::requestLocked(TELIX_JS_AV_HANDLE player, Entry& entry, const Item& item) {
     if (m_owner != player) {
         releaseLocked(m_owner, Phase::stopped);
     }
@@ -125,7 +124,7 @@ void Players::requestLocked(TELIX_JS_AV_HANDLE player, Entry& entry, const Item&
 }
 
 // Takes the pipeline from `player` if it has it.
-void Players::releaseLocked(TELIX_JS_AV_HANDLE player, Phase phase) {
+void PlayerRegistry::releaseLocked(TELIX_JS_AV_HANDLE player, Phase phase) {
     if (player == 0 || m_owner != player) {
         return;
     }
@@ -142,7 +141,7 @@ void Players::releaseLocked(TELIX_JS_AV_HANDLE player, Phase phase) {
     });
 }
 
-bool Players::play(TELIX_JS_AV_HANDLE player, const std::string& url, uint32_t playCount) {
+bool PlayerRegistry::play(TELIX_JS_AV_HANDLE player, const std::string& url, uint32_t playCount) {
     std::lock_guard<std::mutex> lock(m_platform.mutex());
     Entry* entry = findLocked(player);
     if (!entry || url.empty()) {
@@ -155,7 +154,7 @@ bool Players::play(TELIX_JS_AV_HANDLE player, const std::string& url, uint32_t p
     return true;
 }
 
-bool Players::queue(TELIX_JS_AV_HANDLE player, const std::string& url, uint32_t playCount) {
+bool PlayerRegistry::queue(TELIX_JS_AV_HANDLE player, const std::string& url, uint32_t playCount) {
     std::lock_guard<std::mutex> lock(m_platform.mutex());
     Entry* entry = findLocked(player);
     if (!entry || url.empty()) {
@@ -170,7 +169,7 @@ bool Players::queue(TELIX_JS_AV_HANDLE player, const std::string& url, uint32_t 
     return true;
 }
 
-bool Players::withdraw(TELIX_JS_AV_HANDLE player) {
+bool PlayerRegistry::withdraw(TELIX_JS_AV_HANDLE player) {
     std::lock_guard<std::mutex> lock(m_platform.mutex());
     Entry* entry = findLocked(player);
     if (entry) {
@@ -179,7 +178,7 @@ bool Players::withdraw(TELIX_JS_AV_HANDLE player) {
     return entry != nullptr;
 }
 
-bool Players::stop(TELIX_JS_AV_HANDLE player) {
+bool PlayerRegistry::stop(TELIX_JS_AV_HANDLE player) {
     std::lock_guard<std::mutex> lock(m_platform.mutex());
     Entry* entry = findLocked(player);
     if (!entry) {
@@ -195,8 +194,8 @@ bool Players::stop(TELIX_JS_AV_HANDLE player) {
 
 // Changes a player that has the pipeline, and the pipeline after it. False if it has it not, or if `change`
 // says so.
-bool Players::apply(TELIX_JS_AV_HANDLE player, const std::function<bool(Entry& entry)>& change,
-                    std::function<void(Player& pipeline)> follow) {
+bool PlayerRegistry::apply(TELIX_JS_AV_HANDLE player, const std::function<bool(Entry& entry)>& change,
+                           std::function<void(MediaPipeline& pipeline)> follow) {
     std::lock_guard<std::mutex> lock(m_platform.mutex());
     Entry* entry = findLocked(player);
     if (!entry || m_owner != player || !change(*entry)) {
@@ -210,21 +209,21 @@ bool Players::apply(TELIX_JS_AV_HANDLE player, const std::function<bool(Entry& e
     return true;
 }
 
-bool Players::pause(TELIX_JS_AV_HANDLE player) {
+bool PlayerRegistry::pause(TELIX_JS_AV_HANDLE player) {
     return apply(
         player, [](Entry& entry) { return entry.isPaused = true; },
-        [](Player& pipeline) { pipeline.setPaused(true); });
+        [](MediaPipeline& pipeline) { pipeline.setPaused(true); });
 }
 
-bool Players::resume(TELIX_JS_AV_HANDLE player) {
+bool PlayerRegistry::resume(TELIX_JS_AV_HANDLE player) {
     const auto change = [](Entry& entry) {
         entry.isPaused = false;
         return true;
     };
-    return apply(player, change, [](Player& pipeline) { pipeline.setPaused(false); });
+    return apply(player, change, [](MediaPipeline& pipeline) { pipeline.setPaused(false); });
 }
 
-bool Players::seek(TELIX_JS_AV_HANDLE player, uint32_t milliseconds) {
+bool PlayerRegistry::seek(TELIX_JS_AV_HANDLE player, uint32_t milliseconds) {
     {
         std::lock_guard<std::mutex> lock(m_platform.mutex());
         Entry* entry = findLocked(player);
@@ -234,7 +233,7 @@ bool Players::seek(TELIX_JS_AV_HANDLE player, uint32_t milliseconds) {
         }
     }
     const auto change = [milliseconds](Entry& entry) {
-        const Player::Progress& progress = entry.progress;
+        const MediaPipeline::Progress& progress = entry.progress;
         const bool isBeyond = progress.duration > 0 && milliseconds > progress.duration;
         const bool isHeld = entry.canSeekAhead || milliseconds / 1000 <= progress.bufferedEnd;
         if (entry.isKnown && (!entry.canSeek || isBeyond || !isHeld)) {
@@ -244,7 +243,7 @@ bool Players::seek(TELIX_JS_AV_HANDLE player, uint32_t milliseconds) {
         ++entry.seeksOnTheWay;
         return true;
     };
-    return apply(player, change, [this, player, milliseconds](Player& pipeline) {
+    return apply(player, change, [this, player, milliseconds](MediaPipeline& pipeline) {
         if (!pipeline.seek(milliseconds)) {
             std::fprintf(stderr, "libtelix: media: the seek to %u ms is refused\n", milliseconds);
         }
@@ -255,7 +254,7 @@ bool Players::seek(TELIX_JS_AV_HANDLE player, uint32_t milliseconds) {
     });
 }
 
-bool Players::setSpeed(TELIX_JS_AV_HANDLE player, double speed) {
+bool PlayerRegistry::setSpeed(TELIX_JS_AV_HANDLE player, double speed) {
     if (speed == 0) {
         pause(player);
         std::lock_guard<std::mutex> lock(m_platform.mutex());
@@ -279,7 +278,7 @@ bool Players::setSpeed(TELIX_JS_AV_HANDLE player, double speed) {
         entry.speed = speed;
         return true;
     };
-    return apply(player, change, [this, player, speed](Player& pipeline) {
+    return apply(player, change, [this, player, speed](MediaPipeline& pipeline) {
         if (pipeline.setSpeed(speed)) {
             return;
         }
@@ -291,7 +290,7 @@ bool Players::setSpeed(TELIX_JS_AV_HANDLE player, double speed) {
     });
 }
 
-bool Players::setVolume(TELIX_JS_AV_HANDLE player, uint32_t volume) {
+bool PlayerRegistry::setVolume(TELIX_JS_AV_HANDLE player, uint32_t volume) {
     constexpr uint32_t loudest = 100;
     {
         std::lock_guard<std::mutex> lock(m_platform.mutex());
@@ -302,11 +301,13 @@ bool Players::setVolume(TELIX_JS_AV_HANDLE player, uint32_t volume) {
         entry->volume = volume;
     }
     apply(
-        player, [](Entry&) { return true; }, [volume](Player& pipeline) { pipeline.setVolume(volume); });
+        player, [](Entry&) { return true; },
+        [volume](MediaPipeline& pipeline) { pipeline.setVolume(volume); });
     return true;
 }
 
-bool Players::changeView(TELIX_JS_AV_HANDLE player, const std::function<void(Picture::View& view)>& change) {
+bool PlayerRegistry::changeView(TELIX_JS_AV_HANDLE player,
+                                const std::function<void(Picture::View& view)>& change) {
     Picture::View view;
     Picture::Token token = 0;
     {
@@ -325,11 +326,11 @@ bool Players::changeView(TELIX_JS_AV_HANDLE player, const std::function<void(Pic
 
 // ---- Progress
 
-uint32_t Players::bufferedOf(const Entry& entry) const {
+uint32_t PlayerRegistry::bufferedOf(const Entry& entry) const {
     return m_injectedBuffered.value_or(entry.progress.buffered);
 }
 
-TELIX_JS_AV_PLAY_INFO* Players::playInfo(TELIX_JS_AV_HANDLE player) {
+TELIX_JS_AV_PLAY_INFO* PlayerRegistry::playInfo(TELIX_JS_AV_HANDLE player) {
     std::lock_guard<std::mutex> lock(m_platform.mutex());
     const Entry* entry = findLocked(player);
     if (!entry) {
@@ -351,11 +352,11 @@ TELIX_JS_AV_PLAY_INFO* Players::playInfo(TELIX_JS_AV_HANDLE player) {
     return &record;
 }
 
-void Players::readProgress() {
+void PlayerRegistry::readProgress() {
     if (!m_pipeline) {
         return;
     }
-    const Player::Progress progress = m_pipeline->progress();
+    const MediaPipeline::Progress progress = m_pipeline->progress();
     std::lock_guard<std::mutex> lock(m_platform.mutex());
     Entry* entry = findLocked(m_owner);
     if (m_working != m_session || !entry) {
@@ -368,7 +369,7 @@ void Players::readProgress() {
     }
 }
 
-std::vector<Players::State> Players::states() const {
+std::vector<PlayerRegistry::State> PlayerRegistry::states() const {
     std::lock_guard<std::mutex> lock(m_platform.mutex());
     std::vector<State> states;
     for (const auto& [handle, entry] : m_entries) {
@@ -395,10 +396,10 @@ std::vector<Players::State> Players::states() const {
 
 // ---- The pipeline, on the platform thread
 
-void Players::begin(uint64_t session, const Item& item) {
+void PlayerRegistry::begin(uint64_t session, const Item& item) {
     m_pipeline.reset();
     m_working = 0;
-    Player::Setup setup;
+    MediaPipeline::Setup setup;
     Picture::View view;
     Picture::Token token = 0;
     {
@@ -426,8 +427,8 @@ void Players::begin(uint64_t session, const Item& item) {
         m_platform.picture().place(token, view);
     }
 
-    Player::Listener listener;
-    listener.known = [this, session](const Player::Media& media) { takeMedia(session, media); };
+    MediaPipeline::Listener listener;
+    listener.known = [this, session](const MediaPipeline::Media& media) { takeMedia(session, media); };
     listener.began = [this, session] { tellBegin(session); };
     listener.buffering = [this, session](bool isHeld) {
         std::lock_guard<std::mutex> lock(m_platform.mutex());
@@ -440,7 +441,7 @@ void Players::begin(uint64_t session, const Item& item) {
     listener.failed = [this, session](TELIX_AV_CB_MSG message, const std::string& reason) {
         m_platform.post([this, session, message, reason] { fail(session, message, reason); });
     };
-    m_pipeline = std::make_unique<Player>(std::move(listener));
+    m_pipeline = std::make_unique<MediaPipeline>(std::move(listener));
     std::string error;
     if (!m_pipeline->start(m_platform.picture(), token, setup, error)) {
         fail(session, TELIX_AV_CB_MSG_ERR_PLAYING, error);
@@ -454,7 +455,7 @@ void Players::begin(uint64_t session, const Item& item) {
     }
 }
 
-void Players::end() {
+void PlayerRegistry::end() {
     m_pipeline.reset();
     m_working = 0;
     Picture::Token token = 0;
@@ -466,7 +467,7 @@ void Players::end() {
 }
 
 // Broadcast has taken the picture.
-void Players::lose() {
+void PlayerRegistry::lose() {
     TELIX_JS_AV_HANDLE player = 0;
     {
         std::lock_guard<std::mutex> lock(m_platform.mutex());
@@ -481,7 +482,7 @@ void Players::lose() {
     tell(player, TELIX_AV_CB_MSG_ERR_PLAYING);
 }
 
-void Players::tellBegin(uint64_t session) {
+void PlayerRegistry::tellBegin(uint64_t session) {
     TELIX_JS_AV_HANDLE player = 0;
     {
         std::lock_guard<std::mutex> lock(m_platform.mutex());
@@ -497,7 +498,7 @@ void Players::tellBegin(uint64_t session) {
     tell(player, TELIX_AV_CB_MSG_PLAYSTART);
 }
 
-void Players::takeEnd(uint64_t session) {
+void PlayerRegistry::takeEnd(uint64_t session) {
     TELIX_JS_AV_HANDLE player = 0;
     bool repeats = false;
     std::optional<Item> next;
@@ -531,7 +532,7 @@ void Players::takeEnd(uint64_t session) {
     }
 }
 
-void Players::fail(uint64_t session, TELIX_AV_CB_MSG message, const std::string& reason) {
+void PlayerRegistry::fail(uint64_t session, TELIX_AV_CB_MSG message, const std::string& reason) {
     TELIX_JS_AV_HANDLE player = 0;
     {
         std::lock_guard<std::mutex> lock(m_platform.mutex());
@@ -546,7 +547,7 @@ void Players::fail(uint64_t session, TELIX_AV_CB_MSG message, const std::string&
     tell(player, message);
 }
 
-void Players::tell(TELIX_JS_AV_HANDLE player, TELIX_AV_CB_MSG message) {
+void PlayerRegistry::tell(TELIX_JS_AV_HANDLE player, TELIX_AV_CB_MSG message) {
     const auto callbacks = callbacksOf(player);
     if (!callbacks) {
         return;
@@ -560,24 +561,7 @@ void Players::tell(TELIX_JS_AV_HANDLE player, TELIX_AV_CB_MSG message) {
 
 // ---- Components
 
-TELIX_JS_AVCOMPHANDLE Players::internLocked(const Component& component) {
-    const auto isSame = [&](const Component& each) {
-        const Player::Stream& stream = each.stream;
-        return each.player == component.player && each.url == component.url &&
-               stream.type == component.stream.type && stream.number == component.stream.number &&
-               stream.encoding == component.stream.encoding && stream.language == component.stream.language &&
-               stream.audioChannels == component.stream.audioChannels &&
-               stream.aspectRatio == component.stream.aspectRatio;
-    };
-    const auto found = std::find_if(m_components.begin(), m_components.end(), isSame);
-    const auto index = found - m_components.begin();
-    if (found == m_components.end()) {
-        m_components.push_back(component);
-    }
-    return static_cast<TELIX_JS_AVCOMPHANDLE>(index + 1);
-}
-
-void Players::takeMedia(uint64_t session, const Player::Media& media) {
+void PlayerRegistry::takeMedia(uint64_t session, const MediaPipeline::Media& media) {
     {
         std::lock_guard<std::mutex> lock(m_platform.mutex());
         Entry* entry = findLocked(m_owner);
@@ -588,77 +572,43 @@ void Players::takeMedia(uint64_t session, const Player::Media& media) {
         entry->canSeek = media.canSeek;
         entry->canSeekAhead = media.canSeekAhead;
         entry->canReverse = media.canReverse;
-        entry->available.clear();
-        for (const Player::Stream& stream : media.streams) {
-            entry->available.push_back(internLocked({m_owner, entry->url, stream}));
+        entry->components.clear();
+        for (const MediaPipeline::Stream& stream : media.streams) {
+            const TELIX_JS_AVCOMPHANDLE handle = m_components.intern({stream, m_owner, entry->url});
+            entry->components.add(handle, m_components.at(handle));
         }
-        const auto firstOf = [&](TELIX_JS_AVCOMPTYPE type) {
-            const auto handles = ofKindLocked(*entry, type, false);
-            return handles.empty() ? 0 : handles.front();
-        };
-        entry->active[TELIX_JS_AVCOMPTYPE_VIDEO] = firstOf(TELIX_JS_AVCOMPTYPE_VIDEO);
-        entry->active[TELIX_JS_AVCOMPTYPE_AUDIO] = firstOf(TELIX_JS_AVCOMPTYPE_AUDIO);
-        entry->active[TELIX_JS_AVCOMPTYPE_SUBTITLE] = 0; // until someone wants them
-        for (const TELIX_JS_AVCOMPHANDLE handle : ofKindLocked(*entry, TELIX_JS_AVCOMPTYPE_AUDIO, false)) {
-            if (m_components[handle - 1].stream.language == m_platform.configuration().audioLanguage) {
-                entry->active[TELIX_JS_AVCOMPTYPE_AUDIO] = handle;
-                break;
-            }
-        }
+        entry->components.selectDefaults(m_platform.configuration().audioLanguage);
     }
     readProgress();
     applySelection();
 }
 
-std::vector<TELIX_JS_AVCOMPHANDLE> Players::ofKindLocked(const Entry& entry, TELIX_JS_AVCOMPTYPE type,
-                                                         bool activeOnly) const {
-    std::vector<TELIX_JS_AVCOMPHANDLE> handles;
-    for (const TELIX_JS_AVCOMPHANDLE handle : entry.available) {
-        const bool isKind = m_components[handle - 1].stream.type == type;
-        if (isKind && (!activeOnly || entry.active[type] == handle)) {
-            handles.push_back(handle);
-        }
-    }
-    return handles;
-}
-
 std::optional<std::vector<TELIX_JS_AVCOMPHANDLE>>
-Players::components(TELIX_JS_AV_HANDLE player, TELIX_JS_AVCOMPTYPE type, bool activeOnly) const {
+PlayerRegistry::components(TELIX_JS_AV_HANDLE player, TELIX_JS_AVCOMPTYPE type, bool activeOnly) const {
     std::lock_guard<std::mutex> lock(m_platform.mutex());
     const Entry* entry = findLocked(player);
     if (!entry || !entry->isKnown) {
         return std::nullopt;
     }
-    return ofKindLocked(*entry, type, activeOnly);
+    return entry->components.list(type, activeOnly);
 }
 
-std::optional<ComponentTraits> Players::findComponent(TELIX_JS_AVCOMPHANDLE component,
-                                                      TELIX_JS_AVCOMPTYPE type) const {
+std::optional<ComponentTraits> PlayerRegistry::findComponent(TELIX_JS_AVCOMPHANDLE component,
+                                                             TELIX_JS_AVCOMPTYPE type) const {
     std::lock_guard<std::mutex> lock(m_platform.mutex());
-    const bool isKnown =
-        component != 0 && component <= m_components.size() && m_components[component - 1].stream.type == type;
-    return isKnown ? std::optional<ComponentTraits>(m_components[component - 1].stream) : std::nullopt;
+    const Component* found = m_components.find(component, type);
+    return found ? std::optional<ComponentTraits>(*found) : std::nullopt;
 }
 
-bool Players::select(TELIX_JS_AV_HANDLE player, TELIX_JS_AVCOMPHANDLE component, TELIX_JS_AVCOMPTYPE type,
-                     bool on) {
-    const auto change = [&](Entry& entry) {
-        const auto choice = ofKindLocked(entry, type, false);
-        if (std::find(choice.begin(), choice.end(), component) == choice.end()) {
-            return false;
-        }
-        if (on) {
-            entry.active[type] = component;
-        } else if (entry.active[type] == component) {
-            entry.active[type] = 0;
-        }
-        return true;
-    };
-    return apply(player, change, [this](Player&) { applySelection(); });
+bool PlayerRegistry::selectComponent(TELIX_JS_AV_HANDLE player, TELIX_JS_AVCOMPHANDLE component,
+                                     TELIX_JS_AVCOMPTYPE type, bool isActive) {
+    return apply(
+        player, [=](Entry& entry) { return entry.components.select(component, type, isActive); },
+        [this](MediaPipeline&) { applySelection(); });
 }
 
-void Players::applySelection() {
-    std::array<std::optional<int>, 3> numbers;
+void PlayerRegistry::applySelection() {
+    std::array<std::optional<int>, ComponentSelection::kTypeCount> streams;
     bool hasVideo = false;
     Picture::Token token = 0;
     {
@@ -667,31 +617,31 @@ void Players::applySelection() {
         if (!m_pipeline || m_working != m_session || !entry) {
             return;
         }
-        for (size_t type = 0; type < numbers.size(); ++type) {
-            if (entry->active[type] != 0) {
-                numbers[type] = m_components[entry->active[type] - 1].stream.number;
+        for (TELIX_JS_AVCOMPTYPE type = 0; type < streams.size(); ++type) {
+            if (const TELIX_JS_AVCOMPHANDLE handle = entry->components.active(type)) {
+                streams[type] = m_components.at(handle).number;
             }
         }
-        hasVideo = !ofKindLocked(*entry, TELIX_JS_AVCOMPTYPE_VIDEO, false).empty();
+        hasVideo = !entry->components.list(TELIX_JS_AVCOMPTYPE_VIDEO, false).empty();
         token = m_token;
     }
-    m_pipeline->selectAudio(numbers[TELIX_JS_AVCOMPTYPE_AUDIO]);
-    m_pipeline->selectSubtitle(numbers[TELIX_JS_AVCOMPTYPE_SUBTITLE]);
-    m_platform.picture().hide(token, hasVideo && !numbers[TELIX_JS_AVCOMPTYPE_VIDEO]);
+    m_pipeline->selectAudio(streams[TELIX_JS_AVCOMPTYPE_AUDIO]);
+    m_pipeline->selectSubtitle(streams[TELIX_JS_AVCOMPTYPE_SUBTITLE]);
+    m_platform.picture().hide(token, hasVideo && !streams[TELIX_JS_AVCOMPTYPE_VIDEO]);
 }
 
-std::optional<Player::Sound> Players::sound() const {
+std::optional<MediaPipeline::Sound> PlayerRegistry::sound() const {
     return m_pipeline ? std::optional(m_pipeline->sound()) : std::nullopt;
 }
 
 // ---- Provoked from outside
 
-TELIX_JS_AV_HANDLE Players::addresseeLocked() const {
+TELIX_JS_AV_HANDLE PlayerRegistry::addresseeLocked() const {
     const TELIX_JS_AV_HANDLE player = m_owner != 0 ? m_owner : m_lastPlayed;
     return findLocked(player) ? player : 0;
 }
 
-bool Players::injectMessage(TELIX_AV_CB_MSG message) {
+bool PlayerRegistry::injectMessage(TELIX_AV_CB_MSG message) {
     std::lock_guard<std::mutex> lock(m_platform.mutex());
     const TELIX_JS_AV_HANDLE player = addresseeLocked();
     if (player == 0) {
@@ -707,8 +657,8 @@ bool Players::injectMessage(TELIX_AV_CB_MSG message) {
     return true;
 }
 
-bool Players::injectRightsError(TELIX_AV_DRM_ERR_STATE_ENUM_T state, const std::string& contentId,
-                                const std::string& drmSystemId, const std::string& rightsIssuerUrl) {
+bool PlayerRegistry::injectRightsError(TELIX_AV_DRM_ERR_STATE_ENUM_T state, const std::string& contentId,
+                                       const std::string& drmSystemId, const std::string& rightsIssuerUrl) {
     std::lock_guard<std::mutex> lock(m_platform.mutex());
     const TELIX_JS_AV_HANDLE player = addresseeLocked();
     if (player == 0) {
@@ -725,7 +675,7 @@ bool Players::injectRightsError(TELIX_AV_DRM_ERR_STATE_ENUM_T state, const std::
     return true;
 }
 
-bool Players::injectBuffered(std::optional<uint32_t> raw) {
+bool PlayerRegistry::injectBuffered(std::optional<uint32_t> raw) {
     std::lock_guard<std::mutex> lock(m_platform.mutex());
     m_injectedBuffered = raw;
     return true;

@@ -1,6 +1,6 @@
 // Plays one piece of media: a pipeline from its address to picture and sound, made anew for each.
-#ifndef TELIX_DESKTOP_PLAYER_H
-#define TELIX_DESKTOP_PLAYER_H
+#ifndef TELIX_DESKTOP_PLATFORM_MEDIAPIPELINE_H
+#define TELIX_DESKTOP_PLATFORM_MEDIAPIPELINE_H
 
 #include "desktop/platform/ComponentTraits.h"
 #include "desktop/platform/Picture.h"
@@ -20,7 +20,7 @@ namespace desktop {
 constexpr uint32_t noBufferReport = 0xFFFFFFFF;
 
 // Platform thread, unless said otherwise.
-class Player {
+class MediaPipeline {
 public:
     // One video, audio or subtitle stream. Streams of a kind are numbered from 0.
     // What needs a key cannot be played, and files do not tell what their sound is for, so no flag is set.
@@ -69,11 +69,11 @@ public:
         bool isMuted = false;
     };
 
-    explicit Player(Listener listener);
+    explicit MediaPipeline(Listener listener);
     // Nothing is seen or heard of it any more.
-    ~Player();
-    Player(const Player&) = delete;
-    Player& operator=(const Player&) = delete;
+    ~MediaPipeline();
+    MediaPipeline(const MediaPipeline&) = delete;
+    MediaPipeline& operator=(const MediaPipeline&) = delete;
 
     // Starts to present as `token`. False with the reason if that is impossible; otherwise the outcome goes
     // to the listener.

@@ -1,5 +1,5 @@
 // The pipeline of a piece of media: its states, seeks, buffering and errors.
-#include "desktop/platform/Player.h"
+#include "desktop/platform/MediaPipeline.h"
 
 #include "desktop/platform/AudioSink.h"
 
@@ -123,7 +123,7 @@ const StreamKind streamKinds[] = {
     {TELIX_JS_AVCOMPTYPE_SUBTITLE, "n-text", "get-text-tags", "get-text-pad"},
 };
 
-void readPad(GstPad* pad, Player::Stream& stream) {
+void readPad(GstPad* pad, MediaPipeline::Stream& stream) {
     stream.encoding = encodingBefore(pad);
     GstCaps* caps = gst_pad_get_current_caps(pad);
     if (!caps) {
@@ -141,13 +141,13 @@ void readPad(GstPad* pad, Player::Stream& stream) {
     gst_caps_unref(caps);
 }
 
-std::vector<Player::Stream> readStreams(GstElement* playbin) {
-    std::vector<Player::Stream> streams;
+std::vector<MediaPipeline::Stream> readStreams(GstElement* playbin) {
+    std::vector<MediaPipeline::Stream> streams;
     for (const StreamKind& kind : streamKinds) {
         gint count = 0;
         g_object_get(playbin, kind.count, &count, nullptr);
         for (gint number = 0; number < count; ++number) {
-            Player::Stream stream;
+            MediaPipeline::Stream stream;
             stream.type = kind.type;
             stream.number = number;
             GstTagList* tags = nullptr;
@@ -252,9 +252,9 @@ private:
 
 } // namespace
 
-Player::Player(Listener listener) : m_listener(std::move(listener)) {}
+MediaPipeline::MediaPipeline(Listener listener) : m_listener(std::move(listener)) {}
 
-bool Player::start(Picture& picture, Picture::Token token, const Setup& setup, std::string& error) {
+bool MediaPipeline::start(Picture& picture, Picture::Token token, const Setup& setup, std::string& error) {
     m_pipeline = gst_element_factory_make("playbin", nullptr);
     GstElement* pictureSink = picture.makeSink(token);
     GstElement* audioSink = makeAudioSink();
@@ -301,7 +301,7 @@ bool Player::start(Picture& picture, Picture::Token token, const Setup& setup, s
     return true; // a failure is on the bus, with its reason
 }
 
-Player::~Player() {
+MediaPipeline::~MediaPipeline() {
     if (m_pipeline && isAsking()) {
         Farewell::begin(m_pipeline);
     } else if (m_pipeline) {
@@ -310,12 +310,12 @@ Player::~Player() {
 }
 
 // The answer to a request may come at any moment.
-bool Player::isAsking() const {
+bool MediaPipeline::isAsking() const {
     return m_isHttp && !m_hasFailed && (!m_hasAnswer || m_isSeeking);
 }
 
 // On GStreamer's thread.
-void Player::onSource(GstElement* playbin, GstElement* source, gpointer shared) {
+void MediaPipeline::onSource(GstElement* playbin, GstElement* source, gpointer shared) {
     (void)playbin;
     if (hasProperty(source, "timeout") && hasProperty(source, "user-agent")) {
         g_object_set(source, "timeout", networkSilence, nullptr);
@@ -334,7 +334,7 @@ void Player::onSource(GstElement* playbin, GstElement* source, gpointer shared) 
 }
 
 // On GStreamer's threads.
-void Player::onElement(GstElement* playbin, GstElement* element, gpointer shared) {
+void MediaPipeline::onElement(GstElement* playbin, GstElement* element, gpointer shared) {
     (void)playbin;
     const GstElementFactory* factory = gst_element_get_factory(element);
     const gchar* name = factory ? GST_OBJECT_NAME(factory) : "";
@@ -348,7 +348,7 @@ void Player::onElement(GstElement* playbin, GstElement* element, gpointer shared
 
 // The file of what has been fetched has been opened. Without a name it goes with the process, however that
 // ends.
-void Player::onStore(GObject* store, GParamSpec* property, gpointer data) {
+void MediaPipeline::onStore(GObject* store, GParamSpec* property, gpointer data) {
     (void)property;
     (void)data;
     gchar* file = nullptr;
@@ -359,13 +359,13 @@ void Player::onStore(GObject* store, GParamSpec* property, gpointer data) {
     g_free(file);
 }
 
-gboolean Player::onMessage(GstBus* bus, GstMessage* message, gpointer player) {
+gboolean MediaPipeline::onMessage(GstBus* bus, GstMessage* message, gpointer player) {
     (void)bus;
-    static_cast<Player*>(player)->handle(message);
+    static_cast<MediaPipeline*>(player)->handle(message);
     return TRUE;
 }
 
-void Player::handle(GstMessage* message) {
+void MediaPipeline::handle(GstMessage* message) {
     if (m_hasFailed) {
         return; // what follows an error are consequences
     }
@@ -414,7 +414,7 @@ void Player::handle(GstMessage* message) {
 
 // ---- Errors
 
-TELIX_AV_CB_MSG Player::kindOf(GstMessage* message, const GError& error) const {
+TELIX_AV_CB_MSG MediaPipeline::kindOf(GstMessage* message, const GError& error) const {
     const uint32_t status = httpStatusOf(message);
     const bool isMissing =
         (status >= 400 && status < 500) ||
@@ -435,7 +435,7 @@ TELIX_AV_CB_MSG Player::kindOf(GstMessage* message, const GError& error) const {
     return isNotUnderstood ? TELIX_AV_CB_MSG_ERR_CODEC_NOT_SUPPORTED : TELIX_AV_CB_MSG_ERR_PLAYING;
 }
 
-void Player::handleError(GstMessage* message) {
+void MediaPipeline::handleError(GstMessage* message) {
     GError* error = nullptr;
     gst_message_parse_error(message, &error, nullptr);
     m_hasFailed = true;
@@ -443,7 +443,7 @@ void Player::handleError(GstMessage* message) {
     g_error_free(error);
 }
 
-void Player::readHeaders(const GstStructure* headers) {
+void MediaPipeline::readHeaders(const GstStructure* headers) {
     const GValue* response = gst_structure_get_value(headers, "response-headers");
     if (!response || !GST_VALUE_HOLDS_STRUCTURE(response)) {
         return;
@@ -462,7 +462,7 @@ void Player::readHeaders(const GstStructure* headers) {
 
 // ---- States
 
-void Player::takeBuffering(int percent) {
+void MediaPipeline::takeBuffering(int percent) {
     const bool isHeld = percent < 100 && !m_isLive; // what is live does not wait
     if (isHeld != m_isHeld) {
         m_isHeld = isHeld;
@@ -472,7 +472,7 @@ void Player::takeBuffering(int percent) {
 }
 
 // After each change of state or place that takes its time.
-void Player::settle() {
+void MediaPipeline::settle() {
     if (!m_isKnown) {
         becomeKnown();
     }
@@ -491,7 +491,7 @@ void Player::settle() {
     applyState();
 }
 
-void Player::becomeKnown() {
+void MediaPipeline::becomeKnown() {
     m_isKnown = true;
     Media media;
     media.streams = readStreams(m_pipeline);
@@ -509,7 +509,7 @@ void Player::becomeKnown() {
 }
 
 // What has been fetched is kept in a file.
-bool Player::usesStore() const {
+bool MediaPipeline::usesStore() const {
     GstIterator* stores = gst_bin_iterate_all_by_element_factory_name(GST_BIN(m_pipeline), storeElement);
     GValue value = G_VALUE_INIT;
     const bool isUsed = gst_iterator_next(stores, &value) == GST_ITERATOR_OK;
@@ -520,7 +520,7 @@ bool Player::usesStore() const {
     return isUsed;
 }
 
-void Player::applyState() {
+void MediaPipeline::applyState() {
     if (!m_isReady && !m_isLive) {
         return; // the beginning is not to be seen before it is the right place
     }
@@ -531,7 +531,7 @@ void Player::applyState() {
     }
 }
 
-void Player::setPaused(bool isPaused) {
+void MediaPipeline::setPaused(bool isPaused) {
     m_isPaused = isPaused;
     applyState();
 }
@@ -539,11 +539,11 @@ void Player::setPaused(bool isPaused) {
 // ---- Seeks
 
 // A server that does not give parts is not asked for one: it would cut the media off, or leave it hanging.
-bool Player::canReach(uint32_t milliseconds) {
+bool MediaPipeline::canReach(uint32_t milliseconds) {
     return !m_hasStore || m_hasRanges || milliseconds / 1000 <= progress().bufferedEnd;
 }
 
-bool Player::applySeek(double speed, uint32_t milliseconds) {
+bool MediaPipeline::applySeek(double speed, uint32_t milliseconds) {
     if (!canReach(milliseconds)) {
         return false;
     }
@@ -563,7 +563,7 @@ bool Player::applySeek(double speed, uint32_t milliseconds) {
     return isTaken;
 }
 
-bool Player::seek(uint32_t milliseconds) {
+bool MediaPipeline::seek(uint32_t milliseconds) {
     if (isSeeking()) {
         m_goal = milliseconds;
         return true;
@@ -571,7 +571,7 @@ bool Player::seek(uint32_t milliseconds) {
     return applySeek(m_speed, milliseconds);
 }
 
-bool Player::setSpeed(double speed) {
+bool MediaPipeline::setSpeed(double speed) {
     if (isSeeking()) {
         m_newSpeed = speed;
         return true;
@@ -579,18 +579,18 @@ bool Player::setSpeed(double speed) {
     return speed == m_speed || applySeek(speed, progress().position);
 }
 
-bool Player::repeat() {
+bool MediaPipeline::repeat() {
     return applySeek(m_speed, 0);
 }
 
 // ---- Sound and streams
 
-void Player::setVolume(uint32_t volume) {
+void MediaPipeline::setVolume(uint32_t volume) {
     m_volume = volume / 100.0;
     applySound();
 }
 
-void Player::selectAudio(std::optional<int> number) {
+void MediaPipeline::selectAudio(std::optional<int> number) {
     m_hasSound = number.has_value();
     if (number && *number != sound().audio) {
         g_object_set(m_pipeline, "current-audio", *number, nullptr);
@@ -598,11 +598,11 @@ void Player::selectAudio(std::optional<int> number) {
     applySound();
 }
 
-void Player::applySound() {
+void MediaPipeline::applySound() {
     g_object_set(m_pipeline, "volume", m_volume, "mute", m_hasSound && m_speed == 1 ? FALSE : TRUE, nullptr);
 }
 
-void Player::selectSubtitle(std::optional<int> number) {
+void MediaPipeline::selectSubtitle(std::optional<int> number) {
     gint current = -1;
     g_object_get(m_pipeline, "current-text", &current, nullptr);
     if (number && *number != current) { // a choice that changes nothing would still drop the text that is due
@@ -614,7 +614,7 @@ void Player::selectSubtitle(std::optional<int> number) {
 
 // The element that draws subtitles is there if the media has any; it is told whether to. What it was given
 // before it was told stays unseen: the next text is the first.
-void Player::applySubtitle() {
+void MediaPipeline::applySubtitle() {
     GstIterator* overlays = gst_bin_iterate_all_by_element_factory_name(GST_BIN(m_pipeline), subtitleElement);
     gst_iterator_foreach(
         overlays,
@@ -625,7 +625,7 @@ void Player::applySubtitle() {
     gst_iterator_free(overlays);
 }
 
-Player::Sound Player::sound() const {
+MediaPipeline::Sound MediaPipeline::sound() const {
     Sound sound;
     gboolean isMuted = FALSE;
     g_object_get(m_pipeline, "current-audio", &sound.audio, "volume", &sound.volume, "mute", &isMuted,
@@ -636,7 +636,7 @@ Player::Sound Player::sound() const {
 
 // ---- Progress
 
-Player::Progress Player::progress() {
+MediaPipeline::Progress MediaPipeline::progress() {
     gint64 value = 0;
     if (!isSeeking() && gst_element_query_position(m_pipeline, GST_FORMAT_TIME, &value) && value >= 0) {
         m_position = static_cast<uint32_t>(value / GST_MSECOND);
@@ -654,7 +654,7 @@ Player::Progress Player::progress() {
     return progress;
 }
 
-void Player::readBuffering(Progress& progress) {
+void MediaPipeline::readBuffering(Progress& progress) {
     GstQuery* query = gst_query_new_buffering(GST_FORMAT_PERCENT);
     if (gst_element_query(m_pipeline, query)) {
         const guint count = gst_query_get_n_buffering_ranges(query);
