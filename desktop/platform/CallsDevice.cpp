@@ -1,4 +1,4 @@
-// The calls on the set itself: settings, keys, memory, capabilities, rating schemes and DRM messages.
+// Platform calls of the device: preferences, keys, memory, capabilities, rating schemes and DRM messages.
 #include "desktop/platform/Device.h"
 #include "desktop/platform/Output.h"
 
@@ -59,7 +59,7 @@ TELIX_RETCODE_ENUM_T TELIX_JS_CAP_HasCapability(const char* profile, ___UINT8* s
     if (!capabilities) {
         return kRefused;
     }
-    *supported = capabilities->has(profile) ? 1 : 0;
+    *supported = capabilities->hasProfile(profile) ? 1 : 0;
     return TELIX_RETCODE_SUCCESS;
 }
 
@@ -102,7 +102,7 @@ TELIX_RETCODE_ENUM_T TELIX_JS_DRM_UnregisterOnDRMMessageResult(TELIX_JS_DRM_MESS
     return TELIX_RETCODE_SUCCESS;
 }
 
-// The answers are those of the configuration, whatever the message says.
+// The result is the one that the configuration states, whatever the message is.
 TELIX_RETCODE_ENUM_T TELIX_JS_DRM_SendDRMMessage(const char* messageType, const char* message,
                                                  const char* drmSystemId, char** messageId) {
     (void)messageType;

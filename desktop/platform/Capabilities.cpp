@@ -1,11 +1,14 @@
-// Profile lists: written from the configuration, and read.
+// Profile list documents: parsed, and generated from the configuration.
 #include "desktop/platform/Capabilities.h"
 
 #include <algorithm>
+#include <cassert>
 #include <cstring>
 #include <glib.h>
 #include <memory>
 #include <utility>
+
+#include "desktop/platform/OwnedString.h"
 
 namespace desktop {
 
@@ -16,8 +19,9 @@ struct MediaProfile {
     const char* name;
     const char* type;
 };
+
 // What the pipelines of this library play.
-const MediaProfile mediaProfiles[] = {
+const MediaProfile kMediaProfiles[] = {
     {"audio_profile", "MPEG1_L3", "audio/mpeg"},
     {"audio_profile", "HEAAC", "audio/mp4"},
     {"video_profile", "TS_AVC_SD_25_HEAAC", "video/mpeg"},
@@ -30,47 +34,44 @@ const MediaProfile mediaProfiles[] = {
     {"video_profile", "MP4_AVC_HD_25_MPEG1_L3", "video/mp4"},
 };
 
-std::string escaped(const std::string& text) {
-    char* copy = g_markup_escape_text(text.c_str(), -1);
-    std::string result = copy;
-    g_free(copy);
-    return result;
+std::string escaped(const std::string& string) {
+    return OwnedString(g_markup_escape_text(string.c_str(), -1)).get();
 }
 
 } // namespace
 
-// What the markup parser fills in.
+// Collects the profiles while GMarkup parses the document.
 struct CapabilitiesParser {
-    Capabilities read;
+    Capabilities capabilities;
     bool hasRoot = false;
 
     static void startElement(GMarkupParseContext* context, const gchar* element, const gchar** names,
                              const gchar** values, gpointer data, GError** error) {
         (void)context;
         auto* self = static_cast<CapabilitiesParser*>(data);
-        const char* colon = std::strchr(element, ':'); // behind a prefix of a namespace
-        const std::string local = colon ? colon + 1 : element;
-        if (!std::exchange(self->hasRoot, true) && local != "profilelist") {
+        const char* colon = std::strchr(element, ':'); // after the prefix of a namespace
+        const std::string localName = colon ? colon + 1 : element;
+        if (!std::exchange(self->hasRoot, true) && localName != "profilelist") {
             g_set_error(error, G_MARKUP_ERROR, G_MARKUP_ERROR_INVALID_CONTENT,
-                        "the document is <%s> and no <profilelist>", element);
+                        "the root element is <%s>, not <profilelist>", element);
             return;
         }
         for (size_t index = 0; names[index]; ++index) {
             if (std::strcmp(names[index], "name") != 0) {
                 continue;
             }
-            if (local == "ui_profile") {
-                self->read.m_uiProfiles.push_back(Capabilities::split(values[index]));
-            } else if (local == "video_profile" || local == "audio_profile") {
-                self->read.m_mediaProfiles.insert(values[index]);
+            if (localName == "ui_profile") {
+                self->capabilities.m_uiProfiles.push_back(Capabilities::parseUiProfile(values[index]));
+            } else if (localName == "video_profile" || localName == "audio_profile") {
+                self->capabilities.m_mediaProfiles.insert(values[index]);
             }
         }
     }
 };
 
-Capabilities::UiProfile Capabilities::split(const std::string& name) {
+Capabilities::UiProfile Capabilities::parseUiProfile(const std::string& name) {
     UiProfile profile;
-    std::unique_ptr<char*, void (*)(char**)> parts(g_strsplit(name.c_str(), "+", -1), g_strfreev);
+    const OwnedStrings parts(g_strsplit(name.c_str(), "+", -1));
     for (char** part = parts.get(); *part; ++part) {
         if (part == parts.get()) {
             profile.base = *part;
@@ -83,45 +84,44 @@ Capabilities::UiProfile Capabilities::split(const std::string& name) {
 
 std::optional<Capabilities> Capabilities::parse(const std::string& document, std::string& error) {
     CapabilitiesParser parser;
-    const GMarkupParser functions{CapabilitiesParser::startElement, nullptr, nullptr, nullptr, nullptr};
+    const GMarkupParser callbacks{CapabilitiesParser::startElement, nullptr, nullptr, nullptr, nullptr};
     std::unique_ptr<GMarkupParseContext, void (*)(GMarkupParseContext*)> context(
-        g_markup_parse_context_new(&functions, G_MARKUP_DEFAULT_FLAGS, &parser, nullptr),
+        g_markup_parse_context_new(&callbacks, G_MARKUP_DEFAULT_FLAGS, &parser, nullptr),
         g_markup_parse_context_free);
-    GError* fault = nullptr;
+    GError* reason = nullptr;
     if (!g_markup_parse_context_parse(context.get(), document.data(), static_cast<gssize>(document.size()),
-                                      &fault) ||
-        !g_markup_parse_context_end_parse(context.get(), &fault)) {
-        error = fault->message;
-        g_error_free(fault);
+                                      &reason) ||
+        !g_markup_parse_context_end_parse(context.get(), &reason)) {
+        error = messageOf(reason);
         return std::nullopt;
     }
-    if (document.find('\0') != std::string::npos) { // no text of the calls could hold it
-        error = "the document holds a zero byte";
+    // GMarkup accepts null characters, but the platform calls return null-terminated strings.
+    if (document.find('\0') != std::string::npos) {
+        error = "the document contains a null character";
         return std::nullopt;
     }
-    parser.read.m_document = document;
-    return std::move(parser.read);
+    parser.capabilities.m_document = document;
+    return std::move(parser.capabilities);
 }
 
 std::optional<Capabilities> Capabilities::load(const std::string& file, std::string& error) {
     char* contents = nullptr;
     gsize length = 0;
-    GError* fault = nullptr;
-    if (!g_file_get_contents(file.c_str(), &contents, &length, &fault)) {
-        error = fault->message;
-        g_error_free(fault);
+    GError* reason = nullptr;
+    if (!g_file_get_contents(file.c_str(), &contents, &length, &reason)) {
+        error = messageOf(reason);
         return std::nullopt;
     }
     const std::string document(contents, length);
     g_free(contents);
-    std::optional<Capabilities> read = parse(document, error);
-    if (!read) {
+    std::optional<Capabilities> capabilities = parse(document, error);
+    if (!capabilities) {
         error = file + ": " + error;
     }
-    return read;
+    return capabilities;
 }
 
-Capabilities Capabilities::builtIn(const Configuration& configuration) {
+Capabilities Capabilities::generate(const Configuration& configuration) {
     std::string schemes = "dvb-si";
     for (const Configuration::RatingScheme& scheme : configuration.ratingSchemes) {
         schemes += " " + scheme.name;
@@ -144,22 +144,22 @@ Capabilities Capabilities::builtIn(const Configuration& configuration) {
                 "\">true</parentalcontrol>\n"
                 "    </ext>\n" +
                 drm + "  </ui_profile>\n";
-    for (const MediaProfile& profile : mediaProfiles) {
+    for (const MediaProfile& profile : kMediaProfiles) {
         document += std::string("  <") + profile.element + " name=\"" + profile.name + "\" type=\"" +
                     profile.type + "\"/>\n";
     }
     document += "</profilelist>\n";
     std::string error;
-    const auto read = parse(document, error);
-    g_assert(read);
-    return *read;
+    const auto capabilities = parse(document, error);
+    assert(capabilities);
+    return *capabilities;
 }
 
-bool Capabilities::has(const std::string& name) const {
+bool Capabilities::hasProfile(const std::string& name) const {
     if (m_mediaProfiles.count(name) != 0) {
         return true;
     }
-    const UiProfile wanted = split(name);
+    const UiProfile wanted = parseUiProfile(name);
     return std::any_of(m_uiProfiles.begin(), m_uiProfiles.end(), [&](const UiProfile& each) {
         const bool isBase = wanted.base == each.base || (wanted.base.empty() && !wanted.fragments.empty());
         return isBase && std::includes(each.fragments.begin(), each.fragments.end(), wanted.fragments.begin(),

@@ -1,6 +1,7 @@
-// What a viewer or a set maker would have set up: read once from a key file, with a default for everything.
-#ifndef TELIX_DESKTOP_CONFIGURATION_H
-#define TELIX_DESKTOP_CONFIGURATION_H
+// The configuration of the television: what a viewer or a set maker sets up. It is read once, from a key
+// file, and every setting has a default.
+#ifndef TELIX_DESKTOP_PLATFORM_CONFIGURATION_H
+#define TELIX_DESKTOP_PLATFORM_CONFIGURATION_H
 
 #include <cstdint>
 #include <optional>
@@ -9,81 +10,74 @@
 
 namespace desktop {
 
-// A group of remote control keys, as the key set of a page has them.
+// A group of remote control keys, with its bit in the key set of a page.
 struct KeyGroup {
     const char* name;
     uint32_t bit;
 };
 const std::vector<KeyGroup>& keyGroups();
 
+// The values of all settings. Their sections, keys, defaults and meanings stand in Settings.cpp.
 struct Configuration {
-    // One entry of the channel line-up: a transport stream file, a folder of them, or the test multiplex.
+    // One source of channels: a transport stream file, a folder of them, or the test multiplex.
     struct Source {
         std::string path;                // empty for the test multiplex
-        std::optional<uint16_t> service; // only this service; otherwise all
+        std::optional<uint16_t> service; // only this service; all if not given
     };
 
-    // A scheme of parental ratings beside "dvb-si".
+    // A parental rating scheme besides "dvb-si".
     struct RatingScheme {
         std::string name;
-        std::vector<std::string> ratings; // in rising order
-        std::vector<std::string> icons;   // addresses, beside `ratings`; empty where there is none
+        std::vector<std::string> ratings; // in ascending order
+        std::vector<std::string> icons;   // URL per rating; empty where there is none
         uint32_t threshold = 0;           // index of the rating that the viewer has set
     };
 
-    // A DRM system, and what it answers to every message.
+    // A DRM system and its response to every message.
     struct DrmSystem {
         std::string id;
         int32_t result = 0;
         std::string message;
     };
 
-    // What is wrong with a file.
+    // An error in a configuration file.
     struct Error {
         std::string file;
-        unsigned int line = 0; // from 1; 0 where the file as a whole is meant
+        unsigned int line = 0; // from 1; 0 if the error concerns the whole file
         std::string reason;
 
-        std::string text() const; // "FILE:LINE: REASON"
+        std::string message() const; // "FILE:LINE: REASON"
     };
 
-    // [channels]
-    std::vector<Source> sources{{"", std::nullopt}};
+    // All settings at their defaults.
+    Configuration();
 
-    // [test] of the test multiplex
-    uint32_t programmeSeconds = 300;  // length of each programme
-    uint32_t streamEventSeconds = 10; // distance of the stream events; 0: none
-
-    // [viewer] ISO codes of three letters
-    std::string country = "DEU";
-    std::string audioLanguage = "deu";
-    std::string subtitleLanguage = "deu";
-
-    // [parental]
-    int32_t ratingThreshold = 16; // of the scheme "dvb-si", as a page sees values of it: years of age
-    std::vector<RatingScheme> ratingSchemes; // each of [parental-scheme NAME]
-
-    // [drm SYSTEM-ID] each
-    std::vector<DrmSystem> drmSystems;
-
-    // [set]
-    uint32_t freeMemory = 64 * 1024 * 1024; // bytes
-    std::string capabilitiesFile;           // empty: the built-in document
-    uint32_t extraSdVideoDecodes = 1;
-    uint32_t extraHdVideoDecodes = 0;
-    uint32_t keys = 0x3FF;  // groups of keys that the remote control has
-    uint32_t keySet = 0x1F; // those that go to the pages as long as none asks for others
-
-    // Reads `file`. On an error `configuration` is left unchanged.
+    // Reads `file`. `configuration` is unchanged if there is an error.
     static std::optional<Error> load(const std::string& file, Configuration& configuration);
 
-    // The file of this process: TELIX_CONFIG, or telix/tv.conf in the user's configuration folder. Empty if
-    // neither is there. A file named by TELIX_CONFIG need not exist.
+    // The configuration file of this process: TELIX_CONFIG, which need not exist, or telix/tv.conf in the
+    // user's configuration folder. Empty if there is neither.
     static std::string file();
 
-    // The configuration of this process: that of file(), or after an error, which goes to standard error, the
-    // defaults. TELIX_CHANNELS, if not empty, replaces `sources`, written as in the file.
+    // The configuration of this process: that of file() or, after an error, which goes to standard error, the
+    // defaults. If TELIX_CHANNELS is not empty, it replaces `sources`, in the notation of the file.
     static Configuration loadOrDefault();
+
+    std::vector<Source> sources;
+    uint32_t programmeSeconds;
+    uint32_t streamEventSeconds; // 0: no stream events
+    std::string country;         // ISO codes of three letters
+    std::string audioLanguage;
+    std::string subtitleLanguage;
+    uint32_t ratingThreshold;                // of the scheme "dvb-si": years of age
+    std::vector<RatingScheme> ratingSchemes; // in the order of the file
+    std::vector<DrmSystem> drmSystems;
+    uint32_t freeMemory;          // bytes
+    std::string capabilitiesFile; // absolute path; empty: the generated document
+    uint32_t extraSdVideoDecodes;
+    uint32_t extraHdVideoDecodes;
+    uint32_t keys;   // bits of the key groups that the remote control has
+    uint32_t keySet; // bits of those that pages receive until one sets a key set
 };
 
 } // namespace desktop

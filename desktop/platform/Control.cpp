@@ -1,10 +1,6 @@
-// The socket and its connections. Requests are read and answered piece by piece on the platform thread, with
-// a lower priority than the television's own work, and never waited for.
+// The socket and its connections. All of them are sources of the platform thread's main context, with a lower
+// priority than the television's own work; reads and writes never block.
 #include "desktop/platform/Control.h"
-
-#include "desktop/platform/ControlProtocol.h"
-#include "desktop/platform/ControlSocket.h"
-#include "desktop/platform/Platform.h"
 
 #include <algorithm>
 #include <cerrno>
@@ -16,45 +12,53 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include "desktop/platform/ControlProtocol.h"
+#include "desktop/platform/ControlSocket.h"
+#include "desktop/platform/Platform.h"
+
 namespace desktop {
 
 namespace {
 
-constexpr size_t mostConnections = 32;
-constexpr size_t pieceSize = 4096;             // read at a time, so that nobody keeps the thread
-constexpr size_t mostUnread = size_t{4} << 20; // of answers that nobody reads
-const char tooMany[] = R"({"ok":false,"error":"too many connections"})"
-                       "\n";
+constexpr size_t kMaxConnections = 32;
+constexpr int kBacklog = 16;
+constexpr size_t kReadSize = 4096;                     // at a time, so that no client keeps the thread busy
+constexpr size_t kMaxOutput = size_t{4} << 20;         // bytes of responses that the client has not read
+constexpr useconds_t kDescriptorShortageDelay = 10000; // microseconds
+const char kTooManyConnections[] = R"({"ok":false,"error":"too many connections"})"
+                                   "\n";
 
 std::string& socketPath() {
     static auto& path = *new std::string;
     return path;
 }
 
-// Runs at the end of the process, beside threads that still work.
+// Runs when the process exits, while other threads are still running. A forked child inherits the handler,
+// but must not remove the socket of its parent.
 void removeSocket() {
     const std::string& path = socketPath();
-    if (path == controlSocketPath(path.substr(0, path.rfind('/')), getpid())) { // no copy of the process
+    if (path == controlSocketPath(path.substr(0, path.rfind('/')), getpid())) {
         unlink(path.c_str());
     }
 }
 
-// Watches a descriptor on the platform thread until `function` gives false.
-using Ready = std::function<bool()>;
+using ReadyFunction = std::function<bool()>;
 
-GSource* watch(int descriptor, GIOCondition condition, Ready function) {
+// Calls `function` on the platform thread whenever the condition holds, until it returns false. The caller
+// owns the source.
+GSource* addDescriptorSource(int descriptor, GIOCondition condition, ReadyFunction function) {
     GSource* source = g_unix_fd_source_new(descriptor, condition);
     g_source_set_priority(source, G_PRIORITY_DEFAULT_IDLE);
     const GUnixFDSourceFunc run = [](gint, GIOCondition, gpointer data) -> gboolean {
-        return (*static_cast<Ready*>(data))() ? G_SOURCE_CONTINUE : G_SOURCE_REMOVE;
+        return (*static_cast<ReadyFunction*>(data))() ? G_SOURCE_CONTINUE : G_SOURCE_REMOVE;
     };
-    g_source_set_callback(source, G_SOURCE_FUNC(run), new Ready(std::move(function)),
-                          [](gpointer data) { delete static_cast<Ready*>(data); });
+    g_source_set_callback(source, G_SOURCE_FUNC(run), new ReadyFunction(std::move(function)),
+                          [](gpointer data) { delete static_cast<ReadyFunction*>(data); });
     g_source_attach(source, Platform::instance().context());
     return source;
 }
 
-void unwatch(GSource*& source) {
+void removeSource(GSource*& source) {
     if (source) {
         g_source_destroy(source);
         g_source_unref(source);
@@ -73,103 +77,111 @@ bool isOwner(int socket) {
 
 class Control::Connection {
 public:
-    Connection(Control& control, int socket) : m_control(control), m_socket(socket) { resume(); }
+    Connection(Control& control, int socket) : m_control(control), m_socket(socket) { resumeReading(); }
     ~Connection() {
-        unwatch(m_reading);
-        unwatch(m_writing);
-        close(m_socket);
+        removeSource(m_readSource);
+        removeSource(m_writeSource);
+        ::close(m_socket);
     }
     Connection(const Connection&) = delete;
     Connection& operator=(const Connection&) = delete;
 
 private:
-    void resume() {
-        if (!m_reading && !m_isEnding) {
-            m_reading = watch(m_socket, G_IO_IN, [this] { return read(); });
+    void resumeReading() {
+        if (!m_readSource && !m_isClosing) {
+            m_readSource = addDescriptorSource(m_socket, G_IO_IN, [this] { return read(); });
         }
     }
 
-    // The result is whether to watch on. The connection may be gone behind it.
+    // Returns whether the source stays. The connection may have been deleted when this returns.
     bool read() {
-        char piece[pieceSize];
-        const ssize_t size = recv(m_socket, piece, sizeof(piece), 0);
+        char buffer[kReadSize];
+        const ssize_t size = recv(m_socket, buffer, sizeof(buffer), 0);
         if (size < 0) {
-            return errno == EAGAIN || errno == EINTR || end();
+            return errno == EAGAIN || errno == EINTR || close();
         }
         if (size == 0) {
-            if (!m_input.empty()) { // whoever wrote it may still read
-                m_output += answerControlRequest(m_input) + "\n";
+            // The client may have shut down only its writing side: a last line without an end still counts.
+            if (!m_input.empty()) {
+                m_output += handleControlRequest(m_input) + "\n";
             }
-            m_isEnding = true;
+            m_isClosing = true;
         }
-        m_input.append(piece, static_cast<size_t>(size));
+        m_input.append(buffer, static_cast<size_t>(size));
+        handleLines();
+        return write() && m_readSource;
+    }
+
+    void handleLines() {
         size_t begin = 0;
         for (size_t at = m_input.find('\n'); at != std::string::npos; at = m_input.find('\n', begin)) {
-            take(m_input.substr(begin, at - begin));
+            handleLine(m_input.substr(begin, at - begin));
             begin = at + 1;
         }
         m_input.erase(0, begin);
-        if (m_input.size() > longestControlRequest) {
-            take(m_input);
-            m_isEnding = true; // where the next line begins is not worth waiting for
+        if (m_input.size() > kMaxControlRequest) {
+            handleLine(m_input);
+            m_isClosing = true; // the end of the overlong line may never come
         }
-        return write() && m_reading;
     }
 
-    void take(std::string line) {
+    void handleLine(std::string line) {
         if (!line.empty() && line.back() == '\r') {
             line.pop_back();
         }
-        if (!line.empty() && !m_isEnding) {
-            m_output += answerControlRequest(line) + "\n";
+        if (!line.empty() && !m_isClosing) {
+            m_output += handleControlRequest(line) + "\n";
         }
     }
 
-    // Writes what the other side takes, and waits for it to take the rest. False if the connection is gone.
+    // Writes as much as the socket accepts and waits until it accepts the rest. Returns false if the
+    // connection has been deleted.
     bool write() {
         const ssize_t size = send(m_socket, m_output.data(), m_output.size(), MSG_NOSIGNAL);
         if (size < 0 && errno != EAGAIN && errno != EINTR) {
-            return end();
+            return close();
         }
         m_output.erase(0, static_cast<size_t>(std::max<ssize_t>(size, 0)));
-        if (m_output.size() > mostUnread || (m_output.empty() && m_isEnding)) {
-            return end();
+        if (m_output.size() > kMaxOutput || (m_output.empty() && m_isClosing)) {
+            return close();
         }
         if (m_output.empty()) {
-            unwatch(m_writing);
-            resume();
+            removeSource(m_writeSource);
+            resumeReading();
         } else {
-            unwatch(m_reading); // no more requests before the answers are read
-            if (!m_writing) {
-                m_writing = watch(m_socket, G_IO_OUT, [this] { return write() && m_writing; });
+            removeSource(m_readSource); // no more requests until the client has read the responses
+            if (!m_writeSource) {
+                m_writeSource =
+                    addDescriptorSource(m_socket, G_IO_OUT, [this] { return write() && m_writeSource; });
             }
         }
         return true;
     }
 
-    bool end() {
+    // Deletes the connection. Returns false.
+    bool close() {
         m_control.remove(this);
         return false;
     }
 
     Control& m_control;
     int m_socket;
-    GSource* m_reading = nullptr;
-    GSource* m_writing = nullptr;
+    GSource* m_readSource = nullptr;
+    GSource* m_writeSource = nullptr;
     std::string m_input;
     std::string m_output;
-    bool m_isEnding = false;
+    bool m_isClosing = false; // once the output has been written
 };
 
 void Control::start() {
-    static Control* control = nullptr; // kept until the process ends
+    static Control* control = nullptr; // never deleted: requests may arrive until the process ends
     if (control) {
         return;
     }
     control = new Control;
     std::string error;
     if (!control->open(error)) {
-        std::fprintf(stderr, "libtelix: no control socket: %s\n", error.c_str());
+        std::fprintf(stderr, "libtelix: control socket: %s\n", error.c_str());
     }
 }
 
@@ -178,19 +190,19 @@ bool Control::open(std::string& error) {
     if (folder.empty()) {
         return false;
     }
-    runningTelevisions(folder); // removes what others have left
+    runningTelevisions(folder); // removes the sockets of processes that have ended
     const std::string path = controlSocketPath(folder, getpid());
     const auto address = socketAddress(path);
     if (!address) {
-        error = path + ": the name is too long";
+        error = path + ": the path is too long for a socket";
         return false;
     }
-    unlink(path.c_str()); // of a former process with this number
+    unlink(path.c_str()); // of an earlier process with the same id
     m_socket = ::socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC | SOCK_NONBLOCK, 0);
-    // The mode of the descriptor becomes that of the file: nobody else can connect even for a moment.
+    // The socket file gets the mode of the descriptor, so that no other user can connect at any time.
     if (m_socket < 0 || fchmod(m_socket, 0600) != 0 ||
         bind(m_socket, reinterpret_cast<const sockaddr*>(&*address), sizeof(*address)) != 0 ||
-        ::listen(m_socket, 16) != 0) {
+        ::listen(m_socket, kBacklog) != 0) {
         error = path + ": " + g_strerror(errno);
         if (m_socket >= 0) {
             close(m_socket);
@@ -205,18 +217,18 @@ bool Control::open(std::string& error) {
 }
 
 void Control::listen() {
-    GSource* source = watch(m_socket, G_IO_IN, [this] {
+    GSource* source = addDescriptorSource(m_socket, G_IO_IN, [this] {
         accept();
-        return m_socket >= 0;
+        return true;
     });
-    g_source_unref(source); // the context keeps it
+    g_source_unref(source); // the context holds a reference
 }
 
 void Control::accept() {
     const int socket = accept4(m_socket, nullptr, nullptr, SOCK_CLOEXEC | SOCK_NONBLOCK);
     if (socket < 0) {
         if (errno == EMFILE || errno == ENFILE || errno == ENOBUFS || errno == ENOMEM) {
-            g_usleep(10000); // the one who waits keeps the socket ready: do not spin
+            g_usleep(kDescriptorShortageDelay); // the socket stays readable: do not spin
         }
         return;
     }
@@ -224,8 +236,8 @@ void Control::accept() {
         close(socket);
         return;
     }
-    if (m_connections.size() >= mostConnections) {
-        send(socket, tooMany, sizeof(tooMany) - 1, MSG_NOSIGNAL);
+    if (m_connections.size() >= kMaxConnections) {
+        send(socket, kTooManyConnections, sizeof(kTooManyConnections) - 1, MSG_NOSIGNAL);
         close(socket);
         return;
     }

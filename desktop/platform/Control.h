@@ -1,7 +1,7 @@
-// Control of the television from outside: a Unix socket of its user alone, at which programs ask for its
-// state and provoke events. The requests stand in ControlProtocol.h.
-#ifndef TELIX_DESKTOP_CONTROL_H
-#define TELIX_DESKTOP_CONTROL_H
+// Control of the television from outside: a Unix socket that only its user can connect to. The protocol is
+// described in ControlProtocol.h.
+#ifndef TELIX_DESKTOP_PLATFORM_CONTROL_H
+#define TELIX_DESKTOP_PLATFORM_CONTROL_H
 
 #include <glib.h>
 #include <list>
@@ -10,14 +10,14 @@
 
 namespace desktop {
 
-// The answer to one request, without the end of the line. Platform thread.
-std::string answerControlRequest(const std::string& line);
+// Handles one request and returns the response, both without the end of the line. Platform thread.
+std::string handleControlRequest(const std::string& line);
 
-// Platform thread.
+// The listening socket and its connections. Platform thread.
 class Control {
 public:
-    // Opens the socket of this process, once; lives as long as the process. What is wrong goes to standard
-    // error, and the television works without.
+    // Opens the socket of this process at the first call; it stays open until the process ends. Errors go to
+    // standard error, and the television then works without a control socket.
     static void start();
 
     Control(const Control&) = delete;

@@ -1,65 +1,99 @@
-// The list of commands.
+// The command table as data, and what requests and command lines are checked with.
 #include "desktop/platform/ControlProtocol.h"
 
 #include "telix/telix_platform.h"
 
 namespace desktop {
 
+namespace {
+
+// ---- What the rows of ControlCommands.h are written with
+
+ControlValueType string() {
+    return {ControlValueType::Kind::String};
+}
+
+ControlValueType number(int64_t minimum, int64_t maximum) {
+    return {ControlValueType::Kind::Number, minimum, maximum};
+}
+
+ControlValueType onOff() {
+    return {ControlValueType::Kind::Boolean};
+}
+
+ControlValueType choice(const char* choices) {
+    return {ControlValueType::Kind::Choice, 0, 0, choices};
+}
+
+ControlParameter argument(const char* name, ControlValueType type, const char* placeholder,
+                          const char* meaning) {
+    return {name, ControlParameter::Use::Argument, type, placeholder, "", meaning};
+}
+
+ControlParameter optionalArgument(const char* name, ControlValueType type, const char* placeholder,
+                                  const char* defaultMeaning, const char* meaning) {
+    return {name, ControlParameter::Use::OptionalArgument, type, placeholder, defaultMeaning, meaning};
+}
+
+ControlParameter option(const char* name, ControlValueType type, const char* placeholder,
+                        const char* defaultMeaning, const char* meaning) {
+    return {name, ControlParameter::Use::Option, type, placeholder, defaultMeaning, meaning};
+}
+
+// "a|b|c" as "a, b or c".
+std::string inWords(std::string choices) {
+    const size_t last = choices.rfind('|');
+    if (last != std::string::npos) {
+        choices.replace(last, 1, " or ");
+    }
+    for (size_t bar = choices.find('|'); bar != std::string::npos; bar = choices.find('|')) {
+        choices.replace(bar, 1, ", ");
+    }
+    return choices;
+}
+
+} // namespace
+
+bool ControlValueType::acceptsNumber(int64_t value) const {
+    return value >= minimum && value <= maximum;
+}
+
+bool ControlValueType::acceptsChoice(const std::string& value) const {
+    return value.find('|') == std::string::npos &&
+           (std::string("|") + choices + "|").find("|" + value + "|") != std::string::npos;
+}
+
+std::string ControlValueType::description(const char* booleans) const {
+    switch (kind) {
+    case Kind::Number:
+        return "a whole number from " + std::to_string(minimum) + " to " + std::to_string(maximum);
+    case Kind::Boolean:
+        return inWords(booleans);
+    case Kind::Choice:
+        return inWords(choices);
+    default:
+        return "a string";
+    }
+}
+
 const std::vector<ControlCommand>& controlCommands() {
-    using Kind = ControlParameter::Kind;
     static const auto& commands = *new std::vector<ControlCommand>{
-        {"channels", "list the channels", {}},
-        {"state", "tell what is presented, by which objects and players, and who listens to what", {}},
-        {"channel",
-         "tune to a channel, as the viewer would",
-         {{"number", Kind::number, true, "place in the list, from 1", 1, UINT32_MAX}}},
-        {"channel-error",
-         "tell the page that its channel can't be presented",
-         {{"error", Kind::number, true, "reason, as pages know it; 1 is no signal", 0, 100}}},
-        {"rating",
-         "change the parental rating of what is shown",
-         {{"age", Kind::number, true, "4 to 18 years, or 0 for none", 0, 18},
-          {"region", Kind::text, false, "country, three letters (the viewer's)"}}},
-        {"rating-error",
-         "tell the page that a rating can't be evaluated",
-         {{"content-id", Kind::text, false, "of the content"}, {"drm-system", Kind::text, false, "its id"}}},
-        {"stream-event",
-         "send a stream event to all listeners that meet the conditions",
-         {{"id", Kind::number, false, "only to listeners to this event id", 0, 65535},
-          {"tag", Kind::number, false, "only to those of this component tag", 0, 255},
-          {"name", Kind::text, false, "only to those that gave this name"},
-          {"data", Kind::text, false, "the event's data, as text"},
-          {"hex", Kind::text, false, "the same, in hexadecimal digits"},
-          {"status", Kind::text, false, "\"trigger\" or \"error\" (trigger)"}}},
-        {"full-screen",
-         "take the picture to full screen or back, as the viewer would",
-         {{"on", Kind::flag, true, "on or off"}}},
-        {"drm-result",
-         "answer a DRM message",
-         {{"result", Kind::number, true, "what became of it; 0 is success", 0, INT32_MAX},
-          {"message", Kind::text, false, "text of the answer"},
-          {"id", Kind::text, false, "id of the message (the last one)"}}},
-        {"rights-error",
-         "tell the page that rights for the media of its player are missing",
-         {{"state", Kind::number, true, "what is wrong; 0 no licence, 1 invalid licence", 0, INT32_MAX},
-          {"content-id", Kind::text, false, "of the media"},
-          {"drm-system", Kind::text, false, "its id"},
-          {"rights-issuer-url", Kind::text, false, "where rights are to be had"}}},
-        {"low-memory",
-         "tell the page that memory is short",
-         {{"free", Kind::number, false, "bytes that are free from now on"}}},
-        {"buffered",
-         "report a buffering level of the players instead of the real one",
-         {{"amount", Kind::number, false, "seconds, or any raw value (the real level again)"}}},
-        {"player-message",
-         "send a platform message of the player, by name or number",
-         {{"message", Kind::text, true, "as play-end, err-not-found or 0xF000"}}},
+#define CONTROL_COMMAND(name, handler, printer, help, ...) {name, help, {__VA_ARGS__}},
+#include "desktop/platform/ControlCommands.h"
     };
     return commands;
 }
 
-const ControlCommand* findControlCommand(const std::string& name) {
-    for (const ControlCommand& command : controlCommands()) {
+const std::vector<ControlCommand>& localCommands() {
+    static const auto& commands = *new std::vector<ControlCommand>{
+#define LOCAL_COMMAND(name, function, help, ...) {name, help, {__VA_ARGS__}},
+#include "desktop/platform/ControlCommands.h"
+    };
+    return commands;
+}
+
+const ControlCommand* findCommand(const std::vector<ControlCommand>& commands, const std::string& name) {
+    for (const ControlCommand& command : commands) {
         if (command.name == name) {
             return &command;
         }

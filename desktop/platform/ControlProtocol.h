@@ -1,27 +1,48 @@
-// The commands of the control socket, each stated once: the library checks requests against this list, and
-// telixctl makes its command line of it.
+// The control protocol, which libtelix and telixctl share. The commands stand in ControlCommands.h.
 //
-// A request is one line with a JSON object: "command" is the command's name, every other member one of its
-// parameters. The answer is one line with a JSON object: "ok" true and what the command gives, or "ok" false
-// and "error", a text.
-#ifndef TELIX_DESKTOP_CONTROLPROTOCOL_H
-#define TELIX_DESKTOP_CONTROLPROTOCOL_H
+// A request is one line with a JSON object: "command" is the name of a command, every other member is one of
+// its parameters. The response is one line with a JSON object: "ok" true and the results of the command, or
+// "ok" false and "error", the reason as a string.
+#ifndef TELIX_DESKTOP_PLATFORM_CONTROLPROTOCOL_H
+#define TELIX_DESKTOP_PLATFORM_CONTROLPROTOCOL_H
 
+#include <cstddef>
 #include <cstdint>
 #include <string>
 #include <vector>
 
 namespace desktop {
 
-struct ControlParameter {
-    enum class Kind { text, number, flag };
+// What a parameter accepts.
+struct ControlValueType {
+    enum class Kind { String, Number, Boolean, Choice };
 
-    const char* name;
     Kind kind;
-    bool isRequired; // and then told without its name on the command line
-    const char* help;
-    int64_t least = 0; // of a number
-    int64_t most = UINT32_MAX;
+    int64_t minimum = 0; // of a number
+    int64_t maximum = 0;
+    const char* choices = ""; // of a choice, separated by vertical bars
+
+    // Whether the number, or the choice, is one of the accepted ones.
+    bool acceptsNumber(int64_t value) const;
+    bool acceptsChoice(const std::string& value) const;
+
+    // The accepted values in words, as "a whole number from 1 to 9", for error messages. Booleans are written
+    // differently in JSON and on a command line.
+    std::string description(const char* booleans) const;
+};
+
+struct ControlParameter {
+    // How the value is given on a command line.
+    enum class Use { Argument, OptionalArgument, Option };
+
+    const char* name; // of the member of a request, and of the option
+    Use use;
+    ControlValueType type;
+    const char* placeholder;    // stands for the value in help texts
+    const char* defaultMeaning; // value, or effect, without the parameter; empty if it is required
+    const char* meaning;
+
+    bool isRequired() const { return use == Use::Argument; }
 };
 
 struct ControlCommand {
@@ -30,19 +51,21 @@ struct ControlCommand {
     std::vector<ControlParameter> parameters;
 };
 
+// The commands that a television handles, and those that telixctl runs itself, in the order of the rows.
 const std::vector<ControlCommand>& controlCommands();
+const std::vector<ControlCommand>& localCommands();
 
-// Null if there is none of that name.
-const ControlCommand* findControlCommand(const std::string& name);
+// Null if there is none with that name.
+const ControlCommand* findCommand(const std::vector<ControlCommand>& commands, const std::string& name);
 const ControlParameter* findControlParameter(const ControlCommand& command, const std::string& name);
 
-// The longest line of a request in bytes, without its end.
-constexpr size_t longestControlRequest = 65536;
+// Length limit of a request in bytes, without the end of the line.
+constexpr size_t kMaxControlRequest = 65536;
 
-// The names of player messages, as "play-end", with their numbers.
+// The names of platform messages of a player, as "play-end".
 struct PlayerMessage {
     const char* name;
-    uint32_t number;
+    uint32_t value;
 };
 const std::vector<PlayerMessage>& playerMessages();
 

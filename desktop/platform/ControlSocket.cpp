@@ -1,4 +1,4 @@
-// Names of control sockets, and which of them are alive.
+// Paths of control sockets, and which of them a process listens on.
 #include "desktop/platform/ControlSocket.h"
 
 #include <algorithm>
@@ -14,33 +14,33 @@ namespace desktop {
 
 namespace {
 
-// The process in the name of a socket; 0 for any other name.
+// The process id in the file name of a socket; 0 for any other file name.
 pid_t pidOf(const std::string& name) {
-    const std::string before = "telix-";
-    const std::string behind = ".sock";
-    if (name.size() <= before.size() + behind.size() || !g_str_has_prefix(name.c_str(), before.c_str()) ||
-        !g_str_has_suffix(name.c_str(), behind.c_str())) {
+    const std::string prefix = "telix-";
+    const std::string suffix = ".sock";
+    if (name.size() <= prefix.size() + suffix.size() || !g_str_has_prefix(name.c_str(), prefix.c_str()) ||
+        !g_str_has_suffix(name.c_str(), suffix.c_str())) {
         return 0;
     }
-    const std::string digits = name.substr(before.size(), name.size() - before.size() - behind.size());
+    const std::string digits = name.substr(prefix.size(), name.size() - prefix.size() - suffix.size());
     guint64 pid = 0;
     return g_ascii_string_to_unsigned(digits.c_str(), 10, 1, G_MAXINT32, &pid, nullptr)
                ? static_cast<pid_t>(pid)
                : 0;
 }
 
-// Whether somebody listens: a full queue counts, nothing is said.
+// Whether a process listens on the socket; a full backlog counts. Sends nothing.
 bool isListening(const std::string& path) {
     const auto address = socketAddress(path);
     const int socket = address ? ::socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC | SOCK_NONBLOCK, 0) : -1;
     if (socket < 0) {
         return false;
     }
-    const bool isThere =
+    const bool isConnected =
         ::connect(socket, reinterpret_cast<const sockaddr*>(&*address), sizeof(*address)) == 0 ||
         errno == EAGAIN || errno == EINPROGRESS;
     ::close(socket);
-    return isThere;
+    return isConnected;
 }
 
 } // namespace
@@ -58,7 +58,7 @@ std::optional<sockaddr_un> socketAddress(const std::string& path) {
 std::string controlFolder(std::string& error) {
     if (const char* folder = g_getenv("XDG_RUNTIME_DIR"); folder && *folder) {
         if (!g_file_test(folder, G_FILE_TEST_IS_DIR)) {
-            error = std::string(folder) + " (XDG_RUNTIME_DIR) is no folder";
+            error = std::string(folder) + ": XDG_RUNTIME_DIR is not a folder";
             return "";
         }
         return folder;
@@ -68,11 +68,11 @@ std::string controlFolder(std::string& error) {
         error = folder + ": " + g_strerror(errno);
         return "";
     }
-    // Anybody may have made it before.
+    // Another user may have created it before.
     struct stat status {};
     if (lstat(folder.c_str(), &status) != 0 || !S_ISDIR(status.st_mode) || status.st_uid != geteuid() ||
         (status.st_mode & 077) != 0) {
-        error = folder + " is not a folder of this user alone";
+        error = folder + ": other users have access to the folder";
         return "";
     }
     return folder;

@@ -1,6 +1,6 @@
 // Where the control sockets of the running televisions are. Used by the library and by telixctl.
-#ifndef TELIX_DESKTOP_CONTROLSOCKET_H
-#define TELIX_DESKTOP_CONTROLSOCKET_H
+#ifndef TELIX_DESKTOP_PLATFORM_CONTROLSOCKET_H
+#define TELIX_DESKTOP_PLATFORM_CONTROLSOCKET_H
 
 #include <optional>
 #include <string>
@@ -15,16 +15,18 @@ struct ControlSocket {
     std::string path;
 };
 
-// The user's folder for sockets: XDG_RUNTIME_DIR, or telix-UID in the folder for temporary files, which is
-// made if it is missing. Empty, with the reason in `error`, if it can't be used or is not the user's alone.
+// The user's folder for sockets: XDG_RUNTIME_DIR or, if that is not set, telix-UID in the folder for
+// temporary files, which is created if it does not exist. Empty, with the reason in `error`, if it cannot be
+// used or if other users have access to it.
 std::string controlFolder(std::string& error);
 
 std::string controlSocketPath(const std::string& folder, pid_t pid);
 
-// The sockets at which somebody listens, by rising pid. Those that dead processes have left are removed.
+// The sockets on which a process listens, in ascending order of the process ids. Removes the sockets of
+// processes that have ended.
 std::vector<ControlSocket> runningTelevisions(const std::string& folder);
 
-// The address of a path; nothing if it is too long for one.
+// The socket address of a path; nothing if the path is too long for one.
 std::optional<sockaddr_un> socketAddress(const std::string& path);
 
 } // namespace desktop

@@ -1,4 +1,4 @@
-// The state of the set, and the answers of its DRM systems.
+// State of the device, and the results of its DRM systems.
 #include "desktop/platform/Device.h"
 
 #include <cstdio>
@@ -14,7 +14,7 @@ std::string drmMessageId(uint64_t number) {
 } // namespace
 
 Device& Device::instance() {
-    static auto* const device = new Device; // kept until the process ends
+    static auto* const device = new Device; // never deleted: callbacks may be running at the exit
     return *device;
 }
 
@@ -23,35 +23,35 @@ Device::Device()
       m_keySet(m_platform.configuration().keySet) {
     const Configuration& configured = configuration();
     if (configured.capabilitiesFile.empty()) {
-        m_capabilities = Capabilities::builtIn(configured);
+        m_capabilities = Capabilities::generate(configured);
     } else {
         std::string error;
         m_capabilities = Capabilities::load(configured.capabilitiesFile, error);
         if (!m_capabilities) {
-            std::fprintf(stderr, "libtelix: no capabilities: %s\n", error.c_str());
+            std::fprintf(stderr, "libtelix: capabilities: %s\n", error.c_str());
         }
     }
-    addScheme({"dvb-si", {}, {}, 0}); // its ratings are ages, which need no names
+    addScheme({"dvb-si", {}, {}, 0}); // its ratings are ages, which have no names
     for (const Configuration::RatingScheme& scheme : configured.ratingSchemes) {
         addScheme(scheme);
     }
 }
 
 void Device::addScheme(const Configuration::RatingScheme& scheme) {
-    SchemeTexts& kept = m_schemeTexts.emplace_back();
+    SchemeStrings& kept = m_schemeStrings.emplace_back();
     kept.name = scheme.name;
-    kept.texts = scheme.ratings;
-    kept.texts.insert(kept.texts.end(), scheme.icons.begin(), scheme.icons.end());
+    kept.strings = scheme.ratings;
+    kept.strings.insert(kept.strings.end(), scheme.icons.begin(), scheme.icons.end());
     const size_t count = scheme.ratings.size();
     for (size_t index = 0; index < count; ++index) {
-        kept.ratings.push_back(kept.texts[index].data());
-        kept.icons.push_back(kept.texts[count + index].data());
+        kept.ratings.push_back(kept.strings[index].data());
+        kept.icons.push_back(kept.strings[count + index].data());
     }
-    kept.ratings.push_back(nullptr); // also an empty array is somewhere
+    kept.ratings.push_back(nullptr); // the address of an empty array must not be null
     kept.icons.push_back(nullptr);
     PARENTALRATTINGSCHEME_STRUCT_T_TAG record{};
     record.handle =
-        broadcastScheme + static_cast<TELIX_JS_SI_PARENTALRATINGSCHEME_HANDLE>(m_schemeRecords.size());
+        kBroadcastScheme + static_cast<TELIX_JS_SI_PARENTALRATINGSCHEME_HANDLE>(m_schemeRecords.size());
     record.count = static_cast<uint32_t>(count);
     record.szName = kept.name.data();
     record.ratingNames = kept.ratings.data();
@@ -81,10 +81,10 @@ uint32_t Device::setKeySet(uint32_t mask) {
 }
 
 std::optional<int32_t> Device::ratingThreshold(TELIX_JS_SI_PARENTALRATINGSCHEME_HANDLE scheme) const {
-    if (scheme == broadcastScheme) {
-        return configuration().ratingThreshold;
+    if (scheme == kBroadcastScheme) {
+        return static_cast<int32_t>(configuration().ratingThreshold);
     }
-    const size_t index = size_t{scheme} - broadcastScheme - 1; // huge for 0
+    const size_t index = size_t{scheme} - kBroadcastScheme - 1; // wraps around for 0
     if (index >= configuration().ratingSchemes.size()) {
         return std::nullopt;
     }
@@ -93,7 +93,7 @@ std::optional<int32_t> Device::ratingThreshold(TELIX_JS_SI_PARENTALRATINGSCHEME_
 
 std::string Device::sendDrmMessage(const std::string& systemId) {
     std::string message = "unknown DRM system";
-    TELIX_DRM_RESULT_CODE_ENUM_T result = drmUnknownSystem;
+    TELIX_DRM_RESULT_CODE_ENUM_T result = kDrmUnknownSystem;
     for (const Configuration::DrmSystem& system : configuration().drmSystems) {
         if (system.id == systemId) {
             message = system.message;
@@ -102,7 +102,7 @@ std::string Device::sendDrmMessage(const std::string& systemId) {
     }
     std::lock_guard<std::mutex> lock(m_platform.mutex());
     std::string id = drmMessageId(++m_lastDrmMessage);
-    m_platform.post([this, id, message, result] { answerDrm(id, message, result); });
+    m_platform.post([this, id, message, result] { reportDrmResult(id, message, result); });
     return id;
 }
 
@@ -111,7 +111,8 @@ std::string Device::lastDrmMessage() const {
     return drmMessageId(m_lastDrmMessage);
 }
 
-void Device::answerDrm(std::string messageId, std::string message, TELIX_DRM_RESULT_CODE_ENUM_T result) {
+void Device::reportDrmResult(std::string messageId, std::string message,
+                             TELIX_DRM_RESULT_CODE_ENUM_T result) {
     onDrmMessageResult.call(reinterpret_cast<___UINT8*>(messageId.data()),
                             reinterpret_cast<___UINT8*>(message.data()), result);
 }
@@ -129,7 +130,7 @@ bool Device::injectDrmResult(const std::string& messageId, const std::string& me
     if (!onDrmMessageResult.isSet()) {
         return false;
     }
-    m_platform.post([this, messageId, message, result] { answerDrm(messageId, message, result); });
+    m_platform.post([this, messageId, message, result] { reportDrmResult(messageId, message, result); });
     return true;
 }
 

@@ -1,30 +1,31 @@
-// The set itself, apart from pictures and sound: what the viewer has chosen, keys, memory, capabilities,
-// rating schemes and DRM systems.
-#ifndef TELIX_DESKTOP_DEVICE_H
-#define TELIX_DESKTOP_DEVICE_H
-
-#include "desktop/platform/Callback.h"
-#include "desktop/platform/Capabilities.h"
-#include "desktop/platform/Platform.h"
-#include "telix/telix_platform.h"
+// The television apart from video and audio: preferences of the viewer, keys, memory, capabilities, rating
+// schemes and DRM systems.
+#ifndef TELIX_DESKTOP_PLATFORM_DEVICE_H
+#define TELIX_DESKTOP_PLATFORM_DEVICE_H
 
 #include <deque>
 #include <optional>
 #include <string>
 #include <vector>
 
+#include "desktop/platform/Callback.h"
+#include "desktop/platform/Capabilities.h"
+#include "desktop/platform/Platform.h"
+#include "telix/telix_platform.h"
+
 namespace desktop {
 
-// What becomes of a DRM message; the numbers that pages know.
-constexpr TELIX_DRM_RESULT_CODE_ENUM_T drmUnknownSystem = 5;
+// Result code of a DRM message to a system that the configuration lacks, as pages see it (OIPF DAE,
+// onDRMMessageResult: unknown DRM system).
+constexpr TELIX_DRM_RESULT_CODE_ENUM_T kDrmUnknownSystem = 5;
 
-// The scheme of the broadcast; the schemes of the configuration have the handles behind it.
-constexpr TELIX_JS_SI_PARENTALRATINGSCHEME_HANDLE broadcastScheme = 1;
+// Handle of the scheme "dvb-si"; the schemes of the configuration have the handles after it.
+constexpr TELIX_JS_SI_PARENTALRATINGSCHEME_HANDLE kBroadcastScheme = 1;
 
-// The functions are called on any thread and answer at once.
+// All functions can be called on any thread and return without waiting.
 class Device {
 public:
-    static Device& instance(); // lives as long as the process, like the platform
+    static Device& instance(); // never deleted, like the platform
 
     Device(const Device&) = delete;
     Device& operator=(const Device&) = delete;
@@ -34,28 +35,28 @@ public:
     uint32_t freeMemory() const;
     void setFreeMemory(uint32_t bytes);
 
-    // The groups of keys that go to the pages. Setting gives those that are in force then: no others than the
-    // remote control has.
+    // The mask of the key groups that pages receive. The setter ignores groups that the remote control lacks,
+    // and returns the mask that it has set.
     uint32_t keySet() const;
     uint32_t setKeySet(uint32_t mask);
 
-    // Nothing if the file of the configuration can't be read any more.
+    // Nothing if the capabilities file is not readable any more.
     const std::optional<Capabilities>& capabilities() const { return m_capabilities; }
 
-    // All schemes as the calls give them out; valid and unchanged for life.
+    // The records of all schemes, as the platform calls return them. They never change.
     std::vector<PARENTALRATTINGSCHEME_STRUCT_T_TAG>& ratingSchemes() { return m_schemeRecords; }
 
-    // What the viewer has set for a scheme: an age for the broadcast's, else the index of a rating.
+    // The threshold of the viewer for a scheme: an age for kBroadcastScheme, else the index of a rating.
     std::optional<int32_t> ratingThreshold(TELIX_JS_SI_PARENTALRATINGSCHEME_HANDLE scheme) const;
 
-    // Takes a message for a DRM system and gives its id. The answer follows on the platform thread, for each
-    // message in its turn: what the configuration says of the system, or drmUnknownSystem.
+    // Sends a message to a DRM system and returns its id. The result follows through the callback, in the
+    // order of the messages: the one that the configuration states for the system, or kDrmUnknownSystem.
     std::string sendDrmMessage(const std::string& systemId);
 
-    // The id given last; empty if none was.
+    // The id of the last message; empty if there was none.
     std::string lastDrmMessage() const;
 
-    // ---- What may be provoked from outside. False if nobody has asked for it.
+    // ---- Events from outside. False if no listener is registered.
 
     bool injectLowMemory();
     bool injectDrmResult(const std::string& messageId, const std::string& message,
@@ -67,27 +68,27 @@ public:
     CountedCallback<TELIX_JS_DRM_MESSAGE_RESULT_CB> onDrmMessageResult;
 
 private:
-    // The texts of a scheme, as its record points to them.
-    struct SchemeTexts {
+    // The strings that the record of a scheme points to.
+    struct SchemeStrings {
         std::string name;
-        std::vector<std::string> texts;
+        std::vector<std::string> strings; // ratings, then icons
         std::vector<char*> ratings;
         std::vector<char*> icons;
     };
 
     Device();
     void addScheme(const Configuration::RatingScheme& scheme);
-    void answerDrm(std::string messageId, std::string message, TELIX_DRM_RESULT_CODE_ENUM_T result);
+    void reportDrmResult(std::string messageId, std::string message, TELIX_DRM_RESULT_CODE_ENUM_T result);
 
     Platform& m_platform;
     std::optional<Capabilities> m_capabilities;
-    std::deque<SchemeTexts> m_schemeTexts; // none moves
+    std::deque<SchemeStrings> m_schemeStrings; // a deque, so that none moves
     std::vector<PARENTALRATTINGSCHEME_STRUCT_T_TAG> m_schemeRecords;
 
-    // Under the platform's mutex.
+    // Guarded by the platform's mutex.
     uint32_t m_freeMemory;
     uint32_t m_keySet;
-    uint64_t m_lastDrmMessage = 0;
+    uint64_t m_lastDrmMessage = 0; // number of messages so far
 };
 
 } // namespace desktop

@@ -1,7 +1,5 @@
-// Finding the socket, and one exchange through it.
+// Finding the socket, and one request through it.
 #include "desktop/telixctl/Television.h"
-
-#include "desktop/platform/ControlSocket.h"
 
 #include <cerrno>
 #include <glib.h>
@@ -9,22 +7,60 @@
 #include <sys/time.h>
 #include <unistd.h>
 
-using namespace desktop;
+#include "desktop/platform/ControlSocket.h"
 
-std::optional<std::string> findTelevision(const Choice& choice, std::string& error) {
-    if (!choice.socket.empty()) {
-        return choice.socket;
+namespace desktop {
+
+namespace {
+
+constexpr time_t kResponseTimeout = 10; // seconds
+
+// A connected socket; negative, with the reason in `error`, if the connection fails.
+int connectTo(const std::string& path, std::string& error) {
+    const auto address = socketAddress(path);
+    if (!address) {
+        error = path + ": the path is too long for a socket";
+        return -1;
     }
-    const char* named = g_getenv("TELIX_SOCKET");
-    if (choice.pid == 0 && named && *named) {
-        return named;
+    const int connection = ::socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0);
+    const timeval timeout{kResponseTimeout, 0};
+    setsockopt(connection, SOL_SOCKET, SO_RCVTIMEO, &timeout, sizeof(timeout));
+    setsockopt(connection, SOL_SOCKET, SO_SNDTIMEO, &timeout, sizeof(timeout));
+    if (connect(connection, reinterpret_cast<const sockaddr*>(&*address), sizeof(*address)) != 0) {
+        error = path + ": cannot connect to a television: " + g_strerror(errno);
+        close(connection);
+        return -1;
+    }
+    return connection;
+}
+
+// After an error the rest is not sent: the response says why the television has stopped reading.
+void sendAll(int connection, std::string bytes) {
+    while (!bytes.empty()) {
+        const ssize_t size = send(connection, bytes.data(), bytes.size(), MSG_NOSIGNAL);
+        if (size < 0) {
+            return;
+        }
+        bytes.erase(0, static_cast<size_t>(size));
+    }
+}
+
+} // namespace
+
+std::optional<std::string> findTelevision(const std::string& socket, pid_t pid, std::string& error) {
+    if (!socket.empty()) {
+        return socket;
+    }
+    const char* variable = g_getenv("TELIX_SOCKET");
+    if (pid == 0 && variable && *variable) {
+        return variable;
     }
     const std::string folder = controlFolder(error);
     if (folder.empty()) {
         return std::nullopt;
     }
-    if (choice.pid != 0) {
-        return controlSocketPath(folder, choice.pid);
+    if (pid != 0) {
+        return controlSocketPath(folder, pid);
     }
     const auto running = runningTelevisions(folder);
     if (running.size() == 1) {
@@ -32,7 +68,7 @@ std::optional<std::string> findTelevision(const Choice& choice, std::string& err
     }
     error = "no television is running";
     if (!running.empty()) {
-        error = "several televisions are running; say which one: --pid";
+        error = "several televisions are running: choose one with --pid:";
         for (const ControlSocket& each : running) {
             error += " " + std::to_string(each.pid);
         }
@@ -40,41 +76,27 @@ std::optional<std::string> findTelevision(const Choice& choice, std::string& err
     return std::nullopt;
 }
 
-std::optional<std::string> ask(const std::string& socket, const std::string& request, std::string& error) {
-    constexpr int longestWait = 10; // seconds
-    const auto address = socketAddress(socket);
-    if (!address) {
-        error = socket + ": the name is too long";
+std::optional<std::string> sendRequest(const std::string& socket, const std::string& request,
+                                       std::string& error) {
+    const int connection = connectTo(socket, error);
+    if (connection < 0) {
         return std::nullopt;
     }
-    const int connection = ::socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0);
-    const timeval limit{longestWait, 0};
-    setsockopt(connection, SOL_SOCKET, SO_RCVTIMEO, &limit, sizeof(limit));
-    setsockopt(connection, SOL_SOCKET, SO_SNDTIMEO, &limit, sizeof(limit));
-    std::string line = request + "\n";
-    std::string answer;
-    if (connect(connection, reinterpret_cast<const sockaddr*>(&*address), sizeof(*address)) != 0) {
-        error = std::string("no television at ") + socket + ": " + g_strerror(errno);
-    } else {
-        while (!line.empty()) {
-            const ssize_t size = send(connection, line.data(), line.size(), MSG_NOSIGNAL);
-            if (size < 0) {
-                break; // what it has answered tells why
-            }
-            line.erase(0, static_cast<size_t>(size));
+    sendAll(connection, request + "\n");
+    std::string response;
+    while (response.find('\n') == std::string::npos) {
+        char buffer[4096];
+        const ssize_t size = recv(connection, buffer, sizeof(buffer), 0);
+        if (size <= 0) {
+            error = socket + (size < 0 && errno == EAGAIN ? ": the television does not respond"
+                                                          : ": the television has closed the connection");
+            break;
         }
-        char piece[4096];
-        while (answer.find('\n') == std::string::npos) {
-            const ssize_t size = recv(connection, piece, sizeof(piece), 0);
-            if (size <= 0) {
-                error = size < 0 && errno == EAGAIN ? "the television does not answer"
-                                                    : "the television has closed the connection";
-                break;
-            }
-            answer.append(piece, static_cast<size_t>(size));
-        }
+        response.append(buffer, static_cast<size_t>(size));
     }
     close(connection);
-    const size_t end = answer.find('\n');
-    return end == std::string::npos ? std::nullopt : std::optional(answer.substr(0, end));
+    const size_t end = response.find('\n');
+    return end == std::string::npos ? std::nullopt : std::optional(response.substr(0, end));
 }
+
+} // namespace desktop

@@ -1,22 +1,23 @@
-// The other end: a running television's control socket.
-#ifndef TELIX_DESKTOP_TELEVISION_H
-#define TELIX_DESKTOP_TELEVISION_H
+// A running television at the other end of its control socket.
+#ifndef TELIX_DESKTOP_TELIXCTL_TELEVISION_H
+#define TELIX_DESKTOP_TELIXCTL_TELEVISION_H
 
 #include <optional>
 #include <string>
 #include <sys/types.h>
 
-// Which television is meant; if nothing says so, the only one that runs.
-struct Choice {
-    std::string socket; // a path, empty if none is named
-    pid_t pid = 0;      // 0 if none is named
-};
+namespace desktop {
 
-// The socket that is meant; nothing, with the reason in `error`, if there is none or more than one.
-std::optional<std::string> findTelevision(const Choice& choice, std::string& error);
+// The control socket given by a path or a process id; without either by TELIX_SOCKET, else that of the only
+// television of this user. Empty and 0 mean not given. Nothing, with the reason in `error`, if no or more
+// than one television is running.
+std::optional<std::string> findTelevision(const std::string& socket, pid_t pid, std::string& error);
 
-// Sends one request and gives the answer, both without the end of the line; nothing, with the reason in
-// `error`, if there is no answer within ten seconds.
-std::optional<std::string> ask(const std::string& socket, const std::string& request, std::string& error);
+// Sends one request and returns the response, both without the end of the line. Nothing, with the reason in
+// `error`, if no response arrives within ten seconds.
+std::optional<std::string> sendRequest(const std::string& socket, const std::string& request,
+                                       std::string& error);
+
+} // namespace desktop
 
 #endif

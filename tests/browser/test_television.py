@@ -202,11 +202,11 @@ class Broadcast(OnTheDesk):
 
     def test_sound_of_another_language_is_heard_when_it_is_selected(self):
         self.tune('Telix One')
-        self.wait_for_state('heardAudio', GERMAN_SOUND)
+        self.wait_for_state('activeAudioPid', GERMAN_SOUND)
         self.assertEqual(self.value('active(1)'), ['deu'])
         for language, pid in (('eng', ENGLISH_SOUND), ('deu', GERMAN_SOUND)):
             self.value(f'tv.selectComponent(component(1, "{language}"))')
-            self.wait_for_state('heardAudio', pid)
+            self.wait_for_state('activeAudioPid', pid)
             self.assertEqual(self.value('active(1)'), [language])
 
     def letters(self):
@@ -224,14 +224,14 @@ class Broadcast(OnTheDesk):
     def test_subtitles_are_on_the_screen_while_they_are_selected(self):
         self.tune('Telix Three')
         self.wait(lambda: self.patterns() == ['Telix Three'], self.patterns)
-        self.assertEqual((self.value('active(2)'), self.state()['shownSubtitle']), ([], None))
+        self.assertEqual((self.value('active(2)'), self.state()['activeSubtitlePid']), ([], None))
         self.assert_no_subtitles()
         self.value('tv.selectComponent(component(2, "deu"))')
-        self.wait_for_state('shownSubtitle', GERMAN_SUBTITLES)
+        self.wait_for_state('activeSubtitlePid', GERMAN_SUBTITLES)
         self.assertEqual(self.value('active(2)'), ['deu'])
         self.wait(lambda: self.letters() > 100, 'no subtitles')
         self.value('tv.unselectComponent(component(2, "deu"))')
-        self.wait_for_state('shownSubtitle', None)
+        self.wait_for_state('activeSubtitlePid', None)
         self.wait(lambda: self.letters() == 0, 'subtitles')
         self.assert_no_subtitles()
 

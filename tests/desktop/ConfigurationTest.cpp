@@ -1,9 +1,13 @@
-// The configuration file: what it sets, and how it says what is wrong with it.
-#include "desktop/platform/Configuration.h"
-
+// The configuration file: settings, their defaults, and error messages.
 #include <fstream>
+#include <glib.h>
+#include <gmock/gmock.h>
 #include <gtest/gtest.h>
+#include <set>
 #include <unistd.h>
+
+#include "desktop/platform/Configuration.h"
+#include "desktop/platform/Settings.h"
 
 using namespace desktop;
 
@@ -11,8 +15,8 @@ namespace {
 
 class ConfigurationTest : public testing::Test {
 protected:
-    std::optional<Configuration::Error> load(const std::string& text) {
-        std::ofstream(m_file) << text;
+    std::optional<Configuration::Error> load(const std::string& contents) {
+        std::ofstream(m_file) << contents;
         return Configuration::load(m_file, m_configuration);
     }
     void TearDown() override { std::remove(m_file.c_str()); }
@@ -33,7 +37,7 @@ TEST_F(ConfigurationTest, SetsWhatItNamesAndLeavesTheRestAtItsDefaults) {
     EXPECT_EQ(m_configuration.sources[1].path, "/films/a.ts");
     EXPECT_FALSE(m_configuration.sources[1].service);
     EXPECT_EQ(m_configuration.sources[2].path,
-              m_file.substr(0, m_file.rfind('/')) + "/music"); // beside the file
+              m_file.substr(0, m_file.rfind('/')) + "/music"); // in the folder of the file
     EXPECT_EQ(m_configuration.sources[2].service, 7);
 }
 
@@ -42,7 +46,7 @@ TEST_F(ConfigurationTest, KnowsRatingSchemesDrmSystemsAndKeys) {
                             "[parental-scheme games]\nratings=3;18\n"
                             "[drm urn:dvb:casystemid:1]\nresult=4\nmessage=no; not now\n[drm other]\n"
                             "[set]\nkey-set=red;alpha\nkeys=red;blue;vcr\n");
-    ASSERT_FALSE(error) << error->text();
+    ASSERT_FALSE(error) << error->message();
     ASSERT_EQ(m_configuration.ratingSchemes.size(), 2U);
     const Configuration::RatingScheme& films = m_configuration.ratingSchemes[0];
     EXPECT_EQ(films.name, "films");
@@ -50,7 +54,7 @@ TEST_F(ConfigurationTest, KnowsRatingSchemesDrmSystemsAndKeys) {
     EXPECT_EQ(films.icons, (std::vector<std::string>{"", "pg.png", ""}));
     EXPECT_EQ(films.threshold, 1U);
     EXPECT_EQ(m_configuration.ratingSchemes[1].icons, (std::vector<std::string>{"", ""}));
-    EXPECT_EQ(m_configuration.ratingSchemes[1].threshold, 1U); // the highest: nothing is kept away
+    EXPECT_EQ(m_configuration.ratingSchemes[1].threshold, 1U); // the last rating
     ASSERT_EQ(m_configuration.drmSystems.size(), 2U);
     EXPECT_EQ(m_configuration.drmSystems[0].id, "urn:dvb:casystemid:1");
     EXPECT_EQ(m_configuration.drmSystems[0].result, 4);
@@ -58,12 +62,12 @@ TEST_F(ConfigurationTest, KnowsRatingSchemesDrmSystemsAndKeys) {
     EXPECT_EQ(m_configuration.drmSystems[1].id, "other");
     EXPECT_EQ(m_configuration.drmSystems[1].result, 0);
     EXPECT_EQ(m_configuration.keys, 0x29U);
-    EXPECT_EQ(m_configuration.keySet, 0x1U); // no letters on this remote control
+    EXPECT_EQ(m_configuration.keySet, 0x1U); // the remote control has no letters
 }
 
 TEST_F(ConfigurationTest, NamesFileLineAndReasonOfEveryFault) {
     const struct {
-        const char* text;
+        const char* contents;
         unsigned int line;
         const char* reason;
     } faults[] = {
@@ -76,10 +80,10 @@ TEST_F(ConfigurationTest, NamesFileLineAndReasonOfEveryFault) {
         {"[test]\nprogramme-seconds=1\n", 2, "programme-seconds"},
         {"[set]\nfree-memory=4294967296\n", 2, "free-memory"},
         {"[channels]\nsources= ; \n", 2, "no channel source is given"},
-        {"[channels]\nsources=a.ts#0\n", 2, "service of \"a.ts#0\""},
+        {"[channels]\nsources=a.ts#0\n", 2, "service id of \"a.ts#0\""},
         {"[parental-scheme films]\n", 1, "the scheme has no ratings"},
         {"\n[parental-scheme dvb-si]\nratings=1\n", 2, "the scheme dvb-si is built in"},
-        {"[parental-scheme films]\nthreshold=X\nratings=G;PG\n", 2, "\"X\" is none of the ratings"},
+        {"[parental-scheme films]\nthreshold=X\nratings=G;PG\n", 2, "\"X\" is not one of the ratings"},
         {"[parental-scheme films]\nratings=G;;PG\n", 2, "a rating has no name"},
         {"[parental-scheme films]\nratings=G;PG;G\n", 2, "\"G\" is given twice"},
         {"[parental-scheme films]\nratings=G;PG\nicons=a;b;c\n", 3, "icons: 3 for 2 ratings"},
@@ -89,15 +93,15 @@ TEST_F(ConfigurationTest, NamesFileLineAndReasonOfEveryFault) {
         {"[drm a]\nresult=-1\n", 2, "result"},
         {"[drm a]\nanswer=1\n", 2, "unknown key \"answer\""},
         {"[drm a]\n[drm  a]\n", 2, "given twice"},
-        {"[set]\nkeys=red;pink\n", 2, "\"pink\" is no group of keys"},
+        {"[set]\nkeys=red;pink\n", 2, "\"pink\" is not a group of keys"},
         {"[set]\ncapabilities=missing.xml\n", 2, "missing.xml"},
     };
     for (const auto& fault : faults) {
-        const auto error = load(fault.text);
-        ASSERT_TRUE(error) << fault.text;
-        EXPECT_EQ(error->line, fault.line) << fault.text;
+        const auto error = load(fault.contents);
+        ASSERT_TRUE(error) << fault.contents;
+        EXPECT_EQ(error->line, fault.line) << fault.contents;
         EXPECT_NE(error->reason.find(fault.reason), std::string::npos) << error->reason;
-        EXPECT_EQ(error->text(), m_file + ":" + std::to_string(fault.line) + ": " + error->reason);
+        EXPECT_EQ(error->message(), m_file + ":" + std::to_string(fault.line) + ": " + error->reason);
         EXPECT_EQ(m_configuration.country, Configuration().country);
     }
     const auto error = Configuration::load(m_file + ".missing", m_configuration);
@@ -111,13 +115,75 @@ TEST_F(ConfigurationTest, ChecksTheDocumentOfTheCapabilities) {
     const std::string setting = "[set]\ncapabilities=" + document.substr(document.rfind('/') + 1) + "\n";
     std::ofstream(document) << "<profilelist/>";
     EXPECT_FALSE(load(setting));
-    EXPECT_EQ(m_configuration.capabilitiesFile, document); // beside the file
+    EXPECT_EQ(m_configuration.capabilitiesFile, document); // in the folder of the file
     std::ofstream(document) << "<profilelist><open></profilelist>";
     const auto error = load(setting);
     ASSERT_TRUE(error);
     EXPECT_EQ(error->line, 2U);
     EXPECT_NE(error->reason.find(document), std::string::npos) << error->reason;
     std::remove(document.c_str());
+}
+
+TEST_F(ConfigurationTest, HasTheDefaultsOfTheTableWithoutAFile) {
+    const Configuration defaults;
+    ASSERT_EQ(defaults.sources.size(), 1U);
+    EXPECT_EQ(defaults.sources[0].path, "");
+    EXPECT_EQ(defaults.programmeSeconds, 300U);
+    EXPECT_EQ(defaults.streamEventSeconds, 10U);
+    EXPECT_EQ(defaults.country, "DEU");
+    EXPECT_EQ(defaults.audioLanguage, "deu");
+    EXPECT_EQ(defaults.subtitleLanguage, "deu");
+    EXPECT_EQ(defaults.ratingThreshold, 16U);
+    EXPECT_TRUE(defaults.ratingSchemes.empty());
+    EXPECT_TRUE(defaults.drmSystems.empty());
+    EXPECT_EQ(defaults.freeMemory, 64U * 1024 * 1024);
+    EXPECT_EQ(defaults.keys, 0x3FFU);
+    EXPECT_EQ(defaults.keySet, 0x1FU);
+    EXPECT_EQ(defaults.capabilitiesFile, "");
+    EXPECT_EQ(defaults.extraSdVideoDecodes, 1U);
+    EXPECT_EQ(defaults.extraHdVideoDecodes, 0U);
+}
+
+TEST_F(ConfigurationTest, ReadsEverySettingOfTheTableFromItsSection) {
+    std::set<std::string> read;
+    for (const Setting& setting : settings()) {
+        const std::string value = setting.defaultValue ? setting.defaultValue : "a;b";
+        std::string contents = std::string("[") + setting.section + "]\n" + setting.key + "=" + value + "\n";
+        if (setting.section == std::string(kSchemeSection) && setting.defaultValue) {
+            contents += "ratings=a;b\n";
+        }
+        const auto error = load(contents);
+        EXPECT_FALSE(error) << error->message();
+        EXPECT_TRUE(read.insert(std::string(setting.section) + "/" + setting.key).second) << setting.key;
+    }
+}
+
+// A row of a Markdown table; the section is named in its first row only.
+std::string settingRow(const Setting& setting, bool isFirst) {
+    const std::string value = setting.defaultValue ? setting.defaultValue : "";
+    const std::string defaultCell = !setting.defaultValue ? "required"
+                                    : value.empty()       ? "empty"
+                                                          : "`" + value + "`";
+    return std::string("| ") + (isFirst ? std::string("`[") + setting.section + "]` " : "") + "| `" +
+           setting.key + "` | " + setting.reader.accepts + " | " + defaultCell + " | " + setting.meaning +
+           " |\n";
+}
+
+TEST_F(ConfigurationTest, IsDocumentedAsTheTableStatesIt) {
+    const char* folder = g_getenv("TELIX_DOCS");
+    ASSERT_NE(folder, nullptr);
+    std::ifstream file(std::string(folder) + "/television.md");
+    const std::string document((std::istreambuf_iterator<char>(file)), std::istreambuf_iterator<char>());
+    std::string table = "| Group | Key | Values | Default | Meaning |\n|---|---|---|---|---|\n";
+    std::string section;
+    for (const Setting& setting : settings()) {
+        table += settingRow(setting, setting.section != section);
+        section = setting.section;
+    }
+    EXPECT_THAT(document, testing::HasSubstr("\n" + table + "\n"));
+    for (const KeyGroup& group : keyGroups()) {
+        EXPECT_THAT(document, testing::HasSubstr(std::string("`") + group.name + "`"));
+    }
 }
 
 } // namespace

@@ -1,27 +1,27 @@
-// The set itself through the calls of the plug-in: settings, keys, memory, capabilities, rating schemes, DRM.
-#include "desktop/platform/Device.h"
-#include "tests/desktop/Received.h"
-
+// The device through the platform calls: preferences, keys, memory, capabilities, rating schemes, DRM.
 #include <atomic>
 #include <cstdlib>
 #include <gtest/gtest.h>
 #include <set>
+
+#include "desktop/platform/Device.h"
+#include "tests/desktop/Received.h"
 
 using namespace desktop;
 using testing::Test;
 
 namespace {
 
-struct Answer {
+struct DrmResult {
     std::string id;
     std::string message;
     int32_t result;
 };
 
-Received<Answer> answers;
+Received<DrmResult> results;
 
-TELIX_RETCODE_ENUM_T onAnswer(___UINT8* id, ___UINT8* message, TELIX_DRM_RESULT_CODE_ENUM_T result) {
-    return answers.add({reinterpret_cast<char*>(id), reinterpret_cast<char*>(message), result});
+TELIX_RETCODE_ENUM_T onDrmResult(___UINT8* id, ___UINT8* message, TELIX_DRM_RESULT_CODE_ENUM_T result) {
+    return results.add({reinterpret_cast<char*>(id), reinterpret_cast<char*>(message), result});
 }
 
 std::atomic<int> lowMemoryCalls{0};
@@ -31,13 +31,13 @@ TELIX_RETCODE_ENUM_T onLowMemory() {
     return 0;
 }
 
-std::string send(const std::string& system) {
+std::string sendDrmMessage(const std::string& system) {
     char* id = nullptr;
     EXPECT_EQ(TELIX_JS_DRM_SendDRMMessage("application/x-any", "<any/>", system.c_str(), &id), 0);
     return textOf(id);
 }
 
-bool has(const char* profile) {
+bool hasProfile(const char* profile) {
     ___UINT8 supported = 0;
     EXPECT_EQ(TELIX_JS_CAP_HasCapability(profile, &supported), 0);
     return supported != 0;
@@ -65,7 +65,7 @@ TEST(DeviceTest, GrantsOnlyTheKeysThatTheRemoteControlHas) {
     EXPECT_EQ(mask, 0x11U);
     uint32_t granted = 0xDEAD;
     ASSERT_EQ(TELIX_JS_APP_SetKeySetValue(0xFFFFFFFF, &granted), 0);
-    EXPECT_EQ(granted, 0x1BFU); // no scroll keys, no letters
+    EXPECT_EQ(granted, 0x1BFU); // the remote control has no scroll keys and no letters
     ASSERT_EQ(TELIX_JS_APP_GetKeySetValue(&mask), 0);
     EXPECT_EQ(mask, 0x1BFU);
     ASSERT_EQ(TELIX_JS_APP_SetKeySetValue(0, &granted), 0);
@@ -77,7 +77,7 @@ TEST(DeviceTest, TellsOfFreeMemoryAndOfItsShortage) {
     ASSERT_EQ(TELIX_JS_APP_GetFreeMem(&amount), 0);
     EXPECT_EQ(amount, 123456U);
     Device& device = Device::instance();
-    EXPECT_FALSE(device.injectLowMemory()); // nobody asked
+    EXPECT_FALSE(device.injectLowMemory()); // no listener is registered
     TELIX_JS_APP_RegisterLowMemory(onLowMemory);
     EXPECT_TRUE(device.injectLowMemory());
     EXPECT_TRUE(waitUntil([] { return lowMemoryCalls == 1; }));
@@ -98,17 +98,17 @@ TEST(DeviceTest, DescribesItselfInAProfileList) {
               std::string::npos);
     EXPECT_NE(document.find("<drm DRMSystemID=\"urn:dvb:casystemid:2\">"), std::string::npos);
 
-    EXPECT_TRUE(has("OITF_HD_UIPROF"));
-    EXPECT_TRUE(has("OITF_HD_UIPROF+DVB_S+META_SI")); // in any order
-    EXPECT_TRUE(has("+TRICKMODE"));
-    EXPECT_TRUE(has("+DRM"));
-    EXPECT_TRUE(has("MP4_AVC_HD_25_HEAAC"));
-    EXPECT_FALSE(has("+PVR"));
-    EXPECT_FALSE(has("OITF_HD_UIPROF+PVR"));
-    EXPECT_FALSE(has("OITF_SDEU_UIPROF"));
-    EXPECT_FALSE(has("OITF_HD"));
-    EXPECT_FALSE(has("+"));
-    EXPECT_FALSE(has("MP4_AVC"));
+    EXPECT_TRUE(hasProfile("OITF_HD_UIPROF"));
+    EXPECT_TRUE(hasProfile("OITF_HD_UIPROF+DVB_S+META_SI")); // in any order
+    EXPECT_TRUE(hasProfile("+TRICKMODE"));
+    EXPECT_TRUE(hasProfile("+DRM"));
+    EXPECT_TRUE(hasProfile("MP4_AVC_HD_25_HEAAC"));
+    EXPECT_FALSE(hasProfile("+PVR"));
+    EXPECT_FALSE(hasProfile("OITF_HD_UIPROF+PVR"));
+    EXPECT_FALSE(hasProfile("OITF_SDEU_UIPROF"));
+    EXPECT_FALSE(hasProfile("OITF_HD"));
+    EXPECT_FALSE(hasProfile("+"));
+    EXPECT_FALSE(hasProfile("MP4_AVC"));
 
     uint32_t count = 77;
     ASSERT_EQ(TELIX_JS_CAP_GetExtraSDVideoDecodes(&count), 0);
@@ -125,11 +125,11 @@ TEST(DeviceTest, ReadsTheProfilesOfADocument) {
                                           "<o:other name=\"W\"/></o:profilelist>",
                                           error);
     ASSERT_TRUE(read) << error;
-    EXPECT_TRUE(read->has("A+C"));
-    EXPECT_TRUE(read->has("+E"));
-    EXPECT_TRUE(read->has("V"));
-    EXPECT_FALSE(read->has("A+E")); // of two profiles
-    EXPECT_FALSE(read->has("W"));
+    EXPECT_TRUE(read->hasProfile("A+C"));
+    EXPECT_TRUE(read->hasProfile("+E"));
+    EXPECT_TRUE(read->hasProfile("V"));
+    EXPECT_FALSE(read->hasProfile("A+E")); // of two profiles
+    EXPECT_FALSE(read->hasProfile("W"));
     for (const char* document : {"", "<profilelist>", "<profilelist></other>", "<capabilities/>", "plain"}) {
         error.clear();
         EXPECT_FALSE(Capabilities::parse(document, error)) << document;
@@ -161,21 +161,21 @@ TEST(DeviceTest, ListsItsRatingSchemesWithThresholds) {
     EXPECT_EQ(threshold, 12);
     ASSERT_EQ(TELIX_JS_SI_PARENTALRATINGSCHEME_GetThreshold(schemes[1].handle, &threshold), 0);
     EXPECT_EQ(threshold, 1); // PG
-    for (const uint32_t nonsense : {0U, schemes[1].handle + 1, 0xFFFFFFFFU}) {
+    for (const uint32_t unknown : {0U, schemes[1].handle + 1, 0xFFFFFFFFU}) {
         threshold = 4711;
-        EXPECT_NE(TELIX_JS_SI_PARENTALRATINGSCHEME_GetThreshold(nonsense, &threshold), 0);
+        EXPECT_NE(TELIX_JS_SI_PARENTALRATINGSCHEME_GetThreshold(unknown, &threshold), 0);
         EXPECT_EQ(threshold, 4711);
     }
 }
 
 TEST(DeviceTest, AnswersDrmMessagesAsConfiguredUnderTheirIdsInTheirOrder) {
-    TELIX_JS_DRM_RegisterOnDRMMessageResult(onAnswer);
-    const std::string first = send("urn:dvb:casystemid:1");
-    const std::string second = send("urn:dvb:casystemid:2");
-    const std::string third = send("urn:dvb:casystemid:3");
+    TELIX_JS_DRM_RegisterOnDRMMessageResult(onDrmResult);
+    const std::string first = sendDrmMessage("urn:dvb:casystemid:1");
+    const std::string second = sendDrmMessage("urn:dvb:casystemid:2");
+    const std::string third = sendDrmMessage("urn:dvb:casystemid:3");
     EXPECT_EQ((std::set<std::string>{first, second, third, ""}).size(), 4U);
-    ASSERT_TRUE(waitUntil([] { return answers.all().size() == 3; }));
-    const std::vector<Answer> all = answers.all();
+    ASSERT_TRUE(waitUntil([] { return results.all().size() == 3; }));
+    const std::vector<DrmResult> all = results.all();
     EXPECT_EQ(all[0].id, first);
     EXPECT_EQ(all[0].message, "granted");
     EXPECT_EQ(all[0].result, 0);
@@ -183,27 +183,27 @@ TEST(DeviceTest, AnswersDrmMessagesAsConfiguredUnderTheirIdsInTheirOrder) {
     EXPECT_EQ(all[1].message, "ask the viewer: \"may it?\"");
     EXPECT_EQ(all[1].result, 4);
     EXPECT_EQ(all[2].id, third);
-    EXPECT_EQ(all[2].result, drmUnknownSystem);
-    EXPECT_EQ(answers.threads().count(std::this_thread::get_id()), 0U);
+    EXPECT_EQ(all[2].result, kDrmUnknownSystem);
+    EXPECT_EQ(results.threads().count(std::this_thread::get_id()), 0U);
     EXPECT_EQ(Device::instance().lastDrmMessage(), third);
-    TELIX_JS_DRM_UnregisterOnDRMMessageResult(onAnswer);
+    TELIX_JS_DRM_UnregisterOnDRMMessageResult(onDrmResult);
 }
 
 TEST(DeviceTest, AnswersOnceAsLongAsOneOfSeveralAgentsIsLeft) {
-    TELIX_JS_DRM_RegisterOnDRMMessageResult(onAnswer);
-    TELIX_JS_DRM_RegisterOnDRMMessageResult(onAnswer);
-    TELIX_JS_DRM_UnregisterOnDRMMessageResult(onAnswer);
-    send("urn:dvb:casystemid:1");
-    ASSERT_TRUE(waitUntil([] { return !answers.all().empty(); }));
-    TELIX_JS_DRM_UnregisterOnDRMMessageResult(onAnswer);
-    send("urn:dvb:casystemid:1");
+    TELIX_JS_DRM_RegisterOnDRMMessageResult(onDrmResult);
+    TELIX_JS_DRM_RegisterOnDRMMessageResult(onDrmResult);
+    TELIX_JS_DRM_UnregisterOnDRMMessageResult(onDrmResult);
+    sendDrmMessage("urn:dvb:casystemid:1");
+    ASSERT_TRUE(waitUntil([] { return !results.all().empty(); }));
+    TELIX_JS_DRM_UnregisterOnDRMMessageResult(onDrmResult);
+    sendDrmMessage("urn:dvb:casystemid:1");
     EXPECT_FALSE(Device::instance().injectDrmResult("any", "text", 0));
-    // The answer would come before anything that is posted behind it.
-    std::atomic<bool> isPast{false};
-    Platform::instance().post([&] { isPast = true; });
-    ASSERT_TRUE(waitUntil([&] { return isPast.load(); }));
-    EXPECT_EQ(answers.all().size(), 1U);
-    TELIX_JS_DRM_UnregisterOnDRMMessageResult(onAnswer); // one too many does no harm
+    // The result would come before anything that is posted after it.
+    std::atomic<bool> isReached{false};
+    Platform::instance().post([&] { isReached = true; });
+    ASSERT_TRUE(waitUntil([&] { return isReached.load(); }));
+    EXPECT_EQ(results.all().size(), 1U);
+    TELIX_JS_DRM_UnregisterOnDRMMessageResult(onDrmResult); // one too many is harmless
 }
 
 TEST(DeviceTest, HasNoChannelHandleByValue) {
