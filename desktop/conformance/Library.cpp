@@ -1,7 +1,8 @@
-// Opening a library and looking its functions up.
 #include "desktop/conformance/Library.h"
 
 #include <dlfcn.h>
+
+namespace desktop {
 
 bool Library::open(const std::string& file, std::string& error) {
     void* library = dlopen(file.c_str(), RTLD_LAZY | RTLD_LOCAL);
@@ -17,3 +18,5 @@ bool Library::open(const std::string& file, std::string& error) {
 #include "telix/telix_platform_calls.h"
     return true;
 }
+
+} // namespace desktop
