@@ -1,4 +1,4 @@
-"""What telixctl provokes in a television reaches the page: telix-tv, the plug-in and the desk's platform library."""
+"""Events sent with telixctl reach the page: telix-tv, the plug-in and the desktop's platform library."""
 
 import os
 import threading
@@ -16,7 +16,7 @@ class Control(unittest.TestCase):
             self.television.start('--plugin', os.environ['TELIX_DESK_PLUGIN'], PAGE))
         self.addCleanup(self.process.kill)
         self.lines = []
-        self.came = threading.Condition()
+        self.changed = threading.Condition()
         threading.Thread(target=self.read, daemon=True).start()
 
     def enterContext(self, context):  # Python has it from 3.11 on
@@ -26,14 +26,14 @@ class Control(unittest.TestCase):
 
     def read(self):
         for line in self.process.stderr:
-            with self.came:
+            with self.changed:
                 self.lines.append(line.rstrip('\n'))
-                self.came.notify_all()
+                self.changed.notify_all()
 
     def wait_for(self, note):
-        """Waits until the page has noted it."""
-        with self.came:
-            self.assertTrue(self.came.wait_for(lambda: any(line.endswith(': ' + note) for line in self.lines),
+        """Waits until the page has logged it."""
+        with self.changed:
+            self.assertTrue(self.changed.wait_for(lambda: any(line.endswith(': ' + note) for line in self.lines),
                                                RUN_LIMIT / 4), f'no "{note}" in {self.lines}')
 
     def test_events_reach_the_page(self):

@@ -1,4 +1,4 @@
-// A platform library with one fault of each kind, for the tests of telix-conformance. Whatever is not here is
+// A platform library with one fault of each kind, for the tests of telix-conformance. All other functions are
 // missing.
 #include "telix/telix_platform.h"
 
@@ -15,37 +15,37 @@ TELIX_JS_DRM_MESSAGE_RESULT_CB drmCallback = nullptr;
 
 } // namespace
 
-// The same block at each call.
-TELIX_RETCODE_ENUM_T TELIX_JS_APP_Config_GetPreferredAudioLanguage(char** text) {
-    *text = language;
+// Returns the same block at each call.
+TELIX_RETCODE_ENUM_T TELIX_JS_APP_Config_GetPreferredAudioLanguage(char** string) {
+    *string = language;
     return TELIX_RETCODE_SUCCESS;
 }
 
-TELIX_RETCODE_ENUM_T TELIX_JS_APP_Config_GetCountryId(char** text) {
-    *text = strdup("Germany");
+TELIX_RETCODE_ENUM_T TELIX_JS_APP_Config_GetCountryId(char** string) {
+    *string = strdup("Germany");
     return TELIX_RETCODE_SUCCESS;
 }
 
-// Refuses, but writes.
+// Refuses, but changes its output.
 TELIX_RETCODE_ENUM_T TELIX_JS_APP_GetFreeMem(uint32_t* amount) {
     *amount = 7;
     return 1;
 }
 
-// Good.
+// Correct.
 TELIX_RETCODE_ENUM_T TELIX_JS_APP_GetKeySetValue(uint32_t* mask) {
     *mask = 0x1F;
     return TELIX_RETCODE_SUCCESS;
 }
 
-// Never writes.
+// Never writes its output.
 TELIX_RETCODE_ENUM_T TELIX_JS_APP_SetKeySetValue(uint32_t mask, uint32_t* granted) {
     (void)mask;
     (void)granted;
     return TELIX_RETCODE_SUCCESS;
 }
 
-// No XML.
+// Not well-formed.
 TELIX_RETCODE_ENUM_T TELIX_JS_CAP_GetXmlCapabilities(char** xml) {
     *xml = strdup("<profilelist>");
     return TELIX_RETCODE_SUCCESS;
@@ -58,7 +58,7 @@ TELIX_RETCODE_ENUM_T TELIX_JS_CM_GetChannelList(uint32_t* count, TELIX_JS_CM_HAN
     return TELIX_RETCODE_SUCCESS;
 }
 
-// Takes any channel.
+// Accepts any handle.
 TELIX_RETCODE_ENUM_T TELIX_JS_CM_GetSid(TELIX_JS_CM_HANDLE channel, uint32_t* sid) {
     *sid = channel;
     return TELIX_RETCODE_SUCCESS;
@@ -73,7 +73,7 @@ TELIX_JS_SI_PARENTALCONTROL_GetParentalRatingSchemes(uint32_t* count,
     std::abort();
 }
 
-// The same handle for all.
+// Returns the same handle for all objects.
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_GetHandle(TELIX_JS_VB_HANDLE* object) {
     *object = 1;
     return TELIX_RETCODE_SUCCESS;
@@ -101,7 +101,7 @@ TELIX_RETCODE_ENUM_T TELIX_JS_DRM_RegisterOnDRMMessageResult(TELIX_JS_DRM_MESSAG
     return TELIX_RETCODE_SUCCESS;
 }
 
-// Does nothing: answers go on.
+// Does nothing: results are still reported.
 TELIX_RETCODE_ENUM_T TELIX_JS_DRM_UnregisterOnDRMMessageResult(TELIX_JS_DRM_MESSAGE_RESULT_CB callback) {
     (void)callback;
     return TELIX_RETCODE_SUCCESS;
@@ -116,9 +116,9 @@ TELIX_RETCODE_ENUM_T TELIX_JS_DRM_SendDRMMessage(const char* messageType, const 
     char id[16] = "m";
     id[1] = static_cast<char>('a' + last++);
     *messageId = strdup(id);
-    std::thread([answered = std::string(id)]() mutable {
-        char text[] = "";
-        drmCallback(reinterpret_cast<___UINT8*>(answered.data()), reinterpret_cast<___UINT8*>(text), 0);
+    std::thread([reported = std::string(id)]() mutable {
+        char message[] = "";
+        drmCallback(reinterpret_cast<___UINT8*>(reported.data()), reinterpret_cast<___UINT8*>(message), 0);
     }).detach();
     return TELIX_RETCODE_SUCCESS;
 }

@@ -1,6 +1,6 @@
 // A television without a window, for the tests of telixctl: loads a platform library as the plug-in does,
-// listens to everything, tunes to the first channel, and says on standard output what comes, line by line.
-// Ends with its input.
+// registers all callbacks, tunes to the first channel or plays media, and prints each callback on a line of
+// standard output. Exits at the end of its input.
 #include "telix/telix_platform.h"
 
 #include <cstdio>
@@ -14,60 +14,60 @@ namespace {
 
 std::mutex outputMutex;
 
-TELIX_RETCODE_ENUM_T say(const std::string& line) {
+TELIX_RETCODE_ENUM_T printLine(const std::string& line) {
     std::lock_guard<std::mutex> lock(outputMutex);
     std::printf("%s\n", line.c_str());
     std::fflush(stdout);
     return 0;
 }
 
-std::string textOf(const ___UINT8* text) {
-    return text ? reinterpret_cast<const char*>(text) : "";
+std::string stringOf(const ___UINT8* argument) {
+    return argument ? reinterpret_cast<const char*>(argument) : "";
 }
 
 TELIX_RETCODE_ENUM_T onChange(TELIX_JS_VB_HANDLE, TELIX_JS_CM_HANDLE channel) {
-    return say("change " + std::to_string(channel));
+    return printLine("change " + std::to_string(channel));
 }
 TELIX_RETCODE_ENUM_T onError(TELIX_JS_VB_HANDLE, TELIX_JS_CM_HANDLE, TELIX_ERR_STATE_ENUM_T error) {
-    return say("error " + std::to_string(error));
+    return printLine("error " + std::to_string(error));
 }
 TELIX_RETCODE_ENUM_T onFullScreen(TELIX_JS_VB_HANDLE) {
-    return say("full-screen");
+    return printLine("full-screen");
 }
 TELIX_RETCODE_ENUM_T onRatingError(TELIX_JS_VB_HANDLE, ___UINT8* contentId, TELIX_JS_SI_PARENTALRATING_HANDLE,
                                    ___UINT8* drmSystemId) {
-    return say("rating-error " + textOf(contentId) + " " + textOf(drmSystemId));
+    return printLine("rating-error " + stringOf(contentId) + " " + stringOf(drmSystemId));
 }
 TELIX_RETCODE_ENUM_T onRating(TELIX_JS_VB_HANDLE, ___UINT8*, TELIX_JS_SI_PARENTALRATING_HANDLE, ___UINT8*) {
-    return say("rating");
+    return printLine("rating");
 }
 TELIX_RETCODE_ENUM_T onStreamEvent(TELIX_JS_VB_HANDLE, ___UINT8*, ___UINT8*, ___UINT8* name, ___UINT8* data,
                                    ___UINT32 length, ___UINT8* status) {
-    return say("stream-event " + textOf(name) + " " + std::string(reinterpret_cast<char*>(data), length) +
-               " " + textOf(status));
+    return printLine("stream-event " + stringOf(name) + " " +
+                     std::string(reinterpret_cast<char*>(data), length) + " " + stringOf(status));
 }
 TELIX_RETCODE_ENUM_T onLowMemory() {
-    return say("low-memory");
+    return printLine("low-memory");
 }
 TELIX_RETCODE_ENUM_T onDrmResult(___UINT8* id, ___UINT8* message, TELIX_DRM_RESULT_CODE_ENUM_T result) {
-    return say("drm " + textOf(id) + " " + textOf(message) + " " + std::to_string(result));
+    return printLine("drm " + stringOf(id) + " " + stringOf(message) + " " + std::to_string(result));
 }
 TELIX_RETCODE_ENUM_T onMessage(TELIX_JS_AV_HANDLE, TELIX_AV_CB_MSG message) {
-    return say("player-message " + std::to_string(message));
+    return printLine("player-message " + std::to_string(message));
 }
 TELIX_RETCODE_ENUM_T onRights(TELIX_JS_AV_HANDLE, TELIX_AV_DRM_ERR_STATE_ENUM_T state, ___UINT8* contentId,
                               ___UINT8* drmSystemId, ___UINT8* url) {
-    return say("rights-error " + std::to_string(state) + " " + textOf(contentId) + " " + textOf(drmSystemId) +
-               " " + textOf(url));
+    return printLine("rights-error " + std::to_string(state) + " " + stringOf(contentId) + " " +
+                     stringOf(drmSystemId) + " " + stringOf(url));
 }
 
 } // namespace
 
-// LIBRARY [MEDIA]
+// Arguments: LIBRARY [MEDIA]
 int main(int argc, char** argv) {
     void* library = argc >= 2 ? dlopen(argv[1], RTLD_LAZY | RTLD_LOCAL) : nullptr;
     if (!library) {
-        std::fprintf(stderr, "%s\n", argc >= 2 ? dlerror() : "no library is named");
+        std::fprintf(stderr, "telix_television: %s\n", argc >= 2 ? dlerror() : "LIBRARY is missing");
         return 2;
     }
 #define TELIX_CALL(name, parameters, arguments)                                                              \
@@ -95,7 +95,7 @@ int main(int argc, char** argv) {
     } else {
         TELIX_JS_VB_BindToCurrChannel(object);
     }
-    say("ready");
+    printLine("ready");
     char ignored = 0;
     while (read(STDIN_FILENO, &ignored, 1) > 0) {
     }
