@@ -105,16 +105,8 @@ std::optional<Capabilities> Capabilities::parse(const std::string& document, std
 }
 
 std::optional<Capabilities> Capabilities::load(const std::string& file, std::string& error) {
-    char* contents = nullptr;
-    gsize length = 0;
-    GError* reason = nullptr;
-    if (!g_file_get_contents(file.c_str(), &contents, &length, &reason)) {
-        error = messageOf(reason);
-        return std::nullopt;
-    }
-    const std::string document(contents, length);
-    g_free(contents);
-    std::optional<Capabilities> capabilities = parse(document, error);
+    const auto document = contentsOf(file, error);
+    std::optional<Capabilities> capabilities = document ? parse(*document, error) : std::nullopt;
     if (!capabilities) {
         error = file + ": " + error;
     }

@@ -210,14 +210,13 @@ std::string Configuration::Error::message() const {
 
 std::optional<Configuration::Error> Configuration::load(const std::string& file,
                                                         Configuration& configuration) {
-    char* data = nullptr;
-    gsize length = 0;
-    GError* error = nullptr;
-    if (!g_file_get_contents(file.c_str(), &data, &length, &error)) {
-        return Error{file, 0, messageOf(error)};
+    std::string reason;
+    const auto found = contentsOf(file, reason);
+    if (!found) {
+        return Error{file, 0, reason};
     }
-    const std::string contents(data, length);
-    g_free(data);
+    const std::string& contents = *found;
+    GError* error = nullptr;
     const KeyFile keyFile(g_key_file_new());
     if (!g_key_file_load_from_data(keyFile.get(), contents.data(), contents.size(), G_KEY_FILE_NONE,
                                    &error)) {

@@ -273,7 +273,9 @@ class CommandLine(ToolTest):
         self.assertIn(f'{path}:1: ', check('nonsense', TELIX_CONFIG=path, status=2))
         self.assertIn('no errors', check('', TELIX_CONFIG=path))
         self.assertIn('the defaults apply', self.ctl('check-config', TELIX_CONFIG='', XDG_CONFIG_HOME=self.folder))
-        self.assertIn('missing.conf', self.ctl('check-config', path + '/missing.conf', status=2))
+        missing = os.path.join(self.folder, 'missing.conf')
+        self.assertEqual(self.ctl('check-config', missing, status=2),
+                         f'telixctl: {missing}: No such file or directory\n')
 
 
 class Conformance(ToolTest):
