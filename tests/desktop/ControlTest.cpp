@@ -351,13 +351,14 @@ TEST_F(ControlTest, ProvokesDrmAnswersAndShortageOfMemory) {
     TELIX_JS_APP_UnRegisterLowMemory(onLowMemory);
 }
 
-TEST_F(ControlTest, AnswersBadLinesWithAnErrorAndGoesOn) {
-    Client client(m_path);
+struct BadLine {
+    std::string line;
+    const char* reason; // part of the error message
+};
+
+std::vector<BadLine> badLines() {
     const std::string deep(2000, '[');
-    const struct {
-        std::string line;
-        const char* reason;
-    } lines[] = {
+    return {
         {"hello", "not a JSON object"},
         {"{", "not a JSON object"},
         {R"({"command":"sta)", "not a JSON object"},
@@ -409,7 +410,11 @@ TEST_F(ControlTest, AnswersBadLinesWithAnErrorAndGoesOn) {
         {R"({"command":")" + std::string("\xc3\x28") + "\"}", "not valid UTF-8"},
         {std::string("\x01\x02\x1b", 3), "not a JSON object"},
     };
-    for (const auto& each : lines) {
+}
+
+TEST_F(ControlTest, AnswersBadLinesWithAnErrorAndGoesOn) {
+    Client client(m_path);
+    for (const BadLine& each : badLines()) {
         const std::string response = client.send(each.line);
         EXPECT_THAT(response, HasSubstr(R"("ok":false)")) << each.line;
         EXPECT_THAT(response, HasSubstr(each.reason)) << each.line;
