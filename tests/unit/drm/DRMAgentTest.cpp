@@ -112,12 +112,12 @@ TEST_F(DRMAgentTest, EveryAgentRegistersAndGivesUpTheOneCallback) {
 }
 
 TEST_F(DRMAgentTest, TheYoungestAgentIsTheOneForResultsAndStaysItWhenItHasGone) {
-    EXPECT_EQ(static_cast<PluginBase*>(drmAgentInst), agent.model());
+    EXPECT_EQ(static_cast<PluginBase*>(drmAgentInst.address()), agent.model());
     const EmbeddedObject other = browser.embed(kType);
     const void* youngest = other.model();
-    EXPECT_EQ(static_cast<PluginBase*>(drmAgentInst), youngest);
+    EXPECT_EQ(static_cast<PluginBase*>(drmAgentInst.address()), youngest);
     other.destroy();
-    EXPECT_EQ(static_cast<PluginBase*>(drmAgentInst), youngest);
+    EXPECT_EQ(static_cast<PluginBase*>(drmAgentInst.address()), youngest);
 }
 
 TEST_F(DRMAgentTest, HandsOutOneScriptObject) {
