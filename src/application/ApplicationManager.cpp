@@ -6,7 +6,7 @@
 #include <algorithm>
 #include <cstring>
 
-#include "common/LiveObject.h"
+#include "common/LiveRef.h"
 #include "common/Log.h"
 #include "common/ObjectKind.h"
 #include "common/ScriptReferences.h"

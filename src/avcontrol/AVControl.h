@@ -23,7 +23,7 @@
 #include <string>
 
 #include "common/DisplayArea.h"
-#include "common/LiveObject.h"
+#include "common/LiveRef.h"
 #include "common/PluginBase.h"
 #include "telix/telix_platform.h"
 
@@ -293,7 +293,7 @@ private:
     std::shared_ptr<MonitorLink> m_monitorLink; // of all monitors; null before the first
     std::atomic<bool> m_monitorStarting{false}; // a thread is made, and its id not yet in its place
 
-    const LiveObject<AVControl> m_live{*this};
+    const LiveRegistration<AVControl> m_live{*this};
 };
 
 #endif

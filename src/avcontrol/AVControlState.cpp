@@ -3,7 +3,7 @@
 #include <cstdlib>
 #include <new>
 
-#include "common/LiveObject.h"
+#include "common/LiveRef.h"
 #include "common/Log.h"
 #include "common/PluginUtils.h"
 #include "src/avcontrol/AVControl.h"

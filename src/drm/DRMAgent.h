@@ -3,7 +3,7 @@
 #ifndef TELIX_SRC_DRM_DRMAGENT_H
 #define TELIX_SRC_DRM_DRMAGENT_H
 
-#include "common/LiveObject.h"
+#include "common/LiveRef.h"
 #include "common/PluginBase.h"
 #include "telix/telix_platform.h"
 
@@ -57,7 +57,7 @@ public:
                                     TELIX_DRM_RESULT_CODE_ENUM_T_tag resultCode);
 
 private:
-    const LiveObject<DRMAgent> m_live{*this};
+    const LiveRegistration<DRMAgent> m_live{*this};
     // One reference held of each that isn't null.
     NPObject* m_jsObject = nullptr;
     NPObject* m_onDRMMessageResult = nullptr;

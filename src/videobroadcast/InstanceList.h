@@ -9,7 +9,7 @@
 #include <memory>
 #include <vector>
 
-#include "common/LiveObject.h"
+#include "common/LiveRef.h"
 
 class VideoBroadcast;
 

@@ -18,7 +18,7 @@
 #include <vector>
 
 #include "common/DisplayArea.h"
-#include "common/LiveObject.h"
+#include "common/LiveRef.h"
 #include "common/PluginBase.h"
 #include "src/videobroadcast/InstanceList.h"
 #include "telix/telix_platform.h"
@@ -160,7 +160,7 @@ private:
 
     void resetCurrentChannel(unsigned int channelHandle);
 
-    const LiveObject<VideoBroadcast> m_live{*this};
+    const LiveRegistration<VideoBroadcast> m_live{*this};
 
     static InstanceList VBInstanceList;
     static std::atomic<bool>

@@ -1,5 +1,5 @@
 // The video/broadcast object on the screen: its size, its display area and full screen.
-#include "common/LiveObject.h"
+#include "common/LiveRef.h"
 #include "common/Log.h"
 #include "common/ScriptValues.h"
 #include "src/videobroadcast/VideoBroadcast.h"

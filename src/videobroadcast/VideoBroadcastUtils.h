@@ -3,7 +3,7 @@
 #ifndef TELIX_SRC_VIDEOBROADCAST_VIDEOBROADCASTUTILS_H
 #define TELIX_SRC_VIDEOBROADCAST_VIDEOBROADCASTUTILS_H
 
-#include "common/LiveObject.h"
+#include "common/LiveRef.h"
 #include "telix/telix_platform.h"
 
 class VideoBroadcast;

@@ -613,7 +613,7 @@ TEST_F(BroadcastEventTest, ARecordOfNoEventIsLogged) {
     const auto deliver = [&](unsigned int type) {
         auto* event = new VideoBcastEvent;
         event->eventType = static_cast<VBEventType>(type);
-        event->vbInstance = &modelOf(vb);
+        event->vbInstance = modelOf(vb).ref();
         EXPECT_EQ(handleVideoBroadcastEvent(event), 0);
     };
     deliver(0);
@@ -632,7 +632,7 @@ TEST_F(BroadcastEventTest, ARecordWithoutPayloadEndsWithTheDomEvent) {
     for (const unsigned int type : {1, 2, 3, 5, 6, 7}) {
         auto* event = new VideoBcastEvent;
         event->eventType = static_cast<VBEventType>(type);
-        event->vbInstance = &modelOf(vb);
+        event->vbInstance = modelOf(vb).ref();
         EXPECT_EQ(handleVideoBroadcastEvent(event), 0);
     }
     EXPECT_THAT(log.calls(),

@@ -1,5 +1,5 @@
 // Which objects live, and the two ways to the browser thread.
-#include "common/LiveObject.h"
+#include "common/LiveRef.h"
 
 #include <glib.h>
 
@@ -64,11 +64,10 @@ void postAsyncCall(NPP npp, void (*step)(void* record), void* record) {
     NPN_PluginThreadAsyncCall(npp, step, record);
 }
 
-void live_object_detail::postIdleIfAlive(void* object, uint64_t generation, int (*step)(void*)) {
+void live_ref_detail::postIdleIfAlive(void* object, uint64_t generation, int (*step)(void*)) {
     postIdle(runIdle, new PostedStep<int>{{object, generation}, step});
 }
 
-void live_object_detail::postAsyncCallIfAlive(NPP npp, void* object, uint64_t generation,
-                                              void (*step)(void*)) {
+void live_ref_detail::postAsyncCallIfAlive(NPP npp, void* object, uint64_t generation, void (*step)(void*)) {
     postAsyncCall(npp, runAsyncCall, new PostedStep<void>{{object, generation}, step});
 }

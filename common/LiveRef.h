@@ -1,8 +1,8 @@
 // Steps for the browser thread, and the objects that they are for. A step is taken later than it is posted,
 // and its object may be gone by then; the next object can even stand at the same address. So a posted step
 // names its object by a generation as well, a number that no two objects of the process share.
-#ifndef TELIX_COMMON_LIVEOBJECT_H
-#define TELIX_COMMON_LIVEOBJECT_H
+#ifndef TELIX_COMMON_LIVEREF_H
+#define TELIX_COMMON_LIVEREF_H
 
 #include <cstdint>
 
@@ -39,12 +39,12 @@ private:
 // A member of each object that steps are posted for: lives as long as the object. Made and ended on the
 // browser thread; ref() on any thread while the object lives.
 template <class Object>
-class LiveObject {
+class LiveRegistration {
 public:
-    explicit LiveObject(Object& object) : m_ref(&object, LiveGenerations::begin()) {}
-    LiveObject(const LiveObject&) = delete;
-    LiveObject& operator=(const LiveObject&) = delete;
-    ~LiveObject() { LiveGenerations::end(m_ref.generation()); }
+    explicit LiveRegistration(Object& object) : m_ref(&object, LiveGenerations::begin()) {}
+    LiveRegistration(const LiveRegistration&) = delete;
+    LiveRegistration& operator=(const LiveRegistration&) = delete;
+    ~LiveRegistration() { LiveGenerations::end(m_ref.generation()); }
 
     LiveRef<Object> ref() const { return m_ref; }
 
@@ -61,22 +61,22 @@ private:
 void postIdle(int (*step)(void* record), void* record);
 void postAsyncCall(NPP npp, void (*step)(void* record), void* record);
 
-namespace live_object_detail {
+namespace live_ref_detail {
 
 void postIdleIfAlive(void* object, uint64_t generation, int (*step)(void*));
 void postAsyncCallIfAlive(NPP npp, void* object, uint64_t generation, void (*step)(void*));
 
-} // namespace live_object_detail
+} // namespace live_ref_detail
 
 // Post if still alive: the step gets the object itself, and is left out if exactly this one no longer lives.
 template <class Object>
 void postIdleIfAlive(const LiveRef<Object>& object, int (*step)(void* object)) {
-    live_object_detail::postIdleIfAlive(object.address(), object.generation(), step);
+    live_ref_detail::postIdleIfAlive(object.address(), object.generation(), step);
 }
 
 template <class Object>
 void postAsyncCallIfAlive(NPP npp, const LiveRef<Object>& object, void (*step)(void* object)) {
-    live_object_detail::postAsyncCallIfAlive(npp, object.address(), object.generation(), step);
+    live_ref_detail::postAsyncCallIfAlive(npp, object.address(), object.generation(), step);
 }
 
 #endif
