@@ -140,13 +140,13 @@ protected:
     HangingCall call;
 };
 
-TEST_F(AVControlHangingMonitor, InTheQuestionForTheBufferIsLeftBehindByItsObject) {
+TEST_F(AVControlHangingMonitor, InTheReportOfTheBufferOutlivesItsObject) {
     const EmbeddedObject object = playingVideo();
     hangsInReport(1, info(3));
     endWhileHanging(object);
 }
 
-TEST_F(AVControlHangingMonitor, InTheQuestionForTheReportOfAClipIsLeftBehindByItsObject) {
+TEST_F(AVControlHangingMonitor, InTheReportOfAClipOutlivesItsObject) {
     const EmbeddedObject object = playingVideo();
     hangsInReport(2, info(3));
     endWhileHanging(object);
@@ -167,7 +167,7 @@ TEST_F(AVControlHangingMonitor, DoesNotLookAtTheRecordOfAPlayerThatHasGone) {
     endWhileHanging(object);
 }
 
-TEST_F(AVControlHangingMonitor, InAPauseIsLeftBehindByItsObject) {
+TEST_F(AVControlHangingMonitor, InAPauseOutlivesItsObject) {
     const EmbeddedObject object = playingVideo();
     report(info(3));
     platform.TELIX_JS_AV_Pause = [this](TELIX_JS_AV_HANDLE) {
@@ -177,7 +177,7 @@ TEST_F(AVControlHangingMonitor, InAPauseIsLeftBehindByItsObject) {
     endWhileHanging(object);
 }
 
-TEST_F(AVControlHangingMonitor, InAResumeIsLeftBehindByItsObject) {
+TEST_F(AVControlHangingMonitor, InAResumeOutlivesItsObject) {
     const EmbeddedObject object = playingVideo();
     report(info(3));
     clock.await(1);
@@ -192,7 +192,7 @@ TEST_F(AVControlHangingMonitor, InAResumeIsLeftBehindByItsObject) {
     endWhileHanging(object);
 }
 
-TEST_F(AVControlHangingMonitor, InTheStopOfAClipIsLeftBehindByItsObject) {
+TEST_F(AVControlHangingMonitor, InTheStopOfAClipOutlivesItsObject) {
     const EmbeddedObject object =
         playlist(asx({entry("first", "<duration value=\"10\"/>"), entry("second")}));
     send(TELIX_AV_CB_MSG_PLAYSTART);
