@@ -181,9 +181,9 @@ bool showsSecondClip(const Shot& shot) {
     return isGrey;
 }
 
-std::optional<MediaPipeline::Sound> sound() {
-    std::promise<std::optional<MediaPipeline::Sound>> result;
-    Platform::instance().post([&] { result.set_value(PlayerRegistry::instance().sound()); });
+std::optional<MediaPipeline::Audio> sound() {
+    std::promise<std::optional<MediaPipeline::Audio>> result;
+    Platform::instance().post([&] { result.set_value(PlayerRegistry::instance().audio()); });
     return result.get_future().get();
 }
 
@@ -655,10 +655,10 @@ TEST_F(MediaTest, LetsTheComponentsBeSeenAndHeardThatAreSelected) {
     char* text = nullptr;
     EXPECT_NE(TELIX_JS_AV_AVComponent_GetLanguage(audio[0], TELIX_JS_AVCOMPTYPE_VIDEO, &text), 0);
 
-    EXPECT_EQ(sound()->audio, 0);
+    EXPECT_EQ(sound()->stream, 0);
     EXPECT_EQ(components(TELIX_JS_AVCOMPTYPE_AUDIO, true), std::vector{audio[0]});
     ASSERT_EQ(TELIX_JS_AV_SelectComponent(m_player, audio[1], TELIX_JS_AVCOMPTYPE_AUDIO), 0);
-    EXPECT_TRUE(waitUntil([] { return sound()->audio == 1; }));
+    EXPECT_TRUE(waitUntil([] { return sound()->stream == 1; }));
     EXPECT_EQ(components(TELIX_JS_AVCOMPTYPE_AUDIO, true), std::vector{audio[1]});
     ASSERT_EQ(TELIX_JS_AV_UnselectComponent(m_player, audio[1], TELIX_JS_AVCOMPTYPE_AUDIO), 0);
     EXPECT_TRUE(waitUntil([] { return sound()->isMuted; }));
@@ -716,7 +716,7 @@ TEST_F(MediaTest, TellsHowMuchIsHeldAhead) {
     EXPECT_NEAR(all.buffered, 20 - all.playPosition / 1000.0, 1.5);
     expectMessages({playStart});
     play(file("clip.mp4"));
-    EXPECT_EQ(info().buffered, noBufferReport);
+    EXPECT_EQ(info().buffered, kNoBufferReport);
 }
 
 TEST_F(MediaTest, WaitsForMediaThatComesSlowlyAndGoesOn) {
@@ -910,7 +910,7 @@ TEST_F(MediaTest, GivesOnWhatIsProvoked) {
     EXPECT_TRUE(players.injectBuffered(0xFF000003));
     EXPECT_EQ(info().buffered, 0xFF000003U);
     EXPECT_TRUE(players.injectBuffered(std::nullopt));
-    EXPECT_EQ(info().buffered, noBufferReport);
+    EXPECT_EQ(info().buffered, kNoBufferReport);
     ASSERT_EQ(TELIX_JS_AV_Stop(m_player), 0);
     EXPECT_TRUE(players.injectMessage(TELIX_AV_CB_MSG_ERR_NET_BUSY)); // to the one that played last
     expectMessages({playStart, TELIX_AV_CB_MSG_ERR_NET_BUSY, 0, TELIX_AV_CB_MSG_ERR_NET_BUSY});
