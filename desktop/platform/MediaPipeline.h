@@ -71,9 +71,11 @@ public:
         uint32_t buffered = kNoBufferReport; // seconds from the position
     };
 
-    // The audio that reaches the sink.
-    struct Audio {
-        int stream = -1; // its number; -1: none
+    // What is really played, asked of GStreamer.
+    struct Output {
+        GstState state = GST_STATE_NULL; // VOID_PENDING during a change of state or a seek
+        double rate = 1;                 // of the segment at the sinks
+        int audioStream = -1;            // its number; -1: none
         double volume = 0;
         bool isMuted = false;
     };
@@ -109,7 +111,7 @@ public:
     void selectSubtitle(std::optional<int> stream);
 
     Progress progress();
-    Audio audio() const;
+    Output output() const;
 
 private:
     enum class State {

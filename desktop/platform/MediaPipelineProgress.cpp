@@ -1,4 +1,4 @@
-// Position and duration, and which part of the media is buffered.
+// Position and duration, which part of the media is buffered, and what is played.
 #include "desktop/platform/MediaPipeline.h"
 
 #include <algorithm>
@@ -47,6 +47,23 @@ void MediaPipeline::readBufferedRanges(Progress& progress) {
         }
     }
     gst_query_unref(query);
+}
+
+MediaPipeline::Output MediaPipeline::output() const {
+    Output output;
+    if (gst_element_get_state(m_playbin, &output.state, nullptr, 0) != GST_STATE_CHANGE_SUCCESS) {
+        output.state = GST_STATE_VOID_PENDING;
+    }
+    GstQuery* query = gst_query_new_segment(GST_FORMAT_TIME);
+    if (gst_element_query(m_playbin, query)) {
+        gst_query_parse_segment(query, &output.rate, nullptr, nullptr, nullptr);
+    }
+    gst_query_unref(query);
+    gboolean isMuted = FALSE;
+    g_object_get(m_playbin, "current-audio", &output.audioStream, "volume", &output.volume, "mute", &isMuted,
+                 nullptr);
+    output.isMuted = isMuted != FALSE;
+    return output;
 }
 
 } // namespace desktop

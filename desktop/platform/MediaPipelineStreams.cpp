@@ -168,7 +168,9 @@ void MediaPipeline::setVolume(uint32_t volume) {
 
 void MediaPipeline::selectAudio(std::optional<int> stream) {
     m_isAudioSelected = stream.has_value();
-    if (stream && *stream != audio().stream) {
+    gint current = -1;
+    g_object_get(m_playbin, "current-audio", &current, nullptr);
+    if (stream && *stream != current) {
         g_object_set(m_playbin, "current-audio", *stream, nullptr);
     }
     applyAudio();
@@ -201,15 +203,6 @@ void MediaPipeline::applySubtitle() {
         },
         GINT_TO_POINTER(m_shared->showsSubtitle ? FALSE : TRUE));
     gst_iterator_free(overlays);
-}
-
-MediaPipeline::Audio MediaPipeline::audio() const {
-    Audio audio;
-    gboolean isMuted = FALSE;
-    g_object_get(m_playbin, "current-audio", &audio.stream, "volume", &audio.volume, "mute", &isMuted,
-                 nullptr);
-    audio.isMuted = isMuted != FALSE;
-    return audio;
 }
 
 } // namespace desktop

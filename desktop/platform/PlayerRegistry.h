@@ -118,8 +118,8 @@ public:
 
     std::vector<State> states() const;
 
-    // The audio of the pipeline; nothing if there is no pipeline. Platform thread.
-    std::optional<MediaPipeline::Audio> audio() const;
+    // Of the pipeline; nothing if there is none. Platform thread.
+    std::optional<MediaPipeline::Output> output() const;
 
 private:
     // Means nothing to the plug-in, but separates two equal messages.

@@ -62,8 +62,4 @@ void PlayerRegistry::applySelection() {
     m_platform.picture().setHidden(token, hasVideo && !streams[TELIX_JS_AVCOMPTYPE_VIDEO]);
 }
 
-std::optional<MediaPipeline::Audio> PlayerRegistry::audio() const {
-    return m_pipeline ? std::optional(m_pipeline->audio()) : std::nullopt;
-}
-
 } // namespace desktop

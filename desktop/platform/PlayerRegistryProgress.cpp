@@ -96,4 +96,8 @@ std::vector<PlayerRegistry::State> PlayerRegistry::states() const {
     return states;
 }
 
+std::optional<MediaPipeline::Output> PlayerRegistry::output() const {
+    return m_pipeline ? std::optional(m_pipeline->output()) : std::nullopt;
+}
+
 } // namespace desktop

@@ -22,6 +22,7 @@ void PlayerRegistry::clearMedia(Entry& entry) {
     entry.isPaused = false;
     entry.isBuffering = false;
     entry.seekSupport = {};
+    entry.pendingSeeks = 0; // those that are still posted belong to the previous session
     entry.progress = {};
     entry.components.clear();
 }
@@ -178,7 +179,8 @@ bool PlayerRegistry::seek(TELIX_JS_AV_HANDLE player, uint32_t milliseconds) {
             std::fprintf(stderr, "libtelix: media: seek to %u ms: refused by the pipeline\n", milliseconds);
         }
         std::lock_guard<std::mutex> lock(m_platform.mutex());
-        if (Entry* entry = findLocked(player)) {
+        Entry* entry = findLocked(player);
+        if (entry && m_pipelineSession == m_session) { // a new session has reset the count
             --entry->pendingSeeks;
         }
     });
@@ -221,7 +223,8 @@ bool PlayerRegistry::setSpeed(TELIX_JS_AV_HANDLE player, double speed) {
         }
         std::fprintf(stderr, "libtelix: media: speed %.1f: refused by the pipeline\n", speed);
         std::lock_guard<std::mutex> lock(m_platform.mutex());
-        if (Entry* entry = findLocked(player)) {
+        Entry* entry = findLocked(player);
+        if (entry && m_pipelineSession == m_session) {
             entry->speed = pipeline.speed();
         }
     });
