@@ -1,11 +1,15 @@
 #!/usr/bin/env python3
-"""Serves folders over HTTP on this machine alone, as a broadcaster's server would: with byte ranges, and on request
-slow, without ranges or with an error. For ./run.sh, the demonstration and the tests.
+"""Serves folders over HTTP on the loopback interface, as a broadcaster's server does: with byte ranges, and on request
+slowly, without ranges or with an error. For ./run.sh, the demonstration and the tests.
 
-What a response is like may be asked for in the address: ?rate=BYTES sends so many bytes a second, ?ranges=no refuses
-byte ranges, ?status=NUMBER answers with that status, ?cut=BYTES closes the connection after so many bytes of the body.
+The query of a URL controls the response:
+  ?rate=BYTES      sends this many bytes a second
+  ?trickle=BYTES   after this many bytes of the file, sends two bytes a second, until the server receives SIGUSR1
+  ?ranges=no       does not accept byte ranges
+  ?status=NUMBER   responds with this status
+  ?cut=BYTES       closes the connection after this many bytes of the body
 
-In a playlist (.asx), whose clips need whole addresses, @FOLDER@ stands for the address of the folder that it is in."""
+In a playlist (.asx), whose clips need absolute URLs, @FOLDER@ stands for the URL of the folder that it is in."""
 
 import argparse
 import contextlib
@@ -20,7 +24,7 @@ import threading
 import time
 import urllib.parse
 
-# Only these names decide: the machine's own list of types changes nothing for them.
+# These extensions have the same type on every machine, whatever its own list of types says.
 CONTENT_TYPES = {
     '.aac': 'audio/aac',
     '.asx': 'video/x-ms-asf',
@@ -40,12 +44,13 @@ CONTENT_TYPES = {
     '.xml': 'application/xml',
 }
 CHUNK = 64 * 1024
-PACE = 0.05  # seconds from one piece of a slow response to the next
-IDLE_LIMIT = 60  # seconds that a connection may stay open without a request
+CHUNK_INTERVAL = 0.05  # seconds between two chunks of a response with a rate
+TRICKLE_INTERVAL = 0.5  # seconds between two bytes of a trickling response: often enough for the client's timeout
+IDLE_TIMEOUT = 60  # seconds after which a connection without a request is closed
 
 
 class BadRequest(Exception):
-    """A request that makes no sense; the text goes to the client."""
+    """An invalid request; the message goes to the client."""
 
 
 def content_type(file):
@@ -53,9 +58,9 @@ def content_type(file):
     return CONTENT_TYPES.get(extension) or mimetypes.guess_type(file)[0] or 'application/octet-stream'
 
 
-def range_of(header, size):
-    """First and last byte that a Range header asks for; None for the whole file; () if the file has no such bytes."""
-    # A header that is not understood, or with several ranges, may be answered with the whole.
+def parse_range(header, size):
+    """First and last byte that a Range header requests; None for the whole file; () if the file has no such bytes."""
+    # A server may ignore a header with several ranges or of an unknown form, and send the whole file.
     match = re.fullmatch(r'bytes=(\d*)-(\d*)', header.replace(' ', ''))
     if not match or match[0] == 'bytes=-':
         return None
@@ -69,109 +74,118 @@ def range_of(header, size):
     return (begin, end) if begin <= end else ()
 
 
-class Wishes:
-    """How the address wants the response to be."""
+class ResponseOptions:
+    """The options in the query of a URL."""
 
     def __init__(self, query):
         values = dict(urllib.parse.parse_qsl(query, keep_blank_values=True))
         self.rate = self._number(values, 'rate', 1)
         self.cut = self._number(values, 'cut', 0)
+        self.trickle = self._number(values, 'trickle', 0)
         self.status = self._number(values, 'status', 200, 599)
         ranges = values.get('ranges', 'yes')
         if ranges not in ('yes', 'no'):
-            raise BadRequest('ranges is yes or no')
+            raise BadRequest('ranges: must be yes or no')
         self.ranges = ranges == 'yes'
 
     @staticmethod
-    def _number(values, name, least, most=None):
+    def _number(values, name, minimum, maximum=None):
         if name not in values:
             return None
         if not re.fullmatch(r'[0-9]{1,12}', values[name]):
-            raise BadRequest(f'{name} is a number')
+            raise BadRequest(f'{name}: must be a number')
         number = int(values[name])
-        if number < least or (most is not None and number > most):
-            raise BadRequest(f'{name} is out of range')
+        if number < minimum or (maximum is not None and number > maximum):
+            raise BadRequest(f'{name}: out of range')
         return number
 
 
 class Handler(http.server.BaseHTTPRequestHandler):
     protocol_version = 'HTTP/1.1'
     server_version = 'media_server'
-    timeout = IDLE_LIMIT
+    timeout = IDLE_TIMEOUT
 
     def do_GET(self):
-        self._answer(True)
+        self._respond(True)
 
     def do_HEAD(self):
-        self._answer(False)
+        self._respond(False)
 
-    def _answer(self, with_body):
+    def _respond(self, with_body):
         path, _, query = self.path.partition('?')
         try:
-            wishes = Wishes(query)
-            file = self.server.file_of(path)
+            options = ResponseOptions(query)
+            file = self.server.find_file(path)
         except BadRequest as error:
             self._refuse(400, str(error), with_body)
             return
-        if wishes.status is not None and wishes.status != 200:
-            self._refuse(wishes.status, 'as asked for', with_body)
+        if options.status is not None and options.status != 200:
+            self._refuse(options.status, 'status as requested', with_body)
         elif file is None:
-            self._refuse(404, 'there is no such file', with_body)
+            self._refuse(404, 'no such file', with_body)
         elif os.path.isdir(file):
             self._redirect(path, query)
         else:
             try:
                 with open(file, 'rb') as source:
-                    self._send(self._filled_in(source, file, path), file, wishes, with_body)
+                    self._send(self._expanded(source, file, path), file, options, with_body)
             except OSError as error:
                 if isinstance(error, (ConnectionError, TimeoutError)):
                     raise
-                self._refuse(404, 'the file cannot be read', with_body)
+                self._refuse(404, 'cannot read the file', with_body)
 
-    def _filled_in(self, source, file, path):
-        """What is to be sent: a playlist with the address of its folder."""
+    def _expanded(self, source, file, path):
+        """What to send: a playlist with the URL of its folder, any other file as it is."""
         if not file.lower().endswith('.asx'):
             return source
         folder = f'http://127.0.0.1:{self.server.server_address[1]}{path.rpartition("/")[0]}'
         return io.BytesIO(source.read().replace(b'@FOLDER@', folder.encode()))
 
-    def _send(self, source, file, wishes, with_body):
+    def _send(self, source, file, options, with_body):
         size = source.seek(0, os.SEEK_END)
-        asked = None
-        # No response names its version, so a condition on one never holds.
-        if wishes.ranges and 'Range' in self.headers and 'If-Range' not in self.headers:
-            asked = range_of(self.headers['Range'], size)
-        if asked == ():
+        byte_range = None
+        # Responses have no validator, so the condition of an If-Range header never holds.
+        if options.ranges and 'Range' in self.headers and 'If-Range' not in self.headers:
+            byte_range = parse_range(self.headers['Range'], size)
+        if byte_range == ():
             self._refuse(416, 'the file has no such bytes', with_body, {'Content-Range': f'bytes */{size}'})
             return
-        begin, end = asked or (0, size - 1)
-        self.send_response(206 if asked else 200)
+        begin, end = byte_range or (0, size - 1)
+        self.send_response(206 if byte_range else 200)
         self.send_header('Content-Type', content_type(file))
         self.send_header('Content-Length', str(end - begin + 1))
-        self.send_header('Accept-Ranges', 'bytes' if wishes.ranges else 'none')
-        if asked:
+        self.send_header('Accept-Ranges', 'bytes' if options.ranges else 'none')
+        if byte_range:
             self.send_header('Content-Range', f'bytes {begin}-{end}/{size}')
         self.end_headers()
         if with_body:
             source.seek(begin)
-            self._copy(source, end - begin + 1, wishes)
+            self._copy(source, end - begin + 1, options)
 
-    def _copy(self, source, length, wishes):
-        due = time.monotonic()
-        chunk = CHUNK if wishes.rate is None else max(1, int(wishes.rate * PACE))
-        limit = length if wishes.cut is None else min(length, wishes.cut)
+    def _copy(self, source, length, options):
+        limit = length if options.cut is None else min(length, options.cut)
         sent = 0
-        while sent < limit:
-            data = source.read(min(chunk, limit - sent))
-            if not data:
-                break  # the file has become shorter
-            self.wfile.write(data)
-            sent += len(data)
-            if wishes.rate is not None:
-                due += len(data) / wishes.rate
-                time.sleep(max(0, due - time.monotonic()))
+        # A range that begins after the offset of the trickle is sent at full speed.
+        if options.trickle is not None and source.tell() <= options.trickle:
+            sent = self._copy_bytes(source, min(limit, options.trickle - source.tell()), options.rate)
+            while sent < limit and not self.server.is_released(TRICKLE_INTERVAL) and self._copy_bytes(source, 1, None):
+                sent += 1
+        sent += self._copy_bytes(source, limit - sent, options.rate)
         if sent < length:
             self.close_connection = True
+
+    def _copy_bytes(self, source, count, rate):
+        """Returns how many bytes were sent: fewer if the file has become shorter."""
+        due = time.monotonic()
+        chunk = CHUNK if rate is None else max(1, int(rate * CHUNK_INTERVAL))
+        sent = 0
+        while sent < count and (data := source.read(min(chunk, count - sent))):
+            self.wfile.write(data)
+            sent += len(data)
+            if rate is not None:
+                due += len(data) / rate
+                time.sleep(max(0, due - time.monotonic()))
+        return sent
 
     def _redirect(self, path, query):
         self.send_response(301)
@@ -201,19 +215,27 @@ class Server(http.server.ThreadingHTTPServer):
 
     def __init__(self, folders, port):
         self._folders = sorted(folders.items(), key=lambda each: len(each[0]), reverse=True)
+        self._released = threading.Event()
         super().__init__(('127.0.0.1', port), Handler)
 
-    def file_of(self, path):
-        """The file or folder behind the path of an address, None if there is none; the index of a folder for itself."""
+    def release(self):
+        self._released.set()
+
+    def is_released(self, timeout):
+        """Waits this many seconds at most."""
+        return self._released.wait(timeout)
+
+    def find_file(self, path):
+        """The file or folder of a URL's path; None if there is none. A folder with a slash is its index."""
         names = urllib.parse.unquote(path).split('/')
         if any(name in ('.', '..') or '\0' in name for name in names):
             return None
-        asked = '/'.join(name for name in names if name)
+        name = '/'.join(name for name in names if name)
         for prefix, folder in self._folders:
-            if prefix and asked != prefix and not asked.startswith(prefix + '/'):
+            if prefix and name != prefix and not name.startswith(prefix + '/'):
                 continue
-            file = os.path.realpath(os.path.join(folder, asked[len(prefix):].lstrip('/')))
-            # A link does not lead out of the folder either.
+            file = os.path.realpath(os.path.join(folder, name[len(prefix):].lstrip('/')))
+            # Neither .. nor a symbolic link leads out of the folder.
             if file != folder and not file.startswith(folder.rstrip('/') + '/'):
                 return None
             if os.path.isdir(file) and path.endswith('/'):
@@ -232,18 +254,22 @@ class Server(http.server.ThreadingHTTPServer):
 
 
 class MediaServer:
-    """A server on a thread of its own. `folders` is folder by prefix of the path; the longest prefix that fits is
-    taken. Port 0: any free one. OSError if the port cannot be had."""
+    """A server on a thread of its own. `folders` maps a prefix of the path to a folder; the longest prefix wins.
+    Port 0: any free one. Raises OSError if the port is not available."""
 
     def __init__(self, folders, port=0):
         self._server = Server({prefix.strip('/'): os.path.realpath(folder) for prefix, folder in folders.items()},
                               port)
-        self.address = f'http://127.0.0.1:{self._server.server_address[1]}'
+        self.url = f'http://127.0.0.1:{self._server.server_address[1]}'
         self._thread = threading.Thread(target=self._server.serve_forever, args=(0.1,), daemon=True)
         self._thread.start()
 
+    def release(self):
+        """Ends the trickling of all responses, now and later."""
+        self._server.release()
+
     def close(self):
-        """Takes no more connections. Responses under way end with the process at the latest."""
+        """Accepts no more connections. Responses in progress end with the process at the latest."""
         self._server.shutdown()
         self._thread.join()
         self._server.server_close()
@@ -259,36 +285,36 @@ def read_arguments():
     parser = argparse.ArgumentParser(description=__doc__, formatter_class=argparse.RawDescriptionHelpFormatter)
     parser.add_argument('folders', nargs='+', metavar='PREFIX=FOLDER',
                         help='serves FOLDER under /PREFIX; an empty PREFIX is the root')
-    parser.add_argument('--port', type=int, default=0, help='port to listen at; 0, which is the default: a free one')
-    parser.add_argument('--announce', metavar='FILE', help='writes the base address to FILE, and removes FILE at the end')
-    parser.add_argument('--until-parent-ends', action='store_true', help='ends with the process that started it')
+    parser.add_argument('--port', type=int, default=0, help='port to listen on (default: 0, any free one)')
+    parser.add_argument('--announce', metavar='FILE', help='writes the base URL to FILE, and removes FILE at the end')
+    parser.add_argument('--until-parent-ends', action='store_true', help='exits with the process that started it')
     arguments = parser.parse_args()
     if not 0 <= arguments.port <= 65535:
-        parser.error(f'{arguments.port} is no port')
+        parser.error(f'--port: {arguments.port}: not a port number')
     folders = {}
     for each in arguments.folders:
         prefix, mark, folder = each.partition('=')
         prefix = prefix.strip('/')
         if not mark:
-            parser.error(f"'{each}' is not PREFIX=FOLDER")
+            parser.error(f'{each}: not of the form PREFIX=FOLDER')
         if not os.path.isdir(folder):
-            parser.error(f"'{folder}' is no folder")
+            parser.error(f'{folder}: not a folder')
         if prefix in folders:
-            parser.error(f"'/{prefix}' is given twice")
+            parser.error(f'/{prefix}: given twice')
         folders[prefix] = folder
     arguments.folders = folders
     return parser, arguments
 
 
 @contextlib.contextmanager
-def announced(file, address):
-    """Names the address in a file as long as the context lasts. Who sees the file finds all of the address in it."""
+def announced(file, url):
+    """A file with the URL, as long as the context lasts. It appears at once with its whole content."""
     if not file:
         yield
         return
     unfinished = f'{file}.{os.getpid()}'
     with open(unfinished, 'w', encoding='utf-8') as out:
-        out.write(address + '\n')
+        out.write(url + '\n')
     os.replace(unfinished, file)
     try:
         yield
@@ -304,9 +330,10 @@ def main():
     for number in (signal.SIGINT, signal.SIGTERM):
         signal.signal(number, lambda *_: ended.set())
     try:
-        with MediaServer(arguments.folders, arguments.port) as server, announced(arguments.announce, server.address):
+        with MediaServer(arguments.folders, arguments.port) as server, announced(arguments.announce, server.url):
+            signal.signal(signal.SIGUSR1, lambda *_: server.release())
             with contextlib.suppress(BrokenPipeError):
-                print(server.address, flush=True)
+                print(server.url, flush=True)
             while not ended.wait(0.2):
                 if arguments.until_parent_ends and os.getppid() != parent:
                     break

@@ -1,25 +1,26 @@
 // The choice of the audio sink, made once.
 #include "desktop/platform/AudioSink.h"
 
-#include "desktop/platform/ElementRank.h"
-
 #include <string>
+
+#include "desktop/platform/ElementRank.h"
 
 namespace desktop {
 
 namespace {
 
-const char* const silentSink = "fakesink";
+constexpr const char* kSilentSink = "fakesink";
 
-// The name of the best sink that can be opened.
+// The name of the element with the highest rank that can be opened.
 std::string chooseSink() {
-    std::string chosen = silentSink;
+    std::string chosen = kSilentSink;
     GstElement* automatic = gst_element_factory_make("autoaudiosink", nullptr);
     if (!automatic) {
         return chosen;
     }
     gst_object_ref_sink(automatic);
-    // It complains on standard error where there is no device, and plays through the other sinks' devices.
+    // openalsink reports a missing device on standard error, and uses only devices that other sinks use as
+    // well.
     setRank("openalsink", GST_RANK_NONE);
     if (gst_element_set_state(automatic, GST_STATE_READY) != GST_STATE_CHANGE_FAILURE) {
         GstIterator* children = gst_bin_iterate_elements(GST_BIN(automatic));
@@ -40,9 +41,9 @@ std::string chooseSink() {
 
 GstElement* makeAudioSink() {
     static const auto& name =
-        *new std::string(chooseSink()); // kept: the platform thread ends with the process
+        *new std::string(chooseSink()); // never deleted: the platform thread runs until the process ends
     GstElement* sink = gst_element_factory_make(name.c_str(), nullptr);
-    if (sink && name == silentSink) {
+    if (sink && name == kSilentSink) {
         g_object_set(sink, "sync", TRUE, nullptr);
     }
     return sink;

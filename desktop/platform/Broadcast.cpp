@@ -263,7 +263,7 @@ bool Broadcast::changeView(TELIX_JS_VB_HANDLE object,
         view = found->view;
         token = m_holder == object ? m_token : 0;
     }
-    m_platform.picture().place(token, view);
+    m_platform.picture().setView(token, view);
     return true;
 }
 
@@ -374,7 +374,7 @@ void Broadcast::present(const Request& request) {
         std::lock_guard<std::mutex> lock(m_platform.mutex());
         view = m_objects[request.object].view;
     }
-    const Picture::Token token = m_platform.picture().take(
+    const Picture::Token token = m_platform.picture().acquire(
         view, [this, object = request.object] { loseTuner(object); },
         [this, number, post] { post([this, number] { succeed(number); }); });
     {

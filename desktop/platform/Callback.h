@@ -1,22 +1,24 @@
-// One callback of the plug-in: registered and given up from the browser's thread, called on the platform
-// thread.
-#ifndef TELIX_DESKTOP_CALLBACK_H
-#define TELIX_DESKTOP_CALLBACK_H
+// A callback of the plug-in: registered and removed on the browser's thread, called on the platform thread.
+#ifndef TELIX_DESKTOP_PLATFORM_CALLBACK_H
+#define TELIX_DESKTOP_PLATFORM_CALLBACK_H
 
 #include <mutex>
 
 namespace desktop {
 
+// The mutex is held while the callback runs, so that none runs after its removal; it is recursive, because
+// the callback may remove itself.
 template <typename Function>
 class Callback {
 public:
-    // The last one registered is called; null counts as none.
+    // Replaces the callback; null removes it.
     void set(Function function) {
         std::lock_guard<std::recursive_mutex> lock(m_mutex);
         m_function = function;
     }
 
-    // When this returns, `function` is not running on another thread and is never called again.
+    // Removes `function` if it is the registered one. When this returns, it is not running on another thread
+    // and is not called again.
     void clear(Function function) {
         std::lock_guard<std::recursive_mutex> lock(m_mutex);
         if (m_function == function) {
@@ -29,7 +31,7 @@ public:
         return m_function != nullptr;
     }
 
-    // On the platform thread, without the platform's mutex. The callback may itself give the registration up.
+    // Platform thread, without the platform's mutex.
     template <typename... Arguments>
     void call(Arguments... arguments) const {
         std::lock_guard<std::recursive_mutex> lock(m_mutex);
@@ -43,18 +45,18 @@ protected:
     Function m_function = nullptr;
 };
 
-// A callback that several register and give up, each for itself: it is called once as long as one of them is
-// left.
+// A callback that is registered several times, and called once as long as a registration is left.
 template <typename Function>
 class CountedCallback : private Callback<Function> {
 public:
+    // Another function replaces the registered one, with a count of one.
     void set(Function function) {
         std::lock_guard<std::recursive_mutex> lock(m_mutex);
-        m_count = function == m_function ? m_count + 1 : 1; // another one takes the place
+        m_count = function == m_function ? m_count + 1 : 1;
         m_function = function;
     }
 
-    // As with Callback, once the last one has gone.
+    // As Callback::clear(), at the last registration.
     void clear(Function function) {
         std::lock_guard<std::recursive_mutex> lock(m_mutex);
         if (m_function == function && m_count > 0 && --m_count == 0) {

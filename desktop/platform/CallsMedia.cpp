@@ -13,7 +13,7 @@ PlayerRegistry& players() {
 
 } // namespace
 
-// What the MIME type and the URL promise makes no difference: the media itself tells what it is.
+// The codes from the MIME type and the URL are not used: GStreamer finds the type of the media itself.
 TELIX_RETCODE_ENUM_T TELIX_JS_AV_CreatePlayer(TELIX_JS_AV_HANDLE* player, int32_t containerCode,
                                               int32_t audioCodecCode, uint32_t memoryAudio) {
     (void)containerCode;
@@ -32,8 +32,7 @@ TELIX_RETCODE_ENUM_T TELIX_JS_AV_RegisterOnPlayStateChange(TELIX_JS_AV_HANDLE pl
     return resultOf(players().setCallback(player, callback));
 }
 
-// The registrations of a player have ended with it, and those of all others go on: nothing is left to do
-// here.
+// A player's callbacks are removed with the player, and those of other players stay: nothing is left to do.
 TELIX_RETCODE_ENUM_T TELIX_JS_AV_UnregisterOnPlayStateChange(TELIX_JS_AV_PLAYSTATE_CB callback) {
     (void)callback;
     return TELIX_RETCODE_SUCCESS;
@@ -52,7 +51,7 @@ TELIX_RETCODE_ENUM_T TELIX_JS_AV_UnregisterOnDRMRightsError(TELIX_JS_AV_DRM_RIGH
 TELIX_RETCODE_ENUM_T TELIX_JS_AV_Play(TELIX_JS_AV_HANDLE player, const char* url, uint32_t playCount,
                                       int32_t sourceCode, int32_t containerCode, int32_t audioCodecCode,
                                       uint32_t reserved32, uint16_t reserved16) {
-    (void)sourceCode; // all kinds of media are fetched alike, and once
+    (void)sourceCode; // one pipeline plays all kinds of media
     (void)containerCode;
     (void)audioCodecCode;
     (void)reserved32;
@@ -68,10 +67,10 @@ TELIX_RETCODE_ENUM_T TELIX_JS_AV_Queue(TELIX_JS_AV_HANDLE player, const char* ur
     (void)audioCodecCode;
     (void)reserved32;
     (void)reserved16;
-    return resultOf(url ? players().queue(player, url, playCount) : players().withdraw(player));
+    return resultOf(url ? players().queue(player, url, playCount) : players().clearQueue(player));
 }
 
-// The plug-in looks it up and never calls it, so no meaning of its values is known.
+// The plug-in looks this call up and never calls it, so the meaning of its values is unknown.
 TELIX_RETCODE_ENUM_T TELIX_JS_AV_PlaySound(uint32_t value1, uint32_t value2, uint32_t value3, uint32_t value4,
                                            uint32_t value5, uint32_t value6, uint32_t value7) {
     (void)value1;

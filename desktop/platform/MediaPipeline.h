@@ -1,11 +1,19 @@
-// Plays one piece of media: a pipeline from its address to picture and sound, made anew for each.
+// Plays one piece of media: a playbin from its URL to the video plane and the audio sink. A new one is made
+// for each piece. Its implementation has one file for each concern:
+//   MediaPipeline.cpp         creation, bus messages, state
+//   MediaPipelineSeek.cpp     seeks and speeds
+//   MediaPipelineStreams.cpp  streams and their selection, audio
+//   MediaPipelineProgress.cpp position, duration, buffering
+//   MediaPipelineErrors.cpp   what a GStreamer error means to the plug-in
+//   DeferredTeardown.h        the end of the pipeline
+//
+// Everything runs on the platform thread but for the callbacks from GStreamer's threads, which touch only
+// what is in Shared.
 #ifndef TELIX_DESKTOP_PLATFORM_MEDIAPIPELINE_H
 #define TELIX_DESKTOP_PLATFORM_MEDIAPIPELINE_H
 
-#include "desktop/platform/ComponentTraits.h"
-#include "desktop/platform/Picture.h"
+#include <gst/gst.h>
 
-#include <array>
 #include <atomic>
 #include <cstdint>
 #include <functional>
@@ -14,142 +22,184 @@
 #include <string>
 #include <vector>
 
+#include "desktop/platform/ComponentTraits.h"
+#include "desktop/platform/Picture.h"
+
 namespace desktop {
 
-// Of play-info: how much media is held ahead is not known, or does not matter.
-constexpr uint32_t noBufferReport = 0xFFFFFFFF;
+// `buffered` of the play info if it is not known how far ahead media is buffered, or if that does not matter.
+constexpr uint32_t kNoBufferReport = 0xFFFFFFFF;
 
-// Platform thread, unless said otherwise.
 class MediaPipeline {
 public:
-    // One video, audio or subtitle stream. Streams of a kind are numbered from 0.
-    // What needs a key cannot be played, and files do not tell what their sound is for, so no flag is set.
+    // A video, audio or subtitle stream. Media that needs a key cannot be played, and files do not say what
+    // their audio is for, so no flag of ComponentTraits is ever set.
     struct Stream : ComponentTraits {
-        int number = 0;
+        int number = 0; // among the streams of its type, from 0
     };
 
-    // What is known of the media as soon as it could be presented.
+    // What is known of the media after preroll.
     struct Media {
         std::vector<Stream> streams;
         bool canSeek = false;
-        bool canSeekAhead = false; // also beyond what is held: the server gives any part
-        bool canReverse = false;   // what has been played is still there
+        bool canSeekBeyondBuffer = false; // the server accepts byte ranges, or there is no server
+        bool canPlayBackward = false;     // what has been played is still there
     };
 
-    // Called on the platform thread, inside of the player's own work: do not end the player in them.
+    // Runs on the platform thread, inside a function of the pipeline: must not delete the pipeline.
     struct Listener {
-        std::function<void(const Media& media)> known; // once, before `began`
-        std::function<void()> began;                   // once, when presentation begins
-        std::function<void(bool isHeld)> buffering;    // presentation waits for media, or goes on
-        std::function<void()> ended;                   // at each end, also that of a repetition
+        std::function<void(const Media& media)> onPrerolled; // once, before onStarted
+        std::function<void()> onStarted;                     // once, when playback starts
+        std::function<void(bool isBuffering)> onBuffering;   // playback stalls for data, or goes on
+        std::function<void()> onEos;                         // at each end, also before repeat()
         std::function<void(TELIX_AV_CB_MSG message, const std::string& reason)>
-            failed; // once, nothing follows
+            onError; // once, nothing follows
     };
 
-    // How it begins.
     struct Setup {
         std::string url;
         double speed = 1;
         uint32_t volume = 100;            // 0 to 100
-        std::optional<uint32_t> position; // milliseconds
+        std::optional<uint32_t> position; // milliseconds; default: the start
         bool isPaused = false;
     };
 
     struct Progress {
-        uint32_t position = 0;              // milliseconds
-        uint32_t duration = 0;              // milliseconds; 0 as long as it is not known
-        uint32_t bufferedEnd = 0;           // seconds from the start of the media
-        uint32_t buffered = noBufferReport; // seconds ahead of the position
+        uint32_t position = 0;               // milliseconds
+        uint32_t duration = 0;               // milliseconds; 0 until it is known
+        uint32_t bufferedEnd = 0;            // seconds from the start of the media
+        uint32_t buffered = kNoBufferReport; // seconds from the position
     };
 
-    // What the pipeline lets through.
-    struct Sound {
-        int audio = -1; // number of the stream; -1: none
+    // What is really played, asked of GStreamer.
+    struct Output {
+        GstState state = GST_STATE_NULL; // VOID_PENDING during a change of state or a seek
+        double rate = 1;                 // of the segment at the sinks
+        int audioStream = -1;            // its number; -1: none
         double volume = 0;
         bool isMuted = false;
     };
 
     explicit MediaPipeline(Listener listener);
-    // Nothing is seen or heard of it any more.
+
+    // Nothing is seen or heard of the media any more when this returns.
     ~MediaPipeline();
+
     MediaPipeline(const MediaPipeline&) = delete;
     MediaPipeline& operator=(const MediaPipeline&) = delete;
 
-    // Starts to present as `token`. False with the reason if that is impossible; otherwise the outcome goes
-    // to the listener.
+    // Starts to play, with the video presented as `token`. Called once. False with the reason if that is
+    // impossible; otherwise the listener hears how it goes on.
     bool start(Picture& picture, Picture::Token token, const Setup& setup, std::string& error);
 
-    // What comes while a seek is at work waits for its end; of several seeks the last one counts. False if
-    // the media turns out to refuse it.
+    // A request during a seek stays pending until that has ended; only the last pending one is carried out.
+    // False if the media refuses at once.
     bool seek(uint32_t milliseconds);
-    // Backward is negative; never 0.
+
+    // Negative speeds play backward; never 0. Otherwise as seek().
     bool setSpeed(double speed);
     double speed() const { return m_speed; }
-    // Plays from the start once more. False if the media cannot be wound back.
+
+    // Plays again from the start. False if the media cannot seek.
     bool repeat();
 
     void setPaused(bool isPaused);
-    void setVolume(uint32_t volume);
-    void selectAudio(std::optional<int> number);
-    void selectSubtitle(std::optional<int> number);
+    void setVolume(uint32_t volume); // 0 to 100
 
-    // True while the position is on its way to the goal of a seek.
-    bool isSeeking() const { return m_isSeeking || !m_isReady; }
+    // Nothing selects no stream.
+    void selectAudio(std::optional<int> stream);
+    void selectSubtitle(std::optional<int> stream);
+
     Progress progress();
-    Sound sound() const;
+    Output output() const;
 
 private:
-    // What GStreamer's threads share. It may outlive the player.
+    enum class State {
+        Null,        // start() has not been called
+        Prerolling,  // connects, and decodes the first data of each stream
+        InitialSeek, // has prerolled, and moves to the position and speed where playback starts
+        Prerolled,   // is there; playback starts unless it is paused or buffering
+        Started,     // playback has started; it may be paused, buffering or seeking
+        Failed,      // an error has been reported; the messages after it are consequences
+    };
+
+    // What the URL and the responses tell of the source.
+    struct Source {
+        bool isNetwork = false;
+        bool isHttp = false;
+        bool isLive = false;            // does not preroll, and does not wait for data
+        bool hasResponse = false;       // the server has responded, to the first request at least
+        bool acceptsByteRanges = false; // of HTTP
+        bool hasDownloadBuffer = false; // what has been received is kept in a file
+    };
+
+    // Requests that wait for preroll or for the end of the seek in progress.
+    struct PendingSeek {
+        std::optional<uint32_t> position;
+        std::optional<double> speed;
+    };
+
+    // What GStreamer's threads use. It may outlive the pipeline.
     struct Shared {
         std::atomic<bool> showsSubtitle{false};
-        std::atomic<bool> hasData{false}; // the source has given something
+        std::atomic<bool> hasData{false}; // the source has produced a buffer
     };
 
     using SharedPointer = std::shared_ptr<Shared>;
 
-    static gboolean onMessage(GstBus* bus, GstMessage* message, gpointer player);
-    static void onSource(GstElement* playbin, GstElement* source, gpointer shared);
-    static void onElement(GstElement* playbin, GstElement* element, gpointer shared);
-    static void onStore(GObject* store, GParamSpec* property, gpointer data);
-    bool isAsking() const;
-    void handle(GstMessage* message);
-    void handleError(GstMessage* message);
-    TELIX_AV_CB_MSG kindOf(GstMessage* message, const GError& error) const;
-    void takeBuffering(int percent);
+    static constexpr const char* kSubtitleElement = "subtitleoverlay"; // draws subtitles into the video
+
+    // MediaPipeline.cpp
+    static gboolean onMessage(GstBus* bus, GstMessage* message, gpointer pipeline);
+    static void onSourceSetup(GstElement* playbin, GstElement* source, gpointer shared);
+    static void onElementSetup(GstElement* playbin, GstElement* element, gpointer shared);
+    static void onDownloadFile(GObject* downloadBuffer, GParamSpec* property, gpointer data);
+    bool createPlaybin(Picture& picture, Picture::Token token, std::string& error);
+    void connectSignals();
+    void changeState(State state);
+    void handleMessage(GstMessage* message);
+    void onStateChanged(GstMessage* message);
+    void onHttpHeaders(const GstStructure* message);
+    void onBuffering(int percent);
+    void onPrerolled();
     void settle();
-    void becomeKnown();
-    bool applySeek(double speed, uint32_t milliseconds);
-    void applyState();
-    void applySound();
+    void applyTargetState();
+    bool isAtStart() const;
+    bool isRequestOutstanding() const;
+    bool usesDownloadBuffer() const;
+
+    // MediaPipelineSeek.cpp
+    bool isSeeking() const;
+    bool isReachable(uint32_t milliseconds);
+    bool sendSeek(double speed, uint32_t milliseconds);
+    bool sendPendingSeek();
+
+    // MediaPipelineStreams.cpp
+    std::vector<Stream> readStreams() const;
+    void applyAudio();
     void applySubtitle();
-    bool usesStore() const;
-    bool canReach(uint32_t milliseconds);
-    void readHeaders(const GstStructure* headers);
-    void readBuffering(Progress& progress);
+
+    // MediaPipelineProgress.cpp
+    void readBufferedRanges(Progress& progress);
+
+    // MediaPipelineErrors.cpp
+    void onError(GstMessage* message);
+    TELIX_AV_CB_MSG classifyError(GstMessage* message, const GError& error) const;
 
     Listener m_listener;
-    GstElement* m_pipeline = nullptr;
-    bool m_isNetwork = false;
-    bool m_isLive = false;
-    bool m_isHttp = false;
-    bool m_hasAnswer = false; // the server has answered, to the first request at least
-    bool m_hasRanges = false; // the server gives any part
-    bool m_hasStore = false;  // what has been fetched is kept
-    bool m_hasFailed = false;
-    bool m_isKnown = false;
-    bool m_isReady = false; // at the place and speed where it is to begin
-    bool m_hasBegun = false;
-    bool m_isSeeking = false;
-    bool m_isPaused = false; // by wish, not by want of media
-    bool m_isHeld = false;   // by want of media
-    bool m_hasSound = true;
+    GstElement* m_playbin = nullptr;
+    State m_state = State::Null;
+    Source m_source;
+    PendingSeek m_pendingSeek;
+    bool m_isSeeking = false;   // a flushing seek is in progress
+    bool m_isPaused = false;    // by the user, not for buffering
+    bool m_isBuffering = false; // paused until enough data is there
+    bool m_isAudioSelected = true;
     double m_speed = 1;
-    double m_volume = 1;
-    std::optional<uint32_t> m_goal;    // of a seek that waits
-    std::optional<double> m_newSpeed;  // that waits
-    GstState m_state = GST_STATE_NULL; // that was asked for
-    uint32_t m_position = 0;
-    uint32_t m_duration = 0;
+    double m_volume = 1;                     // 0 to 1
+    GstState m_targetState = GST_STATE_NULL; // the last one that was set
+    uint32_t m_position = 0;                 // milliseconds, as last read or requested
+    uint32_t m_duration = 0;                 // milliseconds
     SharedPointer m_shared = std::make_shared<Shared>();
 };
 

@@ -1,140 +1,140 @@
-// Newest frame, display area, and the functions with which the window reads them.
+// The newest frame, the view, and the exported functions with which the window reads them.
 #include "desktop/platform/Picture.h"
-
-#include "desktop/platform/Platform.h"
 
 #include <gst/app/gstappsink.h>
 #include <gst/video/video.h>
+
 #include <utility>
+
+#include "desktop/platform/Platform.h"
 
 namespace desktop {
 
 namespace {
 
-// What an acquired frame holds until it is released.
-struct Held {
-    GstSample* sample;
+// The owner of an acquired frame's pixels, until the frame is released.
+struct MappedFrame {
+    GstSample* sample; // owns a reference
     GstVideoFrame frame;
 };
 
-void giveBack(GstSample* sample) {
+void unref(GstSample* sample) {
     if (sample) {
         gst_sample_unref(sample);
     }
+}
+
+// Maps the pixels and describes them in `frame`. Takes the reference; false if the sample is no video frame.
+bool mapFrame(GstSample* sample, telix_desktop_frame& frame) {
+    GstVideoInfo info;
+    auto* mapped = new MappedFrame{sample, {}};
+    if (!gst_video_info_from_caps(&info, gst_sample_get_caps(sample)) ||
+        !gst_video_frame_map(&mapped->frame, &info, gst_sample_get_buffer(sample), GST_MAP_READ)) {
+        gst_sample_unref(sample);
+        delete mapped;
+        return false;
+    }
+    frame.pixels = static_cast<const uint8_t*>(GST_VIDEO_FRAME_PLANE_DATA(&mapped->frame, 0));
+    frame.width = static_cast<uint32_t>(info.width);
+    frame.height = static_cast<uint32_t>(info.height);
+    frame.stride = static_cast<uint32_t>(GST_VIDEO_FRAME_PLANE_STRIDE(&mapped->frame, 0));
+    guint aspectWidth = 0;
+    guint aspectHeight = 0;
+    if (gst_video_calculate_display_ratio(&aspectWidth, &aspectHeight, static_cast<guint>(info.width),
+                                          static_cast<guint>(info.height), static_cast<guint>(info.par_n),
+                                          static_cast<guint>(info.par_d), 1, 1)) {
+        frame.aspectWidth = aspectWidth;
+        frame.aspectHeight = aspectHeight;
+    }
+    frame.owner = mapped;
+    return true;
 }
 
 } // namespace
 
-// What a sink needs to know, for as long as its callbacks may run.
-struct Picture::Target {
+// The user data of a sink's callbacks.
+struct Picture::SinkData {
     Picture& picture;
     Token token;
-    uint64_t sink;
+    uint64_t id;
 };
 
-Picture::Token Picture::take(const View& view, std::function<void()> lost, std::function<void()> shown) {
-    std::function<void()> formerLost;
-    GstSample* formerSample = nullptr;
+// ---- Presentations
+
+Picture::Token Picture::acquire(const View& view, std::function<void()> onPreempted,
+                                std::function<void()> onFirstFrame) {
+    std::function<void()> preempt;
+    GstSample* oldSample = nullptr;
     Token token = 0;
     {
         std::lock_guard<std::mutex> lock(m_mutex);
-        token = m_current = ++m_last;
+        token = m_current = ++m_lastToken;
         m_view = view;
         m_isHidden = false;
-        formerSample = std::exchange(m_sample, nullptr);
-        formerLost = std::exchange(m_lost, std::move(lost));
-        m_shown = std::move(shown);
+        oldSample = std::exchange(m_sample, nullptr);
+        preempt = std::exchange(m_onPreempted, std::move(onPreempted));
+        m_onFirstFrame = std::move(onFirstFrame);
     }
-    giveBack(formerSample);
-    if (formerLost) {
-        formerLost();
+    unref(oldSample);
+    if (preempt) {
+        preempt();
     }
-    wake();
+    wakeUp();
     return token;
 }
 
 void Picture::release(Token token) {
-    GstSample* formerSample = nullptr;
+    GstSample* oldSample = nullptr;
     {
         std::lock_guard<std::mutex> lock(m_mutex);
-        if (token == 0 || token != m_current) {
+        if (!isCurrentLocked(token)) {
             return;
         }
         m_current = 0;
-        m_lost = nullptr;
-        m_shown = nullptr;
-        formerSample = std::exchange(m_sample, nullptr);
+        m_onPreempted = nullptr;
+        m_onFirstFrame = nullptr;
+        oldSample = std::exchange(m_sample, nullptr);
     }
-    giveBack(formerSample);
-    wake();
+    unref(oldSample);
+    wakeUp();
 }
 
-void Picture::place(Token token, const View& view) {
+void Picture::setView(Token token, const View& view) {
     {
         std::lock_guard<std::mutex> lock(m_mutex);
-        if (token == 0 || token != m_current) {
+        if (!isCurrentLocked(token)) {
             return;
         }
         m_view = view;
     }
-    wake();
+    wakeUp();
 }
 
 void Picture::blank(Token token) {
-    GstSample* formerSample = nullptr;
+    GstSample* oldSample = nullptr;
     {
         std::lock_guard<std::mutex> lock(m_mutex);
-        if (token == 0 || token != m_current) {
+        if (!isCurrentLocked(token)) {
             return;
         }
-        formerSample = std::exchange(m_sample, nullptr);
+        oldSample = std::exchange(m_sample, nullptr);
     }
-    giveBack(formerSample);
-    wake();
+    unref(oldSample);
+    wakeUp();
 }
 
-void Picture::hide(Token token, bool isHidden) {
+void Picture::setHidden(Token token, bool isHidden) {
     {
         std::lock_guard<std::mutex> lock(m_mutex);
-        if (token == 0 || token != m_current || m_isHidden == isHidden) {
+        if (!isCurrentLocked(token) || m_isHidden == isHidden) {
             return;
         }
         m_isHidden = isHidden;
     }
-    wake();
+    wakeUp();
 }
 
-// Takes the sample over.
-GstFlowReturn Picture::showSample(const Target& target, GstSample* sample) {
-    if (sample) {
-        // One of our own: the sink uses its sample again, and could not change one that somebody holds.
-        GstSample* own = gst_sample_new(gst_sample_get_buffer(sample), gst_sample_get_caps(sample),
-                                        gst_sample_get_segment(sample), nullptr);
-        gst_sample_unref(sample);
-        target.picture.show(target, own);
-        gst_sample_unref(own);
-    }
-    return GST_FLOW_OK;
-}
-
-void Picture::show(const Target& target, GstSample* sample) {
-    std::function<void()> shown;
-    GstSample* formerSample = nullptr;
-    {
-        std::lock_guard<std::mutex> lock(m_mutex);
-        if (target.token == 0 || target.token != m_current || target.sink != m_lastSink) {
-            return;
-        }
-        formerSample = std::exchange(m_sample, gst_sample_ref(sample)); // kept until the next one
-        ++m_serial;
-        shown = std::exchange(m_shown, nullptr);
-    }
-    giveBack(formerSample);
-    wake();
-    if (shown) {
-        shown();
-    }
-}
+// ---- Frames
 
 GstElement* Picture::makeSink(Token token) {
     GError* error = nullptr;
@@ -145,26 +145,61 @@ GstElement* Picture::makeSink(Token token) {
     if (!bin) {
         return nullptr;
     }
-    uint64_t number = 0;
+    uint64_t id = 0;
     {
         std::lock_guard<std::mutex> lock(m_mutex);
-        number = ++m_lastSink;
+        id = ++m_lastSink;
     }
-    blank(token); // the sink before shows nothing more
+    blank(token); // the frame of the previous sink
     GstElement* sink = gst_bin_get_by_name(GST_BIN(bin), "picture");
     GstAppSinkCallbacks callbacks{};
-    callbacks.new_sample = [](GstAppSink* appSink, gpointer target) {
-        return showSample(*static_cast<Target*>(target), gst_app_sink_try_pull_sample(appSink, 0));
+    callbacks.new_sample = [](GstAppSink* appSink, gpointer data) {
+        return onSample(*static_cast<SinkData*>(data), gst_app_sink_try_pull_sample(appSink, 0));
     };
-    // The first frame is shown while the pipeline still waits to begin.
-    callbacks.new_preroll = [](GstAppSink* appSink, gpointer target) {
-        return showSample(*static_cast<Target*>(target), gst_app_sink_try_pull_preroll(appSink, 0));
+    // The first frame is shown while the pipeline is still paused.
+    callbacks.new_preroll = [](GstAppSink* appSink, gpointer data) {
+        return onSample(*static_cast<SinkData*>(data), gst_app_sink_try_pull_preroll(appSink, 0));
     };
-    gst_app_sink_set_callbacks(GST_APP_SINK(sink), &callbacks, new Target{*this, token, number},
-                               [](gpointer target) { delete static_cast<Target*>(target); });
-    gst_object_unref(sink); // the bin keeps it
+    gst_app_sink_set_callbacks(GST_APP_SINK(sink), &callbacks, new SinkData{*this, token, id},
+                               [](gpointer data) { delete static_cast<SinkData*>(data); });
+    gst_object_unref(sink); // the bin owns it
     return bin;
 }
+
+// GStreamer's thread. Takes the reference.
+GstFlowReturn Picture::onSample(const SinkData& sink, GstSample* sample) {
+    if (sample) {
+        // A copy without the pixels: the sink reuses its sample, which it cannot while somebody else refers
+        // to it.
+        GstSample* copy = gst_sample_new(gst_sample_get_buffer(sample), gst_sample_get_caps(sample),
+                                         gst_sample_get_segment(sample), nullptr);
+        gst_sample_unref(sample);
+        sink.picture.showSample(sink, copy);
+        gst_sample_unref(copy);
+    }
+    return GST_FLOW_OK;
+}
+
+void Picture::showSample(const SinkData& sink, GstSample* sample) {
+    std::function<void()> onFirstFrame;
+    GstSample* oldSample = nullptr;
+    {
+        std::lock_guard<std::mutex> lock(m_mutex);
+        if (!isCurrentLocked(sink.token) || sink.id != m_lastSink) {
+            return;
+        }
+        oldSample = std::exchange(m_sample, gst_sample_ref(sample)); // kept until the next frame
+        ++m_serial;
+        onFirstFrame = std::exchange(m_onFirstFrame, nullptr);
+    }
+    unref(oldSample);
+    wakeUp();
+    if (onFirstFrame) {
+        onFirstFrame();
+    }
+}
+
+// ---- The window
 
 void Picture::setWakeup(telix_desktop_wakeup wakeup, void* data) {
     {
@@ -172,64 +207,42 @@ void Picture::setWakeup(telix_desktop_wakeup wakeup, void* data) {
         m_wakeup = wakeup;
         m_wakeupData = data;
     }
-    bool visible = false;
+    bool isPresenting = false;
     {
         std::lock_guard<std::mutex> lock(m_mutex);
-        visible = m_current != 0;
+        isPresenting = m_current != 0;
     }
-    if (visible) {
-        wake();
+    if (isPresenting) {
+        wakeUp();
     }
 }
 
-void Picture::wake() {
+void Picture::wakeUp() {
     std::lock_guard<std::mutex> lock(m_wakeupMutex);
     if (m_wakeup) {
         m_wakeup(m_wakeupData);
     }
 }
 
-void Picture::acquire(telix_desktop_frame& frame) {
+void Picture::acquireFrame(telix_desktop_frame& frame) {
     frame = {};
-    GstSample* sample = nullptr;
-    {
-        std::lock_guard<std::mutex> lock(m_mutex);
-        frame.areaX = m_view.x;
-        frame.areaY = m_view.y;
-        frame.areaWidth = m_view.width;
-        frame.areaHeight = m_view.height;
-        frame.fullScreen = m_view.fullScreen ? 1 : 0;
-        frame.visible = m_current != 0 && m_sample && !m_isHidden ? 1 : 0;
-        frame.serial = m_serial;
-        if (frame.visible) {
-            sample = gst_sample_ref(m_sample); // the record's, until it is released
-        }
-    }
-    if (!sample) {
-        return;
-    }
-    GstVideoInfo info;
-    auto* held = new Held{sample, {}};
-    if (!gst_video_info_from_caps(&info, gst_sample_get_caps(sample)) ||
-        !gst_video_frame_map(&held->frame, &info, gst_sample_get_buffer(sample), GST_MAP_READ)) {
-        gst_sample_unref(sample);
-        delete held;
+    GstSample* sample = describeFrame(frame);
+    if (sample && !mapFrame(sample, frame)) {
         frame.visible = 0;
-        return;
     }
-    frame.pixels = static_cast<const uint8_t*>(GST_VIDEO_FRAME_PLANE_DATA(&held->frame, 0));
-    frame.width = static_cast<uint32_t>(info.width);
-    frame.height = static_cast<uint32_t>(info.height);
-    frame.stride = static_cast<uint32_t>(GST_VIDEO_FRAME_PLANE_STRIDE(&held->frame, 0));
-    guint aspectWidth = 0;
-    guint aspectHeight = 0;
-    if (gst_video_calculate_display_ratio(&aspectWidth, &aspectHeight, static_cast<guint>(info.width),
-                                          static_cast<guint>(info.height), static_cast<guint>(info.par_n),
-                                          static_cast<guint>(info.par_d), 1, 1)) {
-        frame.aspectWidth = aspectWidth;
-        frame.aspectHeight = aspectHeight;
-    }
-    frame.owner = held;
+}
+
+// All but the pixels. A new reference to the sample that is to be seen; null if there is none.
+GstSample* Picture::describeFrame(telix_desktop_frame& frame) {
+    std::lock_guard<std::mutex> lock(m_mutex);
+    frame.areaX = m_view.x;
+    frame.areaY = m_view.y;
+    frame.areaWidth = m_view.width;
+    frame.areaHeight = m_view.height;
+    frame.fullScreen = m_view.fullScreen ? 1 : 0;
+    frame.visible = m_current != 0 && m_sample && !m_isHidden ? 1 : 0;
+    frame.serial = m_serial;
+    return frame.visible != 0 ? gst_sample_ref(m_sample) : nullptr;
 }
 
 } // namespace desktop
@@ -239,14 +252,14 @@ void telix_desktop_set_wakeup(telix_desktop_wakeup wakeup, void* data) {
 }
 
 void telix_desktop_acquire_frame(telix_desktop_frame* frame) {
-    desktop::Platform::instance().picture().acquire(*frame);
+    desktop::Platform::instance().picture().acquireFrame(*frame);
 }
 
 void telix_desktop_release_frame(telix_desktop_frame* frame) {
-    if (auto* held = static_cast<desktop::Held*>(frame->owner)) {
-        gst_video_frame_unmap(&held->frame);
-        gst_sample_unref(held->sample);
-        delete held;
+    if (auto* mapped = static_cast<desktop::MappedFrame*>(frame->owner)) {
+        gst_video_frame_unmap(&mapped->frame);
+        gst_sample_unref(mapped->sample);
+        delete mapped;
     }
     *frame = {};
 }

@@ -1,24 +1,25 @@
-// What is to be seen: the newest frame of whoever presents now, broadcast or a player, and where the page
-// wants it. The exported functions for the window are in telix_picture.h.
-#ifndef TELIX_DESKTOP_PICTURE_H
-#define TELIX_DESKTOP_PICTURE_H
+// The video plane under the page: the newest frame of the one presentation (broadcast or a media player), and
+// where on the page it is shown. The functions that are exported to the window are in telix_picture.h.
+#ifndef TELIX_DESKTOP_PLATFORM_PICTURE_H
+#define TELIX_DESKTOP_PLATFORM_PICTURE_H
+
+#include <gst/gst.h>
+
+#include <cstdint>
+#include <functional>
+#include <mutex>
 
 #include "desktop/platform/telix_picture.h"
 
-#include <condition_variable>
-#include <cstdint>
-#include <functional>
-#include <gst/gst.h>
-#include <mutex>
-
 namespace desktop {
 
+// Has locks of its own; no function needs the platform's mutex.
 class Picture {
 public:
-    // Names a presentation; 0 names none. A presentation that has been replaced has no effect any more.
+    // Identifies a presentation; 0: none. Every function ignores a token whose presentation has ended.
     using Token = uint64_t;
 
-    // Where the picture stands on the page of 1280 by 720.
+    // Where on the page of 1280 by 720 pixels the video is shown.
     struct View {
         int32_t x = 0;
         int32_t y = 0;
@@ -27,50 +28,53 @@ public:
         bool fullScreen = false;
     };
 
-    // Begins a presentation, which takes the set's one media pipeline from the one before: that one's `lost`
-    // is called on this thread, inside. `shown` is called once, when the first frame is there, on GStreamer's
-    // thread. Platform thread.
-    Token take(const View& view, std::function<void()> lost, std::function<void()> shown = nullptr);
+    // Starts a presentation and preempts the previous one, whose `onPreempted` runs on this thread before the
+    // function returns. `onFirstFrame` runs once, on GStreamer's thread. Platform thread.
+    Token acquire(const View& view, std::function<void()> onPreempted,
+                  std::function<void()> onFirstFrame = nullptr);
 
-    // Ends a presentation by its own will: `lost` is not called, the picture goes black. Platform thread.
+    // Ends a presentation; the video plane becomes black and `onPreempted` does not run. Platform thread.
     void release(Token token);
 
-    // Places the picture. Any thread.
-    void place(Token token, const View& view);
+    // Any thread, as the next two.
+    void setView(Token token, const View& view);
 
-    // Removes the frame. Any thread.
+    // Drops the frame; the next one is shown.
     void blank(Token token);
 
-    // Takes the picture from sight, or gives it back: what is shown meanwhile is there then. Any thread.
-    void hide(Token token, bool isHidden);
+    // While it is hidden, frames still arrive, and the newest is there at once when it is shown again.
+    void setHidden(Token token, bool isHidden);
 
-    // A sink for pipelines: takes raw video of any format and shows it as `token`, in the place of the sink
-    // made before. Until then there is no frame. The reference is floating; null if an element is missing.
+    // A sink for raw video of any format, which presents it as `token`. It replaces the sink that was made
+    // last: that one's frames are dropped. A floating reference; null if an element is missing. Platform
+    // thread.
     GstElement* makeSink(Token token);
 
-    // The exported functions.
+    // The exported functions. Any thread.
     void setWakeup(telix_desktop_wakeup wakeup, void* data);
-    void acquire(telix_desktop_frame& frame);
+    void acquireFrame(telix_desktop_frame& frame);
 
 private:
-    struct Target;
+    struct SinkData;
 
-    static GstFlowReturn showSample(const Target& target, GstSample* sample);
-    void show(const Target& target, GstSample* sample);
-    void wake();
+    bool isCurrentLocked(Token token) const { return token != 0 && token == m_current; }
+    static GstFlowReturn onSample(const SinkData& sink, GstSample* sample);
+    void showSample(const SinkData& sink, GstSample* sample);
+    GstSample* describeFrame(telix_desktop_frame& frame);
+    void wakeUp();
 
-    std::mutex m_mutex;
-    Token m_last = 0;
+    std::mutex m_mutex; // guards what follows; not held in callbacks
+    Token m_lastToken = 0;
     Token m_current = 0;
-    uint64_t m_lastSink = 0; // by number
+    uint64_t m_lastSink = 0; // the id of the sink that was made last
     View m_view;
     bool m_isHidden = false;
-    GstSample* m_sample = nullptr; // one reference
+    GstSample* m_sample = nullptr; // owns a reference; null: no frame
     uint64_t m_serial = 0;
-    std::function<void()> m_lost;
-    std::function<void()> m_shown;
+    std::function<void()> m_onPreempted;
+    std::function<void()> m_onFirstFrame;
 
-    std::mutex m_wakeupMutex; // held while the wake-up runs
+    std::mutex m_wakeupMutex; // guards what follows; held while the wake-up runs
     telix_desktop_wakeup m_wakeup = nullptr;
     void* m_wakeupData = nullptr;
 };

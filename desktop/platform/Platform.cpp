@@ -1,46 +1,48 @@
-// Start of the set, its thread, and how work gets there.
+// The platform thread: its start, and functions that are posted to it.
 #include "desktop/platform/Platform.h"
 
-#include "desktop/platform/Control.h"
+#include <gst/gst.h>
 
 #include <cstdio>
-#include <gst/gst.h>
 #include <thread>
+
+#include "desktop/platform/Control.h"
 
 namespace desktop {
 
 namespace {
 
-// A function that is called by and by on the platform thread.
-struct Repeated {
+// The user data of a timer.
+struct RepeatedFunction {
     std::function<bool()> function;
 
     static gboolean run(gpointer data) {
-        return static_cast<Repeated*>(data)->function() ? G_SOURCE_CONTINUE : G_SOURCE_REMOVE;
+        return static_cast<RepeatedFunction*>(data)->function() ? G_SOURCE_CONTINUE : G_SOURCE_REMOVE;
     }
-    static void destroy(gpointer data) { delete static_cast<Repeated*>(data); }
+    static void destroy(gpointer data) { delete static_cast<RepeatedFunction*>(data); }
 };
 
 } // namespace
 
 Platform& Platform::instance() {
-    static auto* const platform = new Platform; // kept until the process ends
+    static auto* const platform = new Platform; // lives until the process ends
     return *platform;
 }
 
 Platform::Platform() : m_context(g_main_context_new()), m_configuration(Configuration::loadOrDefault()) {
-    std::thread(&Platform::run, this).detach(); // ends with the process
+    std::thread(&Platform::run, this).detach(); // runs until the process ends
     std::unique_lock<std::mutex> lock(m_startMutex);
     m_started.wait(lock, [this] { return m_isStarted; });
-    post(Control::start); // runs when this object is complete
+    // Control::start calls instance(), which blocks until this object is complete.
+    post(Control::start);
 }
 
 void Platform::run() {
     g_main_context_push_thread_default(m_context);
     GError* error = nullptr;
     if (!gst_init_check(nullptr, nullptr, &error)) {
-        std::fprintf(stderr, "libtelix: no pictures and no sound: %s\n",
-                     error ? error->message : "GStreamer");
+        std::fprintf(stderr, "libtelix: GStreamer: cannot be initialised, no video and no audio: %s\n",
+                     error ? error->message : "unknown reason");
         g_clear_error(&error);
     }
     {
@@ -62,10 +64,10 @@ void Platform::post(std::function<void()> function) {
     g_source_set_priority(source, G_PRIORITY_DEFAULT);
     g_source_set_callback(source, runPosted, this, nullptr);
     g_source_attach(source, m_context);
-    g_source_unref(source); // the context keeps it
+    g_source_unref(source); // the context owns it
 }
 
-// There is one source for each function, so that those of others get their turn in between.
+// Each function has a source of its own, so that other sources are dispatched in between.
 gboolean Platform::runPosted(gpointer platform) {
     auto* self = static_cast<Platform*>(platform);
     std::function<void()> function;
@@ -81,9 +83,10 @@ gboolean Platform::runPosted(gpointer platform) {
 void Platform::postDelayed(unsigned int milliseconds, std::function<bool()> function) {
     post([this, milliseconds, function = std::move(function)]() mutable {
         GSource* source = g_timeout_source_new(milliseconds);
-        g_source_set_callback(source, Repeated::run, new Repeated{std::move(function)}, Repeated::destroy);
+        g_source_set_callback(source, RepeatedFunction::run, new RepeatedFunction{std::move(function)},
+                              RepeatedFunction::destroy);
         g_source_attach(source, m_context);
-        g_source_unref(source); // the context keeps it
+        g_source_unref(source); // the context owns it
     });
 }
 

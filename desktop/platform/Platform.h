@@ -1,47 +1,51 @@
-// The television set behind libtelix.so: starts at the first call, owns the platform thread and what all
-// calls share. Everything that calls must answer at once is plain data under one mutex; all other work, and
-// every callback to the plug-in, happens on the platform thread.
-#ifndef TELIX_DESKTOP_PLATFORM_H
-#define TELIX_DESKTOP_PLATFORM_H
+// The core of libtelix.so: starts at the first call of the plug-in and owns what the subsystems share (the
+// platform thread, the mutex, the configuration, the video plane).
+//
+// What a call must return at once is plain data under one mutex. All other work, and every callback to the
+// plug-in, runs on the platform thread.
+#ifndef TELIX_DESKTOP_PLATFORM_PLATFORM_H
+#define TELIX_DESKTOP_PLATFORM_PLATFORM_H
 
-#include "desktop/platform/Configuration.h"
-#include "desktop/platform/Picture.h"
+#include <glib.h>
 
 #include <condition_variable>
 #include <deque>
 #include <functional>
-#include <glib.h>
 #include <mutex>
+
+#include "desktop/platform/Configuration.h"
+#include "desktop/platform/Picture.h"
 
 namespace desktop {
 
 class Platform {
 public:
-    // The set. The first call of any thread starts it, and waits until the platform thread is up and
-    // GStreamer is initialized on it. It lives as long as the process: GStreamer's threads may outlast any
+    // The first call, on any thread, starts the platform thread and waits until GStreamer is initialised on
+    // it. The platform lives as long as the process, because GStreamer's threads may run longer than any
     // destructor.
     static Platform& instance();
 
     Platform(const Platform&) = delete;
     Platform& operator=(const Platform&) = delete;
 
-    // Runs `function` on the platform thread, in the order of the calls. Any thread; never runs it at once.
+    // Runs `function` on the platform thread, in the order of the calls and never before this returns. Any
+    // thread.
     void post(std::function<void()> function);
 
-    // Runs `function` on the platform thread after `milliseconds`, and then again at that distance as long as
-    // it returns true. Any thread.
+    // Runs `function` on the platform thread after `milliseconds`, and again at that interval as long as it
+    // returns true. Any thread.
     void postDelayed(unsigned int milliseconds, std::function<bool()> function);
 
     bool isPlatformThread() const;
 
-    // For bus watches and the like of the platform thread.
+    // The main context of the platform thread, for bus watches and other sources.
     GMainContext* context() const { return m_context; }
 
-    // Guards the state that calls read. Never hold it in a callback to the plug-in, nor while GStreamer is
-    // waited for.
+    // Guards the state that calls read. Not held in callbacks to the plug-in, nor while waiting for
+    // GStreamer.
     std::mutex& mutex() { return m_mutex; }
 
-    // Does not change after the start.
+    // Does not change after the start. Any thread.
     const Configuration& configuration() const { return m_configuration; }
 
     Picture& picture() { return m_picture; }
@@ -55,9 +59,9 @@ private:
     GMainContext* m_context;
     std::mutex m_startMutex;
     std::condition_variable m_started;
-    bool m_isStarted = false;
+    bool m_isStarted = false; // guarded by m_startMutex
     std::mutex m_postedMutex;
-    std::deque<std::function<void()>> m_posted;
+    std::deque<std::function<void()>> m_posted; // guarded by m_postedMutex
     Configuration m_configuration;
     Picture m_picture;
 };

@@ -194,7 +194,7 @@ class Channels(Demonstration):
 
     def test_over_http_the_description_of_the_stream_event_is_fetched(self):
         with MediaServer({'': os.path.join(ROOT, 'apps')}) as server:
-            self.assertEqual(self.announce(page=server.address + '/demo/index.html'),
+            self.assertEqual(self.announce(page=server.url + '/demo/index.html'),
                              ['RegisterStreamEvent(1, callback, "1", "1f", "red-button")'])
 
     def test_programmes_that_change_are_read_anew(self):
@@ -497,7 +497,7 @@ class Desk(Demonstration):
         super().setUpClass()
         server = MediaServer({'': os.path.join(ROOT, 'apps'), 'media': os.environ['TELIX_CLIPS']})
         cls.addClassCleanup(server.close)
-        cls.page = server.address + '/demo/index.html'
+        cls.page = server.url + '/demo/index.html'
 
     def watch(self, name, *parts, environment=None):
         """Goes through the steps; gives the notes and the picture of the window."""
@@ -653,7 +653,7 @@ class Look(Demonstration):
     def test_media(self):
         self.check('unserved', ['yellow'])
         with MediaServer({'': os.path.join(ROOT, 'apps')}) as server:
-            self.check('media', ['yellow'], page=server.address + '/demo/index.html')
+            self.check('media', ['yellow'], page=server.url + '/demo/index.html')
 
     def test_the_set(self):
         for steps_down in range(10):

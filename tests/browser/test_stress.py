@@ -30,7 +30,7 @@ class Stress(unittest.TestCase):
         rounds = []  # resident bytes when each began
         with MediaServer({'': pages, 'media': os.environ['TELIX_CLIPS']}) as server, \
                 Television(os.environ['TELIX_TV']) as television:
-            address = f'{server.address}/stress.html?rounds={ROUNDS}&tunes={TUNES}&starts={STARTS}'
+            address = f'{server.url}/stress.html?rounds={ROUNDS}&tunes={TUNES}&starts={STARTS}'
             with television.start('--plugin', os.environ['TELIX_DESK_PLUGIN'], '--timeout', TIME_LIMIT, '--wait-for',
                                   'window.stressResult', '--eval', 'window.stressResult', address) as process:
                 errors = ''

@@ -1,8 +1,6 @@
-// What the callbacks of a test were given, and waiting for it.
+// What callbacks received, and waiting for it.
 #ifndef TELIX_TESTS_DESKTOP_RECEIVED_H
 #define TELIX_TESTS_DESKTOP_RECEIVED_H
-
-#include "telix/telix_platform.h"
 
 #include <chrono>
 #include <cstdlib>
@@ -14,10 +12,13 @@
 #include <utility>
 #include <vector>
 
-// Looks until it is so; false if that takes too long.
-inline bool waitUntil(const std::function<bool()>& isSo, int seconds = 30) {
+#include "telix/telix_platform.h"
+
+// Polls until the condition holds. False after the timeout, which is long enough for a machine under full
+// load.
+inline bool waitUntil(const std::function<bool()>& condition, int seconds = 60) {
     const auto end = std::chrono::steady_clock::now() + std::chrono::seconds(seconds);
-    while (!isSo()) {
+    while (!condition()) {
         if (std::chrono::steady_clock::now() > end) {
             return false;
         }
@@ -26,18 +27,18 @@ inline bool waitUntil(const std::function<bool()>& isSo, int seconds = 30) {
     return true;
 }
 
-// Takes a text of the platform over; a null one is empty.
+// Takes ownership of a string that the platform returned; null counts as empty.
 inline std::string textOf(char* text) {
     std::string copy = text ? text : "";
     std::free(text);
     return copy;
 }
 
-// What came, in its order. The functions are called on any thread.
+// Events in the order of their arrival. The functions may be called on any thread.
 template <typename Event>
 class Received {
 public:
-    // Gives what a callback gives back.
+    // Returns what the callback returns.
     TELIX_RETCODE_ENUM_T add(Event event) {
         std::lock_guard<std::mutex> lock(m_mutex);
         m_events.push_back(std::move(event));
@@ -55,7 +56,7 @@ public:
         return m_events;
     }
 
-    // On which it came, since the start of the test program.
+    // The threads on which events arrived since the start of the test program.
     std::set<std::thread::id> threads() const {
         std::lock_guard<std::mutex> lock(m_mutex);
         return m_threads;
