@@ -11,6 +11,7 @@
 
 #include "common/BrowserGates.h"
 #include "common/Log.h"
+#include "common/PageScripts.h"
 
 std::string toLower(const std::string& text) {
     std::string result = text;
@@ -319,93 +320,21 @@ std::string streamEventScript(const std::string& name, const std::string& data, 
 
 std::string parseStreamEventXMLScript(const std::string& url, const std::string& eventName,
                                       const std::string& id, bool isAdd) {
-    std::string script = "var requestURL = '";
-    script += url;
-    script += "'; var eventName = '";
-    script += eventName;
-    // Meant: the loop over the text form compares `event`, not the entry just split, and several names stay
-    // undeclared, hence global in the page.
-    script += "';"
-              "var httpReq = new XMLHttpRequest();"
-              "httpReq.open('GET', requestURL, true);"
-              "httpReq.onreadystatechange = function(){"
-              "\tif((httpReq.readyState == 4) && (httpReq.status == 200)){"
-              "\t\tvar eventId_val = null;"
-              "\t\tvar comp_tag_val = null;"
-              "\t\tif(xmlData = httpReq.responseXML){"
-              "\t\t\tvar stream_event_type_elem =  xmlData.getElementsByTagName('stream_event');"
-              "\t\t\tfor(i=0; i < stream_event_type_elem.length; i++){"
-              "\t\t\t\tif(stream_event_type_elem[i].getAttribute('stream_event_name') == eventName){"
-              "\t\t\t\t\teventId_val = stream_event_type_elem[i].getAttribute('stream_event_id');"
-              "\t\t\t\t\tvar stream_event_elem = stream_event_type_elem[i].parentNode;"
-              "\t\t\t\t\tif(stream_event_elem)"
-              "\t\t\t\t\t\tcomp_tag_val = stream_event_elem.getAttribute('component_tag');"
-              "\t\t\t\t\tbreak;"
-              "\t\t\t\t}"
-              "\t\t\t}"
-              "\t\t}"
-              "\t\tif(!eventId_val || !comp_tag_val){"
-              "\t\t\tif(respText = httpReq.responseText){"
-              "\t\t\t\tvar eventset = respText.split(',');"
-              "\t\t\t\tfor(i=0; i < eventset.length - 1; i++){"
-              "\t\t\t\t\teventToken = eventset[i].split('.', 2);"
-              "\t\t\t\t\tif(eventName == event[1]){"
-              "\t\t\t\t\t\teventId_val = event[0];"
-              "\t\t\t\t\t\tbreak;"
-              "\t\t\t\t\t}"
-              "\t\t\t\t}"
-              "\t\t\t\tcompToken = eventset[eventset.length - 1];"
-              "\t\t\t\teventToken = compToken.split('$');"
-              "\t\t\t\tcomp_tag_val = eventToken[1];"
-              "\t\t\t\tif(null == eventId_val){"
-              "\t\t\t\t\tevent = eventToken[0].split('.', 2);"
-              "\t\t\t\t\tif(event[1] == eventName)"
-              "\t\t\t\t\t\teventId_val = event[0];"
-              "\t\t\t\t}"
-              "\t\t\t}"
-              "\t\t}"
-              "var objElem = document.getElementById('";
-    script += id;
-    script += "');"
-              "objElem.";
-    script += isAdd ? "addStreamEventListener" : "removeStreamEventListener";
-    script += "(requestURL, eventName, eventId_val, comp_tag_val);"
-              "}"
-              "};"
-              "httpReq.send(null);";
+    const std::string script =
+        fillIn(kStreamEventRequestScript,
+               {url, eventName, id, isAdd ? "addStreamEventListener" : "removeStreamEventListener"});
     PLUGIN_LOG(COMMON, "Script: %s \n", script.c_str());
     return script;
 }
 
 std::string getPlayCountVal(const std::string& id) {
-    std::string script = "window.getPlayCountVal = function()"
-                         "{"
-                         "\tvar objElem = document.getElementById(\"";
-    script += id;
-    script += "\");"
-              "\tvar nodeList = objElem.childNodes;"
-              "\tfor( var i = 0; i < nodeList.length ; i++)"
-              "\t{"
-              "\t\tvar paramElem = nodeList.item(i);"
-              "\t\tif( 'param' == paramElem.nodeName || 'PARAM' == paramElem.nodeName)"
-              "\t\t{"
-              "\t\t\tvar loopStr = paramElem.getAttribute('value');"
-              "\t\t\treturn loopStr;"
-              "\t\t}"
-              "\t}"
-              "};";
+    const std::string script = fillIn(kPlayCountScript, {id});
     PLUGIN_LOG(COMMON, "Script:--  %s ----\n", script.c_str());
     return script;
 }
 
 std::string getEncodedURL(const std::string& url) {
-    std::string script = "window.getEncodedURL = function()"
-                         "{"
-                         "\tvar encodedURL = encodeURI(\"";
-    script += url;
-    script += "\");"
-              "\treturn encodedURL;"
-              "};";
+    const std::string script = fillIn(kEncodedUrlScript, {url});
     PLUGIN_LOG(COMMON, "Script:--  %s ----\n", script.c_str());
     return script;
 }
