@@ -65,21 +65,21 @@ NPObject* Application::onApplicationHidden() {
 }
 
 void Application::setOnKeyPress(NPObject* handler) {
-    replaceListener(m_onKeyPress, handler);
+    storeListener(m_onKeyPress, handler);
 }
 
 void Application::setOnKeyUp(NPObject* handler) {
-    replaceListener(m_onKeyUp, handler);
+    storeListener(m_onKeyUp, handler);
 }
 
 void Application::setOnKeyDown(NPObject* handler) {
-    replaceListener(m_onKeyDown, handler);
+    storeListener(m_onKeyDown, handler);
 }
 
 void Application::setOnApplicationShown(NPObject* handler) {
-    replaceListener(m_onApplicationShown, handler);
+    storeListener(m_onApplicationShown, handler);
 }
 
 void Application::setOnApplicationHidden(NPObject* handler) {
-    replaceListener(m_onApplicationHidden, handler);
+    storeListener(m_onApplicationHidden, handler);
 }

@@ -24,15 +24,6 @@ namespace {
 
 const char* const kMimeTypes[] = {"application/oipfapplicationmanager", nullptr};
 
-// Meant: the retain is made on whatever is stored, null included.
-void storeHandler(NPObject*& slot, NPObject* handler) {
-    if (slot) {
-        NPN_ReleaseObject(slot);
-    }
-    slot = handler;
-    NPN_RetainObject(slot);
-}
-
 } // namespace
 
 const ObjectKind applicationManagerKind = [] {
@@ -188,19 +179,19 @@ NPObject* ApplicationManager::onApplicationLoadError() {
 }
 
 void ApplicationManager::setOnLowmemory(NPObject* handler) {
-    storeHandler(m_onLowmemory, handler);
+    storeListener(m_onLowmemory, handler);
 }
 
 void ApplicationManager::setOnApplicationLoaded(NPObject* handler) {
-    storeHandler(m_onApplicationLoaded, handler);
+    storeListener(m_onApplicationLoaded, handler);
 }
 
 void ApplicationManager::setOnApplicationUnloaded(NPObject* handler) {
-    storeHandler(m_onApplicationUnloaded, handler);
+    storeListener(m_onApplicationUnloaded, handler);
 }
 
 void ApplicationManager::setOnApplicationLoadError(NPObject* handler) {
-    storeHandler(m_onApplicationLoadError, handler);
+    storeListener(m_onApplicationLoadError, handler);
 }
 
 bool ApplicationManager::handleApplicationLoadError() {

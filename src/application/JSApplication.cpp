@@ -32,5 +32,5 @@ JSApplication::JSApplication(NPP npp) : SubObjectWrapper(npp, kClass) {
 }
 
 JSApplication::~JSApplication() {
-    ApplicationManager::removeApplication(impl());
+    endModel([](Application& application) { ApplicationManager::removeApplication(&application); });
 }

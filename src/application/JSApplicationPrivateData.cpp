@@ -18,13 +18,9 @@ constexpr ScriptMember kMembers[] = {
     property("currentChannel", readCurrentChannel),
 };
 
-constexpr ScriptClass kClass("JSApplicationPrivateData", LogModule::APP_MGR, kMembers);
+constexpr ScriptClass kClass = ScriptClass("JSApplicationPrivateData", LogModule::APP_MGR, kMembers)
+                                   .refusingWritesWith("JSApplicationPrivateData class\n");
 
 } // namespace
 
 JSApplicationPrivateData::JSApplicationPrivateData(NPP npp) : SubObjectWrapper(npp, kClass) {}
-
-bool JSApplicationPrivateData::SetProperty(NPIdentifier, const NPVariant*) {
-    PLUGIN_LOG(APP_MGR, "JSApplicationPrivateData class\n");
-    return false;
-}

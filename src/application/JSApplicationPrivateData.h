@@ -8,9 +8,6 @@
 class JSApplicationPrivateData final : public SubObjectWrapper<ApplicationPrivateData, 3> {
 public:
     explicit JSApplicationPrivateData(NPP npp);
-
-    // Refuses as the base does, with a line in the log.
-    bool SetProperty(NPIdentifier name, const NPVariant* value) override;
 };
 
 #endif

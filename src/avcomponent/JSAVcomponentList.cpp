@@ -16,7 +16,7 @@ constexpr ScriptArray kArray =
 constexpr ScriptClass kClass = ScriptClass("JSAVcomponentList", LogModule::AV_COMP, kMembers)
                                    .withArray(&kArray)
                                    .keepingUnreadResults()
-                                   .refusingWith("JSAVcomponentList class\n");
+                                   .refusingWritesWith("JSAVcomponentList class\n");
 
 } // namespace
 

@@ -7,9 +7,6 @@
 class JSOipfConfiguration final : public EmbeddedObjectWrapper<2> {
 public:
     explicit JSOipfConfiguration(NPP npp);
-
-    // Refuses as the base does, but without a line in the log.
-    bool SetProperty(NPIdentifier name, const NPVariant* value) override;
 };
 
 #endif

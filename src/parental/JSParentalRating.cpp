@@ -3,6 +3,8 @@
 
 namespace {
 
+constexpr const char* kRefusal = "JSParentalRating class\n";
+
 // Meant: unlike the other texts an empty region reads as void.
 bool readRegion(PluginBase& model, NPVariant& result) {
     const std::string region = static_cast<ParentalRating&>(model).getRegion();
@@ -20,8 +22,9 @@ constexpr ScriptMember kMembers[] = {
     property("region", readRegion),
 };
 
-constexpr ScriptClass kClass =
-    ScriptClass("JSParentalRating", LogModule::PARENTAL, kMembers).refusingWith("JSParentalRating class\n");
+constexpr ScriptClass kClass = ScriptClass("JSParentalRating", LogModule::PARENTAL, kMembers)
+                                   .refusingMethodsWith(kRefusal)
+                                   .refusingWritesWith(kRefusal);
 
 } // namespace
 

@@ -15,7 +15,7 @@ constexpr ScriptArray kArray = scriptArray<&Model::getLength, &Model::getitem>(L
 
 constexpr ScriptClass kClass = ScriptClass("JSParentalRatingCollection", LogModule::PARENTAL, kMembers)
                                    .withArray(&kArray)
-                                   .refusingWith("JSParentalRatingCollection class\n");
+                                   .refusingWritesWith("JSParentalRatingCollection class\n");
 
 } // namespace
 

@@ -54,10 +54,10 @@ NPObject* ParentalRatingScheme::getThreshold() {
     if (!object) {
         return nullptr;
     }
+    NPN_RetainObject(object); // the caller's; the reference of the creation is never given back
     ParentalRating& rating = *wrapperOf<JSParentalRating>(object)->impl();
     // Meant: the number is the handle too, which does no harm, since a threshold never asks the platform.
     rating.setParentalRatingHandle(static_cast<uint32_t>(threshold));
     rating.setThresholdProperties(static_cast<uint32_t>(threshold), m_name);
-    // Meant: the caller gets one of two references; the other stays behind.
-    return handOut(object);
+    return object;
 }

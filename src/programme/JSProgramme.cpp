@@ -15,7 +15,7 @@ constexpr ScriptMember kMembers[] = {
 };
 
 constexpr ScriptClass kClass =
-    ScriptClass("JSProgramme", LogModule::PROGRAMME, kMembers).refusingWith("JSProgramme class\n");
+    ScriptClass("JSProgramme", LogModule::PROGRAMME, kMembers).refusingMethodsWith("JSProgramme class\n");
 
 } // namespace
 

@@ -1,7 +1,9 @@
 // An application as a page sees it, and the four page functions that do its work.
 #include "src/application/Application.h"
 
+#include "common/ScriptReferences.h"
 #include "src/application/ApplicationManager.h"
+#include "src/application/JSApplication.h"
 #include "tests/support/BorderTest.h"
 
 using ::testing::AllOf;
@@ -83,6 +85,34 @@ TEST_F(ApplicationTest, AHandlerIsKeptAndReplaced) {
     }
 }
 
+// What the browser sees of the slot at the moment at which it counts a reference to the new handler.
+NPObject* (*retainOfBrowser)(NPObject* object) = nullptr;
+Application* observedApplication = nullptr;
+NPObject* heldAtRetain = nullptr;
+
+NPObject* retainAndLook(NPObject* object) {
+    NPNFuncs->retainobject = retainOfBrowser; // the getter retains too
+    heldAtRetain = observedApplication->onKeyPress();
+    if (heldAtRetain) {
+        NPN_ReleaseObject(heldAtRetain);
+    }
+    return retainOfBrowser(object);
+}
+
+TEST_F(ApplicationTest, AHandlerIsReleasedStoredAndThenRetained) {
+    const ScriptFunction first = browser.function("first");
+    const ScriptFunction second = browser.function("second");
+    application.set("onKeyPress", first);
+    log.clear();
+    retainOfBrowser = browser.table().retainobject;
+    observedApplication = wrapperOf<JSApplication>(application.object())->impl();
+    browser.table().retainobject = retainAndLook;
+    EXPECT_TRUE(application.set("onKeyPress", second));
+    EXPECT_EQ(heldAtRetain, second.object());
+    EXPECT_THAT(log.everything(), ElementsAre("NPN_ReleaseObject first", "NPN_RetainObject second",
+                                              "NPN_ReleaseObject second", "NPN_RetainObject second"));
+}
+
 TEST_F(ApplicationTest, AHandlerCanNotBeClearedOrWrittenAsAnythingElse) {
     for (const char* name : handlerNames) {
         const ScriptFunction handler = browser.function("handler");
@@ -115,6 +145,17 @@ TEST_F(ApplicationTest, TheEndReleasesPrivateDataAndHandlersInItsOwnOrder) {
                             "NPN_ReleaseObject onKeyUp", "NPN_ReleaseObject onKeyPress",
                             "NPN_ReleaseObject onApplicationShown", "NPN_ReleaseObject onApplicationHidden"));
     EXPECT_EQ(applicationCount(), 0U);
+}
+
+TEST_F(ApplicationTest, TheEndLogsOnceBeforeAnythingIsGivenBack) {
+    application.get("privateData");
+    const std::string text = logOf(1, [this] { application.reset(); });
+    const size_t logged = text.find("APP_MGR :: ~JSApplication :: Destructor called, This:-- ");
+    ASSERT_NE(logged, std::string::npos) << text;
+    EXPECT_LT(logged, text.find("NPN_ReleaseObject")) << text;
+    EXPECT_EQ(text.find("~JSApplication ::", logged + sizeof "APP_MGR :: ~JSApplication ::"),
+              std::string::npos)
+        << text;
 }
 
 TEST_F(ApplicationTest, CreateApplicationAsksThePageAndGivesANewApplication) {

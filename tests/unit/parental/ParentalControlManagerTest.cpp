@@ -425,4 +425,19 @@ TEST_F(ParentalControlTest, LogsUnderItsModule) {
     collectionWasMade = false; // but in the process of the log
 }
 
+TEST_F(ParentalControlTest, AThresholdIsRetainedBeforeItIsFilled) {
+    const std::string text = logOf(1, [this] {
+        tellThreshold(15);
+        records.add(60, "mpaa", {});
+        EXPECT_TRUE(schemes().get("0").object().get("threshold"));
+    });
+    const size_t told = text.find("parentalRatingThreshold is:: ( 15 )");
+    const size_t created = text.find("NPN_CreateObject", told);
+    const size_t retained = text.find("NPN_RetainObject", created);
+    const size_t filled = text.find("Buffer value is:: ( 15 )", told);
+    EXPECT_TRUE(told < created && created < retained && retained < filled && filled != std::string::npos)
+        << text;
+    collectionWasMade = false; // but in the process of the log
+}
+
 } // namespace

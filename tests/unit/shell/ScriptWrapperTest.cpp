@@ -11,6 +11,7 @@ using ::testing::AllOf;
 using ::testing::ElementsAre;
 using ::testing::HasSubstr;
 using ::testing::IsEmpty;
+using ::testing::MatchesRegex;
 using ::testing::Not;
 
 namespace {
@@ -39,6 +40,7 @@ public:
     std::string join(const std::string& text, uint32_t number, bool flag) {
         return text + " " + std::to_string(number) + (flag ? " yes" : " no");
     }
+    void note(const std::string&, const std::string&, const std::string&) {}
     NPObject* echo(NPObject* object) { return handOut(object); }
 
     static inline int alive = 0;
@@ -68,6 +70,7 @@ constexpr ScriptMember shelfMembers[] = {
     method("item", invoke<&Shelf::item>),
     method("clear", invoke<&Shelf::clear>),
     method("join", invoke<&Shelf::join>),
+    method("note", invoke<&Shelf::note>),
     method("echo", invoke<&Shelf::echo>),
 };
 
@@ -119,6 +122,22 @@ TEST_F(ScriptWrapperTest, AWrapperOwnsItsModel) {
     EXPECT_EQ(wrapperOf<JSShelf>(shelf.object())->impl()->getBrowser(), tv.npp());
     shelf = {};
     EXPECT_EQ(Shelf::alive, 0);
+}
+
+TEST_F(ScriptWrapperTest, TheDestructorLogsFirstUnderItsOwnNameThenDeletesTheModel) {
+    shelf.set("onChange", browser.function("listener")); // its release is what the model's end logs
+    const std::string text = logOf(1, [this] { shelf = {}; });
+    EXPECT_THAT(text,
+                MatchesRegex(" PLUGIN >>> CHANNEL :: ~JSShelf :: Destructor called, This:-- 0x[0-9a-f]+ --\n"
+                             " PLUGIN >>> COMMON :: NPN_ReleaseObject ::  is called\n"));
+}
+
+TEST_F(ScriptWrapperTest, TheWrapperOfAnEmbeddedObjectLogsItsDestructorToo) {
+    EmbeddedObject manager = browser.embed("application/oipfparentalcontrolmanager");
+    manager.scriptObject();
+    manager.destroy();
+    EXPECT_THAT(logOf(8, [&] { manager.dropScriptObject(); }),
+                MatchesRegex(" PLUGIN >>> PARENTAL :: ~JSParentalControlManager :: Destructor called, .*\n"));
 }
 
 TEST_F(ScriptWrapperTest, TheWrapperOfNullIsNull) {
@@ -233,6 +252,14 @@ TEST_F(ScriptWrapperTest, ArgumentsOfTheRightTypesReachTheModel) {
     EXPECT_EQ(shelf.call("join", "a", 2.9, false), "a 2 no");
     EXPECT_EQ(shelf.call("join", "a", -1.0, false), "a 0 no");
     EXPECT_EQ(shelf.call("join", "a", 5e9, false), "a 4294967295 no");
+}
+
+TEST_F(ScriptWrapperTest, ArgumentsAreConvertedFromTheFirstToTheLast) {
+    const auto converted = [](const std::string& text) {
+        return logLine("COMMON", "stringValue", "In stringValue() function, string is: " + text + ". \n");
+    };
+    EXPECT_EQ(logOf(9, [this] { EXPECT_TRUE(shelf.call("note", "a", "b", "c")); }),
+              converted("a") + converted("b") + converted("c"));
 }
 
 TEST_F(ScriptWrapperTest, ArgumentsOfOtherTypesFailTheCall) {
