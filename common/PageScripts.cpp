@@ -20,9 +20,9 @@ std::string fillIn(std::string_view script, std::initializer_list<std::string_vi
     return line;
 }
 
-// Fetches the description and looks for the event in its XML form, then in its text form. The names that are
-// not declared become globals of the page.
-// The loop over the text form compares `event`, not the entry just split.
+// Fetches the description and looks for the event in its XML form, then in its text form.
+// quirk 12: names that are not declared become globals of the page.
+// quirk 91: the loop over the text form compares `event`, not the entry just split.
 const std::string_view kStreamEventRequestScript = R"js(
 var requestURL = '@@'; var eventName = '@@';
 var httpReq = new XMLHttpRequest();
@@ -70,7 +70,7 @@ objElem.@@(requestURL, eventName, eventId_val, comp_tag_val);
 httpReq.send(null);
 )js";
 
-// The first `param` child counts, whatever its name.
+// quirk 66: the first `param` child counts, whatever its name.
 const std::string_view kPlayCountScript = R"js(
 window.getPlayCountVal = function()
 {

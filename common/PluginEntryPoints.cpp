@@ -17,7 +17,7 @@ constexpr int32_t kUnreadStreamChunk = 8192;
 const char kBannerRule[] =
     "*******************************************************************************************\n";
 
-// An instance that isn't there. Meant: a live instance never counts as invalid, whatever its data.
+// An instance that isn't there. A live instance never counts as invalid, whatever its data.
 bool isInvalid(NPP instance) {
     return !instance;
 }

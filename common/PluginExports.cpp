@@ -9,7 +9,7 @@
 
 namespace {
 
-// The size of the plug-in's table through `setvalue` on a 32-bit set. Meant: the same number on every
+// The size of the plug-in's table through `setvalue` on a 32-bit set. The same number on every
 // machine.
 constexpr uint16_t kPluginTableSize = 60;
 constexpr uint16_t kInterfaceVersion = 24;

@@ -49,6 +49,7 @@ double numberValue(const NPVariant& value) {
 
 namespace {
 
+// quirk 5: a number beyond the range takes the nearest bound instead of wrapping.
 template <typename Integer>
 Integer saturate(double number) {
     if (std::isnan(number)) {
@@ -76,10 +77,11 @@ int getIntFromNPIdentifier(const NPIdentifier& id) {
         return result;
     }
     PLUGIN_LOG(COMMON, "Property name:-- %s --\n", name);
+    // quirk 6: only the first character is tested.
     if (name[0] >= '0' && name[0] <= '9') {
         result = std::atoi(name);
     }
-    // Meant: free() and not NPN_MemFree. The browsers of the sets hand these texts out from the C heap.
+    // free() and not NPN_MemFree: the browsers of the sets hand these strings out from the C heap.
     std::free(name);
     return result;
 }
@@ -255,6 +257,8 @@ unsigned char* utf8ToUtf16Converter(const NPString& text, unsigned int* length) 
     return bytes;
 }
 
+// quirk 10: the event gets no properties.
+// quirk 12: `objElement` and `newEvent` become globals of the page.
 std::string domEventScript(const std::string& id, const std::string& event, bool bubbles, bool cancelable) {
     PLUGIN_LOG(COMMON, "Id: %s , Event: %s \n", id.c_str(), event.c_str());
     assert(!id.empty());
@@ -290,6 +294,7 @@ std::string parseDataAsUTF8(const std::string& data) {
     return result;
 }
 
+// quirk 11: a quote in an argument or in the payload ends the string literal, and the script fails.
 std::string streamEventScript(const std::string& name, const std::string& data, const std::string& status,
                               const std::string& id) {
     PLUGIN_LOG(COMMON, "is called. Name: %s , Data: %s , Status: %s , Id:  %s \n", name.c_str(), data.c_str(),

@@ -79,8 +79,8 @@ std::tuple<Types...> readArguments(const NPVariant* args, const std::tuple<Types
 
 } // namespace script_detail
 
-// Whether the first arguments of a call fit the types of a tuple. The array is read as it stands: its length
-// is not looked at.
+// Whether the first arguments of a call fit the types of a tuple.
+// quirk 1: the array is read as it stands, whatever its length.
 template <class Tuple>
 bool argumentsFit(const NPVariant* args) {
     return script_detail::argumentsFit(args, static_cast<const Tuple*>(nullptr),
@@ -115,8 +115,8 @@ bool write(PluginBase& model, const NPVariant& value) {
     return true;
 }
 
-// A property that holds a script function: an object replaces it, null clears it, anything else changes
-// nothing; the write succeeds in all three cases.
+// A property that holds a script function: an object replaces it, null clears it.
+// quirk 4: anything else changes nothing, and the write succeeds.
 template <auto Setter>
 bool writeListener(PluginBase& model, const NPVariant& value) {
     using Call = script_detail::Signature<decltype(Setter)>;

@@ -96,7 +96,7 @@ int ApplicationManager::onLowMemoryCb() {
     return 0;
 }
 
-// Meant: the notice ends here; the script handler is stored and never called.
+// quirk 13: the notification ends here; the script handler is stored and never called.
 int ApplicationManager::handleOnLowMemory(void*) {
     PLUGIN_LOG(APP_MGR, " is called \n");
     return G_SOURCE_REMOVE;
@@ -130,7 +130,8 @@ NPObject* ApplicationManager::getOwnerApplication(NPObject* document) {
         const NPString& href = location.value.stringValue;
         PLUGIN_LOG(APP_MGR, " ApplicationManager class:: Location: %s \n",
                    std::string(href.UTF8Length ? href.UTF8Characters : "", href.UTF8Length).c_str());
-        // A new object at every call: the reference of its creation goes to the caller, none is kept.
+        // quirk 15: a new object at every call; the reference of its creation goes to the caller, none is
+        // kept.
         application = createScriptObject<JSApplication>(m_npp);
     }
     NPN_ReleaseVariantValue(&location);
@@ -139,7 +140,8 @@ NPObject* ApplicationManager::getOwnerApplication(NPObject* document) {
 
 Application* ApplicationManager::getApplication(ApplicationPrivateData* data) {
     for (Application* application : m_applications) {
-        // Meant: the reference that comes with the object is left behind.
+        // The reference that comes with the object is never released: an application that was visited keeps
+        // it.
         auto* wrapper = wrapperOf<JSApplicationPrivateData>(application->privateData());
         if (wrapper && wrapper->impl() == data) {
             return application;
@@ -150,7 +152,7 @@ Application* ApplicationManager::getApplication(ApplicationPrivateData* data) {
 
 Application* ApplicationManager::getApplication(KeySet* keySet) {
     for (Application* application : m_applications) {
-        // Meant: the references that come with both objects are left behind.
+        // The references that come with both objects are never released.
         auto* dataWrapper = wrapperOf<JSApplicationPrivateData>(application->privateData());
         if (dataWrapper) {
             auto* keySetWrapper = wrapperOf<JSKeySet>(dataWrapper->impl()->keySet());
@@ -195,7 +197,7 @@ void ApplicationManager::setOnApplicationLoadError(NPObject* handler) {
 }
 
 bool ApplicationManager::handleApplicationLoadError() {
-    // Meant: this one statement speaks as another class, under that class's module.
+    // This one statement names another class, under that class's module: logs of sets are read by it.
     PLUGIN_LOG(AVCONTROL, "AVControl class");
     if (!m_onApplicationLoadError) {
         return false;
@@ -223,7 +225,7 @@ int ApplicationManager::callKeyHandlers(NPObject* (Application::*handler)()) {
             const bool isAlive =
                 std::find(m_applications.begin(), m_applications.end(), application) != m_applications.end();
             if (isAlive && (application->*handler)()) {
-                // Meant: both getter calls leave a reference behind.
+                // Neither of the two references that the getter hands out is released.
                 invokeJScriptFunc((application->*handler)(), nullptr, 0);
             }
         }

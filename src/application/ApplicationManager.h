@@ -46,11 +46,12 @@ public:
 
     // The application, of any page, that owns a private data object or a key set; null if none lives. Every
     // application that is visited makes these objects if it has none, and one reference to each of them is
-    // left behind.
+    // never released.
     Application* getApplication(ApplicationPrivateData* data);
     Application* getApplication(KeySet* keySet);
 
     // Script handlers. A getter hands out one more reference; null if none is set. A setter takes null too.
+    // quirk 14: nothing calls the handlers of loading, unloading and load errors.
     NPObject* onLowmemory();
     NPObject* onApplicationLoaded();
     NPObject* onApplicationUnloaded();

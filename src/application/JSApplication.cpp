@@ -6,7 +6,7 @@
 
 namespace {
 
-// Meant: unlike the manager's handlers these can't be cleared: a write of null is refused.
+// quirk 16: a handler is written as an object or not at all; null is refused.
 constexpr ScriptMember kMembers[] = {
     property("privateData", read<&Application::privateData>),
     property("private", read<&Application::privateData>),

@@ -5,7 +5,7 @@ namespace {
 
 using Model = ApplicationPrivateData;
 
-// Meant: an object also when there is none; no null is put in its place.
+// quirk 21: an object variant also when there is no object; no null is put in its place.
 bool readCurrentChannel(PluginBase& model, NPVariant& result) {
     result.type = NPVariantType_Object;
     result.value.objectValue = static_cast<Model&>(model).getCurrChannel();

@@ -38,6 +38,7 @@ bool AVcomponent::fetchText(std::string& cache, Call ofAVControl, Call ofVideoBr
     return true;
 }
 
+// quirk 34: the first successful answer is kept for good.
 template <class Raw, class Value, class Call>
 Value AVcomponent::fetchOnce(Value& cache, bool& valid, Call ofAVControl, Call ofVideoBroadcast) const {
     if (m_handle != 0 && !valid) {

@@ -8,11 +8,11 @@ constexpr ScriptMember kMembers[] = {
     property("length", read<&AVcomponentList::length>),
 };
 
-// Meant: this one line belongs to the channels' module.
+// This one line belongs to the channels' module: logs of sets are read by it.
 constexpr ScriptArray kArray =
     scriptArray<&AVcomponentList::length, &AVcomponentList::item>(LogModule::CHANNEL, " ");
 
-// Meant: a read that finds no property leaves the browser's result as it was.
+// A read that finds no property leaves the browser's result as it was.
 constexpr ScriptClass kClass = ScriptClass("JSAVcomponentList", LogModule::AV_COMP, kMembers)
                                    .withArray(&kArray)
                                    .keepingUnreadResults()

@@ -7,6 +7,7 @@
 
 namespace {
 
+// quirk 25: an answer that is not empty is kept for good.
 std::string fetchText(std::string& cache, TELIX_RETCODE_ENUM_T (*ask)(char**)) {
     char* text = nullptr;
     if (cache.empty() && ask(&text) == 0 && text) {

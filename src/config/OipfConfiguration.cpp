@@ -36,7 +36,7 @@ NPObject* OipfConfiguration::getJSObject() {
 }
 
 NPObject* OipfConfiguration::getKeySetObject() {
-    // Made for this object's own instance, which has no application manager: hence the key set is inert.
+    // quirk 22: made for this object's own instance, which has no application manager.
     return handOutOnce<JSKeySet>(getBrowser(), m_keySetObject);
 }
 

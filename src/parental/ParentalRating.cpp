@@ -9,14 +9,14 @@
 ParentalRating::ParentalRating(NPP npp) : PluginBase(npp) {}
 
 void ParentalRating::setThresholdProperties(unsigned int threshold, const std::string& scheme) {
-    // Meant: written as a signed number.
+    // quirk 38: the number as text, signed, is the name, and the region is a text that says "undefined".
     const std::string number = std::to_string(static_cast<int32_t>(threshold));
     PLUGIN_LOG(PARENTAL, " Buffer value is:: ( %s )\n", number.c_str());
     m_isThreshold = true;
     m_name = number;
     m_value = static_cast<int32_t>(threshold);
     m_scheme = scheme;
-    m_region = "undefined"; // meant: a text that says so
+    m_region = "undefined";
 }
 
 template <class Ask>

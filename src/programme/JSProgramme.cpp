@@ -11,6 +11,7 @@ constexpr ScriptMember kMembers[] = {
     property("duration", read<&Model::getDuration>, write<&Model::setDuration>),
     property("description", read<&Model::getDescription>, write<&Model::setDescription>),
     property("channelID", read<&Model::getChannelID>, write<&Model::setChannelID>),
+    // quirk 33: the name of the property.
     property("parentalRating", read<&Model::getParentalRatingCollectionObject>),
 };
 
