@@ -1,4 +1,4 @@
-// The texts of the longer page scripts. Pages on sets in the field rely on them byte for byte,
+// The longer page scripts. Pages on sets in the field rely on them byte for byte,
 // inconsistencies included.
 #include "common/PageScripts.h"
 
@@ -20,9 +20,9 @@ std::string fillIn(std::string_view script, std::initializer_list<std::string_vi
     return line;
 }
 
-// Fetches the description and looks for the event in its XML form, then in its text form.
+// Fetches the description and looks for the event in its XML form, then in its comma-separated form.
 // quirk 12: names that are not declared become globals of the page.
-// quirk 91: the loop over the text form compares `event`, not the entry just split.
+// quirk 91: the loop over the comma-separated form compares `event`, not the entry just split.
 const std::string_view kStreamEventRequestScript = R"js(
 var requestURL = '@@'; var eventName = '@@';
 var httpReq = new XMLHttpRequest();

@@ -23,7 +23,7 @@ NPObject* PluginBase::getJSObject() {
 
 NPError PluginBase::init(unsigned short mode, int argc, char* const* argn, char* const* argv) {
     PLUGIN_LOG(COMMON, "PluginBase::Mode: %d , Argc:  %d \n", mode, argc);
-    // The value of these two travels in the address itself.
+    // The value of these two is the pointer itself.
     NPN_SetValue(m_npp, NPPVpluginWindowBool, nullptr);
     // NOLINTNEXTLINE(performance-no-int-to-ptr)
     NPN_SetValue(m_npp, NPPVpluginTransparentBool, reinterpret_cast<void*>(true));
@@ -111,9 +111,9 @@ NPObject* PluginBase::getNPPluginObj() {
 }
 
 std::string PluginBase::getBaseURL(const std::string& url) {
-    static const char expression[] = "document.location.href";
+    static const char kExpression[] = "document.location.href";
     std::string base;
-    NPString text{expression, sizeof(expression) - 1};
+    NPString text{kExpression, sizeof(kExpression) - 1};
     NPVariant result{};
     if (!NPN_Evaluate(m_npp, getNPWindowObj(), &text, &result) || result.type != NPVariantType_String) {
         return base;
@@ -160,8 +160,8 @@ void PluginBase::setObjectStyle(const std::string& style) {
         value.value.stringValue = {style.c_str(), static_cast<uint32_t>(std::strlen(style.c_str()))};
         NPN_SetProperty(m_npp, styleObject.value.objectValue, imageId, &value);
     }
-    static const NPString transparent{"transparent", 11};
-    value.value.stringValue = transparent;
+    static const NPString kTransparent{"transparent", 11};
+    value.value.stringValue = kTransparent;
     NPN_SetProperty(m_npp, styleObject.value.objectValue, colorId, &value);
     NPN_ReleaseVariantValue(&styleObject);
 }

@@ -72,8 +72,8 @@ NPError NPP_Initialize() {
 
 const char* NPP_GetMIMEDescription() {
     // Never freed: browsers keep the address beyond NP_Shutdown.
-    static const char* const description = strdup(PluginEntryPoints::getInst()->mimeTypeString().c_str());
-    return description;
+    static const char* const kDescription = strdup(PluginEntryPoints::getInst()->mimeTypeString().c_str());
+    return kDescription;
 }
 
 void NPP_Shutdown() {

@@ -1,5 +1,5 @@
 // Conversion of script values, the UTF-8 machinery behind the one place where a script string stands for
-// bytes, and the page scripts. The scripts are fixed texts, inconsistencies included: pages on sets in the
+// bytes, and the page scripts. The scripts are fixed, inconsistencies included: pages on sets in the
 // field rely on them.
 #include "common/PluginUtils.h"
 
@@ -55,9 +55,9 @@ Integer saturate(double number) {
     if (std::isnan(number)) {
         return 0;
     }
-    constexpr double lowest = std::numeric_limits<Integer>::min();
-    constexpr double highest = std::numeric_limits<Integer>::max();
-    return static_cast<Integer>(std::clamp(number, lowest, highest));
+    constexpr double kLowest = std::numeric_limits<Integer>::min();
+    constexpr double kHighest = std::numeric_limits<Integer>::max();
+    return static_cast<Integer>(std::clamp(number, kLowest, kHighest));
 }
 
 } // namespace
@@ -91,11 +91,11 @@ bool isEscapeCharacter(unsigned int value) {
 }
 
 std::string getEscapeChar(ESC_CHAR_ENUM_T value) {
-    static const char letters[] = "abtnvfr";
+    static const char kLetters[] = "abtnvfr";
     if (!isEscapeCharacter(value)) {
         return {};
     }
-    return {'\\', letters[value - ESC_CHAR_ALERT]};
+    return {'\\', kLetters[value - ESC_CHAR_ALERT]};
 }
 
 int inlineUTF8SequenceLengthNonASCII(char first) {
@@ -164,7 +164,7 @@ bool isLegalUTF8Sequence(const char* bytes, int length) {
 
 // Decodes one sequence: all bytes summed up in base 64, then the sum of their marker bits taken off.
 uint32_t readUTF8Sequence(const char** source, int length) {
-    static const uint32_t markers[] = {0, 0, 0x3080, 0xE2080, 0x3C82080, 0xFA082080, 0x82082080};
+    static const uint32_t kMarkers[] = {0, 0, 0x3080, 0xE2080, 0x3C82080, 0xFA082080, 0x82082080};
     if (length < 1 || length > 6) {
         return 0;
     }
@@ -172,14 +172,14 @@ uint32_t readUTF8Sequence(const char** source, int length) {
     for (int i = 0; i < length; ++i) {
         value = value * 64 + static_cast<unsigned char>(*(*source)++);
     }
-    return value - markers[length];
+    return value - kMarkers[length];
 }
 
 } // namespace
 
 ConversionResult convUTF8ToUTF16(const char** sourceStart, const char* sourceEnd,
                                  unsigned short** targetStart, unsigned short* targetEnd, int strict) {
-    constexpr unsigned short replacement = 0xFFFD;
+    constexpr unsigned short kReplacement = 0xFFFD;
     ConversionResult result = conversionOK;
     const char* source = *sourceStart;
     unsigned short* target = *targetStart;
@@ -210,7 +210,7 @@ ConversionResult convUTF8ToUTF16(const char** sourceStart, const char* sourceEnd
             *target++ = static_cast<unsigned short>((character >> 10) + 0xD7C0);
             *target++ = static_cast<unsigned short>((character & 0x3FF) | 0xDC00);
         } else {
-            *target++ = isNone ? replacement : static_cast<unsigned short>(character);
+            *target++ = isNone ? kReplacement : static_cast<unsigned short>(character);
         }
     }
     *sourceStart = source;
@@ -281,7 +281,7 @@ std::string parseDataAsUTF8(const std::string& data) {
     std::string result;
     for (size_t index = 0; index < data.size(); index += 2) {
         unsigned int value = 0;
-        // At the end of the text the terminating zero is met, which is no hex digit.
+        // The terminating zero ends a pair that is cut short: it is not a hex digit.
         for (size_t taken = 0; taken < 2 && isASCIIHexDigit(data.c_str()[index + taken]); ++taken) {
             value = value << 4 | static_cast<unsigned int>(toASCIIHexValue(data[index + taken]));
         }

@@ -12,7 +12,7 @@
 #include "common/PluginBase.h"
 #include "common/ScriptValues.h"
 
-// Each of these does its work on the model behind the wrapper and tells whether it took place: false from a
+// Each of these does its work on the model behind the wrapper and returns whether it took place: false from a
 // writer or an invoker is a value or arguments that do not fit.
 using ScriptReader = bool (*)(PluginBase& model, NPVariant& result);
 using ScriptWriter = bool (*)(PluginBase& model, const NPVariant& value);

@@ -1,4 +1,4 @@
-// Texts for script.
+// Strings for script.
 #include "common/ScriptValues.h"
 
 #include <cstring>

@@ -68,7 +68,7 @@ protected:
     // Fetches the identifiers of the table's names, in its order.
     void fetchIdentifiers(NPIdentifier* identifiers) const;
 
-    // The rest of the virtual operations behind the look-up. `member` is the name's row, null if the class
+    // The rest of the virtual operations after the look-up. `member` is the name's row, null if the class
     // has none; `model` is the model at this moment, or null.
     bool refuseMethod() const;
     bool invokeMember(const ScriptMember* member, PluginBase* model, const NPVariant* args,

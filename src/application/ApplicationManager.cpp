@@ -26,7 +26,7 @@ const char* const kMimeTypes[] = {"application/oipfapplicationmanager", nullptr}
 
 } // namespace
 
-const ObjectKind applicationManagerKind = [] {
+const ObjectKind kApplicationManagerKind = [] {
     ObjectKind kind{};
     kind.id = 200;
     kind.destroyText = "APPMANAGER_OBJ_ID delete\n";
@@ -118,8 +118,8 @@ NPObject* ApplicationManager::getJSObject() {
 }
 
 NPObject* ApplicationManager::getOwnerApplication(NPObject* document) {
-    static const char expression[] = "location.href";
-    NPString text{expression, sizeof(expression) - 1};
+    static const char kExpression[] = "location.href";
+    NPString text{kExpression, sizeof(kExpression) - 1};
     NPVariant location{};
     // The document itself is the scope, not the page's window.
     if (!NPN_Evaluate(m_npp, document, &text, &location)) {

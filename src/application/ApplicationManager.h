@@ -14,7 +14,7 @@ class ApplicationPrivateData;
 class KeySet;
 struct ObjectKind;
 
-extern const ObjectKind applicationManagerKind;
+extern const ObjectKind kApplicationManagerKind;
 
 class ApplicationManager final : public PluginBase {
 public:
@@ -39,7 +39,7 @@ public:
     NPObject* getJSObject() override;
 
     // A new application object for the page of the document; the caller owns its reference. Null if the
-    // document tells no location.
+    // document has no location.
     NPObject* getOwnerApplication(NPObject* document);
 
     std::vector<Application*> applicationList() const { return m_applications; }

@@ -1,4 +1,4 @@
-// The script face of an application's private data.
+// The script interface of an application's private data.
 #ifndef TELIX_SRC_APPLICATION_JSAPPLICATIONPRIVATEDATA_H
 #define TELIX_SRC_APPLICATION_JSAPPLICATIONPRIVATEDATA_H
 

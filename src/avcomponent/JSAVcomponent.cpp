@@ -3,7 +3,7 @@
 
 namespace {
 
-// quirk 35: an empty text is a string of length 0, not null.
+// quirk 35: an empty string has length 0 and is not null.
 // The block comes from the C heap: the browsers of the sets free it there.
 template <std::string (AVcomponent::*Getter)()>
 bool readText(PluginBase& model, NPVariant& result) {

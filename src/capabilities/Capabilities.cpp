@@ -35,7 +35,7 @@ uint32_t fetchCount(uint32_t& last, TELIX_RETCODE_ENUM_T (*ask)(uint32_t*)) {
 
 } // namespace
 
-const ObjectKind capabilitiesKind = [] {
+const ObjectKind kCapabilitiesKind = [] {
     ObjectKind kind{};
     kind.id = 700;
     kind.destroyText = "OIPFCAPABILITIES_OBJ_ID delete :: %p \n";

@@ -23,10 +23,10 @@ uint32_t fetchId(uint32_t& cache, uint32_t handle, Ask ask) {
     return cache;
 }
 
-// quirk 29: an id or a text that the platform has given is kept for good.
-// A text that the platform is asked for as long as it is empty.
+// quirk 29: an id or a string that the platform has given is kept for good.
+// A string that the platform is asked for as long as it is empty.
 template <class Ask>
-std::string fetchText(std::string& cache, uint32_t handle, Ask ask) {
+std::string fetchString(std::string& cache, uint32_t handle, Ask ask) {
     if (cache.empty() && handle != 0) {
         char* text = nullptr;
         if (ask(handle, &text) == 0 && text) {
@@ -76,11 +76,11 @@ int Channel::getChannelType() {
 }
 
 std::string Channel::getName() {
-    return fetchText(m_name, m_channelHandle, TELIX_JS_CM_GetName);
+    return fetchString(m_name, m_channelHandle, TELIX_JS_CM_GetName);
 }
 
 std::string Channel::getDsd() {
-    return fetchText(m_dsd, m_channelHandle, TELIX_JS_CM_GetDsd);
+    return fetchString(m_dsd, m_channelHandle, TELIX_JS_CM_GetDsd);
 }
 
 std::string Channel::getCcid() {

@@ -1,4 +1,4 @@
-// The script face of the embedded configuration object.
+// The script interface of the embedded configuration object.
 #ifndef TELIX_SRC_CONFIG_JSOIPFCONFIGURATION_H
 #define TELIX_SRC_CONFIG_JSOIPFCONFIGURATION_H
 

@@ -13,7 +13,7 @@ const char* const kMimeTypes[] = {"application/oipfconfiguration", nullptr};
 
 } // namespace
 
-const ObjectKind oipfConfigurationKind = [] {
+const ObjectKind kOipfConfigurationKind = [] {
     ObjectKind kind{};
     kind.id = 500;
     kind.destroyText = "OIPFCONFIGURATION_OBJ_ID delete :: %p \n";

@@ -9,7 +9,7 @@
 class DRMAgent;
 struct ObjectKind;
 
-extern const ObjectKind drmAgentKind;
+extern const ObjectKind kDrmAgentKind;
 
 // The agent that every result goes to: the one constructed last. Meant: it keeps its value when that agent
 // has gone; whether the agent lives is asked of the class.

@@ -5,7 +5,7 @@ namespace {
 
 constexpr const char* kRefusal = "JSParentalRating class\n";
 
-// quirk 37: unlike the other texts an empty region reads as void.
+// quirk 37: unlike the other strings an empty region reads as void.
 bool readRegion(PluginBase& model, NPVariant& result) {
     const std::string region = static_cast<ParentalRating&>(model).getRegion();
     if (!region.empty()) {

@@ -13,7 +13,7 @@ const char* const kMimeTypes[] = {"application/oipfparentalcontrolmanager", null
 
 } // namespace
 
-const ObjectKind parentalControlManagerKind = [] {
+const ObjectKind kParentalControlManagerKind = [] {
     ObjectKind kind{};
     kind.id = 600;
     kind.mimeTypes = kMimeTypes;

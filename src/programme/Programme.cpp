@@ -10,12 +10,12 @@
 
 namespace {
 
-// quirk 31: a text whose length comes beside it in one byte.
+// quirk 31: a string whose length comes beside it in one byte.
 template <class Ask>
-std::string fetchText(std::string& last, uint32_t handle, Ask ask) {
+std::string fetchString(std::string& last, uint32_t handle, Ask ask) {
     char* text = nullptr;
     ___UINT8 length = 0;
-    // The text of an answer of length 0 is not freed: it stays the platform's.
+    // A string of length 0 is not freed: it stays the platform's.
     if (handle != 0 && ask(handle, &text, &length) == 0 && text && length != 0) {
         last.assign(text, length);
         std::free(text);
@@ -56,7 +56,7 @@ Programme::~Programme() {
 }
 
 std::string Programme::getName() {
-    return fetchText(m_name, m_programmeHandle, TELIX_JS_SI_GetName);
+    return fetchString(m_name, m_programmeHandle, TELIX_JS_SI_GetName);
 }
 
 uint32_t Programme::getStartTime() {
@@ -68,7 +68,7 @@ uint32_t Programme::getDuration() {
 }
 
 std::string Programme::getDescription() {
-    return fetchText(m_description, m_programmeHandle, TELIX_JS_SI_GetDescription);
+    return fetchString(m_description, m_programmeHandle, TELIX_JS_SI_GetDescription);
 }
 
 std::string Programme::getChannelID() {

@@ -13,7 +13,7 @@ using ::testing::IsEmpty;
 
 namespace {
 
-// The platform's rating schemes: records, and the texts that they point at.
+// The platform's rating schemes: records, and the strings that they point at.
 class SchemeRecords {
 public:
     // `ratings` are names with their icons; without a name the record has none.

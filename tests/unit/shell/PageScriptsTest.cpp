@@ -1,4 +1,4 @@
-// The texts that the plug-in has the page evaluate, byte for byte.
+// The scripts that the plug-in has the page evaluate, byte for byte.
 #include "common/PluginUtils.h"
 
 #include <algorithm>
@@ -92,10 +92,10 @@ TEST_F(PageScriptsTest, AStreamEventWithoutTextLeavesItOut) {
 }
 
 TEST_F(PageScriptsTest, ControlCharactersHaveEscapes) {
-    const char* const escapes[] = {"\\a", "\\b", "\\t", "\\n", "\\v", "\\f", "\\r"};
+    const char* const kEscapes[] = {"\\a", "\\b", "\\t", "\\n", "\\v", "\\f", "\\r"};
     for (int value = -1; value < 256; ++value) {
         EXPECT_EQ(getEscapeChar(static_cast<ESC_CHAR_ENUM_T>(value)),
-                  value >= 7 && value <= 13 ? escapes[value - 7] : "")
+                  value >= 7 && value <= 13 ? kEscapes[value - 7] : "")
             << value;
     }
 }
@@ -123,7 +123,7 @@ TEST_F(PageScriptsTest, APairWithoutLeadingDigitAndAZeroAddNothing) {
 }
 
 // The text of parseStreamEventXMLScript between url and method name.
-const std::string streamEventScriptBody =
+const std::string kStreamEventScriptBody =
     "var httpReq = new XMLHttpRequest();httpReq.open('GET', requestURL, true);"
     "httpReq.onreadystatechange = function(){\tif((httpReq.readyState == 4) && (httpReq.status == 200)){"
     "\t\tvar eventId_val = null;\t\tvar comp_tag_val = null;\t\tif(xmlData = httpReq.responseXML){"
@@ -144,12 +144,12 @@ const std::string streamEventScriptBody =
 
 TEST_F(PageScriptsTest, AStreamEventDescriptionIsFetchedAndHandedToTheElement) {
     EXPECT_EQ(parseStreamEventXMLScript("dvb://1", "name", "tv", true),
-              "var requestURL = 'dvb://1'; var eventName = 'name';" + streamEventScriptBody +
+              "var requestURL = 'dvb://1'; var eventName = 'name';" + kStreamEventScriptBody +
                   "var objElem = document.getElementById('tv');objElem.addStreamEventListener(requestURL, "
                   "eventName, "
                   "eventId_val, comp_tag_val);}};httpReq.send(null);");
     EXPECT_EQ(parseStreamEventXMLScript("dvb://1", "name", "tv", false),
-              "var requestURL = 'dvb://1'; var eventName = 'name';" + streamEventScriptBody +
+              "var requestURL = 'dvb://1'; var eventName = 'name';" + kStreamEventScriptBody +
                   "var objElem = document.getElementById('tv');objElem.removeStreamEventListener(requestURL, "
                   "eventName, eventId_val, comp_tag_val);}};httpReq.send(null);");
 }

@@ -57,7 +57,7 @@ bool readDuplicate(PluginBase& model, NPVariant& result) {
     return true;
 }
 
-constexpr ScriptMember shelfMembers[] = {
+constexpr ScriptMember kShelfMembers[] = {
     property("isOpen", read<&Shelf::isOpen>),
     property("depth", read<&Shelf::depth>, write<&Shelf::setDepth>),
     property("highNumber", read<&Shelf::highNumber>),
@@ -74,13 +74,13 @@ constexpr ScriptMember shelfMembers[] = {
     method("echo", invoke<&Shelf::echo>),
 };
 
-constexpr ScriptArray shelfItems = scriptArray<&Shelf::length, &Shelf::item>(LogModule::CHANNEL, " ");
-constexpr ScriptClass shelfClass =
-    ScriptClass("JSShelf", LogModule::CHANNEL, shelfMembers).withArray(&shelfItems);
+constexpr ScriptArray kShelfItems = scriptArray<&Shelf::length, &Shelf::item>(LogModule::CHANNEL, " ");
+constexpr ScriptClass kShelfClass =
+    ScriptClass("JSShelf", LogModule::CHANNEL, kShelfMembers).withArray(&kShelfItems);
 
-class JSShelf final : public SubObjectWrapper<Shelf, std::size(shelfMembers)> {
+class JSShelf final : public SubObjectWrapper<Shelf, std::size(kShelfMembers)> {
 public:
-    explicit JSShelf(NPP npp) : SubObjectWrapper(npp, shelfClass) {}
+    explicit JSShelf(NPP npp) : SubObjectWrapper(npp, kShelfClass) {}
 };
 
 class ScriptWrapperTest : public BorderTest {
@@ -148,7 +148,7 @@ TEST_F(ScriptWrapperTest, NamesAreInternedOnceInTheOrderOfTheTable) {
     log.clear();
     const ObjectRef another = ObjectRef::adopt(createScriptObject<JSShelf>(tv.npp()));
     std::vector<std::string> expected = {"NPN_CreateObject JSShelf#2"};
-    for (const ScriptMember& member : shelfMembers) {
+    for (const ScriptMember& member : kShelfMembers) {
         expected.push_back("NPN_GetStringIdentifier \"" + std::string(member.name) + "\"");
     }
     EXPECT_EQ(log.everything(), expected);
