@@ -28,6 +28,7 @@ int g_delivered = 0;
 struct BareRecord {
     unsigned int type;
     void* receiver;
+    uint64_t generation; // of the receiver
     void* payload;
 };
 
@@ -71,7 +72,7 @@ gboolean callingHandler(gpointer data) {
 
 template <GSourceFunc Handler>
 void fireBare() {
-    g_idle_add(Handler, new BareRecord{1, &g_delivered, new BarePayload{0, 2, 200}});
+    g_idle_add(Handler, new BareRecord{1, &g_delivered, 1, new BarePayload{0, 2, 200}});
 }
 
 // ---- Ours

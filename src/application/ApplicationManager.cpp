@@ -6,6 +6,7 @@
 #include <algorithm>
 #include <cstring>
 
+#include "common/LiveRef.h"
 #include "common/Log.h"
 #include "common/ObjectKind.h"
 #include "common/ScriptReferences.h"
@@ -92,7 +93,7 @@ void ApplicationManager::removeApplication(Application* application) {
 
 int ApplicationManager::onLowMemoryCb() {
     PLUGIN_LOG(APP_MGR, " is called \n");
-    g_idle_add(handleOnLowMemory, nullptr);
+    postIdle(handleOnLowMemory, nullptr); // for no object: the step touches none
     return 0;
 }
 

@@ -4,9 +4,7 @@
 #include <strings.h>
 #include <unistd.h>
 
-#include <algorithm>
 #include <cstdlib>
-#include <vector>
 
 #include "common/Log.h"
 #include "common/ObjectKind.h"
@@ -27,13 +25,8 @@ const char* const kMimeTypes[] = {"audio/mpeg",
                                   "audio/mpegurl",
                                   nullptr};
 
-constexpr int kScreenWidth = 1280;
-constexpr int kScreenHeight = 720;
 constexpr int kMaxDestructionWaits = 3;
 constexpr uint32_t kLeastReportedDuration = 1000; // milliseconds
-
-// Every object there is, for the steps that arrive late. Browser thread only.
-std::vector<const AVControl*> liveObjects;
 
 AVControl& controlOf(PluginBase& model) {
     return static_cast<AVControl&>(model);
@@ -53,11 +46,6 @@ const StreamOperations kStreamOperations = {
     [](PluginBase& model, const char* url, NPReason reason, void* notifyData) {
         controlOf(model).urlNotify(url, reason, notifyData);
     }};
-
-// From one edge to the other, whatever a page gives for them.
-int32_t distance(int32_t from, int32_t to) {
-    return static_cast<int32_t>(static_cast<uint32_t>(to) - static_cast<uint32_t>(from));
-}
 
 // The length of a clip. Meant: a clip of less than an hour leaves the hours of an earlier one, and one that
 // is not longer than a second leaves all three.
@@ -108,7 +96,6 @@ std::atomic<AVControl*> g_lastPlayedInstance{nullptr};
 
 AVControl::AVControl(NPP npp, unsigned short objectKind)
     : PluginBase(npp, objectKind), m_mainThread(pthread_self()) {
-    liveObjects.push_back(this);
     if (const char* limit = std::getenv("PLUGIN_BUFFERING_LOWER_LIMIT")) {
         m_lowerLimit = static_cast<uint32_t>(std::atoi(limit));
         PLUGIN_LOG(AVCONTROL, "Lower limit obtained from system: %u", m_lowerLimit);
@@ -127,10 +114,10 @@ AVControl::~AVControl() {
     PLUGIN_LOG(AVCONTROL, " Exiting\n");
     TELIX_JS_AV_UnregisterOnPlayStateChange(onPlayStateChangeCb);
     TELIX_JS_AV_UnregisterOnDRMRightsError(onDRMRightsErrorCb);
+    endMonitors();
     for (int i = 0; i < kMaxDestructionWaits && m_workingAsyncCalls != 0; ++i) {
         sleep(1);
     }
-    endMonitors();
     // A clip that began after destroyAV() was a change of state already posted then.
     AVControl* self = this;
     g_lastPlayedInstance.compare_exchange_strong(self, nullptr);
@@ -143,7 +130,6 @@ AVControl::~AVControl() {
     releaseHeld(m_subtitleComponents);
     releaseHeld(m_onDRMRightsError);
     std::free(m_bodyData);
-    liveObjects.erase(std::remove(liveObjects.begin(), liveObjects.end(), this), liveObjects.end());
 }
 
 NPError AVControl::initAV(unsigned short mode, int argc, char** argn, char** argv, char* mimeType) {
@@ -188,9 +174,9 @@ void AVControl::readAttribute(const char* name, const char* value) {
         m_fetchStream = false;
         setData(value);
     } else if (named("src1") || (named("oneshot_url") && saying("true"))) {
-        m_sourceCode = SOURCE_ONE_SHOT;
+        m_sourceCode = SourceCode::OneShot;
         m_fetchStream = false;
-        m_streamState = STREAM_READY;
+        m_streamState = StreamState::Ready;
     }
 }
 
@@ -213,13 +199,14 @@ void AVControl::lookAtMedia(const std::string& mimeType) {
     if (m_fetchStream && url.rfind("http://", 0) == 0) {
         getURLValue(url);
     } else {
-        NPN_PluginThreadAsyncCall(m_npp, startMediaCb, this);
+        postAsyncCall(m_npp, startMediaCb, this);
     }
 }
 
-// Playback itself starts from script only, or from the end of a playlist's stream.
-void AVControl::startMediaCb(void* object) {
-    PLUGIN_LOG(AVCONTROL, "Instance: %p \n", object);
+// Playback itself starts from script only, or from the end of a playlist's stream. The address is logged and
+// not followed, so the step needs no live object.
+void AVControl::startMediaCb(void* address) {
+    PLUGIN_LOG(AVCONTROL, "Instance: %p \n", address);
 }
 
 int AVControl::destroyAV() {
@@ -234,16 +221,12 @@ int AVControl::destroyAV() {
             g_lastPlayedInstance = nullptr;
         }
     }
-    NPN_PluginThreadAsyncCall(m_npp, destroyMediaCB, this);
+    postAsyncCallIfAlive(m_npp, m_live.ref(), destroyMediaCB);
     return 1;
 }
 
 void AVControl::destroyMediaCB(void* object) {
     delete static_cast<AVControl*>(object);
-}
-
-bool AVControl::isAlive(const AVControl* object) {
-    return std::find(liveObjects.begin(), liveObjects.end(), object) != liveObjects.end();
 }
 
 bool AVControl::isBrowserThread() const {
@@ -259,71 +242,39 @@ NPError AVControl::setWindow(const NPWindow*, bool forceReset) {
     if (m_mediaType == 0) {
         return NPERR_NO_ERROR;
     }
-    const auto region = [this] { return Area{m_regionX, m_regionY, m_width, m_height}; };
-    // Full screen is 1280 by 720 whatever the screen.
-    Area area = isFullScreen() ? Area{0, 0, kScreenWidth, kScreenHeight} : region();
-    if (area == Area{}) {
-        setPluginRegionFromDOM();
-        area = region();
-        if (area.width == kScreenWidth && area.height == kScreenHeight) {
-            area.x = 0;
-            area.y = 0;
-        }
-    }
-    if (!m_playerHandle || (!forceReset && area == m_acceptedArea)) {
-        return NPERR_NO_ERROR;
-    }
-    NPRect rectangle{};
-    rectangle.top = static_cast<uint16_t>(area.y);
-    rectangle.left = static_cast<uint16_t>(area.x);
-    rectangle.bottom = static_cast<uint16_t>(area.y + area.height);
-    rectangle.right = static_cast<uint16_t>(area.x + area.width);
-    NPN_InvalidateRect(m_npp, &rectangle);
-    const TELIX_JS_DISPLAY_AREA shown{static_cast<uint16_t>(area.x), static_cast<uint16_t>(area.y),
-                                      static_cast<uint16_t>(area.width), static_cast<uint16_t>(area.height)};
-    if (TELIX_JS_AV_SetDisplayArea(m_playerHandle, &shown) == 0) {
-        m_acceptedArea = area;
+    const Area area = m_displayArea.choose(*this, isFullScreen());
+    if (m_playerHandle && (forceReset || !m_displayArea.isAccepted(area))) {
+        m_displayArea.present(m_npp, area, m_playerHandle, TELIX_JS_AV_SetDisplayArea);
     }
     return NPERR_NO_ERROR;
 }
 
 void AVControl::setPluginRegionFromDOM() {
-    NPVariant rectangle{};
-    if (!NPN_Invoke(m_npp, getNPPluginObj(), NPN_GetStringIdentifier("getBoundingClientRect"), nullptr, 0,
-                    &rectangle)) {
-        return;
-    }
-    if (rectangle.type == NPVariantType_Object) {
-        // An edge that can't be read leaves what depends on it as it was.
-        const auto readEdge = [&](const char* name, auto store) {
-            NPVariant edge{};
-            if (NPN_GetProperty(m_npp, rectangle.value.objectValue, NPN_GetStringIdentifier(name), &edge)) {
-                store(toInt32(numberValue(edge)));
-                NPN_ReleaseVariantValue(&edge);
-            }
-        };
-        readEdge("left", [this](int32_t left) { m_regionX = left; });
-        readEdge("top", [this](int32_t top) { m_regionY = top; });
-        readEdge("right", [this](int32_t right) { m_width = distance(m_regionX, right); });
-        readEdge("bottom", [this](int32_t bottom) { m_height = distance(m_regionY, bottom); });
-    }
-    NPN_ReleaseVariantValue(&rectangle);
+    m_displayArea.readRegion(*this);
 }
 
 void AVControl::printMonitoringInfo(int kind) {
     if (kind == 1 && m_playerHandle) {
-        TELIX_JS_AV_PLAY_INFO* info = nullptr; // stays the platform's
-        if (TELIX_JS_AV_GetPlayInfo(m_playerHandle, &info) == 0 && info) {
-            PLUGIN_LOG(AVCONTROL, "TELIX_JS_AV_GetPlayInfo -(state:%d, duration:%d, playPosition:%d)",
-                       info->state, info->duration, info->playPosition);
-            reportedLength.take(info->duration);
-        }
-        PLUGIN_LOG(AVCONTROL, "<Play><Status>Start</Status><File>%s,%02d:%02d:%02d</File></Play>",
-                   currentMedia().c_str(), reportedLength.hours.load(), reportedLength.minutes.load(),
-                   reportedLength.seconds.load());
+        takeReportedLength(m_playerHandle);
+        reportClip("Start");
     } else if (kind == 2) {
-        PLUGIN_LOG(AVCONTROL, "<Play><Status>End</Status><File>%s,%02d:%02d:%02d</File></Play>",
+        reportClip("End");
+    }
+}
+
+void AVControl::takeReportedLength(uint32_t player) {
+    TELIX_JS_AV_PLAY_INFO* info = nullptr; // stays the platform's
+    if (TELIX_JS_AV_GetPlayInfo(player, &info) == 0 && info) {
+        PLUGIN_LOG_FOR(LogModule::AVCONTROL, "printMonitoringInfo",
+                       "TELIX_JS_AV_GetPlayInfo -(state:%d, duration:%d, playPosition:%d)", info->state,
+                       info->duration, info->playPosition);
+        reportedLength.take(info->duration);
+    }
+}
+
+void AVControl::reportClip(const char* status) const {
+    PLUGIN_LOG_FOR(LogModule::AVCONTROL, "printMonitoringInfo",
+                   "<Play><Status>%s</Status><File>%s,%02d:%02d:%02d</File></Play>", status,
                    currentMedia().c_str(), reportedLength.hours.load(), reportedLength.minutes.load(),
                    reportedLength.seconds.load());
-    }
 }

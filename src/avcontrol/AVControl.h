@@ -22,6 +22,8 @@
 #include <queue>
 #include <string>
 
+#include "common/DisplayArea.h"
+#include "common/LiveRef.h"
 #include "common/PluginBase.h"
 #include "telix/telix_platform.h"
 
@@ -68,8 +70,8 @@ extern std::atomic<uint32_t> g_lastReceivedMessage;
 
 class AVControl final : public PluginBase {
 public:
-    // The platform's code of the one container whose streams have to be started anew to seek.
-    static constexpr int32_t CONTAINER_MP3 = 2;
+    // The platform's code of the one container whose streams have to be restarted to seek.
+    static constexpr int32_t kContainerMp3 = 2;
 
     AVControl(NPP npp, unsigned short objectKind);
     ~AVControl();
@@ -101,10 +103,11 @@ public:
     NPError setWindow(const NPWindow* window, bool forceReset);
     // Reads the element's place in the page.
     void setPluginRegionFromDOM();
-    void setWidth(int32_t width) { m_width = width; }
-    void setHeight(int32_t height) { m_height = height; }
-    int32_t getWidth() const { return m_width; }
-    int32_t getHeight() const { return m_height; }
+    // The sizes last read there. Script may overwrite them until the next reading.
+    void setWidth(int32_t width) { m_displayArea.region().width = width; }
+    void setHeight(int32_t height) { m_displayArea.region().height = height; }
+    int32_t getWidth() const { return m_displayArea.region().width; }
+    int32_t getHeight() const { return m_displayArea.region().height; }
 
     // The browser's streams.
     NPError newStream(NPMIMEType type, NPStream* stream, NPBool seekable, uint16_t* stype);
@@ -183,43 +186,23 @@ public:
     void printMonitoringInfo(int kind);
 
 private:
-    // What the player was told that it plays: `source` of the platform's codes.
-    enum source_code {
-        SOURCE_ORDINARY = 6,
-        SOURCE_ONE_SHOT = 7,
-        SOURCE_SMOOTH_STREAMING = 23,
-        SOURCE_HLS = 25
-    };
+    // What the player is told that it plays: `source` of the platform's codes.
+    enum class SourceCode : int32_t { Ordinary = 6, OneShot = 7, SmoothStreaming = 23, Hls = 25 };
 
     // Whether the browser has to deliver a stream before a clip from the network may play.
-    enum stream_state { STREAM_NOT_REQUESTED = 0, STREAM_REQUESTED = 1, STREAM_READY = 2 };
+    enum class StreamState { NotRequested, Requested, Ready };
 
-    struct Area {
-        int32_t x;
-        int32_t y;
-        int32_t width;
-        int32_t height;
+    // A monitor thread, and its way to this object (AVControlMonitor.cpp).
+    class Monitor;
+    class MonitorLink;
 
-        bool operator==(const Area& other) const {
-            return x == other.x && y == other.y && width == other.width && height == other.height;
-        }
-    };
-
-    // What the monitor thread remembers from poll to poll.
-    struct Monitor {
-        bool bufferingPaused = false; // the monitor itself has paused the player
-        bool startReported = false;
-    };
-
-    // Steps posted to the browser thread; each finds out whether its object still lives.
-    static void startMediaCb(void* object);
+    // Steps posted to the browser thread. Those that get the object run only while it lives.
+    static void startMediaCb(void* address);
     static void destroyMediaCB(void* object);
     static void changePlayStateCb(void* record);
     static void changeReadyStateCb(void* object);
     static void playPositionChangedCb(void* object);
 
-    // Whether there is such an object now. Browser thread only.
-    static bool isAlive(const AVControl* object);
     bool isBrowserThread() const;
 
     void readAttribute(const char* name, const char* value);
@@ -238,12 +221,18 @@ private:
     bool beginMedia();
     bool handOverMedia();
 
-    static void* bufferingThread(void* object);
-    void poll(Monitor& monitor);
-    void pollPlayer(Monitor& monitor);
-    bool isPastClipEnd(unsigned int position) const;
-    void resumePlayer(Monitor& monitor);
-    void leaveMonitor();
+    // stop() without its call of the platform: what comes before, with whether the platform is to be asked,
+    // and what comes after the platform has stopped.
+    bool beginStop();
+    void completeStop();
+    // The same for the play report of a clip's start: the platform's part, and the line of the log.
+    static void takeReportedLength(uint32_t player);
+    void reportClip(const char* status) const;
+
+    static void* bufferingThread(void* monitor);
+    bool isWatched(bool monitorHasPaused) const;
+    bool isPastClipEnd(uint32_t position) const;
+    bool giveUpMonitor(pthread_t monitor);
     void endMonitors();
 
     NPObject* getComponentList(int32_t type, bool active);
@@ -259,7 +248,7 @@ private:
     // The codes of the platform.
     int32_t m_containerCode = 1280;
     int32_t m_audioCodecCode = 0;
-    source_code m_sourceCode = SOURCE_ORDINARY;
+    SourceCode m_sourceCode = SourceCode::Ordinary;
     std::atomic<play_state> m_playState{PLAY_STATE_STOPPED};
     std::string m_mimeType;      // after the first bytes of a stream: its whole header text
     bool m_downloadable = false; // stored; nothing reads it
@@ -268,14 +257,13 @@ private:
     std::atomic<int32_t> m_workingAsyncCalls{0};    // state changes posted and not yet run
     std::atomic<uint32_t> m_durationLast{0};        // milliseconds
     std::atomic<uint32_t> m_currentPositionLast{0}; // milliseconds
-    Area m_acceptedArea{};                          // what the platform took last
     // Seconds of buffered media.
     uint32_t m_lowerLimit = 4;
     uint32_t m_upperLimit = 10;
     uint32_t m_playCount = 1;
     std::string m_data; // the address as script sees it
     bool m_fetchStream = true;
-    stream_state m_streamState = STREAM_NOT_REQUESTED;
+    StreamState m_streamState = StreamState::NotRequested;
     int32_t m_mediaType = -1;
     bool m_streamSeen = false;
     std::atomic<double> m_playSpeed{1.0}; // in force
@@ -292,11 +280,8 @@ private:
     std::atomic<bool> m_notifyReadyState{false};
     bool m_streamFlag = false; // nothing reads it
     bool m_memoryAudio = false;
-    // The element's place in the page. The sizes are apart from the attributes that the base class keeps.
-    int32_t m_regionX = 0;
-    int32_t m_regionY = 0;
-    int32_t m_width = 0;
-    int32_t m_height = 0;
+    // Its sizes are apart from the attributes that the base class keeps.
+    DisplayArea m_displayArea{RectangleResult::Tested};
     // The address in play: an immutable text that is exchanged as a whole, since the monitor reports it.
     std::shared_ptr<const std::string> m_currentMedia = std::make_shared<const std::string>();
     NPObject* m_onFullScreenChange = nullptr; // meant: never released at the end
@@ -305,9 +290,10 @@ private:
     std::queue<std::string> m_urlQueue; // mirrors what the platform has been given to play next
     NPObject* m_onDRMRightsError = nullptr;
 
-    // Monitor threads that have not ended, and whether one is being made.
-    std::atomic<int> m_monitorThreads{0};
-    std::atomic<bool> m_monitorStarting{false};
+    std::shared_ptr<MonitorLink> m_monitorLink; // of all monitors; null before the first
+    std::atomic<bool> m_monitorStarting{false}; // a thread is made, and its id not yet in its place
+
+    const LiveRegistration<AVControl> m_live{*this};
 };
 
 #endif

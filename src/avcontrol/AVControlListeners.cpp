@@ -1,10 +1,9 @@
 // The script listeners, the notices of a new speed and position, and the way of a DRM rights error from the
 // platform to the page.
-#include <glib.h>
-
 #include <cstdlib>
 #include <cstring>
 
+#include "common/LiveRef.h"
 #include "common/Log.h"
 #include "common/PluginUtils.h"
 #include "common/ScriptReferences.h"
@@ -50,7 +49,7 @@ int handleDRMRightsErrorEvent(void* record) {
     AVControl* instance = g_lastPlayedInstance;
     auto* event = static_cast<DRMRgtsErrEvtData*>(record);
     if (!instance || !event) {
-        return G_SOURCE_REMOVE; // meant: the record is left behind
+        return 0; // meant: the record is left behind
     }
     // A control that plays must have an id for this.
     instance->invokeJScript(domEventScript(instance->getId(), "DRMRightsError", false, false));
@@ -68,7 +67,7 @@ int handleDRMRightsErrorEvent(void* record) {
         instance->invokeJScriptFunc(listener, arguments, 1 + DRMRgtsErrEvtData::kTexts);
     }
     delete event;
-    return G_SOURCE_REMOVE;
+    return 0;
 }
 
 const char* textOf(const unsigned char* bytes) {
@@ -84,9 +83,8 @@ int AVControl::onDRMRightsErrorCb(unsigned int handle, TELIX_AV_DRM_ERR_STATE_EN
                " Received Callback from system. Player Handle: %u, Error State: (%u), Content Id: (%s), DRM "
                "System Id: (%s),  RightsIssuerURL: (%s) \n",
                handle, state, textOf(contentId), textOf(drmSystemId), textOf(rightsIssuerUrl));
-    g_idle_add(handleDRMRightsErrorEvent,
-               new DRMRgtsErrEvtData(handle, state, textOf(contentId), textOf(drmSystemId),
-                                     textOf(rightsIssuerUrl)));
+    postIdle(handleDRMRightsErrorEvent, new DRMRgtsErrEvtData(handle, state, textOf(contentId),
+                                                              textOf(drmSystemId), textOf(rightsIssuerUrl)));
     return 0;
 }
 
@@ -138,7 +136,7 @@ void AVControl::handlePlaySpeedChanged() {
 
 void AVControl::handlePlayPositionChanged() {
     if (!isBrowserThread()) {
-        NPN_PluginThreadAsyncCall(m_npp, playPositionChangedCb, this);
+        postAsyncCallIfAlive(m_npp, m_live.ref(), playPositionChangedCb);
         return;
     }
     if (m_onPlayPositionChanged) {
@@ -147,8 +145,5 @@ void AVControl::handlePlayPositionChanged() {
 }
 
 void AVControl::playPositionChangedCb(void* object) {
-    auto* control = static_cast<AVControl*>(object);
-    if (isAlive(control)) {
-        control->handlePlayPositionChanged();
-    }
+    static_cast<AVControl*>(object)->handlePlayPositionChanged();
 }

@@ -24,7 +24,7 @@ constexpr int32_t kUnknownContainer = 1280;
 constexpr int32_t kMp3Codec = 1;
 
 const PluginMimeType pluginMimeType[] = {
-    {"audio/mpeg", "mp3", 0, kMediaAudio, AVControl::CONTAINER_MP3, kMp3Codec},
+    {"audio/mpeg", "mp3", 0, kMediaAudio, AVControl::kContainerMp3, kMp3Codec},
     {"audio/mp4", "mp4", 0, kMediaAudio, 512, 4},
     {"video/mp4", "mp4", 0, kMediaVideo, 512, 0},
     {"video/mpeg", "mpg", 0, kMediaVideo, 512, 0},
@@ -46,7 +46,7 @@ void AVControl::detectMediaType(const std::string& type) {
     if (type.empty()) {
         if (m_mediaType == kMediaUnknown && m_mimeType.find("audio/mpeg") != std::string::npos) {
             m_mediaType = kMediaAudio;
-            m_containerCode = CONTAINER_MP3;
+            m_containerCode = kContainerMp3;
             m_audioCodecCode = kMp3Codec;
         }
         return;
@@ -65,10 +65,10 @@ void AVControl::detectMediaType(const std::string& type) {
         take(*row);
         if (equal(type, "video/x-ms-ism") || equal(type, "application/vnd.ms-sstr+xml")) {
             PLUGIN_LOG(AVCONTROL, "video/x-ms-ism mimetype or application/vnd.ms-sstr+xml mimetype ");
-            m_sourceCode = SOURCE_SMOOTH_STREAMING;
+            m_sourceCode = SourceCode::SmoothStreaming;
         } else if (equal(type, "application/vnd.apple.mpegurl") || equal(type, "audio/mpegurl")) {
             PLUGIN_LOG(AVCONTROL, "HLS mimetype ");
-            m_sourceCode = SOURCE_HLS;
+            m_sourceCode = SourceCode::Hls;
         }
     }
     const std::string url = getURL();
@@ -95,7 +95,7 @@ void AVControl::setData(const std::string& url) {
             m_memoryAudio = true;
         } else if (equal(tail.substr(0, 4), ".ism")) {
             PLUGIN_LOG(AVCONTROL, "Smooth streaming URL ");
-            m_sourceCode = SOURCE_SMOOTH_STREAMING;
+            m_sourceCode = SourceCode::SmoothStreaming;
         }
     }
     stop();
@@ -109,7 +109,7 @@ void AVControl::setData(const std::string& url) {
     if (m_fetchStream) {
         getURLValue(getURL());
     } else {
-        m_streamState = STREAM_READY;
+        m_streamState = StreamState::Ready;
     }
 }
 
@@ -131,6 +131,6 @@ void AVControl::getURLValue(const std::string& url) {
         return;
     }
     NPN_GetURLNotify(m_npp, url.c_str(), nullptr, nullptr);
-    m_streamState = STREAM_REQUESTED;
+    m_streamState = StreamState::Requested;
     m_streamFlag = false;
 }

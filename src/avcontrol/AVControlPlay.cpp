@@ -113,10 +113,10 @@ bool AVControl::play(double speed) {
 
 // A clip of a playlist from the network plays once the object has had its stream.
 bool AVControl::waitsForStream() {
-    if (!m_isPlayList || m_streamState == STREAM_READY || !startsWith(currentMedia(), "http://")) {
+    if (!m_isPlayList || m_streamState == StreamState::Ready || !startsWith(currentMedia(), "http://")) {
         return false;
     }
-    if (m_streamState == STREAM_NOT_REQUESTED) {
+    if (m_streamState == StreamState::NotRequested) {
         getURLValue(currentMedia());
     }
     return true;
@@ -139,8 +139,8 @@ bool AVControl::beginMedia() {
 }
 
 bool AVControl::handOverMedia() {
-    return TELIX_JS_AV_Play(m_playerHandle, currentMedia().c_str(), m_playCount, m_sourceCode,
-                            m_containerCode, m_audioCodecCode, 0, 0) == 0;
+    return TELIX_JS_AV_Play(m_playerHandle, currentMedia().c_str(), m_playCount,
+                            static_cast<int32_t>(m_sourceCode), m_containerCode, m_audioCodecCode, 0, 0) == 0;
 }
 
 void AVControl::pause() {
@@ -159,17 +159,25 @@ void AVControl::pause() {
 }
 
 void AVControl::stop() {
-    PLUGIN_LOG(AVCONTROL, "PlayerHandle: %u, g_lastPlayedInstance: %p, This: %p \n", m_playerHandle,
-               static_cast<void*>(g_lastPlayedInstance), static_cast<void*>(this));
+    if (beginStop() && TELIX_JS_AV_Stop(m_playerHandle) == 0) {
+        completeStop();
+    }
+}
+
+bool AVControl::beginStop() {
+    PLUGIN_LOG_FOR(LogModule::AVCONTROL, "stop", "PlayerHandle: %u, g_lastPlayedInstance: %p, This: %p \n",
+                   m_playerHandle, static_cast<void*>(g_lastPlayedInstance), static_cast<void*>(this));
     m_playStartCounter = 0;
     m_durationLast = 0;
     m_currentPositionLast = 0;
     destroyBufferingThread();
     // The pipeline of another object is left alone.
-    if (m_playerHandle && g_lastPlayedInstance == this && TELIX_JS_AV_Stop(m_playerHandle) == 0) {
-        changePlayState(PLAY_STATE_STOPPED);
-        g_lastReceivedMessage = 0;
-    }
+    return m_playerHandle && g_lastPlayedInstance == this;
+}
+
+void AVControl::completeStop() {
+    changePlayState(PLAY_STATE_STOPPED);
+    g_lastReceivedMessage = 0;
 }
 
 bool AVControl::seek(unsigned int ms) {
@@ -177,7 +185,7 @@ bool AVControl::seek(unsigned int ms) {
         return false;
     }
     // A stream of these kinds can't be moved in: it starts again at the new place.
-    const bool restart = m_containerCode == CONTAINER_MP3 || startsWith(currentMedia(), "mms://");
+    const bool restart = m_containerCode == kContainerMp3 || startsWith(currentMedia(), "mms://");
     if (restart) {
         changePlayState(PLAY_STATE_BUFFERING);
         destroyBufferingThread();
@@ -254,8 +262,8 @@ bool AVControl::queue(const std::string& url) {
         PLUGIN_LOG(AVCONTROL, " is called with url value as NULL\n");
     }
     // Without an address the platform drops what waits there.
-    if (TELIX_JS_AV_Queue(m_playerHandle, url.empty() ? nullptr : url.c_str(), m_playCount, m_sourceCode,
-                          m_containerCode, m_audioCodecCode, 0, 0) != 0) {
+    if (TELIX_JS_AV_Queue(m_playerHandle, url.empty() ? nullptr : url.c_str(), m_playCount,
+                          static_cast<int32_t>(m_sourceCode), m_containerCode, m_audioCodecCode, 0, 0) != 0) {
         PLUGIN_LOG(AVCONTROL, " AVControl call ended \n");
         return false;
     }

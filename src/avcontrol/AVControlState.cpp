@@ -1,10 +1,9 @@
 // Play state and ready state: the way of a platform message to the browser thread, what it means, and how a
 // change of state reaches the page.
-#include <glib.h>
-
 #include <cstdlib>
+#include <new>
 
-#include "common/BrowserGates.h"
+#include "common/LiveRef.h"
 #include "common/Log.h"
 #include "common/PluginUtils.h"
 #include "src/avcontrol/AVControl.h"
@@ -22,9 +21,47 @@ struct AVPlayStateEvent {
 
 // A change of state on its way to the browser thread; a block of malloc.
 struct PlayStateChange {
-    AVControl* object;
+    LiveRef<AVControl> object;
     play_state from;
     play_state to;
+};
+
+// What the messages of the platform that report an error are to processError().
+struct MessageError {
+    TELIX_AV_CB_MSG message;
+    avcontrol_ce_error error;
+};
+
+constexpr MessageError kMessageErrors[] = {
+    {TELIX_AV_CB_MSG_ERR_PLAYING, AVCONTROL_ERROR_UNIDENTIFIED},
+    {TELIX_AV_CB_MSG_ERR_NOT_FOUND, AVCONTROL_ERROR_CONTENT_NOT_AVAILABLE},
+    {TELIX_AV_CB_MSG_ERR_CODEC_NOT_SUPPORTED, AVCONTROL_ERROR_FORMAT},
+    {TELIX_AV_CB_MSG_ERR_NET_DISCONNECTED, AVCONTROL_ERROR_CONNECTION},
+    {TELIX_AV_CB_MSG_ERR_NET_CANNOT_CONNECT, AVCONTROL_ERROR_CONNECTION},
+    {TELIX_AV_CB_MSG_ERR_WMDRM_CANNOT_PROCESS, AVCONTROL_ERROR_DRM_CANNOT_PROCESS},
+    {TELIX_AV_CB_MSG_ERR_WMDRM_LIC_FAILLOCAL, AVCONTROL_ERROR_DRM_LICENCE_LOCAL},
+    {TELIX_AV_CB_MSG_ERR_WMDRM_LIC_FAILTRANSFER, AVCONTROL_ERROR_DRM_LICENCE_TRANSFER},
+    {TELIX_AV_CB_MSG_ERR_WMDRM_LIC_EXPIRED, AVCONTROL_ERROR_DRM_LICENCE_EXPIRED},
+};
+
+// The value of the script property `error` for the reasons of an error. Other reasons leave it as it is.
+struct ScriptError {
+    avcontrol_ce_error first;
+    avcontrol_ce_error last;
+    int32_t value;
+    const char* logText;
+};
+
+constexpr char kUnidentified[] = "error : AVControl_UnIdentified_Error\n";
+
+constexpr ScriptError kScriptErrors[] = {
+    {AVCONTROL_ERROR_FORMAT, AVCONTROL_ERROR_FORMAT, 0, "error : AVControl_Format_Error\n"},
+    {AVCONTROL_ERROR_CONNECTION, AVCONTROL_ERROR_CONNECTION, 1, "error : AVControl_Connection_Error\n"},
+    {AVCONTROL_ERROR_UNIDENTIFIED, AVCONTROL_ERROR_UNIDENTIFIED, 2, kUnidentified},
+    {AVCONTROL_ERROR_CONTENT_NOT_AVAILABLE, AVCONTROL_ERROR_CONTENT_NOT_AVAILABLE, 5,
+     "error : AVControl_Content_NotAvailable\n"},
+    {AVCONTROL_ERROR_CONTENT_FIRST, AVCONTROL_ERROR_CONTENT_LAST, 2, kUnidentified},
+    {AVCONTROL_ERROR_DRM_CANNOT_PROCESS, AVCONTROL_ERROR_DRM_LICENCE_EXPIRED, 2, kUnidentified},
 };
 
 } // namespace
@@ -37,7 +74,7 @@ int AVControl::onPlayStateChangeCb(unsigned int handle, TELIX_AV_CB_MSG msg) {
     event->message = msg;
     // The overload for the idle step is the one with a single argument.
     int (*idleStep)(void*) = onPlayStateChangeCb;
-    g_idle_add(idleStep, event);
+    postIdle(idleStep, event);
     return 0;
 }
 
@@ -46,11 +83,11 @@ int AVControl::onPlayStateChangeCb(void* record) {
     AVControl* instance = g_lastPlayedInstance;
     if (!event || !instance) {
         // Meant: the small record of a message after the last player has gone is left behind.
-        return G_SOURCE_REMOVE;
+        return 0;
     }
     instance->handlePlayStateChange(event->playerHandle, event->message);
     delete event;
-    return G_SOURCE_REMOVE;
+    return 0;
 }
 
 void AVControl::handlePlayStateChange(unsigned int handle, TELIX_AV_CB_MSG msg) {
@@ -73,45 +110,19 @@ void AVControl::handlePlayStateChange(unsigned int handle, TELIX_AV_CB_MSG msg) 
         return;
     }
     g_lastReceivedMessage = msg;
-    switch (msg) {
-    case TELIX_AV_CB_MSG_PLAYEND:
+    if (msg == TELIX_AV_CB_MSG_PLAYEND) {
         instance->endOfClip();
-        break;
-    case TELIX_AV_CB_MSG_PLAYSTART:
+    } else if (msg == TELIX_AV_CB_MSG_PLAYSTART) {
         takeQueuedURL();
         instance->changePlayState(PLAY_STATE_PLAYING);
-        break;
-    case TELIX_AV_CB_MSG_ERR_PLAYING:
-        instance->processError(AVCONTROL_ERROR_UNIDENTIFIED);
-        break;
-    case TELIX_AV_CB_MSG_ERR_NOT_FOUND:
-        instance->processError(AVCONTROL_ERROR_CONTENT_NOT_AVAILABLE);
-        break;
-    case TELIX_AV_CB_MSG_ERR_CODEC_NOT_SUPPORTED:
-        instance->processError(AVCONTROL_ERROR_FORMAT);
-        break;
-    case TELIX_AV_CB_MSG_ERR_NET_DISCONNECTED:
-    case TELIX_AV_CB_MSG_ERR_NET_CANNOT_CONNECT:
-        instance->processError(AVCONTROL_ERROR_CONNECTION);
-        break;
-    case TELIX_AV_CB_MSG_ERR_NET_BUSY:
-    case TELIX_AV_CB_MSG_ERR_NET_CANNOT_PROCESS:
+    } else if (msg == TELIX_AV_CB_MSG_ERR_NET_BUSY || msg == TELIX_AV_CB_MSG_ERR_NET_CANNOT_PROCESS) {
         PLUGIN_LOG(AVCONTROL, "Network message (%x)\n", msg);
-        break;
-    case TELIX_AV_CB_MSG_ERR_WMDRM_CANNOT_PROCESS:
-        instance->processError(AVCONTROL_ERROR_DRM_CANNOT_PROCESS);
-        break;
-    case TELIX_AV_CB_MSG_ERR_WMDRM_LIC_FAILLOCAL:
-        instance->processError(AVCONTROL_ERROR_DRM_LICENCE_LOCAL);
-        break;
-    case TELIX_AV_CB_MSG_ERR_WMDRM_LIC_FAILTRANSFER:
-        instance->processError(AVCONTROL_ERROR_DRM_LICENCE_TRANSFER);
-        break;
-    case TELIX_AV_CB_MSG_ERR_WMDRM_LIC_EXPIRED:
-        instance->processError(AVCONTROL_ERROR_DRM_LICENCE_EXPIRED);
-        break;
-    default:
-        break;
+    } else {
+        for (const MessageError& row : kMessageErrors) {
+            if (row.message == msg) {
+                instance->processError(row.error);
+            }
+        }
     }
 }
 
@@ -153,20 +164,11 @@ void AVControl::processError(avcontrol_ce_error code) {
     if (code == AVCONTROL_ERROR_NONE) {
         return;
     }
-    if (code == AVCONTROL_ERROR_FORMAT) {
-        PLUGIN_LOG(AVCONTROL, "error : AVControl_Format_Error\n");
-        m_error = 0;
-    } else if (code == AVCONTROL_ERROR_CONNECTION) {
-        PLUGIN_LOG(AVCONTROL, "error : AVControl_Connection_Error\n");
-        m_error = 1;
-    } else if (code == AVCONTROL_ERROR_CONTENT_NOT_AVAILABLE) {
-        PLUGIN_LOG(AVCONTROL, "error : AVControl_Content_NotAvailable\n");
-        m_error = 5;
-    } else if (code == AVCONTROL_ERROR_UNIDENTIFIED ||
-               (code >= AVCONTROL_ERROR_CONTENT_FIRST && code <= AVCONTROL_ERROR_CONTENT_LAST) ||
-               (code >= AVCONTROL_ERROR_DRM_CANNOT_PROCESS && code <= AVCONTROL_ERROR_DRM_LICENCE_EXPIRED)) {
-        PLUGIN_LOG(AVCONTROL, "error : AVControl_UnIdentified_Error\n");
-        m_error = 2;
+    for (const ScriptError& row : kScriptErrors) {
+        if (code >= row.first && code <= row.last) {
+            PLUGIN_LOG(AVCONTROL, "%s", row.logText);
+            m_error = row.value;
+        }
     }
     changePlayState(PLAY_STATE_ERROR);
 }
@@ -186,14 +188,13 @@ void AVControl::changePlayState(play_state from, play_state to) {
     }
     if (!isBrowserThread()) {
         PLUGIN_LOG(AVCONTROL, "(Not Main Thread) called(%d->%d)", from, to);
-        auto* change = static_cast<PlayStateChange*>(std::malloc(sizeof(PlayStateChange)));
-        if (!change) {
+        void* block = std::malloc(sizeof(PlayStateChange));
+        if (!block) {
             PLUGIN_LOG(AVCONTROL, "malloc failed\n");
             return;
         }
-        *change = {this, from, to};
         ++m_workingAsyncCalls;
-        NPN_PluginThreadAsyncCall(m_npp, changePlayStateCb, change);
+        postAsyncCall(m_npp, changePlayStateCb, new (block) PlayStateChange{m_live.ref(), from, to});
         return;
     }
     PLUGIN_LOG(AVCONTROL, "(Main Thread) called(%d->%d \n)", from, to);
@@ -222,9 +223,9 @@ void AVControl::changePlayState(play_state from, play_state to) {
 // Meant: a change that was posted before the object began to go still runs.
 void AVControl::changePlayStateCb(void* record) {
     auto* change = static_cast<PlayStateChange*>(record);
-    if (isAlive(change->object)) {
-        change->object->changePlayState(change->from, change->to);
-        change->object->decrementWorkingAsyncCall();
+    if (AVControl* object = change->object.get()) {
+        object->changePlayState(change->from, change->to);
+        object->decrementWorkingAsyncCall();
     }
     std::free(change);
 }
@@ -232,7 +233,7 @@ void AVControl::changePlayStateCb(void* record) {
 void AVControl::changeReadyState(int value) {
     m_readyState = value;
     if (!isBrowserThread()) {
-        NPN_PluginThreadAsyncCall(m_npp, changeReadyStateCb, this);
+        postAsyncCallIfAlive(m_npp, m_live.ref(), changeReadyStateCb);
         return;
     }
     if (!getId().empty()) {
@@ -243,9 +244,7 @@ void AVControl::changeReadyState(int value) {
 
 void AVControl::changeReadyStateCb(void* object) {
     auto* control = static_cast<AVControl*>(object);
-    if (isAlive(control)) {
-        control->changeReadyState(control->getReadyState());
-    }
+    control->changeReadyState(control->getReadyState());
 }
 
 void AVControl::dispatchDomEvent(const char* event, bool bubbles) {

@@ -15,7 +15,7 @@ constexpr int32_t kChunkSize = 1024;
 } // namespace
 
 NPError AVControl::newStream(NPMIMEType, NPStream* stream, NPBool, uint16_t*) {
-    m_streamState = STREAM_READY;
+    m_streamState = StreamState::Ready;
     // One stream in an object's life; what another address brings is not looked at.
     if (m_streamSeen) {
         NPN_DestroyStream(m_npp, stream, NPRES_DONE);

@@ -36,12 +36,15 @@ NPObject* ChannelList::getChannel(unsigned int handle) {
 
 NPObject* ChannelList::getChannel(const std::string& ccid) {
     PLUGIN_LOG(CHANNEL, "Channel Id =( %s )\n", ccid.c_str());
-    NPObject* found = m_channels.find(
-        [&ccid](Channel& channel) { return strcasecmp(channel.getCcid().c_str(), ccid.c_str()) == 0; });
-    if (found) {
-        PLUGIN_LOG(CHANNEL, "getChannel() succeeded. ccid string: %s \n", ccid.c_str());
-    }
-    return found;
+    return m_channels.find([&ccid](Channel& channel) {
+        if (strcasecmp(channel.getCcid().c_str(), ccid.c_str()) != 0) {
+            return false;
+        }
+        // Before the reference for the caller is added, as the log of all modules shows.
+        PLUGIN_LOG_FOR(LogModule::CHANNEL, "getChannel", "getChannel() succeeded. ccid string: %s \n",
+                       ccid.c_str());
+        return true;
+    });
 }
 
 NPObject* ChannelList::getChannelByTriplet(unsigned int onid, unsigned int tsid, unsigned int sid) {

@@ -5,7 +5,6 @@
 
 #include <cstdlib>
 #include <cstring>
-#include <set>
 
 #include "common/Log.h"
 #include "common/ObjectKind.h"
@@ -14,13 +13,11 @@
 #include "common/ScriptValues.h"
 #include "src/drm/JSDRMAgent.h"
 
-DRMAgent* drmAgentInst = nullptr;
+LiveRef<DRMAgent> drmAgentInst;
 
 namespace {
 
 const char* const kMimeTypes[] = {"application/oipfdrmagent", nullptr};
-
-std::set<const DRMAgent*> s_liveAgents;
 
 // A copy of the platform's text, null if there is no memory.
 char* copyOf(const unsigned char* text) {
@@ -68,11 +65,11 @@ int handleDRMMessageResultEvent(void* data) {
         return G_SOURCE_REMOVE;
     }
     auto* result = static_cast<DRMMsgEventData*>(data);
-    DRMAgent* agent = drmAgentInst;
-    if (DRMAgent::isAlive(agent)) {
+    const LiveRef<DRMAgent> receiver = drmAgentInst;
+    if (DRMAgent* agent = receiver.get()) {
         agent->invokeJScript(domEventScript(agent->getId(), "DRMMessageResult", false, false));
-        // A listener of the event may have taken the element out of the page.
-        NPObject* handler = DRMAgent::isAlive(agent) ? agent->getOnDRMMessageResult() : nullptr;
+        // A listener of the event may have taken the element out of the page, and put another one in.
+        NPObject* handler = receiver.get() ? agent->getOnDRMMessageResult() : nullptr;
         if (handler) {
             NPVariant args[3] = {textArgument(result->messageId), textArgument(result->resultMessage), {}};
             setResult(args[2], result->resultCode);
@@ -85,21 +82,15 @@ int handleDRMMessageResultEvent(void* data) {
 }
 
 DRMAgent::DRMAgent(NPP npp, unsigned short objectId) : PluginBase(npp, objectId) {
-    s_liveAgents.insert(this);
-    drmAgentInst = this;
+    drmAgentInst = m_live.ref();
     TELIX_JS_DRM_RegisterOnDRMMessageResult(onDRMMessageResultCb);
 }
 
 DRMAgent::~DRMAgent() {
-    s_liveAgents.erase(this);
     // Meant: once for each agent, also while others live on.
     TELIX_JS_DRM_UnregisterOnDRMMessageResult(onDRMMessageResultCb);
     releaseHeld(m_jsObject);
     releaseHeld(m_onDRMMessageResult);
-}
-
-bool DRMAgent::isAlive(const DRMAgent* agent) {
-    return s_liveAgents.count(agent) > 0;
 }
 
 NPObject* DRMAgent::getJSObject() {
@@ -133,6 +124,6 @@ int DRMAgent::onDRMMessageResultCb(unsigned char* messageId, unsigned char* resu
                reinterpret_cast<const char*>(messageId), reinterpret_cast<const char*>(resultMessage),
                resultCode);
     // The record passes to the idle step; this thread must not touch it afterwards.
-    g_idle_add(handleDRMMessageResultEvent, new DRMMsgEventData(messageId, resultMessage, resultCode));
+    postIdle(handleDRMMessageResultEvent, new DRMMsgEventData(messageId, resultMessage, resultCode));
     return 0;
 }

@@ -3,6 +3,7 @@
 #ifndef TELIX_SRC_DRM_DRMAGENT_H
 #define TELIX_SRC_DRM_DRMAGENT_H
 
+#include "common/LiveRef.h"
 #include "common/PluginBase.h"
 #include "telix/telix_platform.h"
 
@@ -11,9 +12,9 @@ struct ObjectKind;
 
 extern const ObjectKind kDrmAgentKind;
 
-// The agent that every result goes to: the one constructed last. Meant: it keeps its value when that agent
-// has gone; whether the agent lives is asked of the class.
-extern DRMAgent* drmAgentInst;
+// The agent that every result goes to: the one constructed last. Meant: it stays so when that agent has gone;
+// results then go nowhere.
+extern LiveRef<DRMAgent> drmAgentInst;
 
 // One result on its way from the platform's thread to the browser's.
 struct DRMMsgEventData {
@@ -39,9 +40,6 @@ public:
     DRMAgent(NPP npp, unsigned short objectId);
     ~DRMAgent();
 
-    // Whether an agent, which may have gone, is alive.
-    static bool isAlive(const DRMAgent* agent);
-
     NPObject* getJSObject() override;
 
     // Sends a message and returns its id; if the platform refuses, the id of the message before, empty if
@@ -59,6 +57,7 @@ public:
                                     TELIX_DRM_RESULT_CODE_ENUM_T_tag resultCode);
 
 private:
+    const LiveRegistration<DRMAgent> m_live{*this};
     // One reference held of each that isn't null.
     NPObject* m_jsObject = nullptr;
     NPObject* m_onDRMMessageResult = nullptr;

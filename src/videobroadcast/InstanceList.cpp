@@ -17,15 +17,15 @@ InstanceList::~InstanceList() {
     }
 }
 
-VideoBroadcast* InstanceList::find(unsigned int handle) const {
+LiveRef<VideoBroadcast> InstanceList::find(unsigned int handle) const {
     // Counted in before the copy is taken up: a sweep that counts nobody knows that whoever comes later finds
     // a newer copy than those that it frees.
     m_readers.fetch_add(1);
-    VideoBroadcast* found = nullptr;
-    if (const Handles* published = m_published.load()) {
-        for (const auto& [instance, held] : *published) {
-            if (held == handle) {
-                found = instance;
+    LiveRef<VideoBroadcast> found;
+    if (const Entries* published = m_published.load()) {
+        for (const auto& [address, entry] : *published) {
+            if (entry.handle == handle) {
+                found = entry.instance;
                 break;
             }
         }
@@ -34,13 +34,13 @@ VideoBroadcast* InstanceList::find(unsigned int handle) const {
     return found;
 }
 
-void InstanceList::set(VideoBroadcast* instance, unsigned int handle) {
-    m_handles[instance] = handle;
+void InstanceList::set(LiveRef<VideoBroadcast> instance, unsigned int handle) {
+    m_entries[instance.address()] = {instance, handle};
     publish();
 }
 
 bool InstanceList::erase(VideoBroadcast* instance) {
-    if (m_handles.erase(instance) == 0) {
+    if (m_entries.erase(instance) == 0) {
         return false;
     }
     publish();
@@ -48,12 +48,12 @@ bool InstanceList::erase(VideoBroadcast* instance) {
 }
 
 unsigned int InstanceList::handleOf(VideoBroadcast* instance) const {
-    const auto entry = m_handles.find(instance);
-    return entry == m_handles.end() ? 0 : entry->second;
+    const auto entry = m_entries.find(instance);
+    return entry == m_entries.end() ? 0 : entry->second.handle;
 }
 
 void InstanceList::publish() {
-    const Handles* replaced = m_published.exchange(new Handles(m_handles));
+    const Entries* replaced = m_published.exchange(new Entries(m_entries));
     if (!replaced) {
         return;
     }

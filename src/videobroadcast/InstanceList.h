@@ -9,12 +9,18 @@
 #include <memory>
 #include <vector>
 
+#include "common/LiveRef.h"
+
 class VideoBroadcast;
 
 class InstanceList {
 public:
-    // Ordered by the object's address, which is its identity.
-    using Handles = std::map<VideoBroadcast*, unsigned int>;
+    struct Entry {
+        LiveRef<VideoBroadcast> instance;
+        unsigned int handle;
+    };
+    // Ordered by the object's address.
+    using Entries = std::map<VideoBroadcast*, Entry>;
 
     // A replaced copy is freed on the main loop once it is `graceMilliseconds` old and no look-up is under
     // way.
@@ -23,26 +29,26 @@ public:
     InstanceList& operator=(const InstanceList&) = delete;
     ~InstanceList();
 
-    // Any thread: the first object in order with the handle, or null. The object may be gone by the time the
+    // Any thread: the first object in order with the handle, or none. The object may be gone by the time the
     // caller looks at it: only the browser thread can tell.
-    VideoBroadcast* find(unsigned int handle) const;
+    LiveRef<VideoBroadcast> find(unsigned int handle) const;
 
     // Browser thread only.
-    void set(VideoBroadcast* instance, unsigned int handle);
+    void set(LiveRef<VideoBroadcast> instance, unsigned int handle);
     bool erase(VideoBroadcast* instance); // whether there was an entry
-    bool contains(VideoBroadcast* instance) const { return m_handles.count(instance) != 0; }
+    bool contains(VideoBroadcast* instance) const { return m_entries.count(instance) != 0; }
     unsigned int handleOf(VideoBroadcast* instance) const; // 0 without an entry
-    const Handles& handles() const { return m_handles; }
+    const Entries& entries() const { return m_entries; }
     size_t copiesHeldBack() const { return m_replaced.size() + m_aged.size(); }
 
 private:
-    using Copies = std::vector<std::unique_ptr<const Handles>>;
+    using Copies = std::vector<std::unique_ptr<const Entries>>;
 
     void publish();
     bool sweep(); // whether copies are left for another turn
 
-    Handles m_handles;
-    std::atomic<const Handles*> m_published{nullptr};
+    Entries m_entries;
+    std::atomic<const Entries*> m_published{nullptr};
     mutable std::atomic<unsigned int> m_readers{0};
     Copies m_replaced; // since the last sweep
     Copies m_aged;     // before it

@@ -76,12 +76,13 @@ bool setChannel(PluginBase& model, const NPVariant* args, unsigned int argCount,
     if (argCount < 1 || !(fits<NPObject*>(args[0]) || args[0].type == NPVariantType_Null)) {
         return false;
     }
-    bool flag = false;
+    bool trickPlay = false;
     if (argCount >= 2 && fits<bool>(args[1])) {
         PLUGIN_LOG_FOR(LogModule::VIDEOBCAST, "Invoke", "mId_setChannel is called With 2 Parameters\n");
-        flag = valueOf<bool>(args[1]);
+        trickPlay = valueOf<bool>(args[1]);
     }
-    videoBroadcast(model).setChannel(fits<NPObject*>(args[0]) ? args[0].value.objectValue : nullptr, flag);
+    videoBroadcast(model).setChannel(fits<NPObject*>(args[0]) ? args[0].value.objectValue : nullptr,
+                                     trickPlay);
     return true;
 }
 
@@ -107,13 +108,18 @@ bool addStreamEventListener(PluginBase& model, const NPVariant* args, unsigned i
            invokeCounted<registeringForm>(model, args, argCount, result);
 }
 
-// Meant: any argument with a value is accepted, of whatever type. Only an object has a component behind it.
+// Meant: any argument with a value is accepted, of whatever type. Only an object has a component to unselect;
+// any other value is logged as the operation logs its object, and that is all.
 bool unselectComponent(PluginBase& model, const NPVariant* args, unsigned int argCount, NPVariant&) {
     if (argCount < 1 || !args[0].value.objectValue) {
         return false;
     }
+    NPObject* component = args[0].value.objectValue;
     if (fits<NPObject*>(args[0])) {
-        videoBroadcast(model).unSelectComponent(args[0].value.objectValue);
+        videoBroadcast(model).unSelectComponent(component);
+    } else {
+        PLUGIN_LOG_FOR(LogModule::VIDEOBCAST, "unSelectComponent", "AVCompObj: %p \n",
+                       static_cast<void*>(component));
     }
     return true;
 }

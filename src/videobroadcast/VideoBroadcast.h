@@ -1,6 +1,15 @@
 // The model of the embedded video/broadcast object: the page's window on the television picture. Most of its
-// operations are one step to the platform with a small cache in front. Browser thread only, but for
-// getInstance(handle) and callbacksRegistered().
+// operations are one step to the platform with a small cache in front. The implementation is one file for
+// each concern:
+//   VideoBroadcast.cpp             kind, list of instances, life, the platform's callbacks, play state
+//   VideoBroadcastGeometry.cpp     size, display area, full screen
+//   VideoBroadcastHandlers.cpp     script handlers
+//   VideoBroadcastStreamEvents.cpp subscriptions to stream events
+//   VideoBroadcastChannels.cpp     tuning, channels, programmes, components
+//   VideoBroadcastUtils.cpp        events: from the platform's callbacks to the page
+//   InstanceList.cpp               which object holds which platform handle, for platform threads
+//
+// Browser thread only, except getInstance(handle), refOf(), ref() and callbacksRegistered().
 #ifndef TELIX_SRC_VIDEOBROADCAST_VIDEOBROADCAST_H
 #define TELIX_SRC_VIDEOBROADCAST_VIDEOBROADCAST_H
 
@@ -8,6 +17,8 @@
 #include <string>
 #include <vector>
 
+#include "common/DisplayArea.h"
+#include "common/LiveRef.h"
 #include "common/PluginBase.h"
 #include "src/videobroadcast/InstanceList.h"
 #include "telix/telix_platform.h"
@@ -31,19 +42,22 @@ public:
     // The listed object with the handle, or null; the one with the lowest address if several share it. Any
     // thread; elsewhere than on the browser thread the object may be gone at any moment.
     static VideoBroadcast* getInstance(unsigned int handle);
+    // The same, for steps that are posted from there.
+    static LiveRef<VideoBroadcast> refOf(unsigned int handle);
 
     static void addInstance(VideoBroadcast* instance);
     // The last object to go takes the platform's callbacks along.
     static void deleteInstance(VideoBroadcast* instance);
-    // Whether the address is that of a live object.
+    // Whether the address is that of a listed object, which need not be the one that was there before.
     static bool checkValidInstance(VideoBroadcast* instance);
-    // The same without a line in the log, for the steps that come back from the page or the main loop.
-    static bool isListed(VideoBroadcast* instance) { return VBInstanceList.contains(instance); }
     static VideoBroadcast* getActiveInst();
     // Whether the platform has the callbacks. Any thread.
     static bool callbacksRegistered() { return bCallbacksRegistered; }
 
     ~VideoBroadcast();
+
+    // This object, for steps that are posted and for whatever returns from the page.
+    LiveRef<VideoBroadcast> ref() const { return m_live.ref(); }
 
     NPObject* getJSObject() override;
 
@@ -58,7 +72,7 @@ public:
     void setHeight(int height);
     int getWidth();
     int getHeight();
-    // The idle steps; their argument is the object. Always 0.
+    // The idle steps; their argument is the object, which is alive. Always 0.
     static int shouldChangeWidth(void* object);
     static int shouldChangeHeight(void* object);
     // The display area follows the element's rectangle in the page, not the browser's record.
@@ -112,7 +126,7 @@ public:
 
     // Tuning. A request returns as soon as the platform has taken it; the outcome comes as an event.
     void bindToCurrentChannel();
-    void setChannel(NPObject* channel, bool flag); // null for no channel; the object is not kept
+    void setChannel(NPObject* channel, bool trickPlay); // null for no channel; the object is not kept
     void setChannelByTriplet(int onid, int tsid, int sid);
     void prevChannel();
     void nextChannel();
@@ -138,16 +152,6 @@ public:
     void unSelectComponent(NPObject* component);
 
 private:
-    struct Area {
-        int x = 0;
-        int y = 0;
-        int width = 0;
-        int height = 0;
-        bool operator==(const Area& other) const {
-            return x == other.x && y == other.y && width == other.width && height == other.height;
-        }
-    };
-
     using SetSize = TELIX_RETCODE_ENUM_T (*)(TELIX_JS_VB_HANDLE object, int32_t size);
 
     VideoBroadcast(NPP npp, unsigned short objectId);
@@ -155,6 +159,8 @@ private:
     void applySize(const char* step, const char* callName, SetSize call, int wanted, int& applied);
 
     void resetCurrentChannel(unsigned int channelHandle);
+
+    const LiveRegistration<VideoBroadcast> m_live{*this};
 
     static InstanceList VBInstanceList;
     static std::atomic<bool>
@@ -182,9 +188,8 @@ private:
     int m_nWidth = 0;            // as last requested by script
     int m_nHeight = 0;           // likewise
     bool m_isFullScreen = false; // as last known
-    Area m_region;               // the element, as last read from the page
-    Area m_displayArea;          // as last accepted by the platform
-    int m_playState = 0;         // as last known
+    DisplayArea m_displayArea{RectangleResult::Trusted};
+    int m_playState = 0; // as last known
     unsigned int m_vbHandle = 0;
     std::vector<StreamEventInfo> m_StreamEventList; // in order of subscription
 };

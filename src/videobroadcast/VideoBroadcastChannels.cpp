@@ -44,9 +44,9 @@ void VideoBroadcast::bindToCurrentChannel() {
     }
 }
 
-void VideoBroadcast::setChannel(NPObject* channel, bool flag) {
+void VideoBroadcast::setChannel(NPObject* channel, bool trickPlay) {
     const unsigned int channelHandle = channel ? channelOf(channel)->getChannelHandle() : 0;
-    if (m_vbHandle && TELIX_JS_VB_SetChannel(m_vbHandle, channelHandle, flag) == 0) {
+    if (m_vbHandle && TELIX_JS_VB_SetChannel(m_vbHandle, channelHandle, trickPlay) == 0) {
         PLUGIN_LOG(VIDEOBCAST, "TELIX_JS_VB_SetChannel call succeeded \n");
         // Meant: no channel marks the object active too.
         m_isActive = true;

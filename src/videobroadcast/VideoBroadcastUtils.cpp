@@ -28,8 +28,8 @@ namespace {
 // The record of an event for the object with the handle, or null if there is none.
 VideoBcastEvent* newEvent(TELIX_JS_VB_HANDLE vbHandle, VBEventType type) {
     auto* event = new VideoBcastEvent;
-    event->vbInstance = VideoBroadcast::getInstance(vbHandle);
-    if (!event->vbInstance) {
+    event->vbInstance = VideoBroadcast::refOf(vbHandle);
+    if (!event->vbInstance.address()) {
         // Left behind: the record of an event that nobody gets.
         // NOLINTNEXTLINE(clang-analyzer-cplusplus.NewDeleteLeaks)
         return nullptr;
@@ -40,8 +40,8 @@ VideoBcastEvent* newEvent(TELIX_JS_VB_HANDLE vbHandle, VBEventType type) {
 
 void queueEvent(const char* callback, TELIX_JS_VB_HANDLE vbHandle, VideoBcastEvent* event) {
     PLUGIN_LOG_FOR(LogModule::VIDEOBCAST, callback, " VB Inst:( %p ) for vbHandle:( %d ), Event:( %p )\n",
-                   static_cast<void*>(event->vbInstance), vbHandle, static_cast<void*>(event));
-    g_idle_add(handleVideoBroadcastEvent, event);
+                   static_cast<void*>(event->vbInstance.address()), vbHandle, static_cast<void*>(event));
+    postIdle(handleVideoBroadcastEvent, event);
 }
 
 // The rest of a callback: `Payload` is made of what the platform gave.
@@ -134,8 +134,8 @@ TELIX_RETCODE_ENUM_T streamEventHandler(TELIX_JS_VB_HANDLE vbHandle, ___UINT8*, 
     if (dataLength != 0) {
         assert(szEventData);
     }
-    VideoBroadcast* videoBroadcast = VideoBroadcast::getInstance(vbHandle);
-    if (!videoBroadcast) {
+    const LiveRef<VideoBroadcast> videoBroadcast = VideoBroadcast::refOf(vbHandle);
+    if (!videoBroadcast.address()) {
         return TELIX_RETCODE_SUCCESS;
     }
     auto* event = new VideoBcastEvent;
@@ -313,6 +313,7 @@ void deliverPlayState(VideoBroadcast& videoBroadcast, const std::string&, void* 
         return;
     }
     HANDLER_LOG("VBEvent_PlayStateChange:: Case. State: %d \n", event->state);
+    const LiveRef<VideoBroadcast> self = videoBroadcast.ref();
     NPVariant args[2]{};
     setResult(args[0], event->state);
     if (event->error == TELIX_ERR_STATE_NONE) {
@@ -324,7 +325,7 @@ void deliverPlayState(VideoBroadcast& videoBroadcast, const std::string&, void* 
     const bool ended = event->state == TELIX_PLAYSTATE_UNREALIZED ||
                        event->state == TELIX_PLAYSTATE_CONNECTING || event->state == TELIX_PLAYSTATE_STOPPED;
     // The handler may have taken the object out of the page.
-    if (ended && VideoBroadcast::isListed(&videoBroadcast)) {
+    if (ended && self.get()) {
         videoBroadcast.setActive(false);
     }
 }
@@ -386,43 +387,54 @@ constexpr EventClass kEvents[] = {
 
 } // namespace
 
+namespace {
+
+// The DOM event, then what the event's class does; disposes of the payload.
+void deliverEvent(VideoBroadcast& instance, const std::string& id, const VideoBcastEvent& event) {
+    if (event.eventType >= std::size(kEvents)) {
+        return;
+    }
+    const EventClass& eventClass = kEvents[event.eventType];
+    if (eventClass.domEvent) {
+        instance.invokeJScript(domEventScript(id, eventClass.domEvent, false, false));
+    }
+    // A listener of the DOM event may have taken the object out of the page.
+    if ((event.eventData || !eventClass.dispose) && event.vbInstance.get()) {
+        eventClass.deliver(instance, id, event.eventData);
+    }
+    if (eventClass.dispose) {
+        eventClass.dispose(event.eventData);
+    }
+}
+
+} // namespace
+
 int handleVideoBroadcastEvent(void* eventData) {
     auto* event = static_cast<VideoBcastEvent*>(eventData);
+    VideoBroadcast* address = event ? event->vbInstance.address() : nullptr;
     PLUGIN_LOG(VIDEOBCAST, "VideoBroadcast class, bCallbacksRegistered : %d \n",
                VideoBroadcast::callbacksRegistered());
-    if (!event || !event->vbInstance || !VideoBroadcast::callbacksRegistered()) {
+    if (!address || !VideoBroadcast::callbacksRegistered()) {
         PLUGIN_LOG(VIDEOBCAST, "Could not process eventData:( %p ), eventType:( %d ), VBInstance: (%p)\n",
-                   eventData, event ? event->eventType : VBEvent_NoEvent,
-                   static_cast<void*>(event ? event->vbInstance : nullptr));
+                   eventData, event ? event->eventType : VBEvent_NoEvent, static_cast<void*>(address));
         return G_SOURCE_REMOVE; // left behind: record and payload
     }
-    VideoBroadcast* instance = event->vbInstance;
     PLUGIN_LOG(VIDEOBCAST, "VB EventType: %d, VB Instance from eventData : %p \n", event->eventType,
-               static_cast<void*>(instance));
-    const bool isValidInst = VideoBroadcast::checkValidInstance(instance);
-    const std::string id = isValidInst ? instance->getId() : std::string();
+               static_cast<void*>(address));
+    // An address in the list is not enough: the next object may have been made there since.
+    const bool isListed = VideoBroadcast::checkValidInstance(address);
+    VideoBroadcast* instance = isListed ? event->vbInstance.get() : nullptr;
+    const std::string id = instance ? instance->getId() : std::string();
     // Meant: an element without an id gets neither DOM events nor calls of its handlers.
     if (id.empty()) {
         PLUGIN_LOG(
             VIDEOBCAST,
             "Invalid VB Instance received or Id attribute is not present with object. isValidInst: %d\n",
-            isValidInst);
+            instance != nullptr);
         delete event;
         return G_SOURCE_REMOVE; // left behind: the payload
     }
-    if (event->eventType < std::size(kEvents)) {
-        const EventClass& eventClass = kEvents[event->eventType];
-        if (eventClass.domEvent) {
-            instance->invokeJScript(domEventScript(id, eventClass.domEvent, false, false));
-        }
-        // A listener of the DOM event may have taken the object out of the page.
-        if ((event->eventData || !eventClass.dispose) && VideoBroadcast::isListed(instance)) {
-            eventClass.deliver(*instance, id, event->eventData);
-        }
-        if (eventClass.dispose) {
-            eventClass.dispose(event->eventData);
-        }
-    }
+    deliverEvent(*instance, id, *event);
     delete event;
     return G_SOURCE_REMOVE;
 }

@@ -3,6 +3,7 @@
 #ifndef TELIX_SRC_VIDEOBROADCAST_VIDEOBROADCASTUTILS_H
 #define TELIX_SRC_VIDEOBROADCAST_VIDEOBROADCASTUTILS_H
 
+#include "common/LiveRef.h"
 #include "telix/telix_platform.h"
 
 class VideoBroadcast;
@@ -22,8 +23,8 @@ enum VBEventType : unsigned int {
 // The record that crosses the threads.
 struct VideoBcastEvent {
     VBEventType eventType = VBEvent_NoEvent;
-    VideoBroadcast* vbInstance = nullptr; // bare: tested again on delivery
-    void* eventData = nullptr;            // the event's payload, owned by the record
+    LiveRef<VideoBroadcast> vbInstance; // whether it still lives is asked on delivery
+    void* eventData = nullptr;          // the event's payload, owned by the record
 };
 
 // Delivers one record and disposes of it; the idle function. Browser thread. Always 0: a record runs once.

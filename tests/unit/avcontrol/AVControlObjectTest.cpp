@@ -432,6 +432,27 @@ TEST_F(AVControlObject, WhatCannotBeReadStaysAsItWas) {
     EXPECT_EQ(log.count("TELIX_JS_AV_SetDisplayArea"), 0u);
 }
 
+TEST_F(AVControlObject, ARectangleThatIsNotAnObjectIsNotRead) {
+    const EmbeddedObject object = video();
+    object.setRectangle(10, 20, 110, 220);
+    object.setWindow(0, 0, 0, 0);
+    for (const Value& value : {Value(nullptr), Value(undefined), Value(5), Value("text")}) {
+        object.element().method("getBoundingClientRect", [&](const Values&) { return value; });
+        log.clear();
+        object.setWindow(0, 0, 0, 0);
+        EXPECT_EQ(log.count("NPN_GetProperty"), 0u) << value;
+    }
+    EXPECT_EQ(platform.TELIX_JS_AV_SetDisplayArea.count(), 1u);
+}
+
+TEST_F(AVControlObject, EdgesFarApartWrapAround) {
+    const EmbeddedObject object = video();
+    object.setRectangle(-2147483648.0, 20, 2147483647, 220);
+    object.setWindow(0, 0, 0, 0);
+    EXPECT_EQ(object.get("width"), -1);
+    EXPECT_TRUE(log.contains("TELIX_JS_AV_SetDisplayArea(7, {0,20,65535,200})"));
+}
+
 TEST_F(AVControlObject, AFullPageObjectHasNoPlayerToPlace) {
     const EmbeddedObject object = browser.embed("video/mp4", {}, NP_FULL);
     object.setRectangle(0, 0, 640, 360);

@@ -1,5 +1,6 @@
 // The time of the buffering monitors: this executable has a `sleep` of its own, and the threads that call it
-// go on when a test lets a second pass. The browser thread never waits in it.
+// go on when a test lets a second pass. The browser thread never waits in it. The monitors are counted from
+// the call that makes them to their end, so that none is missed that has not come to run yet.
 #ifndef TELIX_TESTS_UNIT_AVCONTROL_MONITORCLOCK_H
 #define TELIX_TESTS_UNIT_AVCONTROL_MONITORCLOCK_H
 
@@ -34,6 +35,8 @@ public:
     void reset();
 
     void sleepOneSecond(); // what `sleep` does
+    int createThread(pthread_t* thread, const pthread_attr_t* attributes, void* (*body)(void*),
+                     void* argument); // what `pthread_create` does
 
 private:
     friend class MonitorThread;
@@ -46,7 +49,7 @@ private:
     pthread_mutex_t m_mutex = PTHREAD_MUTEX_INITIALIZER;
     pthread_cond_t m_changed = PTHREAD_COND_INITIALIZER;
     const pthread_t m_browserThread = pthread_self();
-    size_t m_threads = 0; // that have called `sleep` and live
+    size_t m_threads = 0; // that live, or are being made
     size_t m_sleeping = 0;
     size_t m_ended = 0;
     unsigned long m_now = 0;

@@ -283,6 +283,18 @@ TEST_F(ChannelListTest, TheModelFindsAChannelByItsHandle) {
     EXPECT_EQ(model.getChannel(8U), nullptr);
 }
 
+TEST_F(ChannelListTest, AFoundChannelIsLoggedBeforeItIsRetained) {
+    const std::string text = logOf(1, [this] {
+        const ObjectRef list = listOf({5});
+        EXPECT_TRUE(list.call("getChannel", "5"));
+    });
+    const size_t found = text.find("getChannel() succeeded. ccid string: 5 ");
+    ASSERT_NE(found, std::string::npos);
+    EXPECT_NE(text.find("NPN_RetainObject", found), std::string::npos);
+    const size_t asked = text.find("Channel Id =( 5 )");
+    EXPECT_GT(text.find("NPN_RetainObject", asked), found);
+}
+
 TEST_F(ChannelListTest, LogsUnderTheChannelsModule) {
     const std::string text = logOf(4, [this] {
         const ObjectRef config = configOf({5});

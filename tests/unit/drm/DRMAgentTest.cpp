@@ -4,9 +4,11 @@
 #include <cstring>
 #include <limits>
 #include <map>
+#include <memory>
 
 #include "src/drm/DRMAgent.h"
 #include "tests/support/BorderTest.h"
+#include "tests/unit/support/SameAddress.h"
 
 using ::testing::ElementsAre;
 using ::testing::HasSubstr;
@@ -112,12 +114,12 @@ TEST_F(DRMAgentTest, EveryAgentRegistersAndGivesUpTheOneCallback) {
 }
 
 TEST_F(DRMAgentTest, TheYoungestAgentIsTheOneForResultsAndStaysItWhenItHasGone) {
-    EXPECT_EQ(static_cast<PluginBase*>(drmAgentInst), agent.model());
+    EXPECT_EQ(static_cast<PluginBase*>(drmAgentInst.address()), agent.model());
     const EmbeddedObject other = browser.embed(kType);
     const void* youngest = other.model();
-    EXPECT_EQ(static_cast<PluginBase*>(drmAgentInst), youngest);
+    EXPECT_EQ(static_cast<PluginBase*>(drmAgentInst.address()), youngest);
     other.destroy();
-    EXPECT_EQ(static_cast<PluginBase*>(drmAgentInst), youngest);
+    EXPECT_EQ(static_cast<PluginBase*>(drmAgentInst.address()), youngest);
 }
 
 TEST_F(DRMAgentTest, HandsOutOneScriptObject) {
@@ -575,6 +577,23 @@ TEST_F(DRMAgentTest, AListenerOfTheEventMayEndTheAgent) {
     browser.onEvent("DRMMessageResult", [&](const DomEvent&) { agent.destroy(); });
     reportFromAnotherThread("id-1", "a", 0);
     reportFromAnotherThread("id-2", "b", 0);
+    browser.pump();
+    EXPECT_EQ(browser.events().size(), 1U);
+    EXPECT_EQ(handler.count(), 0U);
+}
+
+TEST_F(DRMAgentTest, AListenerOfTheEventMayPutAnotherAgentAtTheSameAddress) {
+    const ScriptFunction handler = browser.function("handler");
+    const SameAddress place(sizeof(DRMAgent));
+    const EmbeddedObject first = browser.embed(kType, {{"id", "drm"}});
+    std::unique_ptr<EmbeddedObject> second;
+    browser.onEvent("DRMMessageResult", [&](const DomEvent&) {
+        first.destroy();
+        second = std::make_unique<EmbeddedObject>(browser.embed(kType, {{"id", "drm"}}));
+        ASSERT_EQ(second->model(), place.address());
+        second->set("onDRMMessageResult", handler);
+    });
+    reportFromAnotherThread("id-1", "a", 0);
     browser.pump();
     EXPECT_EQ(browser.events().size(), 1U);
     EXPECT_EQ(handler.count(), 0U);

@@ -1,9 +1,12 @@
 // The events of the broadcast on their way from a platform thread to the page.
 #include "src/videobroadcast/VideoBroadcastUtils.h"
 
+#include <memory>
+
 #include <glib.h>
 #include <gmock/gmock.h>
 
+#include "tests/unit/support/SameAddress.h"
 #include "tests/unit/videobroadcast/BroadcastTest.h"
 
 using ::testing::ElementsAre;
@@ -202,6 +205,83 @@ TEST_F(BroadcastEventTest, AHandlerMayTakeTheObjectOut) {
     });
     fire([&] { callbacks.playStateChange(7, 0, 0, 200); });
     EXPECT_EQ(handler.count(), 1U);
+    leftBehind(handler);
+}
+
+TEST_F(BroadcastEventTest, AnEventIsNotDeliveredToTheNextObjectAtTheSameAddress) {
+    const EmbeddedObject other = embed("other"); // keeps the callbacks registered
+    const SameAddress place(sizeof(VideoBroadcast));
+    const EmbeddedObject first = embed();
+    onPlatformThread([&] {
+        callbacks.channelChangeSucceeded(8, 11);
+        callbacks.channelChangeError(8, 11, 1);
+        callbacks.programmesChanged(8);
+        callbacks.playStateChange(8, 0, 2, 200);
+        callbacks.fullScreenChange(8);
+    });
+    first.destroy();
+    const EmbeddedObject second = ready("onFullScreenChange");
+    ASSERT_EQ(second.model(), place.address());
+    for (const char* slot :
+         {"onChannelChangeSucceeded", "onChannelChangeError", "onProgrammesChanged", "onPlayStateChange"}) {
+        second.set(slot, handler);
+    }
+    log.clear();
+    browser.pump();
+    EXPECT_THAT(log.everything(), IsEmpty());
+    EXPECT_EQ(handler.count(), 0U);
+    // Its own events come.
+    onPlatformThread([&] { callbacks.fullScreenChange(9); });
+    browser.pump();
+    EXPECT_EQ(handler.count(), 1U);
+    leftBehind(handler);
+}
+
+TEST_F(BroadcastEventTest, AnEventForAReplacedObjectIsLoggedAsOneForAnInvalidInstance) {
+    const std::string text = logOf(6, [&] {
+        const EmbeddedObject other = embed("other");
+        const SameAddress place(sizeof(VideoBroadcast));
+        const EmbeddedObject first = embed();
+        callbacks.fullScreenChange(8);
+        first.destroy();
+        const EmbeddedObject second = embed();
+        EXPECT_EQ(second.model(), place.address());
+        browser.pump();
+    });
+    EXPECT_THAT(text,
+                HasSubstr(handlerLine("Invalid VB Instance received or Id attribute is not present with "
+                                      "object. isValidInst: 0\n")));
+}
+
+TEST_F(BroadcastEventTest, ADomListenerMayPutAnotherObjectAtTheSameAddress) {
+    const EmbeddedObject other = embed("other");
+    const SameAddress place(sizeof(VideoBroadcast));
+    const EmbeddedObject first = ready("onFullScreenChange");
+    std::unique_ptr<EmbeddedObject> second;
+    browser.onEvent("FullScreenChange", [&](const DomEvent&) {
+        first.destroy();
+        second = std::make_unique<EmbeddedObject>(ready("onFullScreenChange"));
+        ASSERT_EQ(second->model(), place.address());
+    });
+    fire([&] { callbacks.fullScreenChange(8); });
+    EXPECT_EQ(handler.count(), 0U);
+}
+
+TEST_F(BroadcastEventTest, AHandlerMayPutAnotherObjectAtTheSameAddress) {
+    const EmbeddedObject other = embed("other");
+    const SameAddress place(sizeof(VideoBroadcast));
+    const EmbeddedObject first = ready("onPlayStateChange");
+    std::unique_ptr<EmbeddedObject> second;
+    handler.does([&](const Values&) {
+        first.destroy();
+        second = std::make_unique<EmbeddedObject>(embed());
+        EXPECT_EQ(second->model(), place.address());
+        modelOf(*second).setActive(true);
+        return undefined;
+    });
+    fire([&] { callbacks.playStateChange(8, 0, TELIX_PLAYSTATE_STOPPED, 200); });
+    EXPECT_EQ(handler.count(), 1U);
+    EXPECT_TRUE(modelOf(*second).isActive()); // the state was the other one's
     leftBehind(handler);
 }
 
@@ -613,7 +693,7 @@ TEST_F(BroadcastEventTest, ARecordOfNoEventIsLogged) {
     const auto deliver = [&](unsigned int type) {
         auto* event = new VideoBcastEvent;
         event->eventType = static_cast<VBEventType>(type);
-        event->vbInstance = &modelOf(vb);
+        event->vbInstance = modelOf(vb).ref();
         EXPECT_EQ(handleVideoBroadcastEvent(event), 0);
     };
     deliver(0);
@@ -632,7 +712,7 @@ TEST_F(BroadcastEventTest, ARecordWithoutPayloadEndsWithTheDomEvent) {
     for (const unsigned int type : {1, 2, 3, 5, 6, 7}) {
         auto* event = new VideoBcastEvent;
         event->eventType = static_cast<VBEventType>(type);
-        event->vbInstance = &modelOf(vb);
+        event->vbInstance = modelOf(vb).ref();
         EXPECT_EQ(handleVideoBroadcastEvent(event), 0);
     }
     EXPECT_THAT(log.calls(),

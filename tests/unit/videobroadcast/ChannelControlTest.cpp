@@ -211,6 +211,16 @@ TEST_F(ChannelControlTest, TheChangesOfTheCurrentChannelAreLogged) {
                                         " TELIX_JS_VB_GetCurrentChannel API failed.\n")));
 }
 
+TEST_F(ChannelControlTest, ANewCurrentChannelIsLoggedBeforeItIsRetainedForTheCaller) {
+    const std::string text = logOf(1, [&] { embed().get("currentChannel"); });
+    const size_t logged = text.find("New Object created. m_pCurChannel = ");
+    ASSERT_NE(logged, std::string::npos);
+    const size_t made = text.rfind("NPN_CreateObject", logged);
+    ASSERT_NE(made, std::string::npos);
+    EXPECT_GT(text.find("NPN_RetainObject", made), logged);
+    EXPECT_NE(text.find("NPN_RetainObject", logged), std::string::npos);
+}
+
 TEST_F(ChannelControlTest, AStepTurnsTheObjectThatThePageHoldsIntoTheNewChannel) {
     const EmbeddedObject vb = embed();
     const ObjectRef channel = vb.get("currentChannel").object();

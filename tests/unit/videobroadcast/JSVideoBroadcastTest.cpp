@@ -8,6 +8,7 @@
 using ::testing::ElementsAre;
 using ::testing::HasSubstr;
 using ::testing::IsEmpty;
+using ::testing::Not;
 
 namespace {
 
@@ -471,6 +472,23 @@ TEST_F(JSVideoBroadcastTest, AnyArgumentWithAValueIsTakenAsUnselectedAndOnlyAnOb
     EXPECT_TRUE(vb.call("unselectComponent", "text"));
     EXPECT_TRUE(vb.call("unselectComponent", true));
     EXPECT_THAT(platformCalls(), IsEmpty());
+}
+
+TEST_F(JSVideoBroadcastTest, WhatIsNoObjectToUnselectIsLoggedAndNothingElse) {
+    const std::string text = logOf(6, [&] { ready().call("unselectComponent", 5); });
+    EXPECT_THAT(text, HasSubstr(logLine("VIDEOBCAST", "unSelectComponent", "AVCompObj: 0x5 \n")));
+    const std::string refused = logOf(6, [&] { ready().call("unselectComponent", 0); });
+    EXPECT_THAT(refused, Not(HasSubstr("AVCompObj")));
+}
+
+TEST_F(JSVideoBroadcastTest, AnUnselectedObjectIsLoggedOnce) {
+    const std::string text = logOf(6, [&] {
+        const EmbeddedObject vb = ready();
+        vb.call("unselectComponent", component(vb, 55, 1));
+    });
+    const std::string line = logLine("VIDEOBCAST", "unSelectComponent", "AVCompObj: 0x");
+    EXPECT_THAT(text, HasSubstr(line));
+    EXPECT_EQ(text.find(line), text.rfind(line));
 }
 
 TEST_F(JSVideoBroadcastTest, AChannelIsCreatedFromFourOrThreeNumbers) {

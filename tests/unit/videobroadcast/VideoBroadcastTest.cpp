@@ -3,6 +3,8 @@
 
 #include <gmock/gmock.h>
 
+#include "common/ObjectKind.h"
+#include "tests/unit/support/SameAddress.h"
 #include "tests/unit/videobroadcast/BroadcastTest.h"
 
 using ::testing::ElementsAre;
@@ -251,6 +253,10 @@ TEST_F(VideoBroadcastTest, TheWrapperIsMadeOnceAndEachCallerGetsAReference) {
 
 TEST_F(VideoBroadcastTest, EventsOfTheBrowserAreNotHandled) {
     EXPECT_EQ(embed().handleEvent(), 0);
+    // Nor do they reach the object: only one kind of object is given them.
+    for (const ObjectKind* const* kind = kObjectKinds; *kind; ++kind) {
+        EXPECT_EQ((*kind)->handleEvent != nullptr, (*kind)->id == 200) << (*kind)->id;
+    }
 }
 
 TEST_F(VideoBroadcastTest, TheActiveObjectIsTheFirstThatIs) {
@@ -368,6 +374,25 @@ TEST_F(VideoBroadcastTest, ASizeStepForADeadObjectDoesNothing) {
     log.clear();
     browser.pump();
     EXPECT_THAT(platformCalls(), IsEmpty());
+}
+
+TEST_F(VideoBroadcastTest, ASizeStepIsNotTakenForTheNextObjectAtTheSameAddress) {
+    const SameAddress place(sizeof(VideoBroadcast));
+    const EmbeddedObject first = embed();
+    first.set("width", 640);
+    first.set("height", 480);
+    first.destroy();
+    const EmbeddedObject second = embed();
+    ASSERT_EQ(second.model(), place.address());
+    // Its own steps find these sizes refused, and another step would ask once more.
+    platform.TELIX_JS_VB_SetWidth = [](TELIX_JS_VB_HANDLE, int32_t) { return 1; };
+    platform.TELIX_JS_VB_SetHeight = [](TELIX_JS_VB_HANDLE, int32_t) { return 1; };
+    second.set("width", 320);
+    second.set("height", 240);
+    log.clear();
+    browser.pump();
+    EXPECT_THAT(platformCalls(),
+                ElementsAre("TELIX_JS_VB_SetWidth(8, 320)", "TELIX_JS_VB_SetHeight(8, 240)"));
 }
 
 // ---- Play state
