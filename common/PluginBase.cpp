@@ -76,7 +76,7 @@ bool PluginBase::invokeJScript(const std::string& script) {
         NPN_ReleaseVariantValue(&result);
         return value;
     }
-    // A result of another type is not released: the scripts of the plug-in yield nothing that needs it.
+    // A result of another type is not released.
     return false;
 }
 

@@ -198,7 +198,7 @@ void ApplicationManager::setOnApplicationLoadError(NPObject* handler) {
 }
 
 bool ApplicationManager::handleApplicationLoadError() {
-    // This one statement names another class, under that class's module: logs of sets are read by it.
+    // This one statement names another class, under that class's module.
     PLUGIN_LOG(AVCONTROL, "AVControl class");
     if (!m_onApplicationLoadError) {
         return false;

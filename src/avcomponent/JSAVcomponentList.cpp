@@ -8,7 +8,7 @@ constexpr ScriptMember kMembers[] = {
     property("length", read<&AVcomponentList::length>),
 };
 
-// This one line belongs to the channels' module: logs of sets are read by it.
+// This one line is logged under the channels' module.
 constexpr ScriptArray kArray =
     scriptArray<&AVcomponentList::length, &AVcomponentList::item>(LogModule::CHANNEL, " ");
 

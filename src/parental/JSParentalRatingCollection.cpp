@@ -10,7 +10,7 @@ constexpr ScriptMember kMembers[] = {
     property("length", read<&Model::getLength>),
 };
 
-// This one line belongs to the channels' module: logs of sets are read by it.
+// This one line is logged under the channels' module.
 constexpr ScriptArray kArray = scriptArray<&Model::getLength, &Model::getitem>(LogModule::CHANNEL, " ");
 
 constexpr ScriptClass kClass = ScriptClass("JSParentalRatingCollection", LogModule::PARENTAL, kMembers)

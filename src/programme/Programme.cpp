@@ -15,7 +15,7 @@ template <class Ask>
 std::string fetchString(std::string& last, uint32_t handle, Ask ask) {
     char* text = nullptr;
     ___UINT8 length = 0;
-    // A string of length 0 is not freed: it stays the platform's.
+    // A string of length 0 is not freed.
     if (handle != 0 && ask(handle, &text, &length) == 0 && text && length != 0) {
         last.assign(text, length);
         std::free(text);
