@@ -36,7 +36,7 @@ void NPN_GetStringIdentifiers(const char** names, unsigned int count, NPIdentifi
 // The integer form: an overload, so that it logs under the same name.
 NPIdentifier NPN_GetStringIdentifier(int value);
 bool NPN_IdentifierIsString(NPIdentifier identifier);
-// The caller owns the text.
+// The caller owns the string.
 char* NPN_UTF8FromIdentifier(NPIdentifier identifier);
 int32_t NPN_IntFromIdentifier(NPIdentifier identifier);
 NPObject* NPN_CreateObject(NPP instance, NPClass* objectClass);

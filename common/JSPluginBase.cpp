@@ -40,6 +40,7 @@ bool JSPluginBase::SetProperty(NPIdentifier, const NPVariant*) {
     return false;
 }
 
+// quirk 2: no wrapper lets script delete, enumerate or construct.
 bool JSPluginBase::RemoveProperty(NPIdentifier) {
     PLUGIN_LOG(COMMON, " JSPluginBase class\n");
     return false;

@@ -23,7 +23,7 @@ enum class LogModule {
     DRMAGENT
 };
 
-// Refreshes `level` from the environment while it is 0 and tells whether a statement of `module` prints. A
+// Refreshes `level` from the environment while it is 0 and returns whether a statement of `module` prints. A
 // level of 0 is read again at every statement; any other stays for good. Any thread.
 inline bool logWanted(std::atomic<int>& level, LogModule module) {
     int value = level.load(std::memory_order_relaxed);
@@ -40,16 +40,16 @@ inline bool logWanted(std::atomic<int>& level, LogModule module) {
 void logPrint(const char* moduleName, const char* functionName, const char* text, ...)
     __attribute__((format(printf, 3, 4)));
 
-[[maybe_unused]] static std::atomic<int> s_logLevel{0};
-[[maybe_unused]] static const char* const s_logModuleNames[] = {
+[[maybe_unused]] static std::atomic<int> logLevelOfFile{0};
+[[maybe_unused]] static const char* const kLogModuleNames[] = {
     "NONE",      "ALL",      "APP_MGR", "CONFIG",  "CHANNEL",      "AVCONTROL", "VIDEOBCAST",
     "PROGRAMME", "PARENTAL", "COMMON",  "AV_COMP", "CAPABILITIES", "DRMAGENT"};
 
 // A statement on behalf of another function, for code that many classes share.
 #define PLUGIN_LOG_FOR(module, functionName, ...)                                                            \
     do {                                                                                                     \
-        if (logWanted(s_logLevel, module)) {                                                                 \
-            logPrint(s_logModuleNames[static_cast<int>(module)], functionName, __VA_ARGS__);                 \
+        if (logWanted(logLevelOfFile, module)) {                                                             \
+            logPrint(kLogModuleNames[static_cast<int>(module)], functionName, __VA_ARGS__);                  \
         }                                                                                                    \
     } while (false)
 

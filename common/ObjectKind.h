@@ -27,7 +27,7 @@ struct StreamOperations {
 
 struct ObjectKind {
     unsigned short id;
-    const char* destroyText;      // log text of NPP_Destroy, given the model's address; null for no line
+    const char* destroyText;      // log line of NPP_Destroy, given the model's address; null for none
     const char* const* mimeTypes; // ends with null
     PluginBase* (*create)(NPP npp, unsigned short id);
     // Deletes the model through its concrete class.
@@ -46,6 +46,6 @@ void disposeOf(PluginBase* model) {
 }
 
 // All kinds, in the order in which NPP_New compares their MIME types; ends with null.
-extern const ObjectKind* const objectKinds[];
+extern const ObjectKind* const kObjectKinds[];
 
 #endif

@@ -23,7 +23,7 @@ NPObject* PluginBase::getJSObject() {
 
 NPError PluginBase::init(unsigned short mode, int argc, char* const* argn, char* const* argv) {
     PLUGIN_LOG(COMMON, "PluginBase::Mode: %d , Argc:  %d \n", mode, argc);
-    // The value of these two travels in the address itself.
+    // The value of these two is the pointer itself.
     NPN_SetValue(m_npp, NPPVpluginWindowBool, nullptr);
     // NOLINTNEXTLINE(performance-no-int-to-ptr)
     NPN_SetValue(m_npp, NPPVpluginTransparentBool, reinterpret_cast<void*>(true));
@@ -44,7 +44,7 @@ NPError PluginBase::init(unsigned short mode, int argc, char* const* argn, char*
             m_id = value;
             PLUGIN_LOG(COMMON, "ID attribute value:: %s \n", value);
         } else if (named("fullscreen") && strcasecmp(value, "true") == 0) {
-            // Meant: the attribute is known and without effect, so that no page starts in full screen.
+            // quirk 9: the attribute is consumed, so that no page starts in full screen.
         } else if (named("autoStart") && strcasecmp(value, "false") == 0) {
             m_autoStart = false;
         } else if (named("width")) {
@@ -76,7 +76,7 @@ bool PluginBase::invokeJScript(const std::string& script) {
         NPN_ReleaseVariantValue(&result);
         return value;
     }
-    // Meant: a result of another type is not released.
+    // A result of another type is not released.
     return false;
 }
 
@@ -111,9 +111,9 @@ NPObject* PluginBase::getNPPluginObj() {
 }
 
 std::string PluginBase::getBaseURL(const std::string& url) {
-    static const char expression[] = "document.location.href";
+    static const char kExpression[] = "document.location.href";
     std::string base;
-    NPString text{expression, sizeof(expression) - 1};
+    NPString text{kExpression, sizeof(kExpression) - 1};
     NPVariant result{};
     if (!NPN_Evaluate(m_npp, getNPWindowObj(), &text, &result) || result.type != NPVariantType_String) {
         return base;
@@ -123,7 +123,7 @@ std::string PluginBase::getBaseURL(const std::string& url) {
     if (url[0] == '/') {
         const size_t scheme = href.find("://");
         if (scheme != std::string::npos) {
-            // Meant: the search begins at "://" and so ends at its first slash; "/a" becomes "scheme:/a".
+            // quirk 7: the search ends at the first slash of "://", so "/a" becomes "scheme:/a".
             base = href.substr(0, href.find('/', scheme) + 1) + url.substr(1);
         }
     } else {
@@ -131,7 +131,7 @@ std::string PluginBase::getBaseURL(const std::string& url) {
         if (query != std::string::npos) {
             base = href.substr(0, query);
         }
-        // Meant: the last slash of the whole address counts, also one in the query.
+        // quirk 8: the last slash of the whole address counts, also one in the query.
         const size_t slash = href.rfind('/');
         if (slash != std::string::npos) {
             base = href.substr(0, slash + 1);
@@ -160,8 +160,8 @@ void PluginBase::setObjectStyle(const std::string& style) {
         value.value.stringValue = {style.c_str(), static_cast<uint32_t>(std::strlen(style.c_str()))};
         NPN_SetProperty(m_npp, styleObject.value.objectValue, imageId, &value);
     }
-    static const NPString transparent{"transparent", 11};
-    value.value.stringValue = transparent;
+    static const NPString kTransparent{"transparent", 11};
+    value.value.stringValue = kTransparent;
     NPN_SetProperty(m_npp, styleObject.value.objectValue, colorId, &value);
     NPN_ReleaseVariantValue(&styleObject);
 }

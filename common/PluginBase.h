@@ -29,7 +29,7 @@ public:
     // Keeps a copy of the record; null keeps the old one.
     void setWindow(const NPWindow* window);
 
-    // Evaluates a text in the page. True only if it ran and yielded the boolean true.
+    // Evaluates a script in the page. True only if it ran and yielded the boolean true.
     bool invokeJScript(const std::string& script);
 
     // Calls a script function. The arguments stay the caller's; the result is thrown away.
@@ -40,7 +40,7 @@ public:
     NPObject* getNPWindowObj();
     NPObject* getNPPluginObj();
 
-    // Resolves an address against the page's; empty if the page's address can't be had.
+    // Resolves a URL against the page's; empty if the browser does not give the page's URL.
     std::string getBaseURL(const std::string& url);
 
     // Sets the embedding element's background image, unless `style` is empty, and makes its background

@@ -17,7 +17,7 @@ constexpr int32_t kUnreadStreamChunk = 8192;
 const char kBannerRule[] =
     "*******************************************************************************************\n";
 
-// An instance that isn't there. Meant: a live instance never counts as invalid, whatever its data.
+// An instance that isn't there. A live instance never counts as invalid, whatever its data.
 bool isInvalid(NPP instance) {
     return !instance;
 }
@@ -30,7 +30,7 @@ PluginBase* modelOf(NPP instance) {
 const ObjectKind* kindOf(NPP instance) {
     const PluginBase* model = modelOf(instance);
     if (model) {
-        for (const ObjectKind* const* kind = objectKinds; *kind; ++kind) {
+        for (const ObjectKind* const* kind = kObjectKinds; *kind; ++kind) {
             if ((*kind)->id == model->getObjectId()) {
                 return *kind;
             }
@@ -148,7 +148,7 @@ NPError PluginEntryPoints::newInstance(NPMIMEType mimeType, NPP instance, uint16
         return NPERR_INVALID_INSTANCE_ERROR;
     }
     const InstanceArguments arguments{mimeType, mode, argc, argn, argv};
-    for (const ObjectKind* const* row = objectKinds; *row; ++row) {
+    for (const ObjectKind* const* row = kObjectKinds; *row; ++row) {
         const ObjectKind& kind = **row;
         if (!makes(kind, mimeType)) {
             continue;
@@ -165,7 +165,7 @@ NPError PluginEntryPoints::newInstance(NPMIMEType mimeType, NPP instance, uint16
         }
         return rv;
     }
-    // A type that no kind claims is no error: the instance stays without a model.
+    // A type that no kind claims is not an error: the instance stays without a model.
     return NPERR_NO_ERROR;
 }
 

@@ -9,7 +9,7 @@
 
 namespace {
 
-// The size of the plug-in's table through `setvalue` on a 32-bit set. Meant: the same number on every
+// The size of the plug-in's table through `setvalue` on a 32-bit set. The same number on every
 // machine.
 constexpr uint16_t kPluginTableSize = 60;
 constexpr uint16_t kInterfaceVersion = 24;
@@ -72,8 +72,8 @@ NPError NPP_Initialize() {
 
 const char* NPP_GetMIMEDescription() {
     // Never freed: browsers keep the address beyond NP_Shutdown.
-    static const char* const description = strdup(PluginEntryPoints::getInst()->mimeTypeString().c_str());
-    return description;
+    static const char* const kDescription = strdup(PluginEntryPoints::getInst()->mimeTypeString().c_str());
+    return kDescription;
 }
 
 void NPP_Shutdown() {

@@ -1,5 +1,5 @@
 // Conversion of script values, the UTF-8 machinery behind the one place where a script string stands for
-// bytes, and the page scripts. The scripts are fixed texts, inconsistencies included: pages on sets in the
+// bytes, and the page scripts. The scripts are fixed, inconsistencies included: pages on sets in the
 // field rely on them.
 #include "common/PluginUtils.h"
 
@@ -11,6 +11,7 @@
 
 #include "common/BrowserGates.h"
 #include "common/Log.h"
+#include "common/PageScripts.h"
 
 std::string toLower(const std::string& text) {
     std::string result = text;
@@ -48,14 +49,15 @@ double numberValue(const NPVariant& value) {
 
 namespace {
 
+// quirk 5: a number beyond the range takes the nearest bound instead of wrapping.
 template <typename Integer>
 Integer saturate(double number) {
     if (std::isnan(number)) {
         return 0;
     }
-    constexpr double lowest = std::numeric_limits<Integer>::min();
-    constexpr double highest = std::numeric_limits<Integer>::max();
-    return static_cast<Integer>(std::clamp(number, lowest, highest));
+    constexpr double kLowest = std::numeric_limits<Integer>::min();
+    constexpr double kHighest = std::numeric_limits<Integer>::max();
+    return static_cast<Integer>(std::clamp(number, kLowest, kHighest));
 }
 
 } // namespace
@@ -75,10 +77,11 @@ int getIntFromNPIdentifier(const NPIdentifier& id) {
         return result;
     }
     PLUGIN_LOG(COMMON, "Property name:-- %s --\n", name);
+    // quirk 6: only the first character is tested.
     if (name[0] >= '0' && name[0] <= '9') {
         result = std::atoi(name);
     }
-    // Meant: free() and not NPN_MemFree. The browsers of the sets hand these texts out from the C heap.
+    // free() and not NPN_MemFree: the browsers of the sets hand these strings out from the C heap.
     std::free(name);
     return result;
 }
@@ -88,11 +91,11 @@ bool isEscapeCharacter(unsigned int value) {
 }
 
 std::string getEscapeChar(ESC_CHAR_ENUM_T value) {
-    static const char letters[] = "abtnvfr";
+    static const char kLetters[] = "abtnvfr";
     if (!isEscapeCharacter(value)) {
         return {};
     }
-    return {'\\', letters[value - ESC_CHAR_ALERT]};
+    return {'\\', kLetters[value - ESC_CHAR_ALERT]};
 }
 
 int inlineUTF8SequenceLengthNonASCII(char first) {
@@ -161,7 +164,7 @@ bool isLegalUTF8Sequence(const char* bytes, int length) {
 
 // Decodes one sequence: all bytes summed up in base 64, then the sum of their marker bits taken off.
 uint32_t readUTF8Sequence(const char** source, int length) {
-    static const uint32_t markers[] = {0, 0, 0x3080, 0xE2080, 0x3C82080, 0xFA082080, 0x82082080};
+    static const uint32_t kMarkers[] = {0, 0, 0x3080, 0xE2080, 0x3C82080, 0xFA082080, 0x82082080};
     if (length < 1 || length > 6) {
         return 0;
     }
@@ -169,14 +172,14 @@ uint32_t readUTF8Sequence(const char** source, int length) {
     for (int i = 0; i < length; ++i) {
         value = value * 64 + static_cast<unsigned char>(*(*source)++);
     }
-    return value - markers[length];
+    return value - kMarkers[length];
 }
 
 } // namespace
 
 ConversionResult convUTF8ToUTF16(const char** sourceStart, const char* sourceEnd,
                                  unsigned short** targetStart, unsigned short* targetEnd, int strict) {
-    constexpr unsigned short replacement = 0xFFFD;
+    constexpr unsigned short kReplacement = 0xFFFD;
     ConversionResult result = conversionOK;
     const char* source = *sourceStart;
     unsigned short* target = *targetStart;
@@ -207,7 +210,7 @@ ConversionResult convUTF8ToUTF16(const char** sourceStart, const char* sourceEnd
             *target++ = static_cast<unsigned short>((character >> 10) + 0xD7C0);
             *target++ = static_cast<unsigned short>((character & 0x3FF) | 0xDC00);
         } else {
-            *target++ = isNone ? replacement : static_cast<unsigned short>(character);
+            *target++ = isNone ? kReplacement : static_cast<unsigned short>(character);
         }
     }
     *sourceStart = source;
@@ -254,6 +257,8 @@ unsigned char* utf8ToUtf16Converter(const NPString& text, unsigned int* length) 
     return bytes;
 }
 
+// quirk 10: the event gets no properties.
+// quirk 12: `objElement` and `newEvent` become globals of the page.
 std::string domEventScript(const std::string& id, const std::string& event, bool bubbles, bool cancelable) {
     PLUGIN_LOG(COMMON, "Id: %s , Event: %s \n", id.c_str(), event.c_str());
     assert(!id.empty());
@@ -276,7 +281,7 @@ std::string parseDataAsUTF8(const std::string& data) {
     std::string result;
     for (size_t index = 0; index < data.size(); index += 2) {
         unsigned int value = 0;
-        // At the end of the text the terminating zero is met, which is no hex digit.
+        // The terminating zero ends a pair that is cut short: it is not a hex digit.
         for (size_t taken = 0; taken < 2 && isASCIIHexDigit(data.c_str()[index + taken]); ++taken) {
             value = value << 4 | static_cast<unsigned int>(toASCIIHexValue(data[index + taken]));
         }
@@ -289,6 +294,7 @@ std::string parseDataAsUTF8(const std::string& data) {
     return result;
 }
 
+// quirk 11: a quote in an argument or in the payload ends the string literal, and the script fails.
 std::string streamEventScript(const std::string& name, const std::string& data, const std::string& status,
                               const std::string& id) {
     PLUGIN_LOG(COMMON, "is called. Name: %s , Data: %s , Status: %s , Id:  %s \n", name.c_str(), data.c_str(),
@@ -319,93 +325,21 @@ std::string streamEventScript(const std::string& name, const std::string& data, 
 
 std::string parseStreamEventXMLScript(const std::string& url, const std::string& eventName,
                                       const std::string& id, bool isAdd) {
-    std::string script = "var requestURL = '";
-    script += url;
-    script += "'; var eventName = '";
-    script += eventName;
-    // Meant: the loop over the text form compares `event`, not the entry just split, and several names stay
-    // undeclared, hence global in the page.
-    script += "';"
-              "var httpReq = new XMLHttpRequest();"
-              "httpReq.open('GET', requestURL, true);"
-              "httpReq.onreadystatechange = function(){"
-              "\tif((httpReq.readyState == 4) && (httpReq.status == 200)){"
-              "\t\tvar eventId_val = null;"
-              "\t\tvar comp_tag_val = null;"
-              "\t\tif(xmlData = httpReq.responseXML){"
-              "\t\t\tvar stream_event_type_elem =  xmlData.getElementsByTagName('stream_event');"
-              "\t\t\tfor(i=0; i < stream_event_type_elem.length; i++){"
-              "\t\t\t\tif(stream_event_type_elem[i].getAttribute('stream_event_name') == eventName){"
-              "\t\t\t\t\teventId_val = stream_event_type_elem[i].getAttribute('stream_event_id');"
-              "\t\t\t\t\tvar stream_event_elem = stream_event_type_elem[i].parentNode;"
-              "\t\t\t\t\tif(stream_event_elem)"
-              "\t\t\t\t\t\tcomp_tag_val = stream_event_elem.getAttribute('component_tag');"
-              "\t\t\t\t\tbreak;"
-              "\t\t\t\t}"
-              "\t\t\t}"
-              "\t\t}"
-              "\t\tif(!eventId_val || !comp_tag_val){"
-              "\t\t\tif(respText = httpReq.responseText){"
-              "\t\t\t\tvar eventset = respText.split(',');"
-              "\t\t\t\tfor(i=0; i < eventset.length - 1; i++){"
-              "\t\t\t\t\teventToken = eventset[i].split('.', 2);"
-              "\t\t\t\t\tif(eventName == event[1]){"
-              "\t\t\t\t\t\teventId_val = event[0];"
-              "\t\t\t\t\t\tbreak;"
-              "\t\t\t\t\t}"
-              "\t\t\t\t}"
-              "\t\t\t\tcompToken = eventset[eventset.length - 1];"
-              "\t\t\t\teventToken = compToken.split('$');"
-              "\t\t\t\tcomp_tag_val = eventToken[1];"
-              "\t\t\t\tif(null == eventId_val){"
-              "\t\t\t\t\tevent = eventToken[0].split('.', 2);"
-              "\t\t\t\t\tif(event[1] == eventName)"
-              "\t\t\t\t\t\teventId_val = event[0];"
-              "\t\t\t\t}"
-              "\t\t\t}"
-              "\t\t}"
-              "var objElem = document.getElementById('";
-    script += id;
-    script += "');"
-              "objElem.";
-    script += isAdd ? "addStreamEventListener" : "removeStreamEventListener";
-    script += "(requestURL, eventName, eventId_val, comp_tag_val);"
-              "}"
-              "};"
-              "httpReq.send(null);";
+    const std::string script =
+        fillIn(kStreamEventRequestScript,
+               {url, eventName, id, isAdd ? "addStreamEventListener" : "removeStreamEventListener"});
     PLUGIN_LOG(COMMON, "Script: %s \n", script.c_str());
     return script;
 }
 
 std::string getPlayCountVal(const std::string& id) {
-    std::string script = "window.getPlayCountVal = function()"
-                         "{"
-                         "\tvar objElem = document.getElementById(\"";
-    script += id;
-    script += "\");"
-              "\tvar nodeList = objElem.childNodes;"
-              "\tfor( var i = 0; i < nodeList.length ; i++)"
-              "\t{"
-              "\t\tvar paramElem = nodeList.item(i);"
-              "\t\tif( 'param' == paramElem.nodeName || 'PARAM' == paramElem.nodeName)"
-              "\t\t{"
-              "\t\t\tvar loopStr = paramElem.getAttribute('value');"
-              "\t\t\treturn loopStr;"
-              "\t\t}"
-              "\t}"
-              "};";
+    const std::string script = fillIn(kPlayCountScript, {id});
     PLUGIN_LOG(COMMON, "Script:--  %s ----\n", script.c_str());
     return script;
 }
 
 std::string getEncodedURL(const std::string& url) {
-    std::string script = "window.getEncodedURL = function()"
-                         "{"
-                         "\tvar encodedURL = encodeURI(\"";
-    script += url;
-    script += "\");"
-              "\treturn encodedURL;"
-              "};";
+    const std::string script = fillIn(kEncodedUrlScript, {url});
     PLUGIN_LOG(COMMON, "Script:--  %s ----\n", script.c_str());
     return script;
 }

@@ -1,6 +1,6 @@
-// Values across the script boundary (numbers, strings, identifiers, UTF-8) and the texts that the plug-in has
-// the page evaluate. All functions are stateless. Those that take or give browser values run on the browser
-// thread.
+// Values across the script boundary (numbers, strings, identifiers, UTF-8) and the scripts that the plug-in
+// has the page evaluate. All functions are stateless. Those that take or give browser values run on the
+// browser thread.
 #ifndef TELIX_COMMON_PLUGINUTILS_H
 #define TELIX_COMMON_PLUGINUTILS_H
 
@@ -65,18 +65,18 @@ int inlineUTF8SequenceLength(char first);
 enum ConversionResult { conversionOK = 0, sourceExhausted = 1, targetExhausted = 2, sourceIllegal = 3 };
 
 // UTF-8 (RFC 3629) to UTF-16 units. Both start pointers are left at the first byte and unit not consumed.
-// `strict` refuses what is no character instead of writing U+FFFD for it.
+// `strict` refuses what is not a character instead of writing U+FFFD for it.
 ConversionResult convUTF8ToUTF16(const char** sourceStart, const char* sourceEnd,
                                  unsigned short** targetStart, unsigned short* targetEnd, int strict);
 
 // A script string whose characters stand for bytes, as those bytes: a character above U+00FF gives its high
 // byte, then its low one. Returns a zero-terminated block that the caller frees with free(), and its length
-// without the zero; or null, with `length` untouched, if the text isn't UTF-8 or memory ran out.
+// without the zero; or null, with `length` untouched, if the string isn't UTF-8 or memory ran out.
 unsigned char* utf8ToUtf16Converter(const NPString& text, unsigned int* length);
 
 // Page scripts. Arguments go in as they are, with nothing escaped.
 
-// Dispatches a plain DOM event at the element; yields the boolean result of dispatchEvent. Neither text may
+// Dispatches a plain DOM event at the element; yields the boolean result of dispatchEvent. Neither string may
 // be empty.
 std::string domEventScript(const std::string& id, const std::string& event, bool bubbles, bool cancelable);
 
@@ -84,7 +84,7 @@ std::string domEventScript(const std::string& id, const std::string& event, bool
 std::string streamEventScript(const std::string& name, const std::string& data, const std::string& status,
                               const std::string& id);
 
-// Hexadecimal text as its characters, control characters as their escapes.
+// A hexadecimal string as its characters, control characters as their escapes.
 std::string parseDataAsUTF8(const std::string& data);
 
 // Fetches a stream event description and calls the element's addStreamEventListener (or
@@ -95,7 +95,7 @@ std::string parseStreamEventXMLScript(const std::string& url, const std::string&
 // Defines window.getPlayCountVal, which returns the value of the element's first `param` child.
 std::string getPlayCountVal(const std::string& id);
 
-// Defines window.getEncodedURL, which returns the address URI-encoded.
+// Defines window.getEncodedURL, which returns the URL, URI-encoded.
 std::string getEncodedURL(const std::string& url);
 
 #endif

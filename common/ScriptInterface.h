@@ -12,7 +12,7 @@
 #include "common/PluginBase.h"
 #include "common/ScriptValues.h"
 
-// Each of these does its work on the model behind the wrapper and tells whether it took place: false from a
+// Each of these does its work on the model behind the wrapper and returns whether it took place: false from a
 // writer or an invoker is a value or arguments that do not fit.
 using ScriptReader = bool (*)(PluginBase& model, NPVariant& result);
 using ScriptWriter = bool (*)(PluginBase& model, const NPVariant& value);
@@ -65,24 +65,35 @@ struct Signature<Result_ (Model_::*)(Arguments_...)> {
 template <class Model_, class Result_, class... Arguments_>
 struct Signature<Result_ (Model_::*)(Arguments_...) const> : Signature<Result_ (Model_::*)(Arguments_...)> {};
 
-template <auto Operation, class... Arguments, size_t... Index>
-bool invokeWith(PluginBase& model, const NPVariant* args, NPVariant& result, const std::tuple<Arguments...>*,
-                std::index_sequence<Index...>) {
-    using Call = Signature<decltype(Operation)>;
-    // The array is read as it stands: its length is not looked at.
-    if (!(ScriptArgument<Arguments>::fits(args[Index]) && ...)) {
-        return false;
-    }
-    auto& target = static_cast<typename Call::Model&>(model);
-    if constexpr (std::is_void_v<typename Call::Result>) {
-        (target.*Operation)(ScriptArgument<Arguments>::read(args[Index])...);
-    } else {
-        setResult(result, (target.*Operation)(ScriptArgument<Arguments>::read(args[Index])...));
-    }
-    return true;
+template <class... Types, size_t... Index>
+bool argumentsFit(const NPVariant* args, const std::tuple<Types...>*, std::index_sequence<Index...>) {
+    return (ScriptArgument<Types>::fits(args[Index]) && ...);
+}
+
+template <class... Types, size_t... Index>
+std::tuple<Types...> readArguments(const NPVariant* args, const std::tuple<Types...>*,
+                                   std::index_sequence<Index...>) {
+    // A call's arguments may be evaluated in any order; those of a braced list are evaluated as they stand.
+    return std::tuple<Types...>{ScriptArgument<Types>::read(args[Index])...};
 }
 
 } // namespace script_detail
+
+// Whether the first arguments of a call fit the types of a tuple.
+// quirk 1: the array is read as it stands, whatever its length.
+template <class Tuple>
+bool argumentsFit(const NPVariant* args) {
+    return script_detail::argumentsFit(args, static_cast<const Tuple*>(nullptr),
+                                       std::make_index_sequence<std::tuple_size_v<Tuple>>{});
+}
+
+// The values of arguments that fit. They are converted from the first to the last: a conversion logs and
+// allocates.
+template <class Tuple>
+Tuple readArguments(const NPVariant* args) {
+    return script_detail::readArguments(args, static_cast<const Tuple*>(nullptr),
+                                        std::make_index_sequence<std::tuple_size_v<Tuple>>{});
+}
 
 // A property read through a getter of the model.
 template <auto Getter>
@@ -104,8 +115,8 @@ bool write(PluginBase& model, const NPVariant& value) {
     return true;
 }
 
-// A property that holds a script function: an object replaces it, null clears it, anything else changes
-// nothing; the write succeeds in all three cases.
+// A property that holds a script function: an object replaces it, null clears it.
+// quirk 4: anything else changes nothing, and the write succeeds.
 template <auto Setter>
 bool writeListener(PluginBase& model, const NPVariant& value) {
     using Call = script_detail::Signature<decltype(Setter)>;
@@ -121,9 +132,20 @@ bool writeListener(PluginBase& model, const NPVariant& value) {
 // result is left as it was.
 template <auto Operation>
 bool invoke(PluginBase& model, const NPVariant* args, unsigned int, NPVariant& result) {
-    using Arguments = typename script_detail::Signature<decltype(Operation)>::Arguments;
-    return script_detail::invokeWith<Operation>(model, args, result, static_cast<const Arguments*>(nullptr),
-                                                std::make_index_sequence<std::tuple_size_v<Arguments>>{});
+    using Call = script_detail::Signature<decltype(Operation)>;
+    if (!argumentsFit<typename Call::Arguments>(args)) {
+        return false;
+    }
+    const auto operation = [&model](const auto&... arguments) {
+        return (static_cast<typename Call::Model&>(model).*Operation)(arguments...);
+    };
+    const auto arguments = readArguments<typename Call::Arguments>(args);
+    if constexpr (std::is_void_v<typename Call::Result>) {
+        std::apply(operation, arguments);
+    } else {
+        setResult(result, std::apply(operation, arguments));
+    }
+    return true;
 }
 
 // Array notation of the list classes: decimal names below `length` read `item`.

@@ -27,15 +27,15 @@ public:
     uint32_t length() const { return m_length; }
     void setLength(uint32_t length) { m_length = length; }
 
-    // Appends a new object, without a change of the length. Meant: a browser that refuses is asked until it
-    // yields.
+    // Appends a new object, without a change of the length. A browser that refuses is asked until it yields:
+    // an entry must not be skipped, or the indexes would no longer be those of the platform.
     Wrapper& add(NPP npp) {
         NPObject* object = nullptr;
         while (!object) {
             object = createScriptObject<Wrapper>(npp);
         }
-        // Meant: two references from the outset. The list gives one back at its end; the one of the creation
-        // stays behind, so an entry outlives its list.
+        // Two references from the outset. The list gives one back at its end and never the one of the
+        // creation, so an entry outlives its list.
         m_objects.push_back(handOut(object));
         return *wrapperOf<Wrapper>(object);
     }

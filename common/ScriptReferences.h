@@ -49,4 +49,12 @@ inline void replaceListener(NPObject*& slot, NPObject* listener) {
     slot = handOut(listener);
 }
 
+// The same in another order: the slot holds the listener by the time that the browser counts the reference,
+// and the retain is made on whatever is stored, null included.
+inline void storeListener(NPObject*& slot, NPObject* listener) {
+    releaseHeld(slot);
+    slot = listener;
+    NPN_RetainObject(slot);
+}
+
 #endif

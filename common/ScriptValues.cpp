@@ -1,4 +1,4 @@
-// Texts for script.
+// Strings for script.
 #include "common/ScriptValues.h"
 
 #include <cstring>
@@ -16,6 +16,7 @@ bool setText(NPVariant& result, const char* text, size_t length) {
     return true;
 }
 
+// quirk 3: an empty string reads as null.
 void setResult(NPVariant& result, const std::string& text) {
     if (text.empty() || !setText(result, text.data(), text.size())) {
         setNull(result);

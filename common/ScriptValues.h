@@ -47,14 +47,14 @@ inline void setResult(NPVariant& result, NPObject* object) {
     result.value.objectValue = object;
 }
 
-// Copies the text into the browser's memory, without a terminating zero. False, with the result untouched, if
-// there was no memory.
+// Copies the string into the browser's memory, without a terminating zero. False, with the result untouched,
+// if there was no memory.
 bool setText(NPVariant& result, const char* text, size_t length);
 
-// A text; null if it is empty or there was no memory.
+// A string; null if it is empty or there was no memory.
 void setResult(NPVariant& result, const std::string& text);
 
-// A text, the empty one too, in a zero-terminated block of the C heap instead of the browser's memory.
+// A string, the empty one too, in a zero-terminated block of the C heap instead of the browser's memory.
 void setDuplicatedText(NPVariant& result, const std::string& text);
 
 // How script hands over an argument of a C++ type: whether the variant fits, and its value.

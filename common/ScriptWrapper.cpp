@@ -8,9 +8,9 @@ ScriptWrapper::ScriptWrapper(NPP npp, const ScriptClass& scriptClass) : m_npp(np
                    static_cast<void*>(this));
 }
 
-ScriptWrapper::~ScriptWrapper() {
-    PLUGIN_LOG_FOR(m_class.logModule, m_class.name, "Destructor called, This:-- %p --\n",
-                   static_cast<void*>(this));
+void ScriptWrapper::logDestructor() const {
+    PLUGIN_LOG_FOR(m_class.logModule, ("~" + std::string(m_class.name)).c_str(),
+                   "Destructor called, This:-- %p --\n", static_cast<const void*>(this));
 }
 
 void ScriptWrapper::fetchIdentifiers(NPIdentifier* identifiers) const {
@@ -27,9 +27,9 @@ int indexInRange(const ScriptArray& array, PluginBase& list, NPIdentifier name) 
     return index != -1 && static_cast<uint32_t>(index) < array.length(list) ? index : -1;
 }
 
-void logRefusal(const ScriptClass& scriptClass, const char* operation) {
-    if (scriptClass.refusalText) {
-        PLUGIN_LOG_FOR(scriptClass.logModule, operation, "%s", scriptClass.refusalText);
+void logRefusal(const ScriptClass& scriptClass, const char* operation, const char* text) {
+    if (text) {
+        PLUGIN_LOG_FOR(scriptClass.logModule, operation, "%s", text);
     }
 }
 
@@ -40,23 +40,21 @@ void logMember(const ScriptClass& scriptClass, const char* operation, const Scri
 } // namespace
 
 bool ScriptWrapper::refuseMethod() const {
-    logRefusal(m_class, "HasMethod");
+    logRefusal(m_class, "HasMethod", m_class.hasMethodRefusal);
     return false;
 }
 
 bool ScriptWrapper::invokeMember(const ScriptMember* member, PluginBase* model, const NPVariant* args,
                                  unsigned int argCount, NPVariant* result) const {
     if (!model) {
-        if (m_class.missingModelText) {
-            PLUGIN_LOG_FOR(m_class.logModule, "Invoke", "%s", m_class.missingModelText);
-        }
+        logRefusal(m_class, "Invoke", m_class.missingModelText);
         return false;
     }
     if (member && member->isMethod()) {
         logMember(m_class, "Invoke", *member);
         return member->invoke(*model, args, argCount, *result);
     }
-    logRefusal(m_class, "Invoke");
+    logRefusal(m_class, "Invoke", m_class.invokeRefusal);
     return false;
 }
 
@@ -103,6 +101,6 @@ bool ScriptWrapper::writeMember(const ScriptMember* member, PluginBase* model, c
         logMember(m_class, "SetProperty", *member);
         return member->write(*model, *value);
     }
-    logRefusal(m_class, "SetProperty");
+    logRefusal(m_class, "SetProperty", m_class.setPropertyRefusal);
     return false;
 }

@@ -14,8 +14,11 @@ struct ScriptClass {
     LogModule logModule;
     const ScriptMember* members;
     size_t memberCount;
-    const ScriptArray* array = nullptr;     // of the list classes
-    const char* refusalText = nullptr;      // logged by HasMethod, Invoke and SetProperty when they refuse
+    const ScriptArray* array = nullptr; // of the list classes
+    // What an operation logs when it refuses; each class logs with some operations and is silent with others.
+    const char* hasMethodRefusal = nullptr;
+    const char* invokeRefusal = nullptr;
+    const char* setPropertyRefusal = nullptr;
     const char* missingModelText = nullptr; // logged by Invoke without a model
     bool readsStartVoid = true;             // whether GetProperty sets the result to void first
 
@@ -28,9 +31,15 @@ struct ScriptClass {
         copy.array = access;
         return copy;
     }
-    constexpr ScriptClass refusingWith(const char* text) const {
+    constexpr ScriptClass refusingMethodsWith(const char* text) const {
         ScriptClass copy = *this;
-        copy.refusalText = text;
+        copy.hasMethodRefusal = text;
+        copy.invokeRefusal = text;
+        return copy;
+    }
+    constexpr ScriptClass refusingWritesWith(const char* text) const {
+        ScriptClass copy = *this;
+        copy.setPropertyRefusal = text;
         return copy;
     }
     constexpr ScriptClass missingModelSays(const char* text) const {
@@ -52,12 +61,14 @@ public:
 
 protected:
     ScriptWrapper(NPP npp, const ScriptClass& scriptClass);
-    ~ScriptWrapper() override;
+
+    // The first statement of a destructor, under its own name.
+    void logDestructor() const;
 
     // Fetches the identifiers of the table's names, in its order.
     void fetchIdentifiers(NPIdentifier* identifiers) const;
 
-    // The rest of the virtual operations behind the look-up. `member` is the name's row, null if the class
+    // The rest of the virtual operations after the look-up. `member` is the name's row, null if the class
     // has none; `model` is the model at this moment, or null.
     bool refuseMethod() const;
     bool invokeMember(const ScriptMember* member, PluginBase* model, const NPVariant* args,
@@ -132,6 +143,7 @@ public:
 protected:
     EmbeddedObjectWrapper(NPP npp, const ScriptClass& scriptClass)
         : SizedScriptWrapper<EmbeddedObjectWrapper, Count>(npp, scriptClass) {}
+    ~EmbeddedObjectWrapper() override { this->logDestructor(); }
 };
 
 // The wrapper of a sub-object: makes its model and owns it.
@@ -144,10 +156,24 @@ public:
 protected:
     SubObjectWrapper(NPP npp, const ScriptClass& scriptClass)
         : SizedScriptWrapper<SubObjectWrapper, Count>(npp, scriptClass), m_impl(new Model(npp)) {}
-    ~SubObjectWrapper() override { delete m_impl; }
+    ~SubObjectWrapper() override {
+        endModel([](Model&) {});
+    }
+
+    // What every wrapper's destructor does: logs, then deletes the model. A class that has something to do
+    // between the two calls this in its own destructor, with that as `before`.
+    template <class Before>
+    void endModel(Before before) {
+        if (m_impl) {
+            this->logDestructor();
+            before(*m_impl);
+            delete m_impl;
+            m_impl = nullptr;
+        }
+    }
 
 private:
-    Model* m_impl;
+    Model* m_impl; // null once the destructor has deleted it
 };
 
 #endif

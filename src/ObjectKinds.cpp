@@ -9,7 +9,7 @@
 #include "src/parental/ParentalControlManager.h"
 #include "src/videobroadcast/VideoBroadcast.h"
 
-const ObjectKind* const objectKinds[] = {
-    &applicationManagerKind,     &avControlKind,    &videoBroadcastKind, &oipfConfigurationKind,
-    &parentalControlManagerKind, &capabilitiesKind, &drmAgentKind,       nullptr,
+const ObjectKind* const kObjectKinds[] = {
+    &kApplicationManagerKind,     &kAvControlKind,    &kVideoBroadcastKind, &kOipfConfigurationKind,
+    &kParentalControlManagerKind, &kCapabilitiesKind, &kDrmAgentKind,       nullptr,
 };

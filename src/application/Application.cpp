@@ -21,8 +21,9 @@ NPObject* Application::privateData() {
     return handOutOnce<JSApplicationPrivateData>(m_npp, m_privateData);
 }
 
+// quirk 18: the flag reaches neither the script nor the new object.
 NPObject* Application::createApplication(const std::string& uri, bool) {
-    // The address goes in unescaped: one with a quote makes a script that fails, and the page sees null.
+    // quirk 19: the URL goes in unescaped; one with a quote makes a script that fails.
     if (!invokeJScript("window.createHbbTVApplication('" + uri + "');")) {
         PLUGIN_LOG(APP_MGR, " Application class:: invokeJScript returned FAIL.\n");
         return nullptr;
@@ -32,6 +33,7 @@ NPObject* Application::createApplication(const std::string& uri, bool) {
     return object;
 }
 
+// quirk 20: the object lives on; only the page function is called.
 void Application::destroyApplication() {
     invokeJScript("window.destroyHbbTVApplication();");
 }
@@ -65,21 +67,21 @@ NPObject* Application::onApplicationHidden() {
 }
 
 void Application::setOnKeyPress(NPObject* handler) {
-    replaceListener(m_onKeyPress, handler);
+    storeListener(m_onKeyPress, handler);
 }
 
 void Application::setOnKeyUp(NPObject* handler) {
-    replaceListener(m_onKeyUp, handler);
+    storeListener(m_onKeyUp, handler);
 }
 
 void Application::setOnKeyDown(NPObject* handler) {
-    replaceListener(m_onKeyDown, handler);
+    storeListener(m_onKeyDown, handler);
 }
 
 void Application::setOnApplicationShown(NPObject* handler) {
-    replaceListener(m_onApplicationShown, handler);
+    storeListener(m_onApplicationShown, handler);
 }
 
 void Application::setOnApplicationHidden(NPObject* handler) {
-    replaceListener(m_onApplicationHidden, handler);
+    storeListener(m_onApplicationHidden, handler);
 }

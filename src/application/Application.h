@@ -21,8 +21,8 @@ public:
     void show();
     void hide();
 
-    // Script handlers, stored for script alone: the plug-in calls none of them by itself. A getter hands out
-    // one more reference; null if none is set.
+    // Script handlers. A getter hands out one more reference; null if none is set.
+    // quirk 17: stored for script alone; the plug-in calls none of them by itself.
     NPObject* onKeyPress();
     NPObject* onKeyUp();
     NPObject* onKeyDown();

@@ -25,18 +25,9 @@ namespace {
 
 const char* const kMimeTypes[] = {"application/oipfapplicationmanager", nullptr};
 
-// Meant: the retain is made on whatever is stored, null included.
-void storeHandler(NPObject*& slot, NPObject* handler) {
-    if (slot) {
-        NPN_ReleaseObject(slot);
-    }
-    slot = handler;
-    NPN_RetainObject(slot);
-}
-
 } // namespace
 
-const ObjectKind applicationManagerKind = [] {
+const ObjectKind kApplicationManagerKind = [] {
     ObjectKind kind{};
     kind.id = 200;
     kind.destroyText = "APPMANAGER_OBJ_ID delete\n";
@@ -106,7 +97,7 @@ int ApplicationManager::onLowMemoryCb() {
     return 0;
 }
 
-// Meant: the notice ends here; the script handler is stored and never called.
+// quirk 13: the notification ends here; the script handler is stored and never called.
 int ApplicationManager::handleOnLowMemory(void*) {
     PLUGIN_LOG(APP_MGR, " is called \n");
     return G_SOURCE_REMOVE;
@@ -128,8 +119,8 @@ NPObject* ApplicationManager::getJSObject() {
 }
 
 NPObject* ApplicationManager::getOwnerApplication(NPObject* document) {
-    static const char expression[] = "location.href";
-    NPString text{expression, sizeof(expression) - 1};
+    static const char kExpression[] = "location.href";
+    NPString text{kExpression, sizeof(kExpression) - 1};
     NPVariant location{};
     // The document itself is the scope, not the page's window.
     if (!NPN_Evaluate(m_npp, document, &text, &location)) {
@@ -140,7 +131,8 @@ NPObject* ApplicationManager::getOwnerApplication(NPObject* document) {
         const NPString& href = location.value.stringValue;
         PLUGIN_LOG(APP_MGR, " ApplicationManager class:: Location: %s \n",
                    std::string(href.UTF8Length ? href.UTF8Characters : "", href.UTF8Length).c_str());
-        // A new object at every call: the reference of its creation goes to the caller, none is kept.
+        // quirk 15: a new object at every call; the reference of its creation goes to the caller, none is
+        // kept.
         application = createScriptObject<JSApplication>(m_npp);
     }
     NPN_ReleaseVariantValue(&location);
@@ -149,7 +141,8 @@ NPObject* ApplicationManager::getOwnerApplication(NPObject* document) {
 
 Application* ApplicationManager::getApplication(ApplicationPrivateData* data) {
     for (Application* application : m_applications) {
-        // Meant: the reference that comes with the object is left behind.
+        // The reference that comes with the object is never released: an application that was visited keeps
+        // it.
         auto* wrapper = wrapperOf<JSApplicationPrivateData>(application->privateData());
         if (wrapper && wrapper->impl() == data) {
             return application;
@@ -160,7 +153,7 @@ Application* ApplicationManager::getApplication(ApplicationPrivateData* data) {
 
 Application* ApplicationManager::getApplication(KeySet* keySet) {
     for (Application* application : m_applications) {
-        // Meant: the references that come with both objects are left behind.
+        // The references that come with both objects are never released.
         auto* dataWrapper = wrapperOf<JSApplicationPrivateData>(application->privateData());
         if (dataWrapper) {
             auto* keySetWrapper = wrapperOf<JSKeySet>(dataWrapper->impl()->keySet());
@@ -189,23 +182,23 @@ NPObject* ApplicationManager::onApplicationLoadError() {
 }
 
 void ApplicationManager::setOnLowmemory(NPObject* handler) {
-    storeHandler(m_onLowmemory, handler);
+    storeListener(m_onLowmemory, handler);
 }
 
 void ApplicationManager::setOnApplicationLoaded(NPObject* handler) {
-    storeHandler(m_onApplicationLoaded, handler);
+    storeListener(m_onApplicationLoaded, handler);
 }
 
 void ApplicationManager::setOnApplicationUnloaded(NPObject* handler) {
-    storeHandler(m_onApplicationUnloaded, handler);
+    storeListener(m_onApplicationUnloaded, handler);
 }
 
 void ApplicationManager::setOnApplicationLoadError(NPObject* handler) {
-    storeHandler(m_onApplicationLoadError, handler);
+    storeListener(m_onApplicationLoadError, handler);
 }
 
 bool ApplicationManager::handleApplicationLoadError() {
-    // Meant: this one statement speaks as another class, under that class's module.
+    // This one statement names another class, under that class's module.
     PLUGIN_LOG(AVCONTROL, "AVControl class");
     if (!m_onApplicationLoadError) {
         return false;
@@ -233,7 +226,7 @@ int ApplicationManager::callKeyHandlers(NPObject* (Application::*handler)()) {
             const bool isAlive =
                 std::find(m_applications.begin(), m_applications.end(), application) != m_applications.end();
             if (isAlive && (application->*handler)()) {
-                // Meant: both getter calls leave a reference behind.
+                // Neither of the two references that the getter hands out is released.
                 invokeJScriptFunc((application->*handler)(), nullptr, 0);
             }
         }

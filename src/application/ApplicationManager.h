@@ -14,7 +14,7 @@ class ApplicationPrivateData;
 class KeySet;
 struct ObjectKind;
 
-extern const ObjectKind applicationManagerKind;
+extern const ObjectKind kApplicationManagerKind;
 
 class ApplicationManager final : public PluginBase {
 public:
@@ -39,18 +39,19 @@ public:
     NPObject* getJSObject() override;
 
     // A new application object for the page of the document; the caller owns its reference. Null if the
-    // document tells no location.
+    // document has no location.
     NPObject* getOwnerApplication(NPObject* document);
 
     std::vector<Application*> applicationList() const { return m_applications; }
 
     // The application, of any page, that owns a private data object or a key set; null if none lives. Every
     // application that is visited makes these objects if it has none, and one reference to each of them is
-    // left behind.
+    // never released.
     Application* getApplication(ApplicationPrivateData* data);
     Application* getApplication(KeySet* keySet);
 
     // Script handlers. A getter hands out one more reference; null if none is set. A setter takes null too.
+    // quirk 14: nothing calls the handlers of loading, unloading and load errors.
     NPObject* onLowmemory();
     NPObject* onApplicationLoaded();
     NPObject* onApplicationUnloaded();

@@ -19,7 +19,7 @@ ApplicationPrivateData::ApplicationPrivateData(NPP npp) : PluginBase(npp) {}
 
 ApplicationPrivateData::~ApplicationPrivateData() {
     releaseHeld(m_keySet);
-    // Meant: the reference of m_currentChannel is left behind.
+    // m_currentChannel is not released: the channel object outlives this one.
 }
 
 NPObject* ApplicationPrivateData::keySet() {
@@ -38,7 +38,7 @@ uint32_t ApplicationPrivateData::getFreeMem() {
 NPObject* ApplicationPrivateData::getCurrChannel() {
     TELIX_JS_CM_HANDLE handle = 0;
     if (TELIX_JS_APP_GetCurrentChannel(&handle) != 0) {
-        // Meant: without a reference for the caller.
+        // The cached object, without a reference for the caller.
         return m_currentChannel;
     }
     if (m_currentChannel && channelOf(m_currentChannel)->getChannelHandle() != handle) {

@@ -25,7 +25,7 @@ public:
 private:
     NPObject* m_keySet = nullptr; // one reference held
     uint32_t m_freeMem = 0;
-    NPObject* m_currentChannel = nullptr; // one reference held, and left behind at the end
+    NPObject* m_currentChannel = nullptr; // one reference held, never released at the end
 };
 
 #endif

@@ -6,7 +6,7 @@
 
 namespace {
 
-// Meant: unlike the manager's handlers these can't be cleared: a write of null is refused.
+// quirk 16: a handler is written as an object or not at all; null is refused.
 constexpr ScriptMember kMembers[] = {
     property("privateData", read<&Application::privateData>),
     property("private", read<&Application::privateData>),
@@ -32,5 +32,5 @@ JSApplication::JSApplication(NPP npp) : SubObjectWrapper(npp, kClass) {
 }
 
 JSApplication::~JSApplication() {
-    ApplicationManager::removeApplication(impl());
+    endModel([](Application& application) { ApplicationManager::removeApplication(&application); });
 }

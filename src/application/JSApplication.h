@@ -1,4 +1,4 @@
-// The script face of an application. It owns the application and keeps it in the process-wide list.
+// The script interface of an application. It owns the application and keeps it in the process-wide list.
 #ifndef TELIX_SRC_APPLICATION_JSAPPLICATION_H
 #define TELIX_SRC_APPLICATION_JSAPPLICATION_H
 

@@ -7,7 +7,7 @@ namespace {
 
 using Model = ApplicationManager;
 
-// Meant: script spells "onLowMemory" with a capital M, the log does not.
+// Script spells "onLowMemory" with a capital M, the log does not.
 constexpr ScriptMember kMembers[] = {
     property("onLowMemory", read<&Model::onLowmemory>, writeListener<&Model::setOnLowmemory>)
         .logged("onLowmemory"),

@@ -1,4 +1,4 @@
-// The script face of the application manager.
+// The script interface of the application manager.
 #ifndef TELIX_SRC_APPLICATION_JSAPPLICATIONMANAGER_H
 #define TELIX_SRC_APPLICATION_JSAPPLICATIONMANAGER_H
 

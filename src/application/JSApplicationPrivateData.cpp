@@ -5,7 +5,7 @@ namespace {
 
 using Model = ApplicationPrivateData;
 
-// Meant: an object also when there is none; no null is put in its place.
+// quirk 21: an object variant also when there is no object; no null is put in its place.
 bool readCurrentChannel(PluginBase& model, NPVariant& result) {
     result.type = NPVariantType_Object;
     result.value.objectValue = static_cast<Model&>(model).getCurrChannel();
@@ -18,13 +18,9 @@ constexpr ScriptMember kMembers[] = {
     property("currentChannel", readCurrentChannel),
 };
 
-constexpr ScriptClass kClass("JSApplicationPrivateData", LogModule::APP_MGR, kMembers);
+constexpr ScriptClass kClass = ScriptClass("JSApplicationPrivateData", LogModule::APP_MGR, kMembers)
+                                   .refusingWritesWith("JSApplicationPrivateData class\n");
 
 } // namespace
 
 JSApplicationPrivateData::JSApplicationPrivateData(NPP npp) : SubObjectWrapper(npp, kClass) {}
-
-bool JSApplicationPrivateData::SetProperty(NPIdentifier, const NPVariant*) {
-    PLUGIN_LOG(APP_MGR, "JSApplicationPrivateData class\n");
-    return false;
-}

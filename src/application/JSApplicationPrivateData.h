@@ -1,4 +1,4 @@
-// The script face of an application's private data.
+// The script interface of an application's private data.
 #ifndef TELIX_SRC_APPLICATION_JSAPPLICATIONPRIVATEDATA_H
 #define TELIX_SRC_APPLICATION_JSAPPLICATIONPRIVATEDATA_H
 
@@ -8,9 +8,6 @@
 class JSApplicationPrivateData final : public SubObjectWrapper<ApplicationPrivateData, 3> {
 public:
     explicit JSApplicationPrivateData(NPP npp);
-
-    // Refuses as the base does, with a line in the log.
-    bool SetProperty(NPIdentifier name, const NPVariant* value) override;
 };
 
 #endif

@@ -28,7 +28,7 @@ bool AVcomponent::ask(Call ofAVControl, Call ofVideoBroadcast, Raw& result) cons
 }
 
 template <class Call>
-bool AVcomponent::fetchText(std::string& cache, Call ofAVControl, Call ofVideoBroadcast) const {
+bool AVcomponent::fetchString(std::string& cache, Call ofAVControl, Call ofVideoBroadcast) const {
     char* text = nullptr;
     if (m_handle == 0 || !cache.empty() || !ask(ofAVControl, ofVideoBroadcast, text) || !text) {
         return false;
@@ -38,6 +38,7 @@ bool AVcomponent::fetchText(std::string& cache, Call ofAVControl, Call ofVideoBr
     return true;
 }
 
+// quirk 34: the first successful answer is kept for good.
 template <class Raw, class Value, class Call>
 Value AVcomponent::fetchOnce(Value& cache, bool& valid, Call ofAVControl, Call ofVideoBroadcast) const {
     if (m_handle != 0 && !valid) {
@@ -51,7 +52,7 @@ Value AVcomponent::fetchOnce(Value& cache, bool& valid, Call ofAVControl, Call o
 }
 
 std::string AVcomponent::getEncoding() {
-    if (fetchText(m_encoding, TELIX_JS_AV_AVComponent_GetEncoding, TELIX_JS_VB_AVComponent_GetEncoding)) {
+    if (fetchString(m_encoding, TELIX_JS_AV_AVComponent_GetEncoding, TELIX_JS_VB_AVComponent_GetEncoding)) {
         PLUGIN_LOG(AV_COMP, " Encoding value returned from IF API= ( %s ) \n", m_encoding.c_str());
     }
     return m_encoding;
@@ -68,7 +69,7 @@ float AVcomponent::getAspectRatio() {
 }
 
 std::string AVcomponent::getLanguage() {
-    fetchText(m_language, TELIX_JS_AV_AVComponent_GetLanguage, TELIX_JS_VB_AVComponent_GetLanguage);
+    fetchString(m_language, TELIX_JS_AV_AVComponent_GetLanguage, TELIX_JS_VB_AVComponent_GetLanguage);
     return m_language;
 }
 

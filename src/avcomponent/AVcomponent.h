@@ -30,8 +30,8 @@ public:
 
     AVcompType_T getType() const { return m_type; }
 
-    // Each is the platform's first successful answer, for a text the first that isn't empty. Until then they
-    // give empty, false or 0.
+    // Each is the platform's first successful answer, for a string the first that isn't empty. Until then
+    // they give empty, false or 0.
     std::string getEncoding();
     bool getEncrypted();
     float getAspectRatio(); // width by height
@@ -46,7 +46,7 @@ private:
     bool ask(Call ofAVControl, Call ofVideoBroadcast, Raw& result) const;
     // True if the cache was filled now.
     template <class Call>
-    bool fetchText(std::string& cache, Call ofAVControl, Call ofVideoBroadcast) const;
+    bool fetchString(std::string& cache, Call ofAVControl, Call ofVideoBroadcast) const;
     template <class Raw, class Value, class Call>
     Value fetchOnce(Value& cache, bool& valid, Call ofAVControl, Call ofVideoBroadcast) const;
 

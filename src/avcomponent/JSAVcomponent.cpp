@@ -3,7 +3,8 @@
 
 namespace {
 
-// Meant: texts come from the C heap, and an empty one is a text of length 0, not null.
+// quirk 35: an empty string has length 0 and is not null.
+// The block comes from the C heap: the browsers of the sets free it there.
 template <std::string (AVcomponent::*Getter)()>
 bool readText(PluginBase& model, NPVariant& result) {
     setDuplicatedText(result, (static_cast<AVcomponent&>(model).*Getter)());

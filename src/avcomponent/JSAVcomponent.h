@@ -1,4 +1,4 @@
-// The script face of an A/V component. It owns the component.
+// The script interface of an A/V component. It owns the component.
 #ifndef TELIX_SRC_AVCOMPONENT_JSAVCOMPONENT_H
 #define TELIX_SRC_AVCOMPONENT_JSAVCOMPONENT_H
 

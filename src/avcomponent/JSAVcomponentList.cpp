@@ -8,15 +8,15 @@ constexpr ScriptMember kMembers[] = {
     property("length", read<&AVcomponentList::length>),
 };
 
-// Meant: this one line belongs to the channels' module.
+// This one line is logged under the channels' module.
 constexpr ScriptArray kArray =
     scriptArray<&AVcomponentList::length, &AVcomponentList::item>(LogModule::CHANNEL, " ");
 
-// Meant: a read that finds no property leaves the browser's result as it was.
+// A read that finds no property leaves the browser's result as it was.
 constexpr ScriptClass kClass = ScriptClass("JSAVcomponentList", LogModule::AV_COMP, kMembers)
                                    .withArray(&kArray)
                                    .keepingUnreadResults()
-                                   .refusingWith("JSAVcomponentList class\n");
+                                   .refusingWritesWith("JSAVcomponentList class\n");
 
 } // namespace
 

@@ -1,4 +1,4 @@
-// The script face of a list of A/V components. It owns the list.
+// The script interface of a list of A/V components. It owns the list.
 #ifndef TELIX_SRC_AVCOMPONENT_JSAVCOMPONENTLIST_H
 #define TELIX_SRC_AVCOMPONENT_JSAVCOMPONENTLIST_H
 

@@ -74,7 +74,7 @@ ReportedLength reportedLength;
 
 } // namespace
 
-const ObjectKind avControlKind = [] {
+const ObjectKind kAvControlKind = [] {
     ObjectKind kind{};
     kind.id = 300;
     kind.destroyText = "AVCONTROL_OBJ_ID delete :: %p \n";

@@ -29,7 +29,7 @@
 
 struct ObjectKind;
 
-extern const ObjectKind avControlKind;
+extern const ObjectKind kAvControlKind;
 
 // The numbers of the script property `playState`.
 enum play_state {

@@ -16,7 +16,7 @@ namespace {
 
 const char* const kMimeTypes[] = {"application/oipfcapabilities", nullptr};
 
-// Meant: XMLCapabilitiesDoc is not declared, so that every parse leaves a global of that name in the page.
+// quirk 12: XMLCapabilitiesDoc is not declared, so every parse leaves a global of that name.
 const char kParserScript[] =
     "window.parseCapabilityDescString = function(xmlCapaDesc)"
     "{"
@@ -35,7 +35,7 @@ uint32_t fetchCount(uint32_t& last, TELIX_RETCODE_ENUM_T (*ask)(uint32_t*)) {
 
 } // namespace
 
-const ObjectKind capabilitiesKind = [] {
+const ObjectKind kCapabilitiesKind = [] {
     ObjectKind kind{};
     kind.id = 700;
     kind.destroyText = "OIPFCAPABILITIES_OBJ_ID delete :: %p \n";
@@ -70,7 +70,8 @@ NPObject* Capabilities::getxmlCapabilities() {
         if (NPN_Invoke(m_npp, getNPWindowObj(), NPN_GetStringIdentifier("parseCapabilityDescString"),
                        &argument, 1, &result)) {
             PLUGIN_LOG(CAPABILITIES, " NPN_Invoke Result Type = %d \n", result.type);
-            // Meant: the type is not tested. Kept: the result's reference, hence it is not released.
+            // quirk 26: the type of what the page's function gives is not tested.
+            // The result is not released: its reference stays with the field.
             m_xmlCapabilities = result.value.objectValue;
         }
         std::free(xml);

@@ -1,5 +1,5 @@
-// The model of the embedded capabilities object: what the device can do, as the platform tells it. Browser
-// thread only.
+// The model of the embedded capabilities object: what the device can do, as the platform describes it.
+// Browser thread only.
 #ifndef TELIX_SRC_CAPABILITIES_CAPABILITIES_H
 #define TELIX_SRC_CAPABILITIES_CAPABILITIES_H
 
@@ -7,7 +7,7 @@
 
 struct ObjectKind;
 
-extern const ObjectKind capabilitiesKind;
+extern const ObjectKind kCapabilitiesKind;
 
 class Capabilities final : public PluginBase {
 public:

@@ -1,4 +1,4 @@
-// The script face of the capabilities object.
+// The script interface of the capabilities object.
 #ifndef TELIX_SRC_CAPABILITIES_JSCAPABILITIES_H
 #define TELIX_SRC_CAPABILITIES_JSCAPABILITIES_H
 

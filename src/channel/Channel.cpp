@@ -8,7 +8,7 @@
 
 namespace {
 
-// Meant: none of the types that script knows.
+// quirk 27: none of the types that script knows.
 constexpr int kTypeUnknown = 3;
 
 // An id that the platform is asked for as long as it is 0.
@@ -23,9 +23,10 @@ uint32_t fetchId(uint32_t& cache, uint32_t handle, Ask ask) {
     return cache;
 }
 
-// A text that the platform is asked for as long as it is empty.
+// quirk 29: an id or a string that the platform has given is kept for good.
+// A string that the platform is asked for as long as it is empty.
 template <class Ask>
-std::string fetchText(std::string& cache, uint32_t handle, Ask ask) {
+std::string fetchString(std::string& cache, uint32_t handle, Ask ask) {
     if (cache.empty() && handle != 0) {
         char* text = nullptr;
         if (ask(handle, &text) == 0 && text) {
@@ -64,7 +65,7 @@ uint32_t Channel::getSid() {
 }
 
 int Channel::getChannelType() {
-    // Meant: asked for at every read, unlike the rest.
+    // Asked for at every read, unlike the rest.
     if (m_channelHandle != 0) {
         int32_t type = 0;
         if (TELIX_JS_CM_GetChannelType(m_channelHandle, &type) == 0) {
@@ -75,16 +76,16 @@ int Channel::getChannelType() {
 }
 
 std::string Channel::getName() {
-    return fetchText(m_name, m_channelHandle, TELIX_JS_CM_GetName);
+    return fetchString(m_name, m_channelHandle, TELIX_JS_CM_GetName);
 }
 
 std::string Channel::getDsd() {
-    return fetchText(m_dsd, m_channelHandle, TELIX_JS_CM_GetDsd);
+    return fetchString(m_dsd, m_channelHandle, TELIX_JS_CM_GetDsd);
 }
 
 std::string Channel::getCcid() {
     if (m_channelHandle != 0) {
-        // Meant: written as a signed number.
+        // quirk 28: the handle as a signed number.
         m_ccid = std::to_string(static_cast<int32_t>(m_channelHandle));
         PLUGIN_LOG(CHANNEL, "Channel:( %p )::m_Ccid= ( %s )\n", static_cast<void*>(this), m_ccid.c_str());
     }

@@ -17,7 +17,7 @@ public:
     // Turns the object into another channel: empties the caches too.
     void reset(uint32_t handle);
 
-    // DVB ids: original network, transport stream, service. 0 until the platform has told one.
+    // DVB ids: original network, transport stream, service. 0 until the platform has given one.
     uint32_t getOnid();
     uint32_t getTsid();
     uint32_t getSid();
@@ -25,7 +25,7 @@ public:
     // The platform's value at this moment; the last one, at first 3, if it refuses.
     int getChannelType();
 
-    // Name and delivery system descriptor; empty until the platform has told them.
+    // Name and delivery system descriptor; empty until the platform has given them.
     std::string getName();
     std::string getDsd();
 

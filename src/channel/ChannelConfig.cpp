@@ -14,6 +14,7 @@ ChannelConfig::~ChannelConfig() {
 
 NPObject* ChannelConfig::getChannelList() {
     PLUGIN_LOG(CHANNEL, " ChannelConfig getChannelListObject\n");
+    // quirk 30: a snapshot that is never rebuilt.
     if (!m_channelList) {
         uint32_t count = 0;
         TELIX_JS_CM_HANDLE* handles = nullptr; // stay the platform's

@@ -3,6 +3,8 @@
 
 namespace {
 
+constexpr const char* kRefusal = "JSChannel class\n";
+
 constexpr ScriptMember kMembers[] = {
     property("onid", read<&Channel::getOnid>).logged("Onid"),
     property("tsid", read<&Channel::getTsid>).logged("Tsid"),
@@ -16,8 +18,9 @@ constexpr ScriptMember kMembers[] = {
     constant("TYPE_OTHER", 2).logged("ChannelType_OTHER"),
 };
 
-constexpr ScriptClass kClass =
-    ScriptClass("JSChannel", LogModule::CHANNEL, kMembers).refusingWith("JSChannel class\n");
+constexpr ScriptClass kClass = ScriptClass("JSChannel", LogModule::CHANNEL, kMembers)
+                                   .refusingMethodsWith(kRefusal)
+                                   .refusingWritesWith(kRefusal);
 
 } // namespace
 

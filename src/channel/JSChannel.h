@@ -1,4 +1,4 @@
-// The script face of a channel. It owns the channel.
+// The script interface of a channel. It owns the channel.
 #ifndef TELIX_SRC_CHANNEL_JSCHANNEL_H
 #define TELIX_SRC_CHANNEL_JSCHANNEL_H
 

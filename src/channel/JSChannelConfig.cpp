@@ -3,12 +3,15 @@
 
 namespace {
 
+constexpr const char* kRefusal = "JSChannelConfig class\n";
+
 constexpr ScriptMember kMembers[] = {
     property("channelList", read<&ChannelConfig::getChannelList>),
 };
 
-constexpr ScriptClass kClass =
-    ScriptClass("JSChannelConfig", LogModule::CHANNEL, kMembers).refusingWith("JSChannelConfig class\n");
+constexpr ScriptClass kClass = ScriptClass("JSChannelConfig", LogModule::CHANNEL, kMembers)
+                                   .refusingMethodsWith(kRefusal)
+                                   .refusingWritesWith(kRefusal);
 
 } // namespace
 

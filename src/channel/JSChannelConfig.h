@@ -1,4 +1,4 @@
-// The script face of the channel configuration. It owns the configuration.
+// The script interface of the channel configuration. It owns the configuration.
 #ifndef TELIX_SRC_CHANNEL_JSCHANNELCONFIG_H
 #define TELIX_SRC_CHANNEL_JSCHANNELCONFIG_H
 

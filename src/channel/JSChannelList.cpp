@@ -12,9 +12,10 @@ bool invokeGetChannelByTriplet(PluginBase& model, const NPVariant* args, unsigne
     if (!Id::fits(args[0]) || !(isNull(args[1]) || Id::fits(args[1])) || !Id::fits(args[2])) {
         return false;
     }
+    const uint32_t onid = Id::read(args[0]);
     const uint32_t tsid = isNull(args[1]) ? kAnyTransportStream : Id::read(args[1]);
-    setResult(result, static_cast<ChannelList&>(model).getChannelByTriplet(Id::read(args[0]), tsid,
-                                                                           Id::read(args[2])));
+    const uint32_t sid = Id::read(args[2]);
+    setResult(result, static_cast<ChannelList&>(model).getChannelByTriplet(onid, tsid, sid));
     return true;
 }
 

@@ -1,4 +1,4 @@
-// The script face of the channel list. It owns the list.
+// The script interface of the channel list. It owns the list.
 #ifndef TELIX_SRC_CHANNEL_JSCHANNELLIST_H
 #define TELIX_SRC_CHANNEL_JSCHANNELLIST_H
 

@@ -7,7 +7,8 @@
 
 namespace {
 
-std::string fetchText(std::string& cache, TELIX_RETCODE_ENUM_T (*ask)(char**)) {
+// quirk 25: an answer that is not empty is kept for good.
+std::string fetchString(std::string& cache, TELIX_RETCODE_ENUM_T (*ask)(char**)) {
     char* text = nullptr;
     if (cache.empty() && ask(&text) == 0 && text) {
         cache = text;
@@ -21,13 +22,13 @@ std::string fetchText(std::string& cache, TELIX_RETCODE_ENUM_T (*ask)(char**)) {
 Configuration::Configuration(NPP npp) : PluginBase(npp) {}
 
 std::string Configuration::getPreferredAudioLanguage() {
-    return fetchText(m_preferredAudioLanguage, TELIX_JS_APP_Config_GetPreferredAudioLanguage);
+    return fetchString(m_preferredAudioLanguage, TELIX_JS_APP_Config_GetPreferredAudioLanguage);
 }
 
 std::string Configuration::getPreferredSubtitleLanguage() {
-    return fetchText(m_preferredSubtitleLanguage, TELIX_JS_APP_Config_GetPreferredSubtitleLanguage);
+    return fetchString(m_preferredSubtitleLanguage, TELIX_JS_APP_Config_GetPreferredSubtitleLanguage);
 }
 
 std::string Configuration::getCountryId() {
-    return fetchText(m_countryId, TELIX_JS_APP_Config_GetCountryId);
+    return fetchString(m_countryId, TELIX_JS_APP_Config_GetCountryId);
 }

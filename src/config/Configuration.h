@@ -8,7 +8,7 @@ class Configuration final : public PluginBase {
 public:
     explicit Configuration(NPP npp);
 
-    // Codes in the platform's form. The platform is asked until it has given a text that isn't empty; that
+    // Codes in the platform's form. The platform is asked until it has given a string that isn't empty; that
     // one is kept for the life of the object, so a later change of the setting is not seen.
     std::string getPreferredAudioLanguage();
     std::string getPreferredSubtitleLanguage();

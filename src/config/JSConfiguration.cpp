@@ -9,7 +9,7 @@ constexpr ScriptMember kMembers[] = {
     property("countryId", read<&Configuration::getCountryId>),
 };
 
-// Meant: a name that isn't one of these leaves the result as the browser gave it.
+// A name that isn't one of these leaves the result as the browser gave it.
 constexpr ScriptClass kClass =
     ScriptClass("JSConfiguration", LogModule::CONFIG, kMembers).keepingUnreadResults();
 

@@ -1,4 +1,4 @@
-// The script face of the device's settings.
+// The script interface of the device's settings.
 #ifndef TELIX_SRC_CONFIG_JSCONFIGURATION_H
 #define TELIX_SRC_CONFIG_JSCONFIGURATION_H
 

@@ -8,8 +8,9 @@ bool setValue(PluginBase& model, const NPVariant* args, unsigned int, NPVariant&
     if (!isNumberValue(args[0])) {
         return false;
     }
-    setResult(result, static_cast<KeySet&>(model).setValue(toUint32(numberValue(args[0])),
-                                                           toUint32(numberValue(args[1]))));
+    const uint32_t mask = toUint32(numberValue(args[0]));
+    const uint32_t other = toUint32(numberValue(args[1]));
+    setResult(result, static_cast<KeySet&>(model).setValue(mask, other));
     return true;
 }
 

@@ -1,4 +1,4 @@
-// The script face of a key set.
+// The script interface of a key set.
 #ifndef TELIX_SRC_CONFIG_JSKEYSET_H
 #define TELIX_SRC_CONFIG_JSKEYSET_H
 

@@ -13,13 +13,9 @@ constexpr ScriptMember kMembers[] = {
 };
 
 constexpr ScriptClass kClass = ScriptClass("JSOipfConfiguration", LogModule::CONFIG, kMembers)
-                                   .refusingWith(kRefusal)
+                                   .refusingMethodsWith(kRefusal)
                                    .missingModelSays(kRefusal);
 
 } // namespace
 
 JSOipfConfiguration::JSOipfConfiguration(NPP npp) : EmbeddedObjectWrapper(npp, kClass) {}
-
-bool JSOipfConfiguration::SetProperty(NPIdentifier, const NPVariant*) {
-    return false;
-}

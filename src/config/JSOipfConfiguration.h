@@ -1,4 +1,4 @@
-// The script face of the embedded configuration object.
+// The script interface of the embedded configuration object.
 #ifndef TELIX_SRC_CONFIG_JSOIPFCONFIGURATION_H
 #define TELIX_SRC_CONFIG_JSOIPFCONFIGURATION_H
 
@@ -7,9 +7,6 @@
 class JSOipfConfiguration final : public EmbeddedObjectWrapper<2> {
 public:
     explicit JSOipfConfiguration(NPP npp);
-
-    // Refuses as the base does, but without a line in the log.
-    bool SetProperty(NPIdentifier name, const NPVariant* value) override;
 };
 
 #endif

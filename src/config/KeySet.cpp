@@ -20,12 +20,13 @@ uint32_t KeySet::getValue() {
 
 uint32_t KeySet::setValue(uint32_t value, uint32_t other) {
     PLUGIN_LOG(APP_MGR, " Value: %d, Other: %d \n", value, other);
-    // Meant: unlike a read, this needs only a manager, no application that owns the key set.
+    // Unlike a read, this needs only a manager, no application that owns the key set.
+    // quirk 24: `other` goes no further than the log.
     if (ApplicationManager::sharedInstance(m_npp)) {
         PLUGIN_LOG(APP_MGR, " Value_typecast: %d, Other: %d \n", value, other);
         uint32_t granted; // the platform writes it if it accepts the mask
         if (TELIX_JS_APP_SetKeySetValue(value, &granted) == 0) {
-            // Meant: what script asked for is kept, what the platform answered is returned.
+            // quirk 23: what script asked for is kept, what the platform granted is returned.
             m_value = value;
             return granted;
         }

@@ -13,7 +13,7 @@ const char* const kMimeTypes[] = {"application/oipfconfiguration", nullptr};
 
 } // namespace
 
-const ObjectKind oipfConfigurationKind = [] {
+const ObjectKind kOipfConfigurationKind = [] {
     ObjectKind kind{};
     kind.id = 500;
     kind.destroyText = "OIPFCONFIGURATION_OBJ_ID delete :: %p \n";
@@ -36,7 +36,7 @@ NPObject* OipfConfiguration::getJSObject() {
 }
 
 NPObject* OipfConfiguration::getKeySetObject() {
-    // Made for this object's own instance, which has no application manager: hence the key set is inert.
+    // quirk 22: made for this object's own instance, which has no application manager.
     return handOutOnce<JSKeySet>(getBrowser(), m_keySetObject);
 }
 

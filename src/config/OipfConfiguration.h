@@ -7,7 +7,7 @@
 
 struct ObjectKind;
 
-extern const ObjectKind oipfConfigurationKind;
+extern const ObjectKind kOipfConfigurationKind;
 
 class OipfConfiguration final : public PluginBase {
 public:

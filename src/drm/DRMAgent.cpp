@@ -37,7 +37,7 @@ NPVariant textArgument(const char* text) {
 
 } // namespace
 
-const ObjectKind drmAgentKind = [] {
+const ObjectKind kDrmAgentKind = [] {
     ObjectKind kind{};
     kind.id = 800;
     kind.destroyText = "DRMAGENT_OBJ_ID delete :: %p \n";

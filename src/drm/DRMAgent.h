@@ -10,7 +10,7 @@
 class DRMAgent;
 struct ObjectKind;
 
-extern const ObjectKind drmAgentKind;
+extern const ObjectKind kDrmAgentKind;
 
 // The agent that every result goes to: the one constructed last. Meant: it stays so when that agent has gone;
 // results then go nowhere.

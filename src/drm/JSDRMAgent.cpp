@@ -7,12 +7,12 @@ namespace {
 
 // The operation as the idiom has it, with the id in the log.
 bool sendDRMMessage(PluginBase& model, const NPVariant* args, unsigned int, NPVariant& result) {
-    using Text = ScriptArgument<std::string>;
-    if (!Text::fits(args[0]) || !Text::fits(args[1]) || !Text::fits(args[2])) {
+    using Texts = std::tuple<std::string, std::string, std::string>;
+    if (!argumentsFit<Texts>(args)) {
         return false;
     }
-    const std::string id = static_cast<DRMAgent&>(model).sendDRMMessage(
-        Text::read(args[0]), Text::read(args[1]), Text::read(args[2]));
+    const auto [type, message, systemId] = readArguments<Texts>(args);
+    const std::string id = static_cast<DRMAgent&>(model).sendDRMMessage(type, message, systemId);
     PLUGIN_LOG_FOR(LogModule::DRMAGENT, "Invoke", " msgID == %s\n", id.c_str());
     setResult(result, id);
     return true;

@@ -1,4 +1,4 @@
-// The script face of the parental control manager.
+// The script interface of the parental control manager.
 #ifndef TELIX_SRC_PARENTAL_JSPARENTALCONTROLMANAGER_H
 #define TELIX_SRC_PARENTAL_JSPARENTALCONTROLMANAGER_H
 

@@ -3,7 +3,9 @@
 
 namespace {
 
-// Meant: unlike the other texts an empty region reads as void.
+constexpr const char* kRefusal = "JSParentalRating class\n";
+
+// quirk 37: unlike the other strings an empty region reads as void.
 bool readRegion(PluginBase& model, NPVariant& result) {
     const std::string region = static_cast<ParentalRating&>(model).getRegion();
     if (!region.empty()) {
@@ -20,8 +22,9 @@ constexpr ScriptMember kMembers[] = {
     property("region", readRegion),
 };
 
-constexpr ScriptClass kClass =
-    ScriptClass("JSParentalRating", LogModule::PARENTAL, kMembers).refusingWith("JSParentalRating class\n");
+constexpr ScriptClass kClass = ScriptClass("JSParentalRating", LogModule::PARENTAL, kMembers)
+                                   .refusingMethodsWith(kRefusal)
+                                   .refusingWritesWith(kRefusal);
 
 } // namespace
 

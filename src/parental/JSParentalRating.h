@@ -1,4 +1,4 @@
-// The script face of a parental rating. It owns the rating.
+// The script interface of a parental rating. It owns the rating.
 #ifndef TELIX_SRC_PARENTAL_JSPARENTALRATING_H
 #define TELIX_SRC_PARENTAL_JSPARENTALRATING_H
 

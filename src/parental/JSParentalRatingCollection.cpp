@@ -10,12 +10,12 @@ constexpr ScriptMember kMembers[] = {
     property("length", read<&Model::getLength>),
 };
 
-// Meant: this one line belongs to the channels' module.
+// This one line is logged under the channels' module.
 constexpr ScriptArray kArray = scriptArray<&Model::getLength, &Model::getitem>(LogModule::CHANNEL, " ");
 
 constexpr ScriptClass kClass = ScriptClass("JSParentalRatingCollection", LogModule::PARENTAL, kMembers)
                                    .withArray(&kArray)
-                                   .refusingWith("JSParentalRatingCollection class\n");
+                                   .refusingWritesWith("JSParentalRatingCollection class\n");
 
 } // namespace
 

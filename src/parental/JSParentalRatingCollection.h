@@ -1,4 +1,4 @@
-// The script face of a collection of parental ratings. It owns the collection.
+// The script interface of a collection of parental ratings. It owns the collection.
 #ifndef TELIX_SRC_PARENTAL_JSPARENTALRATINGCOLLECTION_H
 #define TELIX_SRC_PARENTAL_JSPARENTALRATINGCOLLECTION_H
 

@@ -5,7 +5,7 @@ namespace {
 
 using Model = ParentalRatingScheme;
 
-// Meant: texts come from the C heap. An empty one is null.
+// A string from the C heap: the browsers of the sets free it there. An empty one is null.
 void setTextOrNull(NPVariant& result, const std::string& text) {
     if (text.empty()) {
         setNull(result);
@@ -28,7 +28,7 @@ bool invokeItem(PluginBase& model, const NPVariant* args, unsigned int, NPVarian
     return true;
 }
 
-// Meant: the argument counts as a double whatever its type, so an integer is read by its bits.
+// quirk 41: the argument counts as a double whatever its type, so an integer is read by its bits.
 bool invokeIconUri(PluginBase& model, const NPVariant* args, unsigned int, NPVariant& result) {
     setTextOrNull(result, static_cast<Model&>(model).getIconUri(toUint32(args[0].value.doubleValue)));
     return true;

@@ -1,4 +1,4 @@
-// The script face of a rating scheme. It owns the scheme.
+// The script interface of a rating scheme. It owns the scheme.
 #ifndef TELIX_SRC_PARENTAL_JSPARENTALRATINGSCHEME_H
 #define TELIX_SRC_PARENTAL_JSPARENTALRATINGSCHEME_H
 

@@ -1,4 +1,4 @@
-// The script face of the collection of rating schemes. It owns the collection.
+// The script interface of the collection of rating schemes. It owns the collection.
 #ifndef TELIX_SRC_PARENTAL_JSPARENTALRATINGSCHEMECOLLECTION_H
 #define TELIX_SRC_PARENTAL_JSPARENTALRATINGSCHEMECOLLECTION_H
 

@@ -13,7 +13,7 @@ const char* const kMimeTypes[] = {"application/oipfparentalcontrolmanager", null
 
 } // namespace
 
-const ObjectKind parentalControlManagerKind = [] {
+const ObjectKind kParentalControlManagerKind = [] {
     ObjectKind kind{};
     kind.id = 600;
     kind.mimeTypes = kMimeTypes;
@@ -37,11 +37,13 @@ NPObject* ParentalControlManager::getJSObject() {
 }
 
 NPObject* ParentalControlManager::getParentalRatingSchemes() {
+    // quirk 42: read once; later changes on the platform are not seen.
     if (!m_parentalRatingSchemes) {
         uint32_t count = 0;
         PARENTALRATTINGSCHEME_STRUCT_T_TAG* records = nullptr; // stay the platform's
         if (TELIX_JS_SI_PARENTALCONTROL_GetParentalRatingSchemes(&count, &records) == 0) {
-            // Meant: two references are kept; the destructor gives one back, the other stays behind.
+            // Two references are kept, and the destructor gives one back: the collection outlives this
+            // object.
             m_parentalRatingSchemes = handOut(createScriptObject<JSParentalRatingSchemeCollection>(m_npp));
             if (m_parentalRatingSchemes) {
                 wrapperOf<JSParentalRatingSchemeCollection>(m_parentalRatingSchemes)

@@ -7,7 +7,7 @@
 
 struct ObjectKind;
 
-extern const ObjectKind parentalControlManagerKind;
+extern const ObjectKind kParentalControlManagerKind;
 
 class ParentalControlManager final : public PluginBase {
 public:

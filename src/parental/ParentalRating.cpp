@@ -9,18 +9,18 @@
 ParentalRating::ParentalRating(NPP npp) : PluginBase(npp) {}
 
 void ParentalRating::setThresholdProperties(unsigned int threshold, const std::string& scheme) {
-    // Meant: written as a signed number.
+    // quirk 38: the name is the number in decimal, and the region is the string "undefined".
     const std::string number = std::to_string(static_cast<int32_t>(threshold));
     PLUGIN_LOG(PARENTAL, " Buffer value is:: ( %s )\n", number.c_str());
     m_isThreshold = true;
     m_name = number;
     m_value = static_cast<int32_t>(threshold);
     m_scheme = scheme;
-    m_region = "undefined"; // meant: a text that says so
+    m_region = "undefined";
 }
 
 template <class Ask>
-std::string ParentalRating::fetchText(std::string& cache, Ask ask) const {
+std::string ParentalRating::fetchString(std::string& cache, Ask ask) const {
     if (!m_isThreshold && cache.empty() && m_handle != 0) {
         char* text = nullptr;
         if (ask(m_handle, &text) == 0 && text) {
@@ -43,15 +43,15 @@ int32_t ParentalRating::fetchNumber(int32_t& last, Ask ask) const {
 }
 
 std::string ParentalRating::getName() {
-    return fetchText(m_name, TELIX_JS_SI_PARENTALRATING_GetName);
+    return fetchString(m_name, TELIX_JS_SI_PARENTALRATING_GetName);
 }
 
 std::string ParentalRating::getScheme() {
-    return fetchText(m_scheme, TELIX_JS_SI_PARENTALRATING_GetScheme);
+    return fetchString(m_scheme, TELIX_JS_SI_PARENTALRATING_GetScheme);
 }
 
 std::string ParentalRating::getRegion() {
-    return fetchText(m_region, TELIX_JS_SI_PARENTALRATING_GetRegion);
+    return fetchString(m_region, TELIX_JS_SI_PARENTALRATING_GetRegion);
 }
 
 int32_t ParentalRating::getValue() {

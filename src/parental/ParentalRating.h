@@ -16,7 +16,7 @@ public:
     // Turns the rating into a threshold of a scheme.
     void setThresholdProperties(unsigned int threshold, const std::string& scheme);
 
-    // Fetched once and kept; empty until the platform has told one.
+    // Fetched once and kept; empty until the platform has given one.
     std::string getName();
     std::string getScheme();
     std::string getRegion();
@@ -28,7 +28,7 @@ public:
 
 private:
     template <class Ask>
-    std::string fetchText(std::string& cache, Ask ask) const;
+    std::string fetchString(std::string& cache, Ask ask) const;
     template <class Ask>
     int32_t fetchNumber(int32_t& last, Ask ask) const;
 

@@ -8,7 +8,7 @@ ParentalRatingCollection::ParentalRatingCollection(NPP npp) : PluginBase(npp) {}
 
 void ParentalRatingCollection::initializeParentalRatting(unsigned int count, const uint32_t* handles) {
     PLUGIN_LOG(PARENTAL, " addParentalRattingObject \n");
-    // Meant: unlike the other lists this one has its full length before its entries are there.
+    // Unlike the other lists this one has its full length before its entries are there.
     m_ratings.setLength(count);
     for (unsigned int index = 0; index < count; ++index) {
         m_ratings.add(m_npp).impl()->setParentalRatingHandle(handles[index]);

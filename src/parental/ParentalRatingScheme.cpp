@@ -22,7 +22,7 @@ void ParentalRatingScheme::setHandle(PARENTALRATTINGSCHEME_STRUCT_T_TAG record) 
 }
 
 uint32_t ParentalRatingScheme::getLength() const {
-    // Meant: this scheme tells of no named ratings, though its items can be had.
+    // quirk 40: this scheme has no named ratings by its length, though its items can be had.
     return m_name == "dvb-si" ? 0 : m_count;
 }
 
@@ -50,14 +50,15 @@ NPObject* ParentalRatingScheme::getThreshold() {
         return nullptr;
     }
     PLUGIN_LOG(PARENTAL, " parentalRatingThreshold is:: ( %d )\n", threshold);
+    // quirk 39: a new object at every read.
     NPObject* object = createScriptObject<JSParentalRating>(m_npp);
     if (!object) {
         return nullptr;
     }
+    NPN_RetainObject(object); // the caller's; the reference of the creation is never given back
     ParentalRating& rating = *wrapperOf<JSParentalRating>(object)->impl();
-    // Meant: the number is the handle too, which does no harm, since a threshold never asks the platform.
+    // The number is the handle too, which does no harm, since a threshold never asks the platform.
     rating.setParentalRatingHandle(static_cast<uint32_t>(threshold));
     rating.setThresholdProperties(static_cast<uint32_t>(threshold), m_name);
-    // Meant: the caller gets one of two references; the other stays behind.
-    return handOut(object);
+    return object;
 }

@@ -17,10 +17,10 @@ public:
 
     std::string getName() const { return m_name; }
 
-    // The number of ratings that a page is told of.
+    // The number of ratings that a page sees.
     uint32_t getLength() const;
 
-    // The name of a rating, and the address of its icon; empty beyond the end.
+    // The name of a rating, and the URL of its icon; empty beyond the end.
     std::string getitem(unsigned int index) const;
     std::string getIconUri(unsigned int index) const;
 
@@ -28,7 +28,7 @@ public:
     uint32_t getIndexOf(const std::string& name) const;
 
     // A new rating that stands for the threshold, made at every call; the caller owns one reference. Null if
-    // the platform tells none.
+    // the platform has none.
     NPObject* getThreshold();
 
 private:

@@ -11,11 +11,12 @@ constexpr ScriptMember kMembers[] = {
     property("duration", read<&Model::getDuration>, write<&Model::setDuration>),
     property("description", read<&Model::getDescription>, write<&Model::setDescription>),
     property("channelID", read<&Model::getChannelID>, write<&Model::setChannelID>),
+    // quirk 33: the name of the property.
     property("parentalRating", read<&Model::getParentalRatingCollectionObject>),
 };
 
 constexpr ScriptClass kClass =
-    ScriptClass("JSProgramme", LogModule::PROGRAMME, kMembers).refusingWith("JSProgramme class\n");
+    ScriptClass("JSProgramme", LogModule::PROGRAMME, kMembers).refusingMethodsWith("JSProgramme class\n");
 
 } // namespace
 

@@ -1,4 +1,4 @@
-// The script face of a programme. It owns the programme.
+// The script interface of a programme. It owns the programme.
 #ifndef TELIX_SRC_PROGRAMME_JSPROGRAMME_H
 #define TELIX_SRC_PROGRAMME_JSPROGRAMME_H
 

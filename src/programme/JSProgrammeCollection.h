@@ -1,4 +1,4 @@
-// The script face of a collection of programmes. It owns the collection.
+// The script interface of a collection of programmes. It owns the collection.
 #ifndef TELIX_SRC_PROGRAMME_JSPROGRAMMECOLLECTION_H
 #define TELIX_SRC_PROGRAMME_JSPROGRAMMECOLLECTION_H
 

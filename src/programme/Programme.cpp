@@ -10,12 +10,12 @@
 
 namespace {
 
-// A text whose length comes beside it.
+// quirk 31: a string whose length comes beside it in one byte.
 template <class Ask>
-std::string fetchText(std::string& last, uint32_t handle, Ask ask) {
+std::string fetchString(std::string& last, uint32_t handle, Ask ask) {
     char* text = nullptr;
     ___UINT8 length = 0;
-    // Meant: the text of an answer of length 0 is not freed.
+    // A string of length 0 is not freed.
     if (handle != 0 && ask(handle, &text, &length) == 0 && text && length != 0) {
         last.assign(text, length);
         std::free(text);
@@ -32,6 +32,7 @@ uint32_t fetchNumber(uint32_t& last, uint32_t handle, Ask ask) {
     return last;
 }
 
+// quirk 32: a write that the platform refuses leaves the value and succeeds for script.
 template <class Tell>
 void store(std::string& last, const std::string& text, uint32_t handle, Tell tell) {
     if (handle != 0 && tell(handle, text.c_str()) == 0) {
@@ -55,7 +56,7 @@ Programme::~Programme() {
 }
 
 std::string Programme::getName() {
-    return fetchText(m_name, m_programmeHandle, TELIX_JS_SI_GetName);
+    return fetchString(m_name, m_programmeHandle, TELIX_JS_SI_GetName);
 }
 
 uint32_t Programme::getStartTime() {
@@ -67,7 +68,7 @@ uint32_t Programme::getDuration() {
 }
 
 std::string Programme::getDescription() {
-    return fetchText(m_description, m_programmeHandle, TELIX_JS_SI_GetDescription);
+    return fetchString(m_description, m_programmeHandle, TELIX_JS_SI_GetDescription);
 }
 
 std::string Programme::getChannelID() {
@@ -107,6 +108,7 @@ void Programme::setChannelID(const std::string& channelID) {
 }
 
 NPObject* Programme::getParentalRatingCollectionObject() {
+    // quirk 33: made once; later changes on the platform are not seen.
     if (!m_parentalRatings && m_programmeHandle != 0) {
         uint32_t count = 0;
         TELIX_JS_SI_PARENTALRATING_HANDLE* handles = nullptr; // stay the platform's

@@ -13,8 +13,8 @@ public:
     // 0 means no handle: the platform is never asked, and writes have no effect.
     void setProgrammeHandle(unsigned int handle) { m_programmeHandle = handle; }
 
-    // What the platform tells at this moment; if it refuses, what was read or written last. Name and
-    // description are at most 255 bytes long and keep their last text when the platform gives an empty one.
+    // What the platform has at this moment; if it refuses, what was read or written last. Name and
+    // description are at most 255 bytes long and keep their last value when the platform gives an empty one.
     // Start time and duration are in units of the platform's.
     std::string getName();
     uint32_t getStartTime();

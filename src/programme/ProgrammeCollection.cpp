@@ -21,7 +21,7 @@ NPObject* ProgrammeCollection::getitem(unsigned int index) {
 
 NPObject* ProgrammeCollection::getJSParentalRatingForHandle(unsigned int ratingHandle) {
     for (uint32_t index = 0; index < getLength(); ++index) {
-        // Meant: the reference that the programme hands out here is left behind.
+        // The reference that the programme hands out here is never released.
         NPObject* ratings = m_programmes.wrapperAt(index).impl()->getParentalRatingCollectionObject();
         if (!ratings) {
             continue;
@@ -30,7 +30,7 @@ NPObject* ProgrammeCollection::getJSParentalRatingForHandle(unsigned int ratingH
             wrapperOf<JSParentalRatingCollection>(ratings)->impl()->getJSParentalRatingForHandle(
                 ratingHandle);
         if (rating) {
-            // Meant: a second reference, though the collection has handed out one.
+            // A second reference, though the collection has handed out one: neither is ever released.
             return handOut(rating);
         }
     }

@@ -26,7 +26,7 @@ NPError initVideoBroadcast(PluginBase& model, const InstanceArguments& arguments
 
 } // namespace
 
-const ObjectKind videoBroadcastKind = [] {
+const ObjectKind kVideoBroadcastKind = [] {
     ObjectKind kind{};
     kind.id = 400;
     kind.destroyText = "VIDEOBROADCAST_OBJ_ID delete :: %p \n";

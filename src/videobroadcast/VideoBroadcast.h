@@ -25,7 +25,7 @@
 
 struct ObjectKind;
 
-extern const ObjectKind videoBroadcastKind;
+extern const ObjectKind kVideoBroadcastKind;
 
 // One subscription to a stream event.
 struct StreamEventInfo {

@@ -40,11 +40,11 @@ PluginBase* create(NPP npp, unsigned short id) {
     return g_createsNothing ? nullptr : new Model(npp, id);
 }
 
-const char* const takingTypes[] = {"test/taking", "test/also-taking", nullptr};
-const char* const plainTypes[] = {"test/plain", "test/taking", nullptr};
-const char* const silentTypes[] = {"test/silent", nullptr};
+const char* const kTakingTypes[] = {"test/taking", "test/also-taking", nullptr};
+const char* const kPlainTypes[] = {"test/plain", "test/taking", nullptr};
+const char* const kSilentTypes[] = {"test/silent", nullptr};
 
-const StreamOperations streamOperations = {
+const StreamOperations kStreamOperations = {
     [](PluginBase&, NPMIMEType type, NPStream* stream, NPBool seekable, uint16_t* stype) -> NPError {
         g_reached.push_back("newStream " + textOf(type) + " " + stream->url + " " + std::to_string(seekable));
         *stype = NP_ASFILE;
@@ -73,7 +73,7 @@ ObjectKind takingKind() {
     ObjectKind kind{};
     kind.id = 300;
     kind.destroyText = "TAKING_OBJ_ID delete :: %p \n";
-    kind.mimeTypes = takingTypes;
+    kind.mimeTypes = kTakingTypes;
     kind.create = create;
     kind.dispose = disposeOf<Model>;
     kind.init = [](PluginBase& model, const InstanceArguments& arguments) -> NPError {
@@ -94,7 +94,7 @@ ObjectKind takingKind() {
         g_reached.push_back(event ? "handleEvent" : "handleEvent null");
         return 34;
     };
-    kind.streams = &streamOperations;
+    kind.streams = &kStreamOperations;
     return kind;
 }
 
@@ -108,13 +108,13 @@ ObjectKind plainKind(unsigned short id, const char* const* types, const char* de
     return kind;
 }
 
-const ObjectKind taking = takingKind();
-const ObjectKind plain = plainKind(500, plainTypes, "PLAIN_OBJ_ID delete\n");
-const ObjectKind silent = plainKind(600, silentTypes, nullptr);
+const ObjectKind kTaking = takingKind();
+const ObjectKind kPlain = plainKind(500, kPlainTypes, "PLAIN_OBJ_ID delete\n");
+const ObjectKind kSilent = plainKind(600, kSilentTypes, nullptr);
 
 } // namespace
 
-const ObjectKind* const objectKinds[] = {&taking, &plain, &silent, nullptr};
+const ObjectKind* const kObjectKinds[] = {&kTaking, &kPlain, &kSilent, nullptr};
 
 namespace {
 

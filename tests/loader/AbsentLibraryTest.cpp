@@ -6,7 +6,7 @@
 
 namespace {
 
-const std::vector<std::string> notFound{
+const std::vector<std::string> kNotFound{
     "Library:: libtelix.so, not found in the path " TELIX_TEST_LIBRARY_DIRECTORY " .\n"};
 
 template <class Function>
@@ -16,8 +16,8 @@ void expectRefusal(const char* name, Function* forwarder) {
     ArgumentSource source;
     EXPECT_EQ(std::apply(forwarder, CallSignature<Function*>::sample(source)), 5);
     EXPECT_TRUE(source.isUntouched());
-    EXPECT_EQ(output.printed(), loadLine);
-    EXPECT_EQ(output.warnings(), notFound);
+    EXPECT_EQ(output.printed(), kLoadLine);
+    EXPECT_EQ(output.warnings(), kNotFound);
 }
 
 } // namespace
@@ -32,7 +32,7 @@ TEST(AbsentLibrary, ShouldLoadSaysNoAndKeepsNoHandle) {
     EXPECT_EQ(should_load_telix_library(), 0);
     EXPECT_EQ(should_load_telix_library(), 0);
     EXPECT_EQ(g_platformModule, nullptr);
-    EXPECT_EQ(output.printed(), std::string(loadLine) + loadLine);
+    EXPECT_EQ(output.printed(), std::string(kLoadLine) + kLoadLine);
     EXPECT_EQ(output.warnings().size(), 2U);
 }
 

@@ -104,9 +104,10 @@ std::vector<unsigned short> kindsOf(const std::vector<EmbeddedObject>& objects) 
     return kinds;
 }
 
-void usePage(ScriptedBrowser& browser) {
+// One object of each kind.
+std::vector<EmbeddedObject> embedAll(ScriptedBrowser& browser) {
     std::vector<EmbeddedObject> objects;
-    for (const ObjectKind* const* kind = objectKinds; *kind; ++kind) {
+    for (const ObjectKind* const* kind = kObjectKinds; *kind; ++kind) {
         const std::string type = (*kind)->mimeTypes[0];
         const Attributes attributes{{"id", "object" + std::to_string((*kind)->id)},
                                     {"data", "http://media.example/a"}};
@@ -119,12 +120,15 @@ void usePage(ScriptedBrowser& browser) {
         }
         objects.push_back(object);
     }
-    EXPECT_THAT(kindsOf(objects), ElementsAre(200, 300, 400, 500, 600, 700, 800));
+    return objects;
+}
 
-    const Value component =
-        ObjectRef::adopt(createScriptObject<JSAVcomponent>(objects[0].npp())); // no set, no components
+// The arguments with which each method of the objects is called.
+std::map<std::string, MethodRow> methodRows(ScriptedBrowser& browser, NPP npp) {
+    // No set, no components: one is made for the calls.
+    const Value component = ObjectRef::adopt(createScriptObject<JSAVcomponent>(npp));
     const Value listener = browser.function("listener");
-    const std::map<std::string, MethodRow> methods{
+    return {
         {"JSApplicationManager.getOwnerApplication", {{browser.document()}}},
         {"JSApplication.createApplication", {{"http://page.example/", true}}},
         {"JSApplication.destroyApplication", {}},
@@ -164,6 +168,13 @@ void usePage(ScriptedBrowser& browser) {
         {"JSCapabilities.hasCapability", {{"OITF_HD_UIPROF"}}},
         {"JSDRMAgent.sendDRMMessage", {{"type", "message", "system"}}},
     };
+}
+
+void usePage(ScriptedBrowser& browser) {
+    const std::vector<EmbeddedObject> objects = embedAll(browser);
+    EXPECT_THAT(kindsOf(objects), ElementsAre(200, 300, 400, 500, 600, 700, 800));
+
+    const std::map<std::string, MethodRow> methods = methodRows(browser, objects[0].npp());
     Walk walk(browser, methods);
     for (const EmbeddedObject& object : objects) {
         ASSERT_TRUE(object.scriptObject());
@@ -199,8 +210,8 @@ TEST(AllObjects, LiveSideBySideWithoutThePlatformLibrary) {
         AllOf(Not(IsEmpty()),
               Each("Library:: libtelix.so, not found in the path " TELIX_TEST_LIBRARY_DIRECTORY " .\n")));
     // Failures inside are printed too, and shown by this.
-    for (size_t at = 0; (at = printed.find(loadLine)) != std::string::npos;) {
-        printed.erase(at, std::string(loadLine).size());
+    for (size_t at = 0; (at = printed.find(kLoadLine)) != std::string::npos;) {
+        printed.erase(at, std::string(kLoadLine).size());
     }
     EXPECT_EQ(printed, "");
 }

@@ -37,7 +37,7 @@ std::string family(const std::string& name) {
 } // namespace
 
 TEST_F(EmptyLibrary, EachOfTheFunctionsIsLookedUpOnceInFamilyOrder) {
-    EXPECT_EQ(printed, loadLine);
+    EXPECT_EQ(printed, kLoadLine);
     std::vector<std::string> names;
     std::vector<std::string> families;
     for (const std::string& warning : warnings) {

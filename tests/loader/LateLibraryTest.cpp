@@ -12,10 +12,10 @@ TEST(LateLibrary, IsPickedUpByTheNextCallAndLoadedOnce) {
     LoaderOutput output;
 
     EXPECT_EQ(TELIX_JS_AV_Stop(7), 5);
-    EXPECT_EQ(output.printed(), loadLine);
+    EXPECT_EQ(output.printed(), kLoadLine);
     EXPECT_EQ(output.warnings().size(), 1U);
     EXPECT_EQ(TELIX_JS_AV_Stop(7), 5);
-    EXPECT_EQ(output.printed(), loadLine);
+    EXPECT_EQ(output.printed(), kLoadLine);
     EXPECT_EQ(output.warnings().size(), 1U);
 
     std::filesystem::create_directories(directory);
@@ -24,7 +24,7 @@ TEST(LateLibrary, IsPickedUpByTheNextCallAndLoadedOnce) {
     platform.TELIX_JS_AV_Stop = [](TELIX_JS_AV_HANDLE player) { return player == 7 ? 42 : 0; };
 
     EXPECT_EQ(TELIX_JS_AV_Stop(7), 42);
-    EXPECT_EQ(output.printed(), loadLine);
+    EXPECT_EQ(output.printed(), kLoadLine);
     EXPECT_EQ(TELIX_JS_AV_Stop(7), 42);
     EXPECT_EQ(should_load_telix_library(), 1);
     EXPECT_EQ(output.printed(), "");

@@ -8,7 +8,7 @@
 #include <string>
 #include <vector>
 
-inline constexpr const char* loadLine = "libtelix.so library will load for first time now.\n";
+inline constexpr const char* kLoadLine = "libtelix.so library will load for first time now.\n";
 
 class LoaderOutput {
 public:

@@ -6,7 +6,7 @@
 
 namespace {
 
-constexpr const char* libraryFile = TELIX_TEST_LIBRARY_DIRECTORY "/libtelix.so";
+constexpr const char* kLibraryFile = TELIX_TEST_LIBRARY_DIRECTORY "/libtelix.so";
 
 // The state is the process's; the first call, whichever test makes it, decides it.
 class PartialLibrary : public testing::Test {
@@ -30,7 +30,7 @@ std::vector<std::string> PartialLibrary::warnings;
 } // namespace
 
 TEST_F(PartialLibrary, TheMissingFunctionIsLoggedOnce) {
-    EXPECT_EQ(printed, loadLine);
+    EXPECT_EQ(printed, kLoadLine);
     ASSERT_EQ(warnings.size(), 1U);
     const std::string text = "Failed to get symbol TELIX_JS_AV_Pause: ";
     EXPECT_EQ(warnings[0].substr(0, text.size()), text);
@@ -49,7 +49,7 @@ TEST_F(PartialLibrary, TheMissingFunctionReturnsFive) {
 }
 
 TEST_F(PartialLibrary, AllOthersReachTheLibrary) {
-    RecordingPlatform& platform = recordingPlatformAt(libraryFile);
+    RecordingPlatform& platform = recordingPlatformAt(kLibraryFile);
     std::vector<std::string> reached;
     platform.onCall = [&](const std::string& call) { reached.push_back(call.substr(0, call.find('('))); };
 #define TELIX_CALL(name, parameters, arguments)                                                              \
@@ -66,7 +66,7 @@ TEST_F(PartialLibrary, AllOthersReachTheLibrary) {
 }
 
 TEST_F(PartialLibrary, ItsNeighboursWork) {
-    RecordingPlatform& platform = recordingPlatformAt(libraryFile);
+    RecordingPlatform& platform = recordingPlatformAt(kLibraryFile);
     platform.TELIX_JS_AV_Stop = [](TELIX_JS_AV_HANDLE player) { return player == 7 ? 0 : 1; };
     platform.TELIX_JS_AV_Resume = [](TELIX_JS_AV_HANDLE player) { return player == 7 ? 3 : 0; };
     EXPECT_EQ(TELIX_JS_AV_Stop(7), 0);

@@ -71,9 +71,9 @@ TEST(SharedObject, ExportsTheEntryPointsTheGatesAndTheForwardersAndNothingElse) 
 
 TEST(SharedObject, NeedsGLibGModuleAndTheRunTimeLibrariesOnly) {
 #ifdef TELIX_TEST_SANITIZED
-    constexpr bool isSanitized = true;
+    constexpr bool kIsSanitized = true;
 #else
-    constexpr bool isSanitized = false;
+    constexpr bool kIsSanitized = false;
 #endif
     const std::set<std::string> allowed{"[libglib-2.0.so.0]", "[libgmodule-2.0.so.0]", "[libc.so.6]",
                                         "[libm.so.6]",        "[libstdc++.so.6]",      "[libgcc_s.so.1]",
@@ -81,7 +81,7 @@ TEST(SharedObject, NeedsGLibGModuleAndTheRunTimeLibrariesOnly) {
     const auto needed = lastWords(outputOfCommand("readelf -d " TELIX_TEST_PLUGIN), "(NEEDED)");
     EXPECT_EQ(needed.count("[libgmodule-2.0.so.0]"), 1U);
     for (const std::string& library : needed) {
-        const bool isSanitizer = isSanitized && library.find("san.so") != std::string::npos;
+        const bool isSanitizer = kIsSanitized && library.find("san.so") != std::string::npos;
         EXPECT_TRUE(isSanitizer || allowed.count(library) != 0) << library;
     }
 }
@@ -96,7 +96,7 @@ TEST(SharedObject, FindsTheLibraryAtTheFixedPlaceOfASet) {
     LoaderOutput output;
     auto* stop = forwarderOf<decltype(TELIX_JS_AV_Stop)>(plugin, "TELIX_JS_AV_Stop");
     EXPECT_EQ(stop(1), 5);
-    EXPECT_EQ(output.printed(), loadLine);
+    EXPECT_EQ(output.printed(), kLoadLine);
     EXPECT_EQ(output.warnings(), std::vector<std::string>{
                                      "Library:: libtelix.so, not found in the path /mnt/browser/lib/TV .\n"});
 
@@ -115,7 +115,7 @@ TEST(SharedObject, FindsTheLibraryAtTheFixedPlaceOfASet) {
     EXPECT_EQ(forwarderOf<decltype(name)>(plugin, #name)(1), 5) << #name;
 #include "telix/telix_platform_calls.h"
     EXPECT_EQ(reached, boundCallNames());
-    EXPECT_EQ(output.printed(), loadLine);
+    EXPECT_EQ(output.printed(), kLoadLine);
     EXPECT_EQ(output.warnings(), std::vector<std::string>{});
     platform.reset();
 }

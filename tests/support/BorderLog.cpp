@@ -13,7 +13,7 @@ bool startsWith(const std::string& text, const std::string& prefix) {
 }
 
 bool isBookkeeping(const std::string& entry) {
-    static const char* const prefixes[] = {
+    static const char* const kPrefixes[] = {
         "NPN_GetStringIdentifier",
         "NPN_GetIntIdentifier",
         "NPN_IdentifierIsString",
@@ -25,7 +25,7 @@ bool isBookkeeping(const std::string& entry) {
         "NPN_MemAlloc",
         "NPN_MemFree",
     };
-    return std::any_of(std::begin(prefixes), std::end(prefixes),
+    return std::any_of(std::begin(kPrefixes), std::end(kPrefixes),
                        [&](const char* prefix) { return startsWith(entry, prefix); });
 }
 

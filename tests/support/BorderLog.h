@@ -28,7 +28,7 @@ public:
     size_t count(const std::string& prefix) const { return startingWith(prefix).size(); }
     bool contains(const std::string& entry) const;
 
-    // Each expected entry stands in the log behind the one before it; others may stand between. Fails the
+    // Each expected entry stands in the log after the one before it; others may stand between. Fails the
     // test with the whole log if not.
     void expectInOrder(const Entries& expected) const;
 

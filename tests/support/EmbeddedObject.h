@@ -25,7 +25,7 @@ public:
     NPError error() const { return m_error; } // what NPP_NewStream said
     uint16_t mode() const { return m_mode; }  // the stream mode that the instance chose
     int32_t writeReady();
-    // NPP_Write with the next bytes of the stream, zeros behind them in memory; or at another offset.
+    // NPP_Write with the next bytes of the stream, zeros after them in memory; or at another offset.
     int32_t write(const std::string& bytes);
     int32_t writeAt(int32_t offset, const std::string& bytes);
     // NPP_DestroyStream.

@@ -1,5 +1,5 @@
 // A stand-in for the television's platform library: a real libtelix.so that writes down each call and does
-// what a test tells it to. The library and the tests share this header; the library is built by
+// what a test asks it to. The library and the tests share this header; the library is built by
 // telix_add_recording_platform (tests/support/platform).
 #ifndef TELIX_TESTS_SUPPORT_RECORDINGPLATFORM_H
 #define TELIX_TESTS_SUPPORT_RECORDINGPLATFORM_H

@@ -18,8 +18,8 @@ namespace {
 
 ScriptedBrowser* s_current = nullptr;
 
-// Objects and blocks that outlived their browser because the plug-in left them behind: still reachable for
-// the leak checker, since the accounts have told already.
+// Objects and blocks that outlived their browser because the plug-in never released them: still reachable for
+// the leak checker, since the accounts have reported them already.
 std::vector<const void*>& leftBehind() {
     static auto* addresses = new std::vector<const void*>;
     return *addresses;
@@ -660,7 +660,7 @@ EmbeddedObject ScriptedBrowser::embed(const std::string& mimeType, const Attribu
     const EmbeddedObject object(std::make_shared<EmbeddedObject::Record>());
     m_instances.push_back(object.m_record);
 
-    Attributes texts = attributes; // the interface hands out writable texts
+    Attributes texts = attributes; // the interface hands out writable strings
     std::vector<char*> names;
     std::vector<char*> values;
     for (auto& attribute : texts) {
@@ -741,8 +741,8 @@ bool ScriptedBrowser::runAsyncCall() {
 }
 
 void ScriptedBrowser::pump() {
-    constexpr int limit = 1000000;
-    for (int turn = 0; turn < limit; ++turn) {
+    constexpr int kLimit = 1000000;
+    for (int turn = 0; turn < kLimit; ++turn) {
         const bool ranAsyncCall = runAsyncCall();
         if (g_main_context_iteration(nullptr, FALSE) == FALSE && !ranAsyncCall) {
             return;

@@ -3,7 +3,7 @@
 // reference that isn't the plug-in's and call from a wrong thread, and logs what crosses the border.
 //
 // Of the language it knows only that a text with an unterminated string literal doesn't run; what a script
-// does is what the test says with whenEvaluating(), and texts that dispatch DOM events do.
+// does is what the test says with whenEvaluating(), and scripts that dispatch DOM events do.
 #ifndef TELIX_TESTS_SUPPORT_SCRIPTEDBROWSER_H
 #define TELIX_TESTS_SUPPORT_SCRIPTEDBROWSER_H
 
@@ -42,7 +42,7 @@ struct Evaluation {
     ObjectRef scope;
 };
 
-// What the page does with certain texts.
+// What the page does with certain scripts.
 class EvaluationRule {
 public:
     using Body = std::function<std::optional<Value>(const Evaluation&)>;
@@ -97,8 +97,8 @@ public:
     std::string address() const { return m_address; }
     void setAddress(const std::string& address) { m_address = address; }
 
-    // Says what the page does with a text; the youngest rule that holds counts. Other texts run and give
-    // undefined, but for the page's address and the dispatch of DOM events.
+    // Says what the page does with a script; the last rule that matches counts. Other scripts run and give
+    // undefined, but for the page's URL and the dispatch of DOM events.
     EvaluationRule& whenEvaluating(const std::string& text);
     EvaluationRule& whenEvaluatingTextFrom(const std::string& prefix);
     EvaluationRule& whenEvaluatingIf(std::function<bool(const Evaluation&)> matches);
@@ -173,7 +173,8 @@ private:
         void* data;
     };
 
-    // Logs a call of the table and tells whether it may go on: on the browser thread, and not to be refused.
+    // Logs a call of the table and returns whether it may go on: on the browser thread, and not to be
+    // refused.
     template <class Text>
     bool enter(const char* entry, Text text);
     bool enter(const char* entry);

@@ -12,11 +12,11 @@
 namespace {
 
 // Behind the arguments of a call: as many as the longest argument list of any method.
-constexpr size_t paddingVariants = 16;
+constexpr size_t kPaddingVariants = 16;
 
-const NPVariant voidVariant{};
+const NPVariant kVoidVariant{};
 
-// A string's bytes in a block of just that size, so that a reader who expects a zero behind them is caught by
+// A string's bytes in a block of just that size, so that a reader who expects a zero after them is caught by
 // the sanitizer.
 char* bareCopy(const std::string& text) {
     char* block = static_cast<char*>(std::malloc(text.empty() ? 1 : text.size()));
@@ -135,7 +135,7 @@ Outcome ObjectRef::get(const Name& name) const {
     }
     const ObjectRef kept = *this;
     const bool exists = hasProperty(name);
-    NPVariant result = voidVariant;
+    NPVariant result = kVoidVariant;
     const bool succeeded =
         m_object->_class->getProperty && m_object->_class->getProperty(m_object, name.identifier(), &result);
     return finish(exists, succeeded, result);
@@ -163,7 +163,7 @@ Outcome ObjectRef::callWith(const Name& name, const Values& arguments) const {
     const ObjectRef kept = *this;
     const bool exists = hasMethod(name);
     const ArgumentArray array(arguments);
-    NPVariant result = voidVariant;
+    NPVariant result = kVoidVariant;
     const bool succeeded =
         m_object->_class->invoke &&
         m_object->_class->invoke(m_object, name.identifier(), array.data(), array.count(), &result);
@@ -172,7 +172,7 @@ Outcome ObjectRef::callWith(const Name& name, const Values& arguments) const {
 
 Outcome ObjectRef::callDefault(const Values& arguments) const {
     const ArgumentArray array(arguments);
-    NPVariant result = voidVariant;
+    NPVariant result = kVoidVariant;
     const bool succeeded = m_object && m_object->_class->invokeDefault &&
                            m_object->_class->invokeDefault(m_object, array.data(), array.count(), &result);
     return finish(true, succeeded, result);
@@ -180,7 +180,7 @@ Outcome ObjectRef::callDefault(const Values& arguments) const {
 
 Outcome ObjectRef::construct(const Values& arguments) const {
     const ArgumentArray array(arguments);
-    NPVariant result = voidVariant;
+    NPVariant result = kVoidVariant;
     const bool succeeded = m_object && m_object->_class->construct &&
                            m_object->_class->construct(m_object, array.data(), array.count(), &result);
     return finish(true, succeeded, result);
@@ -245,12 +245,12 @@ Value Value::take(NPVariant& variant) {
             ScriptedBrowser::current().freeBlock(const_cast<char*>(variant.value.stringValue.UTF8Characters));
         }
     }
-    variant = voidVariant;
+    variant = kVoidVariant;
     return value;
 }
 
 void Value::giveTo(NPVariant& variant) const {
-    variant = voidVariant;
+    variant = kVoidVariant;
     variant.type = type();
     switch (type()) {
     case NPVariantType_Bool:
@@ -351,7 +351,7 @@ std::ostream& operator<<(std::ostream& stream, const Outcome& outcome) {
 }
 
 ArgumentArray::ArgumentArray(const Values& values)
-    : m_variants(values.size() + paddingVariants, voidVariant),
+    : m_variants(values.size() + kPaddingVariants, kVoidVariant),
       m_count(static_cast<uint32_t>(values.size())) {
     for (size_t i = 0; i < values.size(); ++i) {
         NPVariant& variant = m_variants[i];

@@ -58,7 +58,7 @@ public:
     int pluginReferences() const;
 
     // The object's operations, asked as a browser asks them. The existence is asked first, and the operation
-    // carried out whatever came of it. A method finds void values behind its last argument.
+    // carried out whatever came of it. A method finds void values after its last argument.
     Outcome get(const Name& name) const;
     Outcome set(const Name& name, const Value& value) const;
     template <class... Arguments>
@@ -156,7 +156,7 @@ struct Outcome {
 std::ostream& operator<<(std::ostream& stream, const Outcome& outcome);
 
 // Arguments as they stand in memory during a call: strings without a terminating zero, and readable void
-// variants behind the last one. Everything stays the browser's.
+// variants after the last one. Everything stays the browser's.
 class ArgumentArray {
 public:
     explicit ArgumentArray(const Values& values);

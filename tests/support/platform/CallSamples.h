@@ -14,8 +14,8 @@
 #include <type_traits>
 #include <vector>
 
-// One argument after the other, no two alike: numbers with bits in each of their bytes, texts, and pointers
-// to memory whose content tells whether anything was written there.
+// One argument after the other, no two alike: numbers with bits in each of their bytes, strings, and pointers
+// to memory whose content shows whether anything was written there.
 class ArgumentSource {
 public:
     ArgumentSource() {

@@ -13,9 +13,9 @@ using ::testing::SizeIs;
 
 namespace {
 
-const char managerType[] = "application/oipfapplicationmanager";
-const char* const handlerNames[] = {"onLowMemory", "onApplicationLoaded", "onApplicationUnloaded",
-                                    "onApplicationLoadError"};
+const char kManagerType[] = "application/oipfapplicationmanager";
+const char* const kHandlerNames[] = {"onLowMemory", "onApplicationLoaded", "onApplicationUnloaded",
+                                     "onApplicationLoadError"};
 
 ApplicationManager& modelOf(const EmbeddedObject& manager) {
     return *static_cast<ApplicationManager*>(static_cast<PluginBase*>(manager.model()));
@@ -27,11 +27,11 @@ protected:
 
     ObjectRef ownerApplication() { return manager.call("getOwnerApplication", browser.document()).object(); }
 
-    EmbeddedObject manager = browser.embed(managerType, {{"id", "manager"}});
+    EmbeddedObject manager = browser.embed(kManagerType, {{"id", "manager"}});
 };
 
 TEST_F(ApplicationManagerTest, HasFourPropertiesAndOneMethod) {
-    for (const char* name : handlerNames) {
+    for (const char* name : kHandlerNames) {
         EXPECT_TRUE(manager.hasProperty(name)) << name;
         EXPECT_FALSE(manager.hasMethod(name)) << name;
     }
@@ -142,7 +142,7 @@ TEST_F(ApplicationManagerTest, TheArgumentCountIsNotLookedAt) {
 }
 
 TEST_F(ApplicationManagerTest, AHandlerIsKeptReplacedAndClearedByNull) {
-    for (const char* name : handlerNames) {
+    for (const char* name : kHandlerNames) {
         const ScriptFunction first = browser.function("first");
         const ScriptFunction second = browser.function("second");
         EXPECT_EQ(manager.get(name), nullptr) << name;
@@ -159,7 +159,7 @@ TEST_F(ApplicationManagerTest, AHandlerIsKeptReplacedAndClearedByNull) {
 }
 
 TEST_F(ApplicationManagerTest, AHandlerWrittenAsAnythingElseStaysAndTheWriteSucceeds) {
-    for (const char* name : handlerNames) {
+    for (const char* name : kHandlerNames) {
         const ScriptFunction handler = browser.function("handler");
         manager.set(name, handler);
         for (const Value& value : {Value(), Value(5), Value(0.5), Value(true), Value("text")}) {
@@ -190,13 +190,13 @@ TEST_F(ApplicationManagerTest, AWriteReleasesTheOldHandlerAndRetainsWhateverIsSt
 
 TEST_F(ApplicationManagerTest, TheFirstManagerRegistersForLowMemoryAndTheLastUnregisters) {
     EXPECT_EQ(platform.TELIX_JS_APP_RegisterLowMemory.count(), 1U); // at the embedding
-    const EmbeddedObject other = browser.embed(managerType);
+    const EmbeddedObject other = browser.embed(kManagerType);
     EXPECT_EQ(platform.TELIX_JS_APP_RegisterLowMemory.count(), 1U);
     manager.destroy();
     EXPECT_EQ(platform.TELIX_JS_APP_UnRegisterLowMemory.count(), 0U);
     other.destroy();
     EXPECT_EQ(platform.TELIX_JS_APP_UnRegisterLowMemory.count(), 1U);
-    browser.embed(managerType);
+    browser.embed(kManagerType);
     EXPECT_THAT(log.startingWith("TELIX_"), ElementsAre("TELIX_JS_APP_UnRegisterLowMemory(callback)",
                                                         "TELIX_JS_APP_RegisterLowMemory(callback)"));
 }
@@ -204,8 +204,8 @@ TEST_F(ApplicationManagerTest, TheFirstManagerRegistersForLowMemoryAndTheLastUnr
 TEST_F(ApplicationManagerTest, TheResultOfTheRegistrationIsNotLookedAt) {
     manager.destroy();
     platform.defaultResult = 1;
-    const EmbeddedObject first = browser.embed(managerType);
-    const EmbeddedObject second = browser.embed(managerType);
+    const EmbeddedObject first = browser.embed(kManagerType);
+    const EmbeddedObject second = browser.embed(kManagerType);
     EXPECT_EQ(first.error(), NPERR_NO_ERROR);
     EXPECT_EQ(platform.TELIX_JS_APP_RegisterLowMemory.count(), 2U);
     first.destroy();
@@ -225,7 +225,7 @@ TEST_F(ApplicationManagerTest, TheSameCallbackIsRegisteredAndUnregistered) {
         unregistered = callback;
         return TELIX_RETCODE_SUCCESS;
     };
-    browser.embed(managerType).destroy();
+    browser.embed(kManagerType).destroy();
     EXPECT_NE(registered, nullptr);
     EXPECT_EQ(unregistered, registered);
 }
@@ -237,7 +237,7 @@ TEST_F(ApplicationManagerTest, ALowMemoryNoticeEndsAtTheLogAndCallsNoHandler) {
         notice = callback;
         return TELIX_RETCODE_SUCCESS;
     };
-    const EmbeddedObject fresh = browser.embed(managerType);
+    const EmbeddedObject fresh = browser.embed(kManagerType);
     const ScriptFunction handler = browser.function("handler");
     fresh.set("onLowMemory", handler);
     log.clear();
@@ -257,7 +257,7 @@ TEST_F(ApplicationManagerTest, ALowMemoryNoticeMayArriveAfterTheLastManager) {
 }
 
 TEST_F(ApplicationManagerTest, EachInstanceHasItsOwnManagerAndHandlers) {
-    const EmbeddedObject other = browser.embed(managerType);
+    const EmbeddedObject other = browser.embed(kManagerType);
     EXPECT_NE(manager.model(), other.model());
     EXPECT_EQ(ApplicationManager::sharedInstance(manager.npp()), manager.model());
     EXPECT_EQ(ApplicationManager::sharedInstance(other.npp()), other.model());
@@ -267,7 +267,7 @@ TEST_F(ApplicationManagerTest, EachInstanceHasItsOwnManagerAndHandlers) {
 }
 
 TEST_F(ApplicationManagerTest, TheApplicationsOfAllManagersAreOneList) {
-    const EmbeddedObject other = browser.embed(managerType);
+    const EmbeddedObject other = browser.embed(kManagerType);
     const ObjectRef mine = ownerApplication();
     const ObjectRef theirs = other.call("getOwnerApplication", browser.document()).object();
     EXPECT_THAT(modelOf(manager).applicationList(), SizeIs(2));
@@ -275,7 +275,7 @@ TEST_F(ApplicationManagerTest, TheApplicationsOfAllManagersAreOneList) {
 }
 
 TEST_F(ApplicationManagerTest, ApplicationsOutliveEveryManager) {
-    const EmbeddedObject other = browser.embed(managerType);
+    const EmbeddedObject other = browser.embed(kManagerType);
     const ObjectRef application = ownerApplication();
     manager.destroy();
     EXPECT_THAT(modelOf(other).applicationList(), SizeIs(1));
@@ -297,7 +297,7 @@ TEST_F(ApplicationManagerTest, AskingTwiceForTheManagerOfAnInstanceGivesTheSame)
 }
 
 TEST_F(ApplicationManagerTest, DestroyReleasesWrapperHandlersRegistrationAndElementInThisOrder) {
-    for (const char* name : handlerNames) {
+    for (const char* name : kHandlerNames) {
         manager.set(name, browser.function(name));
     }
     log.clear();
@@ -344,7 +344,7 @@ TEST_F(ApplicationManagerTest, KeyEventsCallTheHandlersOfAllApplicationsAndLeave
     for (const Row& row : {Row{"onKeyPress", &ApplicationManager::handleKeyPressEvent},
                            Row{"onKeyUp", &ApplicationManager::handleKeyUpEvent},
                            Row{"onKeyDown", &ApplicationManager::handleKeyDownEvent}}) {
-        const EmbeddedObject other = browser.embed(managerType);
+        const EmbeddedObject other = browser.embed(kManagerType);
         const ObjectRef mine = ownerApplication();
         const ObjectRef without = ownerApplication();
         const ObjectRef theirs = other.call("getOwnerApplication", browser.document()).object();
@@ -356,7 +356,7 @@ TEST_F(ApplicationManagerTest, KeyEventsCallTheHandlersOfAllApplicationsAndLeave
         EXPECT_EQ((modelOf(manager).*row.handle)(), 1);
         EXPECT_THAT(log.calls(), ElementsAre("NPN_InvokeDefault first " + std::string(row.name) + "()",
                                              "NPN_InvokeDefault second " + std::string(row.name) + "()"));
-        EXPECT_EQ(first.pluginReferences(), 3); // the application's, and two left behind
+        EXPECT_EQ(first.pluginReferences(), 3); // the application's, and two that are never released
         leftBehind(first, 2);
         leftBehind(second, 2);
     }

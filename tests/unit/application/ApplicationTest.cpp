@@ -1,7 +1,9 @@
 // An application as a page sees it, and the four page functions that do its work.
 #include "src/application/Application.h"
 
+#include "common/ScriptReferences.h"
 #include "src/application/ApplicationManager.h"
+#include "src/application/JSApplication.h"
 #include "tests/support/BorderTest.h"
 
 using ::testing::AllOf;
@@ -12,9 +14,9 @@ using ::testing::SizeIs;
 
 namespace {
 
-const char* const handlerNames[] = {"onKeyPress", "onKeyUp", "onKeyDown", "onApplicationShown",
-                                    "onApplicationHidden"};
-const char createScript[] = "window.createHbbTVApplication('http://b.example/');";
+const char* const kHandlerNames[] = {"onKeyPress", "onKeyUp", "onKeyDown", "onApplicationShown",
+                                     "onApplicationHidden"};
+const char kCreateScript[] = "window.createHbbTVApplication('http://b.example/');";
 
 class ApplicationTest : public BorderTest {
 protected:
@@ -31,7 +33,7 @@ protected:
 };
 
 TEST_F(ApplicationTest, HasItsPropertiesAndMethods) {
-    for (const char* name : handlerNames) {
+    for (const char* name : kHandlerNames) {
         EXPECT_TRUE(application.hasProperty(name)) << name;
         EXPECT_FALSE(application.hasMethod(name)) << name;
     }
@@ -69,7 +71,7 @@ TEST_F(ApplicationTest, InternsItsNamesInOrder) {
 }
 
 TEST_F(ApplicationTest, AHandlerIsKeptAndReplaced) {
-    for (const char* name : handlerNames) {
+    for (const char* name : kHandlerNames) {
         const ScriptFunction first = browser.function("first");
         const ScriptFunction second = browser.function("second");
         EXPECT_EQ(application.get(name), nullptr) << name;
@@ -83,8 +85,36 @@ TEST_F(ApplicationTest, AHandlerIsKeptAndReplaced) {
     }
 }
 
+// What the browser sees of the slot at the moment at which it counts a reference to the new handler.
+NPObject* (*retainOfBrowser)(NPObject* object) = nullptr;
+Application* observedApplication = nullptr;
+NPObject* heldAtRetain = nullptr;
+
+NPObject* retainAndLook(NPObject* object) {
+    NPNFuncs->retainobject = retainOfBrowser; // the getter retains too
+    heldAtRetain = observedApplication->onKeyPress();
+    if (heldAtRetain) {
+        NPN_ReleaseObject(heldAtRetain);
+    }
+    return retainOfBrowser(object);
+}
+
+TEST_F(ApplicationTest, AHandlerIsReleasedStoredAndThenRetained) {
+    const ScriptFunction first = browser.function("first");
+    const ScriptFunction second = browser.function("second");
+    application.set("onKeyPress", first);
+    log.clear();
+    retainOfBrowser = browser.table().retainobject;
+    observedApplication = wrapperOf<JSApplication>(application.object())->impl();
+    browser.table().retainobject = retainAndLook;
+    EXPECT_TRUE(application.set("onKeyPress", second));
+    EXPECT_EQ(heldAtRetain, second.object());
+    EXPECT_THAT(log.everything(), ElementsAre("NPN_ReleaseObject first", "NPN_RetainObject second",
+                                              "NPN_ReleaseObject second", "NPN_RetainObject second"));
+}
+
 TEST_F(ApplicationTest, AHandlerCanNotBeClearedOrWrittenAsAnythingElse) {
-    for (const char* name : handlerNames) {
+    for (const char* name : kHandlerNames) {
         const ScriptFunction handler = browser.function("handler");
         application.set(name, handler);
         for (const Value& value :
@@ -103,7 +133,7 @@ TEST_F(ApplicationTest, TheHandlersAreApart) {
 }
 
 TEST_F(ApplicationTest, TheEndReleasesPrivateDataAndHandlersInItsOwnOrder) {
-    for (const char* name : handlerNames) {
+    for (const char* name : kHandlerNames) {
         application.set(name, browser.function(name));
     }
     application.get("privateData");
@@ -117,32 +147,43 @@ TEST_F(ApplicationTest, TheEndReleasesPrivateDataAndHandlersInItsOwnOrder) {
     EXPECT_EQ(applicationCount(), 0U);
 }
 
+TEST_F(ApplicationTest, TheEndLogsOnceBeforeAnythingIsGivenBack) {
+    application.get("privateData");
+    const std::string text = logOf(1, [this] { application.reset(); });
+    const size_t logged = text.find("APP_MGR :: ~JSApplication :: Destructor called, This:-- ");
+    ASSERT_NE(logged, std::string::npos) << text;
+    EXPECT_LT(logged, text.find("NPN_ReleaseObject")) << text;
+    EXPECT_EQ(text.find("~JSApplication ::", logged + sizeof "APP_MGR :: ~JSApplication ::"),
+              std::string::npos)
+        << text;
+}
+
 TEST_F(ApplicationTest, CreateApplicationAsksThePageAndGivesANewApplication) {
-    browser.whenEvaluating(createScript).gives(true);
+    browser.whenEvaluating(kCreateScript).gives(true);
     log.clear();
     const Outcome created = application.call("createApplication", "http://b.example/", true);
     ASSERT_TRUE(created.value.isObject());
     EXPECT_NE(created.object(), application);
     EXPECT_EQ(created.object().pluginReferences(), 0);
     EXPECT_THAT(log.calls(),
-                ElementsAre("NPN_GetValue 15", "NPN_Evaluate window \"" + std::string(createScript) + "\"",
+                ElementsAre("NPN_GetValue 15", "NPN_Evaluate window \"" + std::string(kCreateScript) + "\"",
                             "NPN_CreateObject JSApplication#2"));
     EXPECT_EQ(applicationCount(), 2U);
 }
 
 TEST_F(ApplicationTest, TheFlagOfCreateApplicationHasNoEffect) {
-    browser.whenEvaluating(createScript).gives(true);
+    browser.whenEvaluating(kCreateScript).gives(true);
     EXPECT_TRUE(application.call("createApplication", "http://b.example/", true).value.isObject());
     EXPECT_TRUE(application.call("createApplication", "http://b.example/", false).value.isObject());
-    EXPECT_THAT(browser.scripts(), ElementsAre("location.href", createScript, createScript));
+    EXPECT_THAT(browser.scripts(), ElementsAre("location.href", kCreateScript, kCreateScript));
 }
 
 TEST_F(ApplicationTest, CreateApplicationIsNullUnlessThePageSaysTrue) {
     for (const Value& answer : {Value(false), Value(), Value(nullptr), Value(1)}) {
-        browser.whenEvaluating(createScript).gives(answer);
+        browser.whenEvaluating(kCreateScript).gives(answer);
         EXPECT_EQ(application.call("createApplication", "http://b.example/", true), nullptr) << answer;
     }
-    browser.whenEvaluating(createScript).throws();
+    browser.whenEvaluating(kCreateScript).throws();
     EXPECT_EQ(application.call("createApplication", "http://b.example/", true), nullptr);
     EXPECT_EQ(applicationCount(), 1U);
 }
@@ -165,7 +206,7 @@ TEST_F(ApplicationTest, AnAddressEndsAtAZero) {
 }
 
 TEST_F(ApplicationTest, CreateApplicationIsNullWhenTheBrowserRefusesTheObject) {
-    browser.whenEvaluating(createScript).gives(true);
+    browser.whenEvaluating(kCreateScript).gives(true);
     browser.refuse("NPN_CreateObject");
     EXPECT_EQ(application.call("createApplication", "http://b.example/", true), nullptr);
     EXPECT_EQ(applicationCount(), 1U);
@@ -224,7 +265,7 @@ TEST_F(ApplicationTest, ADestroyedApplicationStillAnswers) {
 
 TEST_F(ApplicationTest, NoPlatformCallIsMade) {
     log.clear();
-    browser.whenEvaluating(createScript).gives(true);
+    browser.whenEvaluating(kCreateScript).gives(true);
     application.call("createApplication", "http://b.example/", true);
     application.call("show");
     application.call("hide");
@@ -237,7 +278,7 @@ TEST_F(ApplicationTest, LogsUnderTheManagersModule) {
                 AllOf(HasSubstr(logLine("APP_MGR", "Invoke", " mId_createApplication\n")),
                       HasSubstr(logLine("APP_MGR", "createApplication",
                                         " Application class:: invokeJScript returned FAIL.\n"))));
-    browser.whenEvaluating(createScript).gives(true);
+    browser.whenEvaluating(kCreateScript).gives(true);
     EXPECT_THAT(logOf(2, [this] { application.call("createApplication", "http://b.example/", true); }),
                 HasSubstr(logLine("APP_MGR", "createApplication", " Target :: object: 0x")));
     EXPECT_THAT(logOf(2, [this] { application.get("onKeyPress"); }),

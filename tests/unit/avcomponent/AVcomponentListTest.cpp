@@ -16,7 +16,7 @@ protected:
         SubObjectTest::TearDown();
     }
 
-    // A list whose components stay behind on purpose.
+    // A list whose components outlive it on purpose.
     ObjectRef listOf(std::vector<uint32_t> handles, AVcompType_T type = AVCOMP_TYPE_AUDIO,
                      AVcompObjType_T objType = AVCOMP_OBJ_VIDEOBROADCAST) {
         componentsLeftBehind += static_cast<int>(handles.size());
@@ -26,7 +26,7 @@ protected:
         });
     }
 
-    // Has both families tell a component's handle as its number of channels.
+    // Has both families give a component's handle as its number of channels.
     void tellHandles() {
         const auto tell = [](uint32_t handle, uint32_t, uint32_t* out) {
             *out = handle;

@@ -18,7 +18,7 @@ protected:
         SubObjectTest::TearDown();
     }
 
-    // The configuration of a platform with these channels, whose objects stay behind on purpose.
+    // The configuration of a platform with these channels, whose objects outlive it on purpose.
     ObjectRef configOf(std::vector<uint32_t> channels) {
         handles = std::move(channels);
         platform.TELIX_JS_CM_GetChannelList = [this](uint32_t* count, uint32_t** out) {

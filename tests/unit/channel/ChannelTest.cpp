@@ -14,7 +14,7 @@ protected:
         return make<JSChannel>([handle](Channel& model) { model.setChannelHandle(handle); });
     }
 
-    // Has the platform tell of each channel: ids are its handle plus 1, 2 and 3, texts end in its handle.
+    // Has the platform know each channel: ids are its handle plus 1, 2 and 3, strings end in its handle.
     void describeChannels() {
         platform.TELIX_JS_CM_GetOnid = id(1);
         platform.TELIX_JS_CM_GetTsid = id(2);

@@ -1,4 +1,4 @@
-// The embedded configuration object and the device's settings behind it.
+// The embedded configuration object and the device's settings that it gives.
 #include <cstring>
 
 #include "src/config/OipfConfiguration.h"

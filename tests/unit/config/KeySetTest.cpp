@@ -212,17 +212,17 @@ struct KeyGroup {
     int value;
 };
 
-const KeyGroup keyGroups[] = {{"RED", 0x1},         {"GREEN", 0x2},  {"YELLOW", 0x4},  {"BLUE", 0x8},
-                              {"NAVIGATION", 0x10}, {"VCR", 0x20},   {"SCROLL", 0x40}, {"INFO", 0x80},
-                              {"NUMERIC", 0x100},   {"ALPHA", 0x200}};
+const KeyGroup kKeyGroups[] = {{"RED", 0x1},         {"GREEN", 0x2},  {"YELLOW", 0x4},  {"BLUE", 0x8},
+                               {"NAVIGATION", 0x10}, {"VCR", 0x20},   {"SCROLL", 0x40}, {"INFO", 0x80},
+                               {"NUMERIC", 0x100},   {"ALPHA", 0x200}};
 
 TEST_F(KeySetTest, TheConstantsReadTheSameBeforeAndAfterSetting) {
     newMasksAreAnsweredWith(0);
-    for (const KeyGroup& group : keyGroups) {
+    for (const KeyGroup& group : kKeyGroups) {
         EXPECT_EQ(keys.get(group.name), Value(group.value)) << group.name;
     }
     keys.call("setValue", 0x3FF);
-    for (const KeyGroup& group : keyGroups) {
+    for (const KeyGroup& group : kKeyGroups) {
         EXPECT_EQ(keys.get(group.name), Value(group.value)) << group.name;
         EXPECT_FALSE(keys.hasMethod(group.name)) << group.name;
         EXPECT_FALSE(keys.call(group.name).succeeded) << group.name;
@@ -233,7 +233,7 @@ TEST_F(KeySetTest, NothingCanBeAssigned) {
     newMasksAreAnsweredWith(0);
     keys.call("setValue", 0x1F);
     std::vector<const char*> names{"value", "setValue", "other"};
-    for (const KeyGroup& group : keyGroups) {
+    for (const KeyGroup& group : kKeyGroups) {
         names.push_back(group.name);
     }
     for (const char* name : names) {

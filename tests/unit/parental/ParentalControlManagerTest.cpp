@@ -13,7 +13,7 @@ using ::testing::IsEmpty;
 
 namespace {
 
-// The platform's rating schemes: records, and the texts that they point at.
+// The platform's rating schemes: records, and the strings that they point at.
 class SchemeRecords {
 public:
     // `ratings` are names with their icons; without a name the record has none.
@@ -422,6 +422,21 @@ TEST_F(ParentalControlTest, LogsUnderItsModule) {
     EXPECT_THAT(text,
                 HasSubstr(logLine("PARENTAL", "getThreshold", " parentalRatingThreshold is:: ( 15 )\n")));
     EXPECT_THAT(text, HasSubstr(logLine("PARENTAL", "GetProperty", "Array Notation Index:-- 0 --\n")));
+    collectionWasMade = false; // but in the process of the log
+}
+
+TEST_F(ParentalControlTest, AThresholdIsRetainedBeforeItIsFilled) {
+    const std::string text = logOf(1, [this] {
+        tellThreshold(15);
+        records.add(60, "mpaa", {});
+        EXPECT_TRUE(schemes().get("0").object().get("threshold"));
+    });
+    const size_t told = text.find("parentalRatingThreshold is:: ( 15 )");
+    const size_t created = text.find("NPN_CreateObject", told);
+    const size_t retained = text.find("NPN_RetainObject", created);
+    const size_t filled = text.find("Buffer value is:: ( 15 )", told);
+    EXPECT_TRUE(told < created && created < retained && retained < filled && filled != std::string::npos)
+        << text;
     collectionWasMade = false; // but in the process of the log
 }
 

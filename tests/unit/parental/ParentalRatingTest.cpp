@@ -213,7 +213,7 @@ protected:
         SubObjectTest::TearDown();
     }
 
-    // A collection whose ratings stay behind on purpose.
+    // A collection whose ratings outlive it on purpose.
     ObjectRef collectionOf(std::vector<uint32_t> handles) {
         ratingsLeftBehind += static_cast<int>(handles.size());
         return make<JSParentalRatingCollection>([&](ParentalRatingCollection& model) {

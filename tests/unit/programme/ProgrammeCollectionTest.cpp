@@ -18,7 +18,7 @@ protected:
         SubObjectTest::TearDown();
     }
 
-    // A collection whose programmes stay behind on purpose.
+    // A collection whose programmes outlive it on purpose.
     ObjectRef collectionOf(std::vector<uint32_t> handles) {
         programmesLeftBehind += static_cast<int>(handles.size());
         return make<JSProgrammeCollection>([&](ProgrammeCollection& model) {
@@ -26,7 +26,7 @@ protected:
         });
     }
 
-    // Gives programmes their ratings; the platform refuses to tell of programmes that are not named.
+    // Gives programmes their ratings; the platform refuses programmes that are not named.
     void giveRatings(std::map<uint32_t, std::vector<uint32_t>> ratings) {
         ratingsOf = std::move(ratings);
         platform.TELIX_JS_SI_GetParentalRatingHandles = [this](uint32_t programme, uint32_t* count,
@@ -141,9 +141,9 @@ TEST_F(ProgrammeCollectionTest, FindsTheRatingThatTheFirstProgrammeHolds) {
     EXPECT_EQ(rating.pluginReferences(), 3) << "two from the outset, and one of the two that were handed out";
     const ObjectRef ratings = collection.call("item", 0).object().get("parentalRating").object();
     EXPECT_EQ(ratings.call("item", 1).object(), rating);
-    EXPECT_EQ(ratings.pluginReferences(), 2) << "the programme's, and the one that the search left behind";
+    EXPECT_EQ(ratings.pluginReferences(), 2) << "the programme's, and the one that the search never releases";
     EXPECT_EQ(browser.liveCount("JSParentalRatingCollection"), 1U) << "the search went no further";
-    // The programme stays behind, and with it all that it holds.
+    // The programme is never released, nor what it holds.
     leftBehind("JSParentalRatingCollection", 2);
     leftBehind("JSParentalRating", 2 + 3);
 }

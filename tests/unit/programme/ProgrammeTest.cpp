@@ -16,7 +16,7 @@ protected:
         return make<JSProgramme>([handle](Programme& model) { model.setProgrammeHandle(handle); });
     }
 
-    // Has the platform tell these values from now on.
+    // Has the platform give these values from now on.
     void tellTexts(const std::string& text) {
         const auto withLength = [text](uint32_t, char** out, uint8_t* length) {
             EXPECT_EQ(*out, nullptr) << "the results are preset";
@@ -81,7 +81,7 @@ protected:
         platform.TELIX_JS_SI_SetDuration = nullptr;
     }
 
-    // Gives each programme these ratings, whose objects stay behind on purpose.
+    // Gives each programme these ratings, whose objects outlive it on purpose.
     void giveRatings(std::vector<uint32_t> handles) {
         ratings = std::move(handles);
         platform.TELIX_JS_SI_GetParentalRatingHandles = [this](uint32_t, uint32_t* count, uint32_t** out) {

@@ -35,8 +35,8 @@ void note(const char* entry, Arguments... arguments) {
     g_note = {entry, {asNumber(arguments)...}};
 }
 
-NPNetscapeFuncs notingTable() {
-    NPNetscapeFuncs table{};
+// Each of these fills one part of the table.
+void noteStreamsAndMemory(NPNetscapeFuncs& table) {
     table.geturl = [](NPP npp, const char* url, const char* target) -> NPError {
         note("geturl", npp, url, target);
         return 21;
@@ -86,6 +86,9 @@ NPNetscapeFuncs notingTable() {
         note("posturlnotify", npp, url, target, length, buffer, isFile, data);
         return 28;
     };
+}
+
+void noteValuesAndIdentifiers(NPNetscapeFuncs& table) {
     table.getvalue = [](NPP npp, NPNVariable variable, void* value) -> NPError {
         note("getvalue", npp, variable, value);
         return 29;
@@ -120,6 +123,9 @@ NPNetscapeFuncs notingTable() {
         note("intfromidentifier", identifier);
         return -34;
     };
+}
+
+void noteObjects(NPNetscapeFuncs& table) {
     table.createobject = [](NPP npp, NPClass* objectClass) -> NPObject* {
         note("createobject", npp, objectClass);
         return address<NPObject*>(35);
@@ -168,10 +174,17 @@ NPNetscapeFuncs notingTable() {
     table.pluginthreadasynccall = [](NPP npp, void (*function)(void*), void* data) {
         note("pluginthreadasynccall", npp, function, data);
     };
+}
+
+NPNetscapeFuncs notingTable() {
+    NPNetscapeFuncs table{};
+    noteStreamsAndMemory(table);
+    noteValuesAndIdentifiers(table);
+    noteObjects(table);
     return table;
 }
 
-// One gate: the entry it leads to, and a call of it that tells whether the result came back.
+// One gate: the entry it leads to, and a call of it that returns whether the result came back.
 struct Gate {
     const char* name;
     const char* entry;
@@ -179,13 +192,13 @@ struct Gate {
     bool (*call)();
 };
 
-const uintptr_t a1 = asNumber(address<char*>(1));
-const uintptr_t a2 = asNumber(address<char*>(2));
-const uintptr_t a3 = asNumber(address<char*>(3));
-const uintptr_t a4 = asNumber(address<char*>(4));
-const uintptr_t a5 = asNumber(address<char*>(5));
+const uintptr_t kA1 = asNumber(address<char*>(1));
+const uintptr_t kA2 = asNumber(address<char*>(2));
+const uintptr_t kA3 = asNumber(address<char*>(3));
+const uintptr_t kA4 = asNumber(address<char*>(4));
+const uintptr_t kA5 = asNumber(address<char*>(5));
 
-const NPP npp = address<NPP>(1);
+const NPP kNpp = address<NPP>(1);
 void* const second = address<void*>(2);
 void* const third = address<void*>(3);
 void* const fourth = address<void*>(4);
@@ -204,66 +217,72 @@ NPStream* stream(void* argument) {
     return static_cast<NPStream*>(argument);
 }
 
-const Gate gates[] = {
-    {"NPN_GetURL", "geturl", {a1, a2, a3}, [] { return NPN_GetURL(npp, text(second), text(third)) == 21; }},
+const Gate kGates[] = {
+    {"NPN_GetURL",
+     "geturl",
+     {kA1, kA2, kA3},
+     [] { return NPN_GetURL(kNpp, text(second), text(third)) == 21; }},
     {"NPN_PostURL",
      "posturl",
-     {a1, a2, a3, 9, a4, 1},
-     [] { return NPN_PostURL(npp, text(second), text(third), 9, text(fourth), 1) == 22; }},
+     {kA1, kA2, kA3, 9, kA4, 1},
+     [] { return NPN_PostURL(kNpp, text(second), text(third), 9, text(fourth), 1) == 22; }},
     {"NPN_RequestRead",
      "requestread",
-     {a2, a3},
+     {kA2, kA3},
      [] { return NPN_RequestRead(stream(second), static_cast<NPByteRange*>(third)) == 23; }},
     {"NPN_NewStream",
      "newstream",
-     {a1, a2, a3, a4},
+     {kA1, kA2, kA3, kA4},
      [] {
-         return NPN_NewStream(npp, static_cast<char*>(second), text(third),
+         return NPN_NewStream(kNpp, static_cast<char*>(second), text(third),
                               static_cast<NPStream**>(fourth)) == 24;
      }},
-    {"NPN_Write", "write", {a1, a2, 9, a3}, [] { return NPN_Write(npp, stream(second), 9, third) == 70000; }},
+    {"NPN_Write",
+     "write",
+     {kA1, kA2, 9, kA3},
+     [] { return NPN_Write(kNpp, stream(second), 9, third) == 70000; }},
     {"NPN_DestroyStream",
      "destroystream",
-     {a1, a2, 2},
-     [] { return NPN_DestroyStream(npp, stream(second), NPRES_USER_BREAK) == 26; }},
-    {"NPN_Status", "status", {a1, a2}, [] { return NPN_Status(npp, text(second)), true; }},
-    {"NPN_UserAgent", "uagent", {a1}, [] { return std::strcmp(NPN_UserAgent(npp), "agent") == 0; }},
+     {kA1, kA2, 2},
+     [] { return NPN_DestroyStream(kNpp, stream(second), NPRES_USER_BREAK) == 26; }},
+    {"NPN_Status", "status", {kA1, kA2}, [] { return NPN_Status(kNpp, text(second)), true; }},
+    {"NPN_UserAgent", "uagent", {kA1}, [] { return std::strcmp(NPN_UserAgent(kNpp), "agent") == 0; }},
     {"NPN_MemAlloc", "memalloc", {9}, [] { return NPN_MemAlloc(9) == address<void*>(77); }},
-    {"NPN_MemFree", "memfree", {a2}, [] { return NPN_MemFree(second), true; }},
+    {"NPN_MemFree", "memfree", {kA2}, [] { return NPN_MemFree(second), true; }},
     {"NPN_MemFlush", "memflush", {9}, [] { return NPN_MemFlush(9) == 80000; }},
     {"NPN_ReloadPlugins", "reloadplugins", {1}, [] { return NPN_ReloadPlugins(1), true; }},
     {"NPN_GetURLNotify",
      "geturlnotify",
-     {a1, a2, a3, a4},
-     [] { return NPN_GetURLNotify(npp, text(second), text(third), fourth) == 27; }},
+     {kA1, kA2, kA3, kA4},
+     [] { return NPN_GetURLNotify(kNpp, text(second), text(third), fourth) == 27; }},
     {"NPN_PostURLNotify",
      "posturlnotify",
-     {a1, a2, a3, 9, a4, 1, a5},
-     [] { return NPN_PostURLNotify(npp, text(second), text(third), 9, text(fourth), 1, fifth) == 28; }},
+     {kA1, kA2, kA3, 9, kA4, 1, kA5},
+     [] { return NPN_PostURLNotify(kNpp, text(second), text(third), 9, text(fourth), 1, fifth) == 28; }},
     {"NPN_GetValue",
      "getvalue",
-     {a1, 15, a2},
-     [] { return NPN_GetValue(npp, NPNVWindowNPObject, second) == 29; }},
+     {kA1, 15, kA2},
+     [] { return NPN_GetValue(kNpp, NPNVWindowNPObject, second) == 29; }},
     {"NPN_SetValue",
      "setvalue",
-     {a1, 3, a2},
-     [] { return NPN_SetValue(npp, NPPVpluginWindowBool, second) == 30; }},
+     {kA1, 3, kA2},
+     [] { return NPN_SetValue(kNpp, NPPVpluginWindowBool, second) == 30; }},
     {"NPN_InvalidateRect",
      "invalidaterect",
-     {a1, a2},
-     [] { return NPN_InvalidateRect(npp, static_cast<NPRect*>(second)), true; }},
+     {kA1, kA2},
+     [] { return NPN_InvalidateRect(kNpp, static_cast<NPRect*>(second)), true; }},
     {"NPN_InvalidateRegion",
      "invalidateregion",
-     {a1, a2},
-     [] { return NPN_InvalidateRegion(npp, second), true; }},
-    {"NPN_ForceRedraw", "forceredraw", {a1}, [] { return NPN_ForceRedraw(npp), true; }},
+     {kA1, kA2},
+     [] { return NPN_InvalidateRegion(kNpp, second), true; }},
+    {"NPN_ForceRedraw", "forceredraw", {kA1}, [] { return NPN_ForceRedraw(kNpp), true; }},
     {"NPN_GetStringIdentifier",
      "getstringidentifier",
-     {a2},
+     {kA2},
      [] { return NPN_GetStringIdentifier(text(second)) == address<NPIdentifier>(31); }},
     {"NPN_GetStringIdentifiers",
      "getstringidentifiers",
-     {a2, 9, a3},
+     {kA2, 9, kA3},
      [] {
          return NPN_GetStringIdentifiers(static_cast<const char**>(second), 9,
                                          static_cast<NPIdentifier*>(third)),
@@ -273,62 +292,68 @@ const Gate gates[] = {
      "getintidentifier",
      {9},
      [] { return NPN_GetStringIdentifier(9) == address<NPIdentifier>(32); }},
-    {"NPN_IdentifierIsString", "identifierisstring", {a2}, [] { return NPN_IdentifierIsString(second); }},
+    {"NPN_IdentifierIsString", "identifierisstring", {kA2}, [] { return NPN_IdentifierIsString(second); }},
     {"NPN_UTF8FromIdentifier",
      "utf8fromidentifier",
-     {a2},
+     {kA2},
      [] { return NPN_UTF8FromIdentifier(second) == address<char*>(33); }},
-    {"NPN_IntFromIdentifier", "intfromidentifier", {a2}, [] { return NPN_IntFromIdentifier(second) == -34; }},
+    {"NPN_IntFromIdentifier",
+     "intfromidentifier",
+     {kA2},
+     [] { return NPN_IntFromIdentifier(second) == -34; }},
     {"NPN_CreateObject",
      "createobject",
-     {a1, a2},
-     [] { return NPN_CreateObject(npp, static_cast<NPClass*>(second)) == address<NPObject*>(35); }},
+     {kA1, kA2},
+     [] { return NPN_CreateObject(kNpp, static_cast<NPClass*>(second)) == address<NPObject*>(35); }},
     {"NPN_RetainObject",
      "retainobject",
-     {a2},
+     {kA2},
      [] { return NPN_RetainObject(object(second)) == address<NPObject*>(36); }},
-    {"NPN_ReleaseObject", "releaseobject", {a2}, [] { return NPN_ReleaseObject(object(second)), true; }},
+    {"NPN_ReleaseObject", "releaseobject", {kA2}, [] { return NPN_ReleaseObject(object(second)), true; }},
     {"NPN_Invoke",
      "invoke",
-     {a1, a2, a3, a4, 9, a5},
-     [] { return NPN_Invoke(npp, object(second), third, variant(fourth), 9, variant(fifth)); }},
+     {kA1, kA2, kA3, kA4, 9, kA5},
+     [] { return NPN_Invoke(kNpp, object(second), third, variant(fourth), 9, variant(fifth)); }},
     {"NPN_InvokeDefault",
      "invokeDefault",
-     {a1, a2, a3, 9, a4},
-     [] { return NPN_InvokeDefault(npp, object(second), variant(third), 9, variant(fourth)); }},
+     {kA1, kA2, kA3, 9, kA4},
+     [] { return NPN_InvokeDefault(kNpp, object(second), variant(third), 9, variant(fourth)); }},
     {"NPN_Evaluate",
      "evaluate",
-     {a1, a2, a3, a4},
-     [] { return NPN_Evaluate(npp, object(second), static_cast<NPString*>(third), variant(fourth)); }},
+     {kA1, kA2, kA3, kA4},
+     [] { return NPN_Evaluate(kNpp, object(second), static_cast<NPString*>(third), variant(fourth)); }},
     {"NPN_GetProperty",
      "getproperty",
-     {a1, a2, a3, a4},
-     [] { return NPN_GetProperty(npp, object(second), third, variant(fourth)); }},
+     {kA1, kA2, kA3, kA4},
+     [] { return NPN_GetProperty(kNpp, object(second), third, variant(fourth)); }},
     {"NPN_SetProperty",
      "setproperty",
-     {a1, a2, a3, a4},
-     [] { return NPN_SetProperty(npp, object(second), third, variant(fourth)); }},
+     {kA1, kA2, kA3, kA4},
+     [] { return NPN_SetProperty(kNpp, object(second), third, variant(fourth)); }},
     {"NPN_RemoveProperty",
      "removeproperty",
-     {a1, a2, a3},
-     [] { return NPN_RemoveProperty(npp, object(second), third); }},
+     {kA1, kA2, kA3},
+     [] { return NPN_RemoveProperty(kNpp, object(second), third); }},
     {"NPN_HasProperty",
      "hasproperty",
-     {a1, a2, a3},
-     [] { return NPN_HasProperty(npp, object(second), third); }},
-    {"NPN_HasMethod", "hasmethod", {a1, a2, a3}, [] { return NPN_HasMethod(npp, object(second), third); }},
+     {kA1, kA2, kA3},
+     [] { return NPN_HasProperty(kNpp, object(second), third); }},
+    {"NPN_HasMethod",
+     "hasmethod",
+     {kA1, kA2, kA3},
+     [] { return NPN_HasMethod(kNpp, object(second), third); }},
     {"NPN_ReleaseVariantValue",
      "releasevariantvalue",
-     {a2},
+     {kA2},
      [] { return NPN_ReleaseVariantValue(variant(second)), true; }},
     {"NPN_SetException",
      "setexception",
-     {a2, a3},
+     {kA2, kA3},
      [] { return NPN_SetException(object(second), text(third)), true; }},
     {"NPN_PluginThreadAsyncCall",
      "pluginthreadasynccall",
-     {a1, a2, a3},
-     [] { return NPN_PluginThreadAsyncCall(npp, reinterpret_cast<void (*)(void*)>(second), third), true; }},
+     {kA1, kA2, kA3},
+     [] { return NPN_PluginThreadAsyncCall(kNpp, reinterpret_cast<void (*)(void*)>(second), third), true; }},
 };
 
 class BrowserGatesTest : public BorderTest {
@@ -344,8 +369,8 @@ protected:
 };
 
 TEST_F(BrowserGatesTest, EachGatePassesArgumentsAndResultOn) {
-    EXPECT_EQ(std::size(gates), 39U);
-    for (const Gate& gate : gates) {
+    EXPECT_EQ(std::size(kGates), 39U);
+    for (const Gate& gate : kGates) {
         g_note = {};
         EXPECT_TRUE(gate.call()) << gate.name;
         EXPECT_EQ(g_note.entry, gate.entry);
@@ -367,7 +392,7 @@ TEST_F(BrowserGatesTest, AMissingEntryForStringIdentifiersGivesNull) {
 
 TEST_F(BrowserGatesTest, EachGateLogsOneLineUnderCommon) {
     for (const int level : {9, 1}) {
-        for (const Gate& gate : gates) {
+        for (const Gate& gate : kGates) {
             EXPECT_EQ(logOf(level, [&] { gate.call(); }), logLine("COMMON", gate.name, " is called\n"));
         }
     }
@@ -377,7 +402,7 @@ TEST_F(BrowserGatesTest, OtherModulesLogNoGate) {
     for (const int level : {0, 2, 3, 4, 5, 6, 7, 8, 10, 11, 12, 13}) {
         EXPECT_EQ(logOf(level,
                         [] {
-                            for (const Gate& gate : gates) {
+                            for (const Gate& gate : kGates) {
                                 gate.call();
                             }
                         }),

@@ -18,9 +18,9 @@ using ::testing::StartsWith;
 
 namespace {
 
-const char managerType[] = "application/oipfapplicationmanager";
+const char kManagerType[] = "application/oipfapplicationmanager";
 
-const std::string bannerRule = std::string(91, '*') + "\n";
+const std::string kBannerRule = std::string(91, '*') + "\n";
 
 class EntryPointsTest : public BorderTest {
 protected:
@@ -128,18 +128,18 @@ TEST_F(EntryPointsTest, InitialiseAsksNothingOfTheBrowserOrThePlatform) {
 TEST_F(EntryPointsTest, InitialisePrintsTheStartBanner) {
     EXPECT_EQ(
         outputOf([] { NPP_Initialize(); }),
-        bannerRule +
+        kBannerRule +
             "                               :: ORDA :: PLUGIN :: START ::                               \n"
             "                            :: VERSION:1.25 :: DATE:21.03.2012 ::                           \n" +
-            bannerRule);
+            kBannerRule);
 }
 
 TEST_F(EntryPointsTest, ShutdownPrintsTheEndBannerAndReturnsNoError) {
     EXPECT_EQ(
         outputOf([] { EXPECT_EQ(NP_Shutdown(), NPERR_NO_ERROR); }),
-        bannerRule +
+        kBannerRule +
             "                                 :: ORDA :: PLUGIN :: END ::                               \n" +
-            bannerRule);
+            kBannerRule);
 }
 
 TEST_F(EntryPointsTest, ShutdownForgetsTheBrowsersTable) {
@@ -240,7 +240,7 @@ TEST_F(EntryPointsTest, AnInstanceWithoutModelTellsNothing) {
 }
 
 TEST_F(EntryPointsTest, TheScriptableObjectComesWithAReferenceEachTime) {
-    const EmbeddedObject manager = browser.embed(managerType);
+    const EmbeddedObject manager = browser.embed(kManagerType);
     NPObject* first = nullptr;
     NPObject* second = nullptr;
     EXPECT_EQ(browser.plugin().getvalue(manager.npp(), NPPVpluginScriptableNPObject, &first), NPERR_NO_ERROR);
@@ -255,7 +255,7 @@ TEST_F(EntryPointsTest, TheScriptableObjectComesWithAReferenceEachTime) {
 }
 
 TEST_F(EntryPointsTest, SetValueIsLoggedAndWithoutEffect) {
-    const EmbeddedObject manager = browser.embed(managerType);
+    const EmbeddedObject manager = browser.embed(kManagerType);
     log.clear();
     for (const int variable : {0, 4, 15, 99}) {
         EXPECT_EQ(browser.plugin().setvalue(manager.npp(), static_cast<NPNVariable>(variable), nullptr),
@@ -268,7 +268,7 @@ TEST_F(EntryPointsTest, SetValueIsLoggedAndWithoutEffect) {
 }
 
 TEST_F(EntryPointsTest, StreamAsFileAndPrintOnlyLog) {
-    const EmbeddedObject manager = browser.embed(managerType);
+    const EmbeddedObject manager = browser.embed(kManagerType);
     log.clear();
     NPStream stream{};
     EXPECT_EQ(logOf(9,
@@ -284,7 +284,7 @@ TEST_F(EntryPointsTest, StreamAsFileAndPrintOnlyLog) {
 }
 
 TEST_F(EntryPointsTest, AKnownTypeGivesTheInstanceAModelOfItsKind) {
-    const EmbeddedObject manager = browser.embed(managerType);
+    const EmbeddedObject manager = browser.embed(kManagerType);
     EXPECT_EQ(manager.error(), NPERR_NO_ERROR);
     ASSERT_NE(manager.model(), nullptr);
     EXPECT_EQ(static_cast<PluginBase*>(manager.model())->getObjectId(), 200);
@@ -361,13 +361,13 @@ TEST_F(EntryPointsTest, NewInstanceLogsTheType) {
 }
 
 TEST_F(EntryPointsTest, DestroyClearsTheInstance) {
-    const EmbeddedObject manager = browser.embed(managerType);
+    const EmbeddedObject manager = browser.embed(kManagerType);
     EXPECT_EQ(manager.destroy(), NPERR_NO_ERROR);
     EXPECT_EQ(manager.model(), nullptr);
 }
 
 TEST_F(EntryPointsTest, DestroyLogsTheKindsLine) {
-    EXPECT_THAT(logOf(9, [this] { browser.embed(managerType).destroy(); }),
+    EXPECT_THAT(logOf(9, [this] { browser.embed(kManagerType).destroy(); }),
                 AllOf(HasSubstr(logLine("COMMON", "destroyInst", " is called \n")),
                       HasSubstr(logLine("COMMON", "destroyInst", "APPMANAGER_OBJ_ID delete\n"))));
 }
@@ -403,7 +403,7 @@ TEST_F(EntryPointsTest, OnlySetWindowLogsTheInvalidInstance) {
 }
 
 TEST_F(EntryPointsTest, AnObjectThatTakesNoStreamsRefusesThemAndReportsSuccess) {
-    const EmbeddedObject manager = browser.embed(managerType);
+    const EmbeddedObject manager = browser.embed(kManagerType);
     log.clear();
     BrowserStream& stream = manager.newStream("http://page.example/a.mp4");
     EXPECT_EQ(stream.error(), NPERR_NO_ERROR);
@@ -417,7 +417,7 @@ TEST_F(EntryPointsTest, AnObjectThatTakesNoStreamsRefusesThemAndReportsSuccess) 
 }
 
 TEST_F(EntryPointsTest, AnObjectWithoutWindowIgnoresWindows) {
-    const EmbeddedObject manager = browser.embed(managerType);
+    const EmbeddedObject manager = browser.embed(kManagerType);
     log.clear();
     EXPECT_EQ(manager.setWindow(1, 2, 3, 4), NPERR_NO_ERROR);
     EXPECT_EQ(manager.setNullWindow(), NPERR_NO_ERROR);

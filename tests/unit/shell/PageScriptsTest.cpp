@@ -1,7 +1,13 @@
-// The texts that the plug-in has the page evaluate, byte for byte.
+// The scripts that the plug-in has the page evaluate, byte for byte.
 #include "common/PluginUtils.h"
+
+#include <algorithm>
+#include <fstream>
+#include <iterator>
+
 #include "tests/support/BorderTest.h"
 
+using ::testing::AllOf;
 using ::testing::HasSubstr;
 using ::testing::Not;
 using ::testing::StartsWith;
@@ -9,6 +15,41 @@ using ::testing::StartsWith;
 namespace {
 
 using PageScriptsTest = BorderTest;
+
+// A script byte for byte, as a file of the folder `scripts` holds it. A script is one line; its file ends
+// where the script ends, without a line end.
+void expectBytesOf(const char* file, const std::string& script) {
+    std::ifstream stream(std::string(TELIX_UNIT_TESTS "/shell/scripts/") + file, std::ios::binary);
+    ASSERT_TRUE(stream) << file;
+    const std::string expected{std::istreambuf_iterator<char>(stream), std::istreambuf_iterator<char>()};
+    const auto [here, there] = std::mismatch(expected.begin(), expected.end(), script.begin(), script.end());
+    if (here == expected.end() && there == script.end()) {
+        return;
+    }
+    const auto place = static_cast<size_t>(here - expected.begin());
+    const size_t from = place < 20 ? 0 : place - 20;
+    ADD_FAILURE() << file << ": byte " << place
+                  << " is the first that differs\n  expected: " << Value(expected.substr(from, 60))
+                  << "\n  but is:   " << Value(script.substr(from, 60));
+}
+
+TEST_F(PageScriptsTest, EveryByteOfAScriptIsWhatPagesRelyOn) {
+    expectBytesOf("domEventScript.txt", domEventScript("tv", "PlayStateChange", true, false));
+    expectBytesOf("streamEventScript.txt", streamEventScript("name", "41420A", "trigger", "tv"));
+    expectBytesOf("streamEventScript.withoutText.txt", streamEventScript("name", "", "error", "tv"));
+    expectBytesOf("parseStreamEventXMLScript.add.txt",
+                  parseStreamEventXMLScript("dvb://1", "name", "tv", true));
+    expectBytesOf("parseStreamEventXMLScript.remove.txt",
+                  parseStreamEventXMLScript("dvb://1", "name", "tv", false));
+    expectBytesOf("getPlayCountVal.txt", getPlayCountVal("player"));
+    expectBytesOf("getEncodedURL.txt", getEncodedURL("http://a.example/b c"));
+}
+
+TEST_F(PageScriptsTest, AnArgumentThatLooksLikeAPlaceStaysAnArgument) {
+    EXPECT_THAT(parseStreamEventXMLScript("@@", "@\n@", "i@@", true),
+                AllOf(StartsWith("var requestURL = '@@'; var eventName = '@\n@';var httpReq"),
+                      HasSubstr("document.getElementById('i@@');objElem.addStreamEventListener(")));
+}
 
 TEST_F(PageScriptsTest, ADomEventIsDispatchedAtTheElement) {
     EXPECT_EQ(domEventScript("a", "b", true, false),
@@ -51,10 +92,10 @@ TEST_F(PageScriptsTest, AStreamEventWithoutTextLeavesItOut) {
 }
 
 TEST_F(PageScriptsTest, ControlCharactersHaveEscapes) {
-    const char* const escapes[] = {"\\a", "\\b", "\\t", "\\n", "\\v", "\\f", "\\r"};
+    const char* const kEscapes[] = {"\\a", "\\b", "\\t", "\\n", "\\v", "\\f", "\\r"};
     for (int value = -1; value < 256; ++value) {
         EXPECT_EQ(getEscapeChar(static_cast<ESC_CHAR_ENUM_T>(value)),
-                  value >= 7 && value <= 13 ? escapes[value - 7] : "")
+                  value >= 7 && value <= 13 ? kEscapes[value - 7] : "")
             << value;
     }
 }
@@ -82,7 +123,7 @@ TEST_F(PageScriptsTest, APairWithoutLeadingDigitAndAZeroAddNothing) {
 }
 
 // The text of parseStreamEventXMLScript between url and method name.
-const std::string streamEventScriptBody =
+const std::string kStreamEventScriptBody =
     "var httpReq = new XMLHttpRequest();httpReq.open('GET', requestURL, true);"
     "httpReq.onreadystatechange = function(){\tif((httpReq.readyState == 4) && (httpReq.status == 200)){"
     "\t\tvar eventId_val = null;\t\tvar comp_tag_val = null;\t\tif(xmlData = httpReq.responseXML){"
@@ -103,12 +144,12 @@ const std::string streamEventScriptBody =
 
 TEST_F(PageScriptsTest, AStreamEventDescriptionIsFetchedAndHandedToTheElement) {
     EXPECT_EQ(parseStreamEventXMLScript("dvb://1", "name", "tv", true),
-              "var requestURL = 'dvb://1'; var eventName = 'name';" + streamEventScriptBody +
+              "var requestURL = 'dvb://1'; var eventName = 'name';" + kStreamEventScriptBody +
                   "var objElem = document.getElementById('tv');objElem.addStreamEventListener(requestURL, "
                   "eventName, "
                   "eventId_val, comp_tag_val);}};httpReq.send(null);");
     EXPECT_EQ(parseStreamEventXMLScript("dvb://1", "name", "tv", false),
-              "var requestURL = 'dvb://1'; var eventName = 'name';" + streamEventScriptBody +
+              "var requestURL = 'dvb://1'; var eventName = 'name';" + kStreamEventScriptBody +
                   "var objElem = document.getElementById('tv');objElem.removeStreamEventListener(requestURL, "
                   "eventName, eventId_val, comp_tag_val);}};httpReq.send(null);");
 }

@@ -43,7 +43,7 @@ protected:
         return model.init(mode, static_cast<int>(names.size()), names.data(), values.data());
     }
 
-    // What becomes of an address on a page.
+    // What becomes of a URL on a page.
     std::string resolved(const std::string& page, const std::string& address) {
         browser.setAddress(page);
         return model.getBaseURL(address);

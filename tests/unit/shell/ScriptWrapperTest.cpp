@@ -11,6 +11,7 @@ using ::testing::AllOf;
 using ::testing::ElementsAre;
 using ::testing::HasSubstr;
 using ::testing::IsEmpty;
+using ::testing::MatchesRegex;
 using ::testing::Not;
 
 namespace {
@@ -39,6 +40,7 @@ public:
     std::string join(const std::string& text, uint32_t number, bool flag) {
         return text + " " + std::to_string(number) + (flag ? " yes" : " no");
     }
+    void note(const std::string&, const std::string&, const std::string&) {}
     NPObject* echo(NPObject* object) { return handOut(object); }
 
     static inline int alive = 0;
@@ -55,7 +57,7 @@ bool readDuplicate(PluginBase& model, NPVariant& result) {
     return true;
 }
 
-constexpr ScriptMember shelfMembers[] = {
+constexpr ScriptMember kShelfMembers[] = {
     property("isOpen", read<&Shelf::isOpen>),
     property("depth", read<&Shelf::depth>, write<&Shelf::setDepth>),
     property("highNumber", read<&Shelf::highNumber>),
@@ -68,16 +70,17 @@ constexpr ScriptMember shelfMembers[] = {
     method("item", invoke<&Shelf::item>),
     method("clear", invoke<&Shelf::clear>),
     method("join", invoke<&Shelf::join>),
+    method("note", invoke<&Shelf::note>),
     method("echo", invoke<&Shelf::echo>),
 };
 
-constexpr ScriptArray shelfItems = scriptArray<&Shelf::length, &Shelf::item>(LogModule::CHANNEL, " ");
-constexpr ScriptClass shelfClass =
-    ScriptClass("JSShelf", LogModule::CHANNEL, shelfMembers).withArray(&shelfItems);
+constexpr ScriptArray kShelfItems = scriptArray<&Shelf::length, &Shelf::item>(LogModule::CHANNEL, " ");
+constexpr ScriptClass kShelfClass =
+    ScriptClass("JSShelf", LogModule::CHANNEL, kShelfMembers).withArray(&kShelfItems);
 
-class JSShelf final : public SubObjectWrapper<Shelf, std::size(shelfMembers)> {
+class JSShelf final : public SubObjectWrapper<Shelf, std::size(kShelfMembers)> {
 public:
-    explicit JSShelf(NPP npp) : SubObjectWrapper(npp, shelfClass) {}
+    explicit JSShelf(NPP npp) : SubObjectWrapper(npp, kShelfClass) {}
 };
 
 class ScriptWrapperTest : public BorderTest {
@@ -121,6 +124,22 @@ TEST_F(ScriptWrapperTest, AWrapperOwnsItsModel) {
     EXPECT_EQ(Shelf::alive, 0);
 }
 
+TEST_F(ScriptWrapperTest, TheDestructorLogsFirstUnderItsOwnNameThenDeletesTheModel) {
+    shelf.set("onChange", browser.function("listener")); // its release is what the model's end logs
+    const std::string text = logOf(1, [this] { shelf = {}; });
+    EXPECT_THAT(text,
+                MatchesRegex(" PLUGIN >>> CHANNEL :: ~JSShelf :: Destructor called, This:-- 0x[0-9a-f]+ --\n"
+                             " PLUGIN >>> COMMON :: NPN_ReleaseObject ::  is called\n"));
+}
+
+TEST_F(ScriptWrapperTest, TheWrapperOfAnEmbeddedObjectLogsItsDestructorToo) {
+    EmbeddedObject manager = browser.embed("application/oipfparentalcontrolmanager");
+    manager.scriptObject();
+    manager.destroy();
+    EXPECT_THAT(logOf(8, [&] { manager.dropScriptObject(); }),
+                MatchesRegex(" PLUGIN >>> PARENTAL :: ~JSParentalControlManager :: Destructor called, .*\n"));
+}
+
 TEST_F(ScriptWrapperTest, TheWrapperOfNullIsNull) {
     EXPECT_EQ(wrapperOf<JSShelf>(nullptr), nullptr);
 }
@@ -129,7 +148,7 @@ TEST_F(ScriptWrapperTest, NamesAreInternedOnceInTheOrderOfTheTable) {
     log.clear();
     const ObjectRef another = ObjectRef::adopt(createScriptObject<JSShelf>(tv.npp()));
     std::vector<std::string> expected = {"NPN_CreateObject JSShelf#2"};
-    for (const ScriptMember& member : shelfMembers) {
+    for (const ScriptMember& member : kShelfMembers) {
         expected.push_back("NPN_GetStringIdentifier \"" + std::string(member.name) + "\"");
     }
     EXPECT_EQ(log.everything(), expected);
@@ -233,6 +252,14 @@ TEST_F(ScriptWrapperTest, ArgumentsOfTheRightTypesReachTheModel) {
     EXPECT_EQ(shelf.call("join", "a", 2.9, false), "a 2 no");
     EXPECT_EQ(shelf.call("join", "a", -1.0, false), "a 0 no");
     EXPECT_EQ(shelf.call("join", "a", 5e9, false), "a 4294967295 no");
+}
+
+TEST_F(ScriptWrapperTest, ArgumentsAreConvertedFromTheFirstToTheLast) {
+    const auto converted = [](const std::string& text) {
+        return logLine("COMMON", "stringValue", "In stringValue() function, string is: " + text + ". \n");
+    };
+    EXPECT_EQ(logOf(9, [this] { EXPECT_TRUE(shelf.call("note", "a", "b", "c")); }),
+              converted("a") + converted("b") + converted("c"));
 }
 
 TEST_F(ScriptWrapperTest, ArgumentsOfOtherTypesFailTheCall) {

@@ -56,7 +56,7 @@ Converted convert(const std::string& source, size_t room = 16, bool strict = tru
     return {result, target, static_cast<size_t>(sourceStart - source.data())};
 }
 
-// The bytes that utf8ToUtf16Converter makes, or an empty value for null. Checks the zero behind them.
+// The bytes that utf8ToUtf16Converter makes, or an empty value for null. Checks the zero after them.
 std::optional<std::string> bytesOf(const std::string& source) {
     const ArgumentArray array({source});
     unsigned int length = 4711;

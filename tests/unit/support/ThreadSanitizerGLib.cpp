@@ -1,5 +1,5 @@
 // Under ThreadSanitizer only: a g_idle_add in front of GLib's. GLib hands sources over by locks of its own
-// that the sanitizer cannot see, so this tells it what the hand-over guarantees: what a thread did before it
+// that the sanitizer cannot see, so this states what the hand-over guarantees: what a thread did before it
 // queued has happened when the main loop runs the function. Nothing else is hidden from the sanitizer.
 #ifdef __SANITIZE_THREAD__
 

@@ -254,7 +254,7 @@ TEST_F(VideoBroadcastTest, TheWrapperIsMadeOnceAndEachCallerGetsAReference) {
 TEST_F(VideoBroadcastTest, EventsOfTheBrowserAreNotHandled) {
     EXPECT_EQ(embed().handleEvent(), 0);
     // Nor do they reach the object: only one kind of object is given them.
-    for (const ObjectKind* const* kind = objectKinds; *kind; ++kind) {
+    for (const ObjectKind* const* kind = kObjectKinds; *kind; ++kind) {
         EXPECT_EQ((*kind)->handleEvent != nullptr, (*kind)->id == 200) << (*kind)->id;
     }
 }
