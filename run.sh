@@ -1,14 +1,14 @@
 #!/usr/bin/env bash
-# The television's window: what is on it is told by the usage below. Installs what is missing and builds what has changed.
+# Starts the desktop television, see the usage below. Installs missing packages and builds what has changed.
 set -euo pipefail
 
 usage='Usage: ./run.sh [OPTION...] [PAGE | TRANSPORT-STREAM...]
 
-Without PAGE, the demonstration on a generated multiplex of three services, with clips for its media page.
-  PAGE                the page of that address or file (.html, .htm, .xhtml, .hbbtv)
-  TRANSPORT-STREAM    a file, or a folder of *.ts: the demonstration shows their services
-  OPTION              of build/desktop/telix-tv, see its --help
-Without a display a screenshot is written instead, of the picture when there is one within 20 seconds.'
+Without arguments, shows the demonstration application with a generated multiplex of three services.
+  PAGE                show this page instead: a URL, or a file *.html, *.htm, *.xhtml or *.hbbtv
+  TRANSPORT-STREAM    show the services of these transport streams: a file, or a folder with *.ts
+  OPTION              an option of build/desktop/telix-tv, see its --help
+Without a display, writes a screenshot instead, as soon as there is a picture or after 20 seconds.'
 
 fail() {
     echo "run.sh: $1" >&2
@@ -17,8 +17,8 @@ fail() {
 
 top=$(cd "$(dirname "${BASH_SOURCE[0]}")" && pwd)
 build="$top/build"
-options=()
-given=()
+options=() # of telix-tv
+operands=() # pages and transport streams
 while [ $# -gt 0 ]; do
     case "$1" in
     -h | --help)
@@ -28,21 +28,22 @@ while [ $# -gt 0 ]; do
     --fullscreen | --inspect | --version | --wait-for-picture | --*=*) options+=("$1") ;;
     --)
         shift
-        given+=("$@")
+        operands+=("$@")
         break
         ;;
     -*)
-        [ $# -gt 1 ] || fail "option $1 has no value"
+        [ $# -gt 1 ] || fail "$1: option needs a value"
         options+=("$1" "$2")
         shift
         ;;
-    *) given+=("$1") ;;
+    *) operands+=("$1") ;;
     esac
     shift
 done
 
 "$top/tools/install-packages.sh" run
 
+# Whether there is a sync byte at the start of five consecutive packets of 188 bytes, at any offset.
 is_transport_stream() {
     python3 - "$1" <<'END'
 import sys
@@ -52,46 +53,46 @@ sys.exit(not any(all(head[at + 188 * n:at + 188 * n + 1] == b'G' for n in range(
 END
 }
 
-# Sets `page`, or adds to `channels`.
+# Checks an operand; sets `page`, or adds to `channels`.
 page=
 channels=()
-look_at() {
+read_operand() {
     case "$1" in
     *://* | data:* | about:*)
         page=$1
         return
         ;;
     esac
-    [ -e "$1" ] || fail "there is no such file: $1"
-    [ -r "$1" ] || fail "it can't be read: $1"
+    [ -e "$1" ] || fail "$1: No such file"
+    [ -r "$1" ] || fail "$1: not readable"
     case "${1,,}" in
     *.html | *.htm | *.xhtml | *.hbbtv)
-        [ -f "$1" ] || fail "it is no file: $1"
+        [ -f "$1" ] || fail "$1: not a file"
         page=$1
         return
         ;;
     esac
     case "$1" in
-    *[\;#]*) fail "a transport stream can't have ; or # in its name: $1" ;;
+    *[\;#]*) fail "$1: the name of a transport stream cannot contain ; or #" ;;
     esac
     if [ -d "$1" ]; then
-        compgen -G "$1/*.ts" >/dev/null || fail "no *.ts in this folder: $1"
+        compgen -G "$1/*.ts" >/dev/null || fail "$1: no *.ts in this folder"
     else
-        [ -f "$1" ] || fail "it is no file: $1"
-        is_transport_stream "$1" || fail "neither a page nor a transport stream: $1"
+        [ -f "$1" ] || fail "$1: not a file"
+        is_transport_stream "$1" || fail "$1: neither a page nor a transport stream"
     fi
     channels+=("$(realpath "$1")")
 }
-for each in "${given[@]}"; do
-    look_at "$each"
+for operand in "${operands[@]}"; do
+    read_operand "$operand"
 done
-[ -z "$page" ] || [ ${#given[@]} -eq 1 ] || fail "a page stands alone: ${given[*]}"
+[ -z "$page" ] || [ ${#operands[@]} -eq 1 ] || fail "$page: a page must be the only argument"
 
 if [ ! -f "$build/CMakeCache.txt" ]; then
     cmake -S "$top" -B "$build" -G Ninja -DTELIX_BUILD_TESTS=OFF -DTELIX_BUILD_BENCH=OFF
 fi
 cmake --build "$build" --target telix-tv nptelixjs_desktop telix telixctl
-# The library would fall back to its defaults; here the viewer can still mend the file.
+# Reports errors in the configuration file, for which the platform library would use defaults.
 "$build/desktop/telixctl" check-config >/dev/null
 
 if [ ${#channels[@]} -gt 0 ]; then
@@ -100,23 +101,23 @@ if [ ${#channels[@]} -gt 0 ]; then
 fi
 if [ -z "$page" ]; then
     "$top/tools/make-clips.sh" "$build/media"
-    # The server ends with this process, which becomes the window or waits for it.
+    # The server stops when this process exits, which becomes telix-tv or waits for it.
     exec 3< <(exec "$top/tools/media_server.py" --until-parent-ends "=$top/apps" "media=$build/media")
-    read -r -t 20 address <&3 || fail "the server for the demonstration did not start"
+    read -r -t 60 url <&3 || fail "tools/media_server.py: did not start within 60 seconds"
     exec 3<&-
-    page="$address/demo/index.html"
+    page="$url/demo/index.html"
 fi
 
 if [ -n "${DISPLAY:-}" ]; then
     exec "$build/desktop/telix-tv" "${options[@]}" "$page"
 fi
-picture="$build/screenshot.png"
-echo "There is no display: the page's picture goes to $picture"
+screenshot="$build/screenshot.png"
+echo "No display: writing a screenshot to $screenshot"
 status=0
 xvfb-run -a -s "-screen 0 1280x720x24" "$build/desktop/telix-tv" --wait-for-picture --timeout 20 \
-    --screenshot "$picture" "${options[@]}" "$page" || status=$?
-# A page need not have a picture.
-if [ $status -eq 1 ] && [ ${#options[@]} -eq 0 ] && [ ${#given[@]} -eq 1 ] && [ ${#channels[@]} -eq 0 ]; then
+    --screenshot "$screenshot" "${options[@]}" "$page" || status=$?
+# A page that shows no video is not an error.
+if [ $status -eq 1 ] && [ ${#options[@]} -eq 0 ] && [ ${#operands[@]} -eq 1 ] && [ ${#channels[@]} -eq 0 ]; then
     status=0
 fi
 exit $status

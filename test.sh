@@ -1,6 +1,6 @@
 #!/usr/bin/env bash
-# Runs all tests: the unit tests with AddressSanitizer and UndefinedBehaviorSanitizer, then everything as shipped.
-# Installs what is missing and builds what has changed.
+# Runs all tests: the unit tests with AddressSanitizer and UndefinedBehaviorSanitizer, then all tests of the release build.
+# Installs missing packages and builds what has changed.
 set -euo pipefail
 cd "$(dirname "${BASH_SOURCE[0]}")"
 
@@ -13,6 +13,6 @@ cmake --preset release -DTELIX_BUILD_TESTS=ON -DTELIX_BUILD_BENCH=ON -DTELIX_BUI
     -DTELIX_BUILD_BROWSER=ON >/dev/null
 cmake --build --preset release -- -k 0
 
-# More than there are cores: many tests wait for pictures and sound.
+# More jobs than cores, because many tests wait for video and audio.
 ctest --preset asan -j $((cores + 1)) --output-on-failure
 ctest --preset release -j $((2 * cores)) --output-on-failure

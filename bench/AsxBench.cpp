@@ -1,6 +1,6 @@
-// Reading a playlist, beside a SAX parse of the same bytes that calls empty handlers and keeps nothing,
-// whereas ours builds its list. The texts that XML knows nothing of are the ones in which each tag would have
-// to look far ahead: time per byte has to be the same for all sizes there as well.
+// Playlist parsing, compared with a SAX parser that calls empty handlers on the same bytes, while ours builds
+// a list. In the malformed documents each tag could cause a long search ahead; the time per byte must not
+// grow with their size.
 #include <benchmark/benchmark.h>
 #include <expat.h>
 
@@ -20,7 +20,7 @@ std::string document(const std::string& head, const std::string& piece, const st
     return text + tail;
 }
 
-// About a hundred bytes a clip, so that 10 MB have a hundred thousand.
+// About 100 bytes per clip: 10 MB have 100,000 clips.
 std::string playlist(size_t size) {
     return document("<ASX VERSION=\"3.0\">\n<TITLE>Evening</TITLE>\n",
                     "<Entry><TITLE>Clip</TITLE><Ref HREF=\"http://media.example/a/clip.mp4\"/>"
@@ -68,7 +68,7 @@ void parseXml(benchmark::State& state, std::string (*make)(size_t)) {
             parser, [](void*, const XML_Char*, const XML_Char**) {}, [](void*, const XML_Char*) {});
         XML_SetCharacterDataHandler(parser, [](void*, const XML_Char*, int) {});
         if (XML_Parse(parser, text.data(), static_cast<int>(text.size()), XML_TRUE) != XML_STATUS_OK) {
-            state.SkipWithError("the text is not well-formed");
+            state.SkipWithError("the document is not well-formed");
         }
         XML_ParserFree(parser);
     }

@@ -1,6 +1,6 @@
-// What a message of the player costs from the platform's callback to the page's state event and listener,
-// beside a bare g_idle_add of a record of the same size; and what a read of `playPosition` costs, beside the
-// platform call that it makes.
+// The time from a player callback of the platform to the state event and the listener of the page, compared
+// with a bare g_idle_add of a record of the same size; and the time of a read of `playPosition`, compared
+// with the platform call that it makes.
 #include <benchmark/benchmark.h>
 #include <glib.h>
 
@@ -11,9 +11,9 @@
 
 namespace {
 
-int g_delivered = 0;
+int delivered = 0;
 
-// An element that plays, with an id and a listener, for as long as a benchmark runs.
+// A playing element with an id and a listener.
 class Page {
 public:
     explicit Page(NPPluginFuncs& plugin) : m_plugin(plugin) {
@@ -53,7 +53,7 @@ struct BareRecord {
 void bareHop(benchmark::State& state) {
     const auto handler = [](gpointer data) -> gboolean {
         delete static_cast<BareRecord*>(data);
-        ++g_delivered;
+        ++delivered;
         return G_SOURCE_REMOVE;
     };
     for (auto _ : state) {
@@ -62,17 +62,17 @@ void bareHop(benchmark::State& state) {
     }
 }
 
-// A start and an end by turns: one state event and one call of the listener for each message.
+// Start and end messages in turn: each causes one state event and one call of the listener.
 void stateEvent(benchmark::State& state, NPPluginFuncs& plugin) {
     const Page page(plugin);
-    g_delivered = 0;
+    delivered = 0;
     bool playing = false;
     for (auto _ : state) {
         playing = !playing;
         AVControl::onPlayStateChangeCb(1, playing ? TELIX_AV_CB_MSG_PLAYSTART : TELIX_AV_CB_MSG_PLAYEND);
         g_main_context_iteration(nullptr, FALSE);
     }
-    if (g_delivered < state.iterations()) {
+    if (delivered < state.iterations()) {
         state.SkipWithError("events were lost");
     }
 }
@@ -101,12 +101,12 @@ void readPlayPosition(benchmark::State& state, NPPluginFuncs& plugin) {
     }
 }
 
-// The rest of what an A/V control object asks of its browser.
+// The additional browser functions that an A/V control object needs.
 void completeTable(NPNetscapeFuncs& table) {
     table.pluginthreadasynccall = [](NPP, void (*function)(void*), void* data) { function(data); };
     table.getproperty = [](NPP, NPObject*, NPIdentifier, NPVariant*) { return false; };
     table.invokeDefault = [](NPP, NPObject*, const NPVariant*, uint32_t, NPVariant* result) {
-        ++g_delivered;
+        ++delivered;
         result->type = NPVariantType_Void;
         return true;
     };

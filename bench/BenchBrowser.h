@@ -1,5 +1,5 @@
-// The browser of the benchmarks: just enough of the browser's table, as fast as it can be, with no accounts
-// kept.
+// A minimal browser for benchmarks: the function table entries that the plug-in needs, as fast as possible
+// and without checks.
 #ifndef TELIX_BENCH_BENCHBROWSER_H
 #define TELIX_BENCH_BENCHBROWSER_H
 
@@ -13,7 +13,7 @@
 #include "common/PluginExports.h"
 #include "npapi/npfunctions.h"
 
-// A table for NP_Initialize; lives as long as the process.
+// The function table for NP_Initialize, with static lifetime.
 inline NPNetscapeFuncs& benchBrowserTable() {
     static NPNetscapeFuncs table = [] {
         NPNetscapeFuncs t{};
@@ -73,8 +73,8 @@ inline NPNetscapeFuncs& benchBrowserTable() {
     return table;
 }
 
-// Runs the benchmarks that `add(plugin)` registers, with the plug-in loaded; `plugin` is its table. Gives the
-// exit status of the program.
+// Initialises the plug-in and runs the benchmarks that `add(plugin)` registers; `plugin` is the plug-in's
+// function table. Returns the exit status of the program.
 template <typename Add>
 int runBenchmarks(int argc, char** argv, Add add) {
     NPPluginFuncs plugin{};
@@ -89,13 +89,13 @@ int runBenchmarks(int argc, char** argv, Add add) {
     return 0;
 }
 
-// The same with benchmarks that `registerAll(name, level)` registers, for each state of the log.
+// The same with benchmarks that `registerAll(name, level)` registers, without and with a log level.
 inline int runWithAndWithoutLog(int argc, char** argv,
                                 void (*registerAll)(const std::string& name, const char* level)) {
     return runBenchmarks(argc, argv, [=](NPPluginFuncs&) {
         registerAll("log unset", nullptr);
-        // Behind those, since a level other than 0 stays for good. No module has this number: nothing is
-        // printed.
+        // Last, because the plug-in caches a log level other than 0. No module has this number, so nothing is
+        // logged.
         registerAll("log set", "99");
     });
 }

@@ -1,4 +1,4 @@
-/* The platform library of the benchmarks: the calls that they make, each as short as it can be. */
+/* The platform library of the benchmarks: minimal implementations of the calls that they make. */
 #include <string.h>
 
 #include "telix/telix_platform.h"
@@ -35,7 +35,7 @@ TELIX_RETCODE_ENUM_T TELIX_JS_CM_GetName(TELIX_JS_CM_HANDLE channel, char** name
     return TELIX_RETCODE_SUCCESS;
 }
 
-/* An empty text, which the plug-in asks for again at every read. */
+/* An empty string, which the plug-in does not cache. */
 TELIX_RETCODE_ENUM_T TELIX_JS_CM_GetDsd(TELIX_JS_CM_HANDLE channel, char** descriptor) {
     (void)channel;
     *descriptor = strdup("");

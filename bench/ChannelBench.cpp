@@ -1,6 +1,6 @@
-// What a large channel list costs a page: building it, taking an entry, finding one by its id (a walk over
-// the list, by the texts of the ids), and reading a channel's cached and uncached properties. Each beside the
-// bare work that it can't do without.
+// Large channel lists: building one, getting an entry, finding one by its id (a linear search that compares
+// strings), and reading cached and uncached properties of a channel. Each is compared with the bare work that
+// it cannot avoid.
 #include <benchmark/benchmark.h>
 #include <strings.h>
 
@@ -39,7 +39,7 @@ NPObject* buildList(const std::vector<uint32_t>& handles) {
     return list;
 }
 
-// Gives back what a list holds and what it leaves behind.
+// Releases the list, and the channels, which a list does not release.
 void destroyList(NPObject* list) {
     ChannelList& model = *wrapperOf<JSChannelList>(list)->impl();
     std::vector<NPObject*> channels;
@@ -78,7 +78,7 @@ void buildOurs(benchmark::State& state) {
     state.SetComplexityN(state.range(0));
 }
 
-// The same objects with the same references, kept in a plain vector.
+// The same objects with the same references in a plain vector.
 void buildBare(benchmark::State& state) {
     for (auto _ : state) {
         std::vector<NPObject*> channels;
@@ -115,7 +115,7 @@ void itemOurs(benchmark::State& state, int64_t index) {
     invokeList(state, "item", argument);
 }
 
-// The reference that passes to the page and comes back.
+// The reference that is passed to the page and released again.
 void itemBare(benchmark::State& state) {
     for (auto _ : state) {
         NPN_ReleaseObject(NPN_RetainObject(channel()));
@@ -130,7 +130,7 @@ void getChannelOurs(benchmark::State& state, int64_t index) {
     invokeList(state, "getChannel", argument);
 }
 
-// The walk alone, over ids that stand there as text.
+// The search alone, over ids that are strings already.
 void getChannelBare(benchmark::State& state, int64_t index) {
     std::vector<std::string> ccids;
     for (const uint32_t handle : handlesOf(kChannels)) {
@@ -156,7 +156,7 @@ void readOurs(benchmark::State& state, const char* property) {
     }
 }
 
-// A text of the name's length in the browser's memory.
+// A string of the name's length in the browser's memory.
 void readTextBare(benchmark::State& state) {
     const std::string name = wrapperOf<JSChannel>(channel())->impl()->getName();
     for (auto _ : state) {
@@ -167,14 +167,14 @@ void readTextBare(benchmark::State& state) {
     }
 }
 
-void askTypeBare(benchmark::State& state) {
+void getTypeBare(benchmark::State& state) {
     int32_t type = 0;
     for (auto _ : state) {
         benchmark::DoNotOptimize(TELIX_JS_CM_GetChannelType(7, &type));
     }
 }
 
-void askTextBare(benchmark::State& state) {
+void getTextBare(benchmark::State& state) {
     for (auto _ : state) {
         char* text = nullptr;
         benchmark::DoNotOptimize(TELIX_JS_CM_GetDsd(7, &text));
@@ -208,12 +208,12 @@ void registerAll(const std::string& log, const char* level) {
         add(std::string("getChannel/ours/") + place,
             [index = index](benchmark::State& state) { getChannelOurs(state, index); });
     }
-    add("read/cached text/bare", readTextBare);
-    add("read/cached text/ours", [](benchmark::State& state) { readOurs(state, "name"); });
-    add("read/asked number/bare", askTypeBare);
-    add("read/asked number/ours", [](benchmark::State& state) { readOurs(state, "channelType"); });
-    add("read/asked text/bare", askTextBare);
-    add("read/asked text/ours", [](benchmark::State& state) { readOurs(state, "dsd"); });
+    add("read/cached string/bare", readTextBare);
+    add("read/cached string/ours", [](benchmark::State& state) { readOurs(state, "name"); });
+    add("read/uncached number/bare", getTypeBare);
+    add("read/uncached number/ours", [](benchmark::State& state) { readOurs(state, "channelType"); });
+    add("read/uncached string/bare", getTextBare);
+    add("read/uncached string/ours", [](benchmark::State& state) { readOurs(state, "dsd"); });
     add("read/constant/ours", [](benchmark::State& state) { readOurs(state, "TYPE_OTHER"); });
 }
 

@@ -1,6 +1,6 @@
-// What an event of the broadcast costs from the platform's callback to the page's handler, beside a bare
-// g_idle_add of a record of the same size, alone and with the browser's own calls of one delivery; one by one
-// on one thread, and 100,000 in a burst from another thread, with the heap before and after.
+// The time of a broadcast event from the platform's callback to the page's handler, compared with a bare
+// g_idle_add of a record of the same size, alone and with the browser calls of one event; one event after the
+// other on one thread, and a burst of 100,000 from another thread, with the heap usage before and after.
 #include <benchmark/benchmark.h>
 #include <glib.h>
 #include <malloc.h>
@@ -21,9 +21,9 @@ constexpr int kBurst = 100000;
 constexpr unsigned int kHandle = 7;
 const std::string kId = "tv";
 
-int g_delivered = 0;
+int delivered = 0;
 
-// ---- The bare hop: the same memory, nothing done with it
+// ---- The baseline: a g_idle_add with the same memory, without any processing
 
 struct BareRecord {
     unsigned int type;
@@ -41,7 +41,7 @@ struct BarePayload {
 void deleteRecord(BareRecord* record) {
     delete static_cast<BarePayload*>(record->payload);
     delete record;
-    ++g_delivered;
+    ++delivered;
 }
 
 gboolean bareHandler(gpointer data) {
@@ -49,7 +49,7 @@ gboolean bareHandler(gpointer data) {
     return G_SOURCE_REMOVE;
 }
 
-// The same with what the browser itself does for a delivery: it runs a text and calls a function.
+// The same with the browser calls of one event: a script evaluation and a function call.
 gboolean callingHandler(gpointer data) {
     auto* record = static_cast<BareRecord*>(data);
     const auto* payload = static_cast<const BarePayload*>(record->payload);
@@ -72,7 +72,7 @@ gboolean callingHandler(gpointer data) {
 
 template <GSourceFunc Handler>
 void fireBare() {
-    g_idle_add(Handler, new BareRecord{1, &g_delivered, 1, new BarePayload{0, 2, 200}});
+    g_idle_add(Handler, new BareRecord{1, &delivered, 1, new BarePayload{0, 2, 200}});
 }
 
 // ---- Ours
@@ -81,7 +81,7 @@ void fireOurs() {
     onPlayStateChangeCb(kHandle, 0, TELIX_PLAYSTATE_PRESENTING, TELIX_ERR_STATE_NONE);
 }
 
-// A video/broadcast object with an id and a handler, for as long as a benchmark runs.
+// A video/broadcast object with an id and a handler.
 class Page {
 public:
     Page() : m_object(VideoBroadcast::getInstance(&m_npp, 400)) {
@@ -94,7 +94,7 @@ public:
         m_object->setOnPlayStateChange(&m_handler);
         benchBrowserTable().invokeDefault = [](NPP, NPObject*, const NPVariant*, uint32_t,
                                                NPVariant* result) {
-            ++g_delivered;
+            ++delivered;
             result->type = NPVariantType_Void;
             return true;
         };
@@ -112,20 +112,20 @@ private:
     VideoBroadcast* m_object;
 };
 
-// ---- The two ways to measure
+// ---- The measurements
 
 using Fire = void (*)();
 
 void oneByOne(benchmark::State& state, Fire fire) {
-    g_delivered = 0;
+    delivered = 0;
     while (state.KeepRunning()) {
         fire();
         g_main_context_iteration(nullptr, FALSE);
     }
-    // What a turn left over because a timer was due in it.
+    // An iteration that runs a timer may leave events in the queue.
     while (g_main_context_iteration(nullptr, FALSE) == TRUE) {
     }
-    if (g_delivered < state.iterations()) {
+    if (delivered < state.iterations()) {
         state.SkipWithError("events were lost");
     }
 }
@@ -136,7 +136,7 @@ void inABurst(benchmark::State& state, Fire fire) {
     size_t after = 0;
     while (state.KeepRunning()) {
         before = mallinfo2().uordblks;
-        g_delivered = 0;
+        delivered = 0;
         std::thread platform([fire] {
             for (int i = 0; i < kBurst; ++i) {
                 fire();
@@ -147,7 +147,7 @@ void inABurst(benchmark::State& state, Fire fire) {
         while (g_main_context_iteration(nullptr, FALSE) == TRUE) {
         }
         after = mallinfo2().uordblks;
-        if (g_delivered < kBurst) {
+        if (delivered < kBurst) {
             state.SkipWithError("events were lost");
             break;
         }

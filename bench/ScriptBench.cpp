@@ -1,8 +1,7 @@
-// What a page's access to our objects costs: property read, method call and HasProperty through the class
-// record, for the first and the last name of a wrapper, beside the same on a bare object written by hand; and
-// the roads to the browser and to the platform library beside direct calls. Each with the log switched off by
-// an unset LOG_MODULE, when every statement asks the environment, and by another module's number, when the
-// level is cached.
+// Script access to the plug-in's objects: property read, method call and HasProperty through the NPClass, for
+// the first and the last name of a wrapper, compared with a hand-written object; and calls to the browser and
+// to the platform library, compared with direct calls. Each with LOG_MODULE unset, when every log statement
+// calls getenv(), and set to the number of another module, when the level is cached.
 #include <benchmark/benchmark.h>
 #include <dlfcn.h>
 
@@ -17,7 +16,7 @@
 
 namespace {
 
-// What our object does for the page, with nothing around it: a chain of comparisons and the answer.
+// The minimal object: it compares identifiers and returns a result.
 struct BareObject : NPObject {
     NPIdentifier names[9];
 };
@@ -121,7 +120,7 @@ void callMethod(benchmark::State& state, NPObject* (*object)(), const char* name
     }
 }
 
-void askEnvironment(benchmark::State& state) {
+void callGetenv(benchmark::State& state) {
     for (auto _ : state) {
         benchmark::DoNotOptimize(std::getenv("LOG_MODULE"));
     }
@@ -183,7 +182,7 @@ void registerAll(const std::string& log, const char* level) {
         add("GetProperty/last" + suffix, getProperty, side.object, "onApplicationHidden");
         add("Invoke/last" + suffix, callMethod, side.object, "hide");
     }
-    add("getenv", askEnvironment);
+    add("getenv", callGetenv);
     add("identifier/direct", identifierDirect);
     add("identifier/gate", identifierThroughGate);
     add("platform/direct", platformDirect);

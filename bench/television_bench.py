@@ -1,6 +1,6 @@
 #!/usr/bin/env python3
-"""What the television of the desk takes of a processor at 1280 by 720 pixels and 25 frames a second, beside decoding alone
-in the same run, and how long it takes from its start to the first picture. Usage: television_bench.py BUILD-FOLDER"""
+"""Measures the CPU load of the desktop television with 720p25 video, compared with decoding alone in the same run, and the
+time from program start to the first picture. Usage: television_bench.py BUILD-FOLDER"""
 
 import os
 import statistics
@@ -12,7 +12,7 @@ TOP = os.path.dirname(os.path.dirname(os.path.abspath(__file__)))
 sys.path.insert(0, os.path.join(TOP, 'tests', 'browser'))
 from television import Television, temporary_folder  # noqa: E402
 
-SECONDS = 15
+SECONDS = 15  # of each measurement
 ROUNDS = 3
 STARTS = 5
 PAGE = '''<!DOCTYPE html><html><body style="margin: 0">
@@ -32,37 +32,37 @@ def make_stream(file):
          '-muxdelay', '0.2', '-muxpreload', '0.2', '-f', 'mpegts', file], check=True)
 
 
-def used_seconds(process):
+def cpu_seconds(process):
     with open(f'/proc/{process.pid}/stat', encoding='ascii') as file:
         fields = file.read().rpartition(')')[2].split()
     return (int(fields[11]) + int(fields[12])) / os.sysconf('SC_CLK_TCK')
 
 
-def television_share(television, page, environment):
-    """The share of one processor that the whole process takes, from the first picture on."""
+def television_load(television, page, environment):
+    """The CPU load of the whole process from the first picture on, 1 for one core."""
     with television.start(page, environment=environment) as process:
         try:
             for line in process.stderr:
                 if 'presenting' in line:
                     break
             else:
-                sys.exit('the television ended without a picture')
-            before, begin = used_seconds(process), time.monotonic()
+                sys.exit('television_bench.py: telix-tv exited without a picture')
+            before, begin = cpu_seconds(process), time.monotonic()
             time.sleep(SECONDS)
-            return (used_seconds(process) - before) / (time.monotonic() - begin)
+            return (cpu_seconds(process) - before) / (time.monotonic() - begin)
         finally:
             process.terminate()
             process.communicate()
 
 
-def decoding_share(build, stream):
+def decoding_load(build, stream):
     run = subprocess.run([os.path.join(build, 'bench', 'decode_load'), stream, str(SECONDS)], check=True,
                          stdout=subprocess.PIPE, text=True)
     return float(run.stdout)
 
 
 def start_seconds(television, page, environment):
-    """From the start of the program until the first picture is in the window."""
+    """The time from program start to the first picture in the window."""
     begin = time.time()
     run = television.run('--wait-for-picture', '--eval', 'Date.now()', page, environment=environment)
     if run.status != 0:
@@ -80,14 +80,14 @@ def main():
         make_stream(stream)
         with open(page, 'w', encoding='utf-8') as file:
             file.write(PAGE)
-        of_file = {'TELIX_CHANNELS': stream}
-        # One after the other, so that what else the machine does falls on both.
-        shares = [(television_share(television, page, of_file), decoding_share(build, stream)) for _ in range(ROUNDS)]
-        ours, decoding = (statistics.median(each) for each in zip(*shares))
+        channels = {'TELIX_CHANNELS': stream}
+        # In turns, so that other load of the machine affects both.
+        loads = [(television_load(television, page, channels), decoding_load(build, stream)) for _ in range(ROUNDS)]
+        ours, decoding = (statistics.median(each) for each in zip(*loads))
         starts = [start_seconds(television, page, {}) for _ in range(STARTS)]
-    print(f'processor at 1280x720, 25 frames: television {100 * ours:.1f} % of one, decoding alone {100 * decoding:.1f} %, '
+    print(f'CPU load at 720p25, of one core: television {100 * ours:.1f} %, decoding alone {100 * decoding:.1f} %, '
           f'difference {100 * (ours - decoding):.1f} %')
-    print(f'start to first picture, test multiplex: median {statistics.median(starts):.2f} s '
+    print(f'program start to first picture, test multiplex: median {statistics.median(starts):.2f} s '
           f'({min(starts):.2f} to {max(starts):.2f} s)')
 
 

@@ -1,6 +1,6 @@
 /* The browser plug-in interface (NPAPI): basic types, instances, windows, streams, variables and errors.
- * Own declarations of the public binary interface, X11 flavour. Sizes and offsets that cross the border are
- * checked at compile time for 32-bit (i386) and 64-bit (LP64) machines. */
+ * Own declarations of the public binary interface for X11. Static assertions check sizes and offsets for
+ * 32-bit (i386) and 64-bit (LP64) machines. */
 #ifndef TELIX_NPAPI_NPAPI_H
 #define TELIX_NPAPI_NPAPI_H
 
@@ -14,7 +14,7 @@ extern "C" {
 #define NPAPI_STATIC_ASSERT(condition) _Static_assert(condition, #condition)
 #endif
 
-/* Picks the expected number for the machine that is compiled for. */
+/* Selects the expected number for the target machine. */
 #define NPAPI_BY_WORD(on32, on64) (sizeof(void*) == 8 ? (on64) : (on32))
 
 #define NP_VERSION_MAJOR 0
@@ -25,16 +25,15 @@ typedef int16_t NPError;
 typedef int16_t NPReason;
 typedef char* NPMIMEType;
 
-/* One embedded object. The browser owns the record; `pdata` belongs to the plug-in, `ndata` to the browser.
- */
+/* A plug-in instance. The browser owns the struct; `pdata` is for the plug-in, `ndata` for the browser. */
 typedef struct _NPP {
     void* pdata;
     void* ndata;
 } NPP_t;
 typedef NPP_t* NPP;
 
-/* One stream of data from the browser to an instance (or back). `headers` holds the HTTP response head, one
- * field a line, or is null. `pdata` belongs to the plug-in. */
+/* A stream between the browser and an instance. `headers` contains the HTTP response headers, one per line,
+ * or is null. `pdata` is for the plug-in. */
 typedef struct _NPStream {
     void* pdata;
     void* ndata;
@@ -56,7 +55,7 @@ typedef struct _NPSavedData {
     void* buf;
 } NPSavedData;
 
-/* Edges in page pixels; `right` and `bottom` lie outside. */
+/* Edges in page pixels; `right` and `bottom` are exclusive. */
 typedef struct _NPRect {
     uint16_t top;
     uint16_t left;
@@ -71,7 +70,7 @@ typedef struct _NPSize {
 
 typedef enum { NPWindowTypeWindow = 1, NPWindowTypeDrawable = 2 } NPWindowType;
 
-/* The place of an instance in its page. `window` is the X window of a windowed plug-in. */
+/* The position of an instance in its page. `window` is the X window of a windowed plug-in. */
 typedef struct _NPWindow {
     void* window;
     int32_t x;
@@ -108,7 +107,7 @@ enum { NP_EMBED = 1, NP_FULL = 2 };
 /* Stream modes. */
 enum { NP_NORMAL = 1, NP_SEEK = 2, NP_ASFILE = 3, NP_ASFILEONLY = 4 };
 
-/* Results of the calls that return an NPError. */
+/* Values of NPError. */
 enum {
     NPERR_NO_ERROR = 0,
     NPERR_GENERIC_ERROR = 1,
@@ -126,10 +125,10 @@ enum {
     NPERR_STREAM_NOT_SEEKABLE = 13
 };
 
-/* Why a stream ended. */
+/* Reasons for the end of a stream. */
 enum { NPRES_DONE = 0, NPRES_NETWORK_ERR = 1, NPRES_USER_BREAK = 2 };
 
-/* What the browser asks of a plug-in (NPP_GetValue). */
+/* Variables of NPP_GetValue. */
 typedef enum {
     NPPVpluginNameString = 1,
     NPPVpluginDescriptionString = 2,
@@ -153,7 +152,7 @@ typedef enum {
     NPPVpluginUsesDOMForCursorBool = 22
 } NPPVariable;
 
-/* What a plug-in asks of the browser, or tells it of itself (NPN_GetValue, NPN_SetValue, NPP_SetValue). */
+/* Variables of NPN_GetValue, NPN_SetValue and NPP_SetValue. */
 typedef enum {
     NPNVxDisplay = 1,
     NPNVxtAppContext = 2,
@@ -200,8 +199,7 @@ typedef struct _NPAsyncSurface {
     } surface;
 } NPAsyncSurface;
 
-/* Platform specific records of which the interface only passes the address. On X11 a region is an X `Region`
- * and a menu an address. */
+/* Platform-specific types that are passed by pointer only. On X11 an NPRegion is an X `Region`. */
 typedef void* NPRegion;
 typedef void NPMenu;
 

@@ -1,5 +1,5 @@
-/* The two function tables that browser and plug-in hand to each other at initialisation.
- * Own declarations of the public binary interface; the browser's table goes through its last public entry. */
+/* The function tables that browser and plug-in exchange at initialisation.
+ * Own declarations of the public binary interface; the browser's table includes its last public entry. */
 #ifndef TELIX_NPAPI_NPFUNCTIONS_H
 #define TELIX_NPAPI_NPFUNCTIONS_H
 
@@ -201,7 +201,7 @@ typedef struct _NPNetscapeFuncs {
     NPN_SetCurrentAsyncSurfaceProcPtr setcurrentasyncsurface;
 } NPNetscapeFuncs;
 
-/* An entry stands behind the two 16-bit words and `index` addresses. */
+/* The offset of an entry after two 16-bit words and `index` pointers. */
 #define NPAPI_TABLE_OFFSET(index) NPAPI_BY_WORD(4 + 4 * (index), 8 + 8 * (index))
 
 NPAPI_STATIC_ASSERT(offsetof(NPPluginFuncs, version) == 2);

@@ -13,10 +13,11 @@
 extern "C" {
 #endif
 
-/* A script name or array index, interned by the browser: equal names have equal addresses, for good. */
+/* A property name or array index, interned by the browser: equal names have the same pointer until the
+ * process exits. */
 typedef void* NPIdentifier;
 
-/* UTF-8 text with a length; not necessarily followed by a zero. */
+/* A UTF-8 string with a length; not necessarily null-terminated. */
 typedef struct _NPString {
     const char* UTF8Characters;
     uint32_t UTF8Length;
@@ -35,8 +36,8 @@ typedef enum {
 typedef struct NPObject NPObject;
 typedef struct NPClass NPClass;
 
-/* A script value. The receiver of a result owns what it holds and gives it back with NPN_ReleaseVariantValue.
- */
+/* A script value. The receiver of a result owns its string or object and releases it with
+ * NPN_ReleaseVariantValue. */
 typedef struct _NPVariant {
     NPVariantType type;
     union {
@@ -48,7 +49,7 @@ typedef struct _NPVariant {
     } value;
 } NPVariant;
 
-/* An object that script can reach. The browser fills in both fields when it creates one. */
+/* A scriptable object. The browser initialises both fields on creation. */
 struct NPObject {
     NPClass* _class;
     uint32_t referenceCount;
@@ -72,7 +73,7 @@ typedef bool (*NPConstructFunctionPtr)(NPObject* object, const NPVariant* args, 
 
 #define NP_CLASS_STRUCT_VERSION 3
 
-/* What the browser knows of a kind of object. */
+/* The functions of a class of objects. */
 struct NPClass {
     uint32_t structVersion;
     NPAllocateFunctionPtr allocate;

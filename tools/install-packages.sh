@@ -1,5 +1,5 @@
 #!/usr/bin/env bash
-# Installs the Debian packages that the named purposes need and that are not there yet.
+# Installs the Debian packages that are missing for the given purposes.
 # Usage: tools/install-packages.sh run|test ...
 set -euo pipefail
 
@@ -17,7 +17,7 @@ for purpose in "$@"; do
             clang-format-14 clang-tidy-14 python3 binutils util-linux)
         ;;
     *)
-        echo "$0: unknown purpose '$purpose' (run, test)" >&2
+        echo "$0: $purpose: unknown purpose, expected run or test" >&2
         exit 2
         ;;
     esac
@@ -32,16 +32,16 @@ done
 [ ${#missing[@]} -gt 0 ] || exit 0
 
 if ! command -v apt-get >/dev/null; then
-    echo "These packages are missing, and this is no Debian machine: ${missing[*]}" >&2
+    echo "$0: cannot install ${missing[*]}: apt-get not found" >&2
     exit 2
 elif [ "$(id -u)" -eq 0 ]; then
-    as_root=()
+    sudo=()
 elif command -v sudo >/dev/null; then
-    as_root=(sudo)
+    sudo=(sudo)
 else
-    echo "These packages are missing, and neither root nor sudo is at hand: ${missing[*]}" >&2
+    echo "$0: cannot install ${missing[*]}: neither root nor sudo" >&2
     exit 2
 fi
 echo "Installing: ${missing[*]}"
-"${as_root[@]}" apt-get update -q
-"${as_root[@]}" env DEBIAN_FRONTEND=noninteractive apt-get install -q -y --no-install-recommends "${missing[@]}"
+"${sudo[@]}" apt-get update -q
+"${sudo[@]}" env DEBIAN_FRONTEND=noninteractive apt-get install -q -y --no-install-recommends "${missing[@]}"

@@ -1,4 +1,4 @@
-// Live television with the remote control: the channel list, what is on, and the events of the object.
+// Live television with the remote control: the channel list, the programmes, and the events of the object.
 (function () {
     'use strict';
 
@@ -24,7 +24,7 @@
         return channel ? channel.name || 'without a name' : 'none';
     }
 
-    // The programmes that the object has, the present one first.
+    // Start time and name of the object's programmes, the present one first.
     function programmeRows() {
         var programmes = video.programmes;
         var rows = [];

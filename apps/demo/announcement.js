@@ -1,9 +1,9 @@
-// The red button: a notice when the broadcast announces something, and the page that red then opens.
+// The red button: a notice when a stream event announces something, and the page that the red key then opens.
 var announcement = (function () {
     'use strict';
 
     var noticeMilliseconds = 8000;
-    var text = null; // what is announced on this channel
+    var text = null; // of the announcement on this channel
     var receivedAt = null;
     var timer = 0;
 
@@ -20,12 +20,12 @@ var announcement = (function () {
     function update() {
         var now = television.state.programmes[0];
         var next = television.state.programmes[1];
-        tv.say('more-title', text);
-        tv.say('more-channel', television.state.channel.name);
-        tv.say('more-now', now ? now.name : 'No programme information');
-        tv.say('more-description', now ? now.description : '');
-        tv.say('more-next', next ? banner.describeProgramme(next) : '');
-        tv.say('more-received', 'Received at ' + receivedAt.toTimeString().substr(0, 8));
+        tv.setText('more-title', text);
+        tv.setText('more-channel', television.state.channel.name);
+        tv.setText('more-now', now ? now.name : 'No programme information');
+        tv.setText('more-description', now ? now.description : '');
+        tv.setText('more-next', next ? banner.describeProgramme(next) : '');
+        tv.setText('more-received', 'Received at ' + receivedAt.toTimeString().substr(0, 8));
     }
 
     function open() {
@@ -41,16 +41,16 @@ var announcement = (function () {
 
     var layer = { keys: { red: close, back: close } };
 
-    // The broadcast repeats its announcements; the notice comes once.
-    function receive(announced) {
-        var words = announced || 'More on this programme';
-        var isNew = text !== words;
-        text = words;
+    // The broadcast repeats its stream events; the notice is shown once.
+    function receive(eventText) {
+        var newText = eventText || 'More on this programme';
+        var isNew = text !== newText;
+        text = newText;
         receivedAt = new Date();
         if (tv.isVisible('more')) {
             update();
         } else if (isNew) {
-            tv.say('notice-text', text);
+            tv.setText('notice-text', text);
             tv.setVisible('notice', true);
             clearTimeout(timer);
             timer = setTimeout(hideNotice, noticeMilliseconds);
@@ -58,14 +58,14 @@ var announcement = (function () {
         banner.update();
     }
 
-    // For another channel, of which nothing is known.
-    function forget() {
+    // Called at a channel change.
+    function clear() {
         text = null;
         hideNotice();
         close();
     }
 
-    return { receive: receive, forget: forget, open: open, close: close, hideNotice: hideNotice,
-             isOpenable: function () { return text !== null; },
-             isNoticed: function () { return tv.isVisible('notice'); } };
+    return { receive: receive, clear: clear, open: open, close: close, hideNotice: hideNotice,
+             isAvailable: function () { return text !== null; },
+             isNoticeShown: function () { return tv.isVisible('notice'); } };
 }());

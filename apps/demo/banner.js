@@ -1,4 +1,4 @@
-// The channel banner: what is on, and for how long still. It comes at a channel change and goes by itself.
+// The channel banner: the channel, and its present and following programme. Shown for some seconds at a channel change.
 var banner = (function () {
     'use strict';
 
@@ -6,7 +6,7 @@ var banner = (function () {
     var timer = 0;
     var threshold = null;
 
-    // The age above which the viewer wants no programmes, or null.
+    // The parental rating threshold, or null.
     function ratingThreshold() {
         var schemes = tv.byId('parental').parentalRatingSchemes;
         var scheme = schemes ? schemes.getParentalRatingScheme('dvb-si') : null;
@@ -40,16 +40,16 @@ var banner = (function () {
         var now = television.state.programmes[0];
         var next = television.state.programmes[1];
         var seconds = Date.now() / 1000;
-        tv.say('clock', tv.timeOfDay(new Date()));
-        tv.say('banner-number', channel ? String(channel.number) : '');
-        tv.say('banner-name', channel ? channel.name : '');
-        tv.say('banner-now', now ? describeProgramme(now) : describeState());
-        tv.say('banner-next', next ? describeProgramme(next) : '');
-        tv.say('banner-rating', now ? describeRating(now.rating) : '');
+        tv.setText('clock', tv.timeOfDay(new Date()));
+        tv.setText('banner-number', channel ? String(channel.number) : '');
+        tv.setText('banner-name', channel ? channel.name : '');
+        tv.setText('banner-now', now ? describeProgramme(now) : describeState());
+        tv.setText('banner-next', next ? describeProgramme(next) : '');
+        tv.setText('banner-rating', now ? describeRating(now.rating) : '');
         tv.setVisible('banner-rating', !!now && !!now.rating);
         var played = now && now.seconds > 0 ? (seconds - now.start) / now.seconds * 100 : 0;
         tv.byId('banner-played').style.width = Math.max(0, Math.min(100, played)) + '%';
-        tv.byId('banner-more').style.display = announcement.isOpenable() ? 'inline' : 'none';
+        tv.byId('banner-more').style.display = announcement.isAvailable() ? 'inline' : 'none';
     }
 
     function hide() {
@@ -57,7 +57,7 @@ var banner = (function () {
         tv.setVisible('banner', false);
     }
 
-    // Shows it as long as the tuning lasts, and then for some seconds.
+    // Shows the banner while the set tunes, and for some seconds afterwards.
     function show() {
         update();
         tv.setVisible('banner', true);

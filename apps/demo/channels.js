@@ -1,4 +1,4 @@
-// Ways to a channel beside the next one: the list, and its number by the digits.
+// Channel selection by the channel list and by number.
 var channels = (function () {
     'use strict';
 
@@ -64,16 +64,16 @@ var channels = (function () {
             tv.setVisible('number', false);
             television.tune(channel);
         } else {
-            tv.say('number', 'No channel ' + digits);
+            tv.setText('number', 'No channel ' + digits);
             timer = setTimeout(function () { tv.setVisible('number', false); }, messageMilliseconds);
         }
         digits = '';
     }
 
-    // A number is complete when no channel has a longer one.
+    // A number is complete if no channel number has more digits.
     function enterDigit(digit) {
         digits += digit;
-        tv.say('number', digits);
+        tv.setText('number', digits);
         tv.setVisible('number', true);
         clearTimeout(timer);
         if (Number(digits) * 10 > television.state.channels.length || digits.length === 3) {

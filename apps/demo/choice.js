@@ -1,4 +1,4 @@
-// The choice of sound and subtitles, of broadcast and of media alike.
+// The selection of audio and subtitle components, for broadcast and media.
 var choice = (function () {
     'use strict';
 
@@ -6,7 +6,7 @@ var choice = (function () {
     var subtitleType = 2;
     var sections = [{ type: audioType, id: 'choice-audio', off: null },
                     { type: subtitleType, id: 'choice-subtitles', off: 'Off' }];
-    var presenter = null; // gives the object that presents, or null
+    var presenter = null; // returns the object that presents, or null
     var entries = [];
     var focused = 0;
 
@@ -24,7 +24,7 @@ var choice = (function () {
         return text;
     }
 
-    // What tells components apart: the browser makes a new wrapper for one each time that it is handed out.
+    // Identifies a component by its values, because the browser creates a new wrapper each time that it returns one.
     function identity(component) {
         return [component.encoding, component.language, component.audioDescription, component.hearingImpaired,
                 component.audioChannels].join();
@@ -40,21 +40,20 @@ var choice = (function () {
 
     function readSection(section, object) {
         var active = toArray(object.getCurrentActiveComponents(section.type));
-        var activeOnes = active.map(identity);
-        var made = toArray(object.getComponents(section.type)).map(function (component) {
+        var activeIdentities = active.map(identity);
+        var sectionEntries = toArray(object.getComponents(section.type)).map(function (component) {
             return { section: section, text: describe(component),
-                     isActive: activeOnes.indexOf(identity(component)) >= 0,
+                     isActive: activeIdentities.indexOf(identity(component)) >= 0,
                      choose: function () { object.selectComponent(component); } };
         });
-        if (section.off && made.length > 0) {
-            made.unshift({ section: section, text: section.off, isActive: active.length === 0,
-                           choose: function () {
-                               toArray(object.getCurrentActiveComponents(section.type)).forEach(function (component) {
-                                   object.unselectComponent(component);
-                               });
-                           } });
+        if (section.off && sectionEntries.length > 0) {
+            sectionEntries.unshift({ section: section, text: section.off, isActive: active.length === 0,
+                                     choose: function () {
+                                         toArray(object.getCurrentActiveComponents(section.type)).forEach(
+                                             function (component) { object.unselectComponent(component); });
+                                     } });
         }
-        return made;
+        return sectionEntries;
     }
 
     function show() {
@@ -69,7 +68,7 @@ var choice = (function () {
         });
     }
 
-    // Reads everything anew.
+    // Reads all components again.
     function refresh() {
         var object = presenter();
         entries = [];
@@ -117,7 +116,7 @@ var choice = (function () {
     };
 
     return { open: open, close: close,
-             // For what presents something else now.
+             // Called when the presenter presents something else.
              update: function () {
                  if (tv.isVisible('choice')) {
                      refresh();

@@ -1,4 +1,4 @@
-// The device page: the set as a page sees it, and the applications that a page can open.
+// The device page: configuration, capabilities, parental control, keys, DRM and applications.
 var device = (function () {
     'use strict';
 
@@ -16,7 +16,7 @@ var device = (function () {
 
     var manager = tv.byId('manager');
     var application = null;
-    var leave = null; // called at the way back
+    var onClose = null;
     var focused = 0;
     var scheme = 0;
     var profile = 0; // the first one that is listed
@@ -38,15 +38,15 @@ var device = (function () {
         return tv.table(names.map(function (name) { return [name, tv.describe(object[name])]; }));
     }
 
-    function value(of) {
-        return of === null || of === undefined || of === '' ? 'not known' : String(of);
+    function textOf(value) {
+        return value === null || value === undefined || value === '' ? 'not known' : String(value);
     }
 
     function hexadecimal(number) {
         return '0x' + number.toString(16);
     }
 
-    // ---- Handlers. One function for all: what counts here is that the object keeps it.
+    // ---- Handlers. One function for all, because the page only shows whether they are set.
 
     function handler() {}
 
@@ -74,14 +74,14 @@ var device = (function () {
 
     function openSecond() {
         created = application.createApplication('second.html', true);
-        log('createApplication("second.html", true) gives ' + tv.describeApplication(created));
+        log('createApplication("second.html", true) returns ' + tv.describeApplication(created));
     }
 
     function preview() {
         openSecond();
         if (created) {
             setTimeout(function () {
-                // The viewer may have closed it; then this page would close itself.
+                // If the viewer has closed it, this call would close this page.
                 if (document.hidden) {
                     created.destroyApplication();
                     log('destroyApplication() brings this page back');
@@ -105,13 +105,13 @@ var device = (function () {
 
     function settingsRows() {
         var settings = tv.byId('configuration').configuration;
-        return [['Country', value(settings.countryId)],
-                ['Audio language', value(settings.preferredAudioLanguage)],
-                ['Subtitle language', value(settings.preferredSubtitleLanguage)],
-                ['Free memory', value(application.privateData.getFreeMem() || null)]];
+        return [['Country', textOf(settings.countryId)],
+                ['Audio language', textOf(settings.preferredAudioLanguage)],
+                ['Subtitle language', textOf(settings.preferredSubtitleLanguage)],
+                ['Free memory', textOf(application.privateData.getFreeMem() || null)]];
     }
 
-    // The profiles of the user interface, of video and of audio in the set's document.
+    // The elements of the UI, video and audio profiles in the capabilities document.
     function describedProfiles() {
         var description = tv.byId('capabilities').xmlCapabilities;
         return description && description.documentElement ? description.documentElement.children : [];
@@ -132,7 +132,7 @@ var device = (function () {
         return rows;
     }
 
-    // The number beside `number` in the direction of `step`, round and round.
+    // The index before or after `number`, cyclic.
     function stepped(number, step, count) {
         return count > 0 ? (number + step + count) % count : 0;
     }
@@ -153,12 +153,12 @@ var device = (function () {
         var rows = [['Scheme', scheme + 1 + ' of ' + all.length],
                     ['Threshold', threshold ? threshold.name : 'not known']];
         for (var i = 0; i < shown.length && rows.length < linesOfPanel; i++) {
-            rows.push(['Rating ' + (i + 1), value(shown.item(i))]);
+            rows.push(['Rating ' + (i + 1), textOf(shown.item(i))]);
         }
         return [tv.element('h2', shown.name || 'A scheme without a name'), tv.table(rows)];
     }
 
-    // ---- Keys. The mask goes back and forth between what a menu needs and that with the digits.
+    // ---- Keys. The mask alternates between the keys of a menu and these with the digits.
 
     function keySet() {
         return application.privateData.keyset;
@@ -168,7 +168,7 @@ var device = (function () {
         var set = keySet();
         var menuKeys = set.RED + set.GREEN + set.YELLOW + set.BLUE + set.NAVIGATION;
         var mask = set.value === menuKeys ? menuKeys + set.NUMERIC : menuKeys;
-        log('setValue(' + hexadecimal(mask) + ') gives ' + hexadecimal(set.setValue(mask)));
+        log('setValue(' + hexadecimal(mask) + ') returns ' + hexadecimal(set.setValue(mask)));
     }
 
     function keyRows() {
@@ -182,39 +182,39 @@ var device = (function () {
         return rows;
     }
 
-    // ---- DRM: a message to the set, and its answer some time later.
+    // ---- DRM: a message to the set and its asynchronous result.
 
     function sendDrmMessage() {
         drm = { sent: 'Hello, set', id: null, result: null, code: null };
         drm.id = tv.byId('agent').sendDRMMessage('text/plain', drm.sent, drmSystems[drmSystem]);
-        log('sendDRMMessage() gives ' + value(drm.id));
+        log('sendDRMMessage() returns ' + textOf(drm.id));
     }
 
     function onDrmResult(id, result, code) {
         drm.id = id;
         drm.result = result;
         drm.code = code;
-        log('onDRMMessageResult: ' + value(result));
+        log('onDRMMessageResult: ' + textOf(result));
         update();
     }
 
     function drmRows() {
-        return [['DRM system', drmSystems[drmSystem]], ['Message', value(drm.sent)], ['Id', value(drm.id)],
-                ['Result', value(drm.result)],
-                ['Code', value(drm.code) + (drmResults[drm.code] ? ', ' + drmResults[drm.code] : '')]];
+        return [['DRM system', drmSystems[drmSystem]], ['Message', textOf(drm.sent)], ['Id', textOf(drm.id)],
+                ['Result', textOf(drm.result)],
+                ['Code', textOf(drm.code) + (drmResults[drm.code] ? ', ' + drmResults[drm.code] : '')]];
     }
 
-    // ---- The menu: a title, what the panel shows, what OK does, and for some what the arrows to left and right do.
+    // ---- The menu: title, contents of the panel, function of OK, optional function of left and right.
 
     var menu = [
         {
             title: 'Settings',
-            panel: function () { return [tv.element('h2', 'What the viewer has set'), tv.table(settingsRows())]; },
+            panel: function () { return [tv.element('h2', 'The settings of the viewer'), tv.table(settingsRows())]; },
             ok: function () { log('they are changed in the set itself'); }
         },
         {
             title: 'Capabilities',
-            panel: function () { return [tv.element('h2', 'What the set can do'), tv.table(capabilityRows())]; },
+            panel: function () { return [tv.element('h2', 'The capabilities of the set'), tv.table(capabilityRows())]; },
             ok: function () { log('left and right show other profiles'); },
             turn: function (step) { profile = stepped(profile, step, describedProfiles().length); }
         },
@@ -230,8 +230,8 @@ var device = (function () {
         {
             title: 'Keys',
             panel: function () {
-                return [tv.element('h2', 'The keys that come to this page'), tv.table(keyRows()),
-                        tv.element('p', 'OK asks for the digits as well, or gives them up.')];
+                return [tv.element('h2', 'The keys that this page gets'), tv.table(keyRows()),
+                        tv.element('p', 'OK adds or removes the digits.')];
             },
             ok: switchKeyMask
         },
@@ -257,12 +257,12 @@ var device = (function () {
         {
             title: 'Application',
             panel: function () {
-                return [tv.element('h2', 'What getOwnerApplication() gave'),
+                return [tv.element('h2', 'The owner application'),
                         propertiesOf(application, applicationHandlers.concat(applicationMethods))];
             },
             ok: function () {
                 application = manager.getOwnerApplication(document);
-                log('getOwnerApplication(document) gives another one');
+                log('getOwnerApplication(document) returns another one');
             }
         },
         {
@@ -321,7 +321,7 @@ var device = (function () {
         document.removeEventListener('keydown', rememberKey, false);
         keys.close(layer);
         tv.setVisible('device', false);
-        leave();
+        onClose();
     }
 
     function thenUpdate(action, argument) {
@@ -332,7 +332,7 @@ var device = (function () {
     }
 
     var layer = { modal: true, keys: { back: close } };
-    var whenThere = {
+    var keysWithPlugin = {
         up: thenUpdate(moveFocus, -1),
         down: thenUpdate(moveFocus, 1),
         left: thenUpdate(turn, -1),
@@ -344,9 +344,9 @@ var device = (function () {
         blue: thenUpdate(preview)
     };
 
-    // Shows the page; `back` is called when the viewer leaves it.
-    function show(back) {
-        leave = back;
+    // Shows the page; `closed` is called when the viewer closes it.
+    function show(closed) {
+        onClose = closed;
         tv.setVisible('device', true);
         keys.open(layer);
         application = application || tv.ownerApplication(manager);
@@ -355,7 +355,7 @@ var device = (function () {
         if (!application) {
             return;
         }
-        Object.keys(whenThere).forEach(function (name) { layer.keys[name] = whenThere[name]; });
+        Object.keys(keysWithPlugin).forEach(function (name) { layer.keys[name] = keysWithPlugin[name]; });
         document.addEventListener('keydown', rememberKey, false);
         tv.byId('agent').onDRMMessageResult = onDrmResult;
         update();

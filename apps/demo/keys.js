@@ -1,13 +1,12 @@
-// The remote control: each key goes to the topmost layer of the screen that has a use for it.
+// The remote control: each key is handled by the topmost layer of the screen that has a function for it.
 //
-// A layer is an object whose `keys` has a function by the name of each key that it takes: up, down, left, right, ok,
-// back, info, red, green, yellow, blue, play, pause, stop, rewind, forward, and digit, which gets the number. Below a
-// layer that is `modal` no other gets a key.
+// A layer is an object whose `keys` maps key names to functions: up, down, left, right, ok, back, info, red, green,
+// yellow, blue, play, pause, stop, rewind, forward, and digit, which gets the number. Layers below a `modal` one get no
+// keys.
 var keys = (function () {
     'use strict';
 
-    // The browser says which codes the keys have; the numbers stand for one that does not. Channel keys step through
-    // the channels as the arrows do.
+    // The browser's constant, the code if the browser has no constant, the name. Channel keys act like arrow keys.
     var codes = [['VK_UP', 38, 'up'], ['VK_DOWN', 40, 'down'], ['VK_LEFT', 37, 'left'], ['VK_RIGHT', 39, 'right'],
                  ['VK_ENTER', 13, 'ok'], ['VK_BACK', 461, 'back'], ['VK_INFO', 457, 'info'], ['VK_RED', 403, 'red'],
                  ['VK_GREEN', 404, 'green'], ['VK_YELLOW', 405, 'yellow'], ['VK_BLUE', 406, 'blue'],
@@ -59,7 +58,7 @@ var keys = (function () {
         layers.push(layer);
     }
 
-    // The names that the browser has for a key code.
+    // The name of the browser's constant for a key code.
     function nameOf(keyCode) {
         return Object.getOwnPropertyNames(window).filter(function (name) {
             return name.indexOf('VK_') === 0 && window[name] === keyCode;

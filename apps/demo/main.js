@@ -1,18 +1,18 @@
-// The television as a whole: what the keys do while the picture has the screen, and the ways to the other pages.
+// The television page: its keys, and the navigation to the other pages.
 (function () {
     'use strict';
 
     function showMessage(title, text) {
-        tv.say('message-title', title);
-        tv.say('message-text', text);
+        tv.setText('message-title', title);
+        tv.setText('message-text', text);
         tv.setVisible('message', true);
     }
 
-    // ---- What broadcast tells
+    // ---- Broadcast events
 
     television.on.tuning = function () {
         tv.setVisible('message', false);
-        announcement.forget();
+        announcement.clear();
         choice.update();
         banner.show();
     };
@@ -30,22 +30,20 @@
 
     function watchTelevision() {
         var hasChannels = television.start();
-        tv.setVisible('ground', !hasChannels);
+        tv.setVisible('background', !hasChannels);
         tv.setVisible('legend', !hasChannels);
         if (hasChannels) {
             return;
         }
-        // Nothing to zap through, but the other pages have something to tell all the same.
-        if (television.isThere()) {
+        if (television.hasPlugin()) {
             showMessage('No television here',
                         'The set has no channels: its platform library is missing, or has no tuner.');
         } else {
-            showMessage('The plug-in is missing', 'This page has an object of type video/broadcast, and the browser ' +
-                                                  'knows nothing that handles it.');
+            showMessage('The plug-in is missing', 'No plug-in of the browser supports the object type video/broadcast.');
         }
     }
 
-    // ---- The ways to the other pages
+    // ---- Navigation
 
     function clearScreen() {
         banner.hide();
@@ -105,7 +103,7 @@
             }),
             info: withChannels(function () { banner.show(); }),
             back: function () {
-                if (announcement.isNoticed()) {
+                if (announcement.isNoticeShown()) {
                     announcement.hideNotice();
                 } else {
                     banner.hide();

@@ -1,22 +1,21 @@
-// The media player: clips that come over HTTP, a playlist, and the ways in which media can fail.
+// The media player: clips over HTTP, a playlist, and media with errors.
 var media = (function () {
     'use strict';
 
     var folder = '../media/';
     var seekMilliseconds = 5000;
     var refreshMilliseconds = 250;
-    var restMilliseconds = 6000; // without a key, until the picture has the screen for itself
+    var hideMilliseconds = 6000; // without a key press, until everything but the video is hidden
     var linesShown = 7;
     var speeds = [-4, -2, -1, 0.5, 1, 2, 4];
     var state = { STOPPED: 0, PLAYING: 1, PAUSED: 2, CONNECTING: 3, BUFFERING: 4, FINISHED: 5, ERROR: 6 };
     var stateTexts = ['Stopped', 'Playing', 'Paused', 'Connecting \u2026', 'Buffering \u2026', 'Finished', 'Error',
                       'Next clip \u2026'];
     var errorTexts = ['The set cannot play this format.', 'The connection failed.',
-                      'The set could not play it, and does not say why.', 'The set has not enough resources.',
+                      'Playback failed for an unknown reason.', 'The set has not enough resources.',
                       'The content is damaged.', 'The content is not available.', 'The content is not available now.'];
 
-    // A playlist starts by itself when it has been read. The type is that of the element: the set takes it for a
-    // promise.
+    // `type` is that of the element, by which the set chooses the player. The plug-in starts a playlist when it is loaded.
     var clips = [
         { title: 'Running clock', detail: 'MP4', type: 'video/mp4', url: 'clip.mp4' },
         { title: 'Second clip', detail: 'MP4', type: 'video/mp4', url: 'second.mp4' },
@@ -24,46 +23,46 @@ var media = (function () {
         { title: 'A tune', detail: 'MP3', type: 'audio/mpeg', url: 'tune.mp3', isAudio: true },
         { title: 'Adaptive streaming', detail: 'HLS', type: 'application/vnd.apple.mpegurl', url: 'hls/index.m3u8' },
         { title: 'Playlist of two clips', detail: 'ASX', type: 'video/mp4', url: 'playlist.asx', isPlaylist: true },
-        // Slower than it is played: 60 kilobytes a second.
+        // The transfer of 60 kB/s is slower than playback.
         { title: 'A slow connection', detail: 'MP4', type: 'video/mp4', url: 'clip.mp4?rate=60000' },
         { title: 'A clip that is not there', detail: 'MP4', type: 'video/mp4', url: 'absent.mp4' },
-        // Port 9 is for discarding what comes, and nowadays nobody listens on it.
+        // Port 9 is the discard service, which normally nothing provides.
         { title: 'A server that is switched off', detail: 'MP4', type: 'video/mp4',
           url: 'http://127.0.0.1:9/clip.mp4' },
-        { title: 'A page, which is no clip', detail: 'HTML', type: 'video/mp4', url: '../demo/index.html' }
+        { title: 'A page instead of a clip', detail: 'HTML', type: 'video/mp4', url: '../demo/index.html' }
     ];
 
-    var leave = null; // called at the way back
+    var onClose = null;
     var video = null;
-    var objectsMade = 0;
-    var playing = null; // the clip that the object was made for
-    var shown = null; // the one whose title is shown
-    var hasBegun = false; // it has presented something
-    var speed = 1; // what the set was told last
+    var objectsCreated = 0;
+    var opened = null; // the clip that the object was created for
+    var shown = null; // the clip whose title is shown
+    var hasStarted = false; // playback of `opened`
+    var speed = 1; // that the set has accepted last
     var speedChanges = 0;
     var notice = '';
     var focused = 0;
     var openTimer = 0;
     var refreshTimer = 0;
-    var restTimer = 0;
+    var hideTimer = 0;
 
     function isServed() {
         return location.protocol !== 'file:';
     }
 
-    // The whole address. The plug-in would only put the page's folder in front.
-    function addressOf(clip) {
+    // The absolute URL. The plug-in resolves relative ones against the page's folder without handling "..".
+    function urlOf(clip) {
         var link = document.createElement('a');
         link.href = clip.url.indexOf('://') > 0 ? clip.url : folder + clip.url;
         return link.href;
     }
 
-    // ---- What is shown
+    // ---- Display
 
-    // The clip that presents: a queued one takes the place of the one before it.
-    function presented() {
-        var address = video ? video.data : null;
-        return clips.filter(function (clip) { return addressOf(clip) === address; })[0] || playing;
+    // The clip that is played, which may be a queued one.
+    function playedClip() {
+        var url = video ? video.data : null;
+        return clips.filter(function (clip) { return urlOf(clip) === url; })[0] || opened;
     }
 
     function describeSpeed() {
@@ -93,110 +92,109 @@ var media = (function () {
         tv.fill(tv.byId('media-list'), tv.linesAround(lines, focused, linesShown));
     }
 
-    // Hides everything but the picture while something plays and no key is pressed.
-    function rest() {
+    // Hides everything but the video.
+    function hideControls() {
         if (video && video.playState === state.PLAYING) {
-            tv.byId('media').className = 'resting';
+            tv.byId('media').className = 'controls-hidden';
         }
     }
 
-    function wake() {
+    function showControls() {
         tv.byId('media').className = '';
-        clearTimeout(restTimer);
-        restTimer = setTimeout(rest, restMilliseconds);
+        clearTimeout(hideTimer);
+        hideTimer = setTimeout(hideControls, hideMilliseconds);
     }
 
     function update() {
-        var isPlaying = video !== null;
-        var position = isPlaying ? video.playPosition : 0;
-        var length = isPlaying ? video.playTime : 0;
-        var playState = isPlaying ? video.playState : state.STOPPED;
-        var clip = isPlaying ? presented() : null;
+        var isOpen = video !== null;
+        var position = isOpen ? video.playPosition : 0;
+        var length = isOpen ? video.playTime : 0;
+        var playState = isOpen ? video.playState : state.STOPPED;
+        var clip = isOpen ? playedClip() : null;
         if (clip !== shown) {
-            // Also of the queue, whose clips begin without a change of state.
+            // Checked at each update, because a queued clip starts without a state change.
             shown = clip;
             notice = '';
-            wake();
+            showControls();
         }
-        tv.say('media-title', clip ? clip.title : 'Choose a clip');
-        tv.say('media-state', isPlaying ? describeState() : '');
+        tv.setText('media-title', clip ? clip.title : 'Choose a clip');
+        tv.setText('media-state', isOpen ? describeState() : '');
         tv.byId('media-state').className = playState === state.ERROR ? 'error' : '';
-        tv.say('media-track', isPlaying ? describeTrack() : '');
-        tv.say('media-time', length > 0 ? tv.duration(position) + ' / ' + tv.duration(length) : '');
+        tv.setText('media-track', isOpen ? describeTrack() : '');
+        tv.setText('media-time', length > 0 ? tv.duration(position) + ' / ' + tv.duration(length) : '');
         tv.byId('media-played').style.width = (length > 0 ? Math.min(100, position / length * 100) : 0) + '%';
-        tv.say('media-notice', notice);
-        hasBegun = hasBegun || playState === state.PLAYING;
-        // The picture is beneath: the ground covers it where there is none to be seen.
-        var hasPicture = isPlaying && hasBegun && !clip.isAudio &&
-                         [state.PLAYING, state.PAUSED, state.BUFFERING].indexOf(playState) >= 0;
-        tv.setVisible('ground', !hasPicture);
+        tv.setText('media-notice', notice);
+        hasStarted = hasStarted || playState === state.PLAYING;
+        var hasVideo = isOpen && hasStarted && !clip.isAudio &&
+                       [state.PLAYING, state.PAUSED, state.BUFFERING].indexOf(playState) >= 0;
+        tv.setVisible('background', !hasVideo);
         if (playState !== state.PLAYING) {
             tv.byId('media').className = '';
         }
     }
 
-    function tell(text) {
+    function showNotice(text) {
         update();
         notice = text;
-        tv.say('media-notice', notice);
+        tv.setText('media-notice', notice);
     }
 
     // ---- Playing
 
-    function dropVideo() {
+    function removeVideo() {
         if (video) {
             video.stop();
             tv.removeObject(video);
         }
         video = null;
-        playing = null;
+        opened = null;
     }
 
     function onStateChange() {
         if (video.playState === state.PLAYING) {
-            wake();
+            showControls();
             choice.update();
         }
         update();
     }
 
-    function makeVideo(clip) {
-        var made = tv.makeObject(clip.type, 'media-' + ++objectsMade);
-        if (!made.isThere) {
-            tv.removeObject(made);
-            tell('This set has no media player.');
+    function createVideo(clip) {
+        var created = tv.createObject(clip.type, 'media-' + ++objectsCreated);
+        if (!created.hasPlugin) {
+            tv.removeObject(created);
+            showNotice('This set has no media player.');
             return;
         }
-        video = made;
-        playing = clip;
+        video = created;
+        opened = clip;
         video.onPlayStateChange = onStateChange;
         video.onPlayPositionChanged = update;
         video.onPlaySpeedChanged = function () { speedChanges++; };
         video.onDRMRightsError = function (error, contentId) {
-            tell('There are no rights for ' + (contentId || 'this content') + ' (' + error + ').');
+            showNotice('There are no rights for ' + (contentId || 'this content') + ' (' + error + ').');
         };
-        video.data = addressOf(clip);
+        video.data = urlOf(clip);
         if (!clip.isPlaylist) {
             video.play(1);
         }
         update();
     }
 
-    // Some sets stop their one pipeline for any player that ends. The browser ends the former one a turn later; the new
-    // one comes after it.
+    // The new object is created in a later turn of the event loop, after the browser has destroyed the previous one: some
+    // sets have a single pipeline, which they stop when any player is destroyed.
     function open() {
         var clip = clips[focused];
-        dropVideo();
-        hasBegun = false;
+        removeVideo();
+        hasStarted = false;
         speed = 1;
         notice = '';
         clearTimeout(openTimer);
-        openTimer = setTimeout(function () { makeVideo(clip); }, 0);
+        openTimer = setTimeout(function () { createVideo(clip); }, 0);
     }
 
-    // The plug-in hands a speed to the set when the next one is asked for. So each speed is asked for twice, and the
-    // ordinary one, which is asked for only as a change, by way of one that is as good as it.
-    function askForSpeed(wanted) {
+    // The plug-in passes a speed to the set only with the next call. So each speed is set twice; normal speed is set
+    // after a nearly equal one, because the plug-in ignores a call that changes nothing.
+    function requestSpeed(wanted) {
         speedChanges = 0;
         video.play(wanted);
         video.play(wanted === 1 ? 1.0001 : wanted);
@@ -206,18 +204,18 @@ var media = (function () {
     }
 
     function setSpeed(wanted) {
-        askForSpeed(wanted);
+        requestSpeed(wanted);
         if (speedChanges >= 2) {
             speed = wanted;
-            tell('');
+            showNotice('');
             return;
         }
-        // Refused; only a pause makes the plug-in forget it.
+        // The set has rejected the speed, which the plug-in keeps until a pause.
         video.play(0);
         video.play(1);
-        askForSpeed(1);
+        requestSpeed(1);
         speed = 1;
-        tell('This speed is not possible here.');
+        showNotice('This speed is not possible here.');
     }
 
     function changeSpeed(step) {
@@ -253,7 +251,7 @@ var media = (function () {
     }
 
     function ok() {
-        if (!video || clips[focused] !== playing) {
+        if (!video || clips[focused] !== opened) {
             open();
         } else if (video.playState === state.PLAYING) {
             pause();
@@ -266,7 +264,7 @@ var media = (function () {
         if (video) {
             video.stop();
             speed = 1;
-            tell('');
+            showNotice('');
         }
     }
 
@@ -276,7 +274,7 @@ var media = (function () {
         }
         var last = Math.max(0, video.playTime - 1000);
         var target = Math.max(0, Math.min(last, video.playPosition + step));
-        tell(video.seek(target) ? '' : 'Here the set cannot go to another position.');
+        showNotice(video.seek(target) ? '' : 'The set cannot seek in this clip.');
     }
 
     function queue() {
@@ -284,7 +282,7 @@ var media = (function () {
         if (!video) {
             open();
         } else {
-            tell(video.queue(addressOf(clip)) ? 'Next: ' + clip.title : 'The set does not queue this.');
+            showNotice(video.queue(urlOf(clip)) ? 'Next: ' + clip.title : 'The set cannot queue this clip.');
         }
     }
 
@@ -304,56 +302,56 @@ var media = (function () {
     function close() {
         clearTimeout(openTimer);
         clearInterval(refreshTimer);
-        clearTimeout(restTimer);
+        clearTimeout(hideTimer);
         choice.close();
         keys.close(layer);
-        dropVideo();
+        removeVideo();
         tv.setVisible('media', false);
-        leave();
+        onClose();
     }
 
-    // Wakes the page at each key, and then does what the key is for.
-    function waking(action, argument) {
+    // The function of a key, which also shows the controls.
+    function withControls(action, argument) {
         return function () {
-            wake();
+            showControls();
             action(argument);
             update();
         };
     }
 
     var layer = { modal: true, keys: { back: close } };
-    var whenServed = {
-        up: waking(moveFocus, -1),
-        down: waking(moveFocus, 1),
-        ok: waking(ok),
-        left: waking(seek, -seekMilliseconds),
-        right: waking(seek, seekMilliseconds),
-        play: waking(play),
-        pause: waking(pause),
-        stop: waking(stop),
-        rewind: waking(changeSpeed, -1),
-        forward: waking(changeSpeed, 1),
-        info: waking(function () {}),
-        green: waking(function () {
+    var keysIfServed = {
+        up: withControls(moveFocus, -1),
+        down: withControls(moveFocus, 1),
+        ok: withControls(ok),
+        left: withControls(seek, -seekMilliseconds),
+        right: withControls(seek, seekMilliseconds),
+        play: withControls(play),
+        pause: withControls(pause),
+        stop: withControls(stop),
+        rewind: withControls(changeSpeed, -1),
+        forward: withControls(changeSpeed, 1),
+        info: withControls(function () {}),
+        green: withControls(function () {
             choice.open(function () {
                 return video && [state.PLAYING, state.PAUSED].indexOf(video.playState) >= 0 ? video : null;
             });
         }),
-        yellow: waking(queue),
-        blue: waking(nextTrack)
+        yellow: withControls(queue),
+        blue: withControls(nextTrack)
     };
 
-    // Shows the page; `back` is called when the viewer leaves it.
-    function show(back) {
-        leave = back;
+    // Shows the page; `closed` is called when the viewer closes it.
+    function show(closed) {
+        onClose = closed;
         tv.setVisible('media', true);
         tv.setVisible('media-unserved', !isServed());
         tv.setVisible('media-player', isServed());
         if (isServed()) {
-            Object.keys(whenServed).forEach(function (name) { layer.keys[name] = whenServed[name]; });
+            Object.keys(keysIfServed).forEach(function (name) { layer.keys[name] = keysIfServed[name]; });
             showList();
             update();
-            wake();
+            showControls();
             refreshTimer = setInterval(update, refreshMilliseconds);
         }
         keys.open(layer);

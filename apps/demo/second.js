@@ -1,19 +1,19 @@
-// The second application of the demonstration: it says who it is and ends itself.
+// The second application of the demonstration: shows its owner application and destroys itself.
 (function () {
     'use strict';
 
     var application = tv.ownerApplication(document.getElementById('manager'));
     var state = document.getElementById('state');
-    state.textContent = 'getOwnerApplication(document) gave ' + tv.describeApplication(application) + '.';
+    state.textContent = 'getOwnerApplication(document) returned ' + tv.describeApplication(application) + '.';
 
-    function leave() {
+    function close() {
         if (application) {
             application.destroyApplication();
         }
     }
 
     var actions = {};
-    actions[VK_BACK] = leave;
-    actions[VK_ENTER] = leave;
+    actions[VK_BACK] = close;
+    actions[VK_ENTER] = close;
     tv.onKeys(actions);
 }());

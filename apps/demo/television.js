@@ -1,10 +1,10 @@
-// Broadcast: the object that presents it, the channels, and what is on. What happens is told to the functions of
-// television.on: tuning(), tuned(), failed(text), programmes(), announced(text).
+// Broadcast: the object that presents it, the channels and the programmes. Events call the functions of television.on:
+// tuning(), tuned(), failed(text), programmes(), announced(text).
 var television = (function () {
     'use strict';
 
-    var zapMilliseconds = 250; // rest after the last of several quick steps
-    var answerMilliseconds = 15000;
+    var zapMilliseconds = 250; // from the last of several quick steps to the tune
+    var tuneTimeoutMilliseconds = 15000;
     var announcement = { url: 'streamevent.xml', name: 'red-button', id: '1', tag: '1f' };
     var errors = { 0: 'The tuner does not support this channel.', 1: 'No signal.',
                    2: 'The tuner is in use.', 3: 'Parental control blocks this channel.',
@@ -15,12 +15,12 @@ var television = (function () {
 
     var on = {};
     var object = null;
-    var former = []; // the objects before it, which present until it does
-    var objectsMade = 0;
+    var previous = []; // earlier objects, one of which presents until `object` does
+    var objectsCreated = 0;
     var timer = 0;
     var state = { channels: [], channel: null, isTuned: false, error: '', programmes: [] };
 
-    // The plug-in ends what it has handed out together with the object that it came from, so values are copied.
+    // Values are copied, because the channels of an object are invalid after its removal.
     function copyChannel(channel, index) {
         return { number: index + 1, ccid: channel.ccid, name: channel.name || 'Channel ' + (index + 1),
                  isRadio: channel.channelType === channel.TYPE_RADIO };
@@ -40,39 +40,38 @@ var television = (function () {
         return channels;
     }
 
-    function known(channel) {
+    function listedChannel(channel) {
         return channel && state.channels.filter(function (each) { return each.ccid === channel.ccid; })[0] || null;
     }
 
     // ---- The object
 
-    function dropFormer() {
-        former.forEach(tv.removeObject);
-        former = [];
-        document.body.offsetWidth; // the browser ends them now
+    function removePrevious() {
+        previous.forEach(tv.removeObject);
+        previous = [];
+        document.body.offsetWidth; // forces the layout, which destroys their plug-in instances
     }
 
-    // An object keeps the lists of components that it has once handed out, also on another channel. So every channel
-    // gets an object of its own. Its events go to listeners of the page: browsers keep a handler that is set on an object
-    // of the plug-in by any such object of the page, and lose it when that one is taken away. Only what an event
-    // does not tell, why something failed, is left to handlers.
-    function renew() {
+    // An object caches its component lists, even across channel changes, so every channel has its own object. Its events
+    // are handled by listeners: browsers share the handler properties of all objects of a plug-in, and lose a handler
+    // when one of these objects is removed. Handlers are used only for the error code, which the events do not have.
+    function replaceObject() {
         if (object) {
             object.onChannelChangeError = object.onPlayStateChange = null;
-            former.push(object);
+            previous.push(object);
         }
-        var made = object = tv.makeObject('video/broadcast', 'broadcast-' + ++objectsMade);
-        if (!object.isThere) {
+        var created = object = tv.createObject('video/broadcast', 'broadcast-' + ++objectsCreated);
+        if (!object.hasPlugin) {
             return;
         }
         function listen(type, action) {
-            made.addEventListener(type, function () {
-                if (made === object) {
+            created.addEventListener(type, function () {
+                if (created === object) {
                     action();
                 }
             }, false);
         }
-        listen('ChannelChangeSucceded', succeed); // in the plug-in's spelling
+        listen('ChannelChangeSucceded', succeed); // the event's own spelling
         listen('ChannelChangeError', function () {
             if (!state.error) {
                 end('The channel cannot be shown.');
@@ -82,7 +81,7 @@ var television = (function () {
         listen('ParentalRatingChange', function () { on.programmes(); });
         object.onChannelChangeError = function (channel, error) { fail(error); };
         object.onPlayStateChange = function (playState, error) {
-            // Also told behind an error of the tuning; then it is a repetition.
+            // Also called after a tune error, which has been reported already.
             if (state.isTuned && error !== undefined) {
                 fail(error);
             }
@@ -100,8 +99,8 @@ var television = (function () {
         on.tuning();
     }
 
-    function expectAnswer() {
-        timer = setTimeout(function () { end('The set does not answer.'); }, answerMilliseconds);
+    function startTimeout() {
+        timer = setTimeout(function () { end('The set does not respond.'); }, tuneTimeoutMilliseconds);
     }
 
     function end(text) {
@@ -115,12 +114,12 @@ var television = (function () {
     function succeed() {
         var presenting = object;
         clearTimeout(timer);
-        state.channel = known(object.currentChannel) || state.channel;
+        state.channel = listedChannel(object.currentChannel) || state.channel;
         state.isTuned = true;
-        // Later: this is a call from the plug-in, of which the objects are. And then in this order: a listener that the
-        // plug-in is given goes with an object that is taken away.
+        // Deferred, because this is a call from the plug-in whose objects are removed. The listener is added after that,
+        // because the removal of an object would remove it.
         setTimeout(function () {
-            dropFormer();
+            removePrevious();
             setTimeout(function () {
                 if (presenting === object && state.isTuned) {
                     watchForAnnouncements();
@@ -136,7 +135,7 @@ var television = (function () {
     }
 
     function present(channel) {
-        renew();
+        replaceObject();
         var list = channelList();
         var wanted = list ? list.getChannel(channel.ccid) : null;
         if (!wanted) {
@@ -144,7 +143,7 @@ var television = (function () {
             return;
         }
         object.setChannel(wanted, false);
-        expectAnswer();
+        startTimeout();
     }
 
     function tune(channel) {
@@ -158,29 +157,29 @@ var television = (function () {
         tune(state.channels[index < 0 ? 0 : (index + step + count) % count]);
     }
 
-    // Shows what the set presents already; also the way back from media. False without channels.
+    // Presents the set's current channel, at the start and after media. Returns false if there are no channels.
     function start() {
-        renew();
-        state.channels = object.isThere ? readChannels() : [];
+        replaceObject();
+        state.channels = object.hasPlugin ? readChannels() : [];
         if (state.channels.length === 0) {
             return false;
         }
         object.bindToCurrentChannel();
-        begin(known(object.currentChannel) || state.channels[0]);
-        expectAnswer();
+        begin(listedChannel(object.currentChannel) || state.channels[0]);
+        startTimeout();
         return true;
     }
 
-    // Gives the tuner and the picture up.
+    // Releases the tuner and the video plane.
     function release() {
         clearTimeout(timer);
         state.isTuned = false;
-        if (object.isThere) {
+        if (object.hasPlugin) {
             object.release();
         }
-        former.push(object);
+        previous.push(object);
         object = null;
-        dropFormer();
+        removePrevious();
     }
 
     // ---- Programmes
@@ -196,13 +195,12 @@ var television = (function () {
                  rating: copyRating(programme.parentalRating) };
     }
 
-    // The programmes too are kept by an object that has once handed them out. One that is made for the moment has those
-    // of now.
+    // An object also caches its programmes, so a temporary object reads the current ones.
     function readProgrammes() {
         if (!state.isTuned) {
             return;
         }
-        var reader = tv.makeObject('video/broadcast');
+        var reader = tv.createObject('video/broadcast');
         var list = reader.programmes;
         state.programmes = [];
         for (var i = 0; list && i < list.length; i++) {
@@ -216,22 +214,22 @@ var television = (function () {
 
     function watchForAnnouncements() {
         var watched = object;
-        function tell(event) {
+        function onStreamEvent(event) {
             if (watched === object && event.name === announcement.name) {
                 on.announced(event.text || '');
             }
         }
         if (location.protocol === 'file:') {
-            // The plug-in would fetch the description, but a request for a file has no status that tells of success.
-            watched.addEventListener('StreamEvent', tell, false);
+            // Without a description file, because the plug-in cannot fetch it: requests for files have no HTTP status.
+            watched.addEventListener('StreamEvent', onStreamEvent, false);
             watched.addStreamEventListener('', announcement.name, announcement.id, announcement.tag);
         } else {
-            watched.addStreamEventListener(announcement.url, announcement.name, tell);
+            watched.addStreamEventListener(announcement.url, announcement.name, onStreamEvent);
         }
     }
 
     return { on: on, state: state, start: start, release: release, tune: tune, zap: zap,
-             isThere: function () { return object.isThere; },
-             // The object that presents, for the choice of components; null while none does.
+             hasPlugin: function () { return object.hasPlugin; },
+             // The object that presents, for the selection of components, or null.
              presenter: function () { return state.isTuned ? object : null; } };
 }());

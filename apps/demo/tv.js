@@ -1,4 +1,4 @@
-// What the pages of the demonstration share: elements, texts and the application of a page.
+// Shared by all pages: DOM helpers, formatting, plug-in objects.
 var tv = (function () {
     'use strict';
 
@@ -11,12 +11,12 @@ var tv = (function () {
     }
 
     function element(name, text, className) {
-        var made = document.createElement(name);
-        made.appendChild(document.createTextNode(text));
+        var created = document.createElement(name);
+        created.appendChild(document.createTextNode(text));
         if (className) {
-            made.className = className;
+            created.className = className;
         }
-        return made;
+        return created;
     }
 
     function fill(parent, children) {
@@ -26,8 +26,8 @@ var tv = (function () {
         children.forEach(function (child) { parent.appendChild(child); });
     }
 
-    // Shows a text in the element of that id.
-    function say(id, text) {
+    // Sets the text of the element with that id.
+    function setText(id, text) {
         if (byId(id).textContent !== text) {
             byId(id).textContent = text;
         }
@@ -41,9 +41,9 @@ var tv = (function () {
         return byId(id).style.display === 'block';
     }
 
-    // A table of two columns, one row for each pair of texts. With an empty second one the first has both columns.
+    // A table with one row per pair of strings. If the second one is empty, the first spans both columns.
     function table(rows) {
-        var made = document.createElement('table');
+        var created = document.createElement('table');
         rows.forEach(function (row) {
             var line = document.createElement('tr');
             line.appendChild(element('td', row[0]));
@@ -52,15 +52,15 @@ var tv = (function () {
             } else {
                 line.appendChild(element('td', row[1]));
             }
-            made.appendChild(line);
+            created.appendChild(line);
         });
-        return made;
+        return created;
     }
 
-    // The lines of a list, of which at most `most` are shown; the one at `focused` is among them.
-    function linesAround(lines, focused, most) {
-        var first = Math.max(0, Math.min(focused - Math.floor(most / 2), lines.length - most));
-        return lines.slice(first, first + most);
+    // At most `count` of the lines, around the focused one.
+    function linesAround(lines, focused, count) {
+        var first = Math.max(0, Math.min(focused - Math.floor(count / 2), lines.length - count));
+        return lines.slice(first, first + count);
     }
 
     function twoDigits(number) {
@@ -71,7 +71,7 @@ var tv = (function () {
         return twoDigits(date.getHours()) + ':' + twoDigits(date.getMinutes());
     }
 
-    // A position in media, from milliseconds.
+    // Formats a media position in milliseconds.
     function duration(milliseconds) {
         var seconds = Math.floor(milliseconds / 1000);
         return Math.floor(seconds / 60) + ':' + twoDigits(seconds % 60);
@@ -81,7 +81,7 @@ var tv = (function () {
         return languages[code] || code || 'Unknown language';
     }
 
-    // The value of a property as a viewer reads it.
+    // Describes the type of a property's value.
     function describe(value) {
         if (value === undefined) {
             return 'not there';
@@ -89,17 +89,17 @@ var tv = (function () {
         return value === null ? 'null' : typeof value;
     }
 
-    // What a method that hands out applications gave. Browsers differ in what they call the type of such an object.
+    // Describes a returned application. Not by its type, because browsers differ in `typeof` for such an object.
     function describeApplication(value) {
         return value ? 'an application' : describe(value);
     }
 
-    // The application that the page is, or null when there is no plug-in.
+    // The owner application of the page, or null if there is no plug-in.
     function ownerApplication(manager) {
         return manager.getOwnerApplication ? manager.getOwnerApplication(document) : null;
     }
 
-    // Calls actions[keyCode]() at the press of a key that has one; the browser then does nothing of its own with it.
+    // Calls actions[keyCode]() on a key press and prevents the browser's default action.
     function onKeys(actions) {
         document.addEventListener('keydown', function (event) {
             if (actions[event.keyCode]) {
@@ -109,18 +109,18 @@ var tv = (function () {
         }, false);
     }
 
-    // A new object of the plug-in, which fills the screen, or is out of sight without an `id`. Without one it gets no
-    // events either. The browser would make it some time later; reading a property makes it do so now.
-    function makeObject(type, id) {
-        var made = document.createElement('object');
-        made.type = type;
+    // Creates a plug-in object that fills the screen. Without an `id` it is invisible and gets no events. `hasPlugin` of
+    // the element says whether a plug-in handles it; the read forces the layout, which creates the instance.
+    function createObject(type, id) {
+        var created = document.createElement('object');
+        created.type = type;
         if (id) {
-            made.id = id;
-            made.className = 'picture';
+            created.id = id;
+            created.className = 'video';
         }
-        byId('pictures').appendChild(made);
-        made.isThere = made.offsetWidth > 0 && made.playState !== undefined;
-        return made;
+        byId('videos').appendChild(created);
+        created.hasPlugin = created.offsetWidth > 0 && created.playState !== undefined;
+        return created;
     }
 
     function removeObject(object) {
@@ -129,8 +129,8 @@ var tv = (function () {
         }
     }
 
-    return { byId: byId, element: element, fill: fill, say: say, setVisible: setVisible, isVisible: isVisible,
+    return { byId: byId, element: element, fill: fill, setText: setText, setVisible: setVisible, isVisible: isVisible,
              table: table, linesAround: linesAround, timeOfDay: timeOfDay, duration: duration,
              languageName: languageName, describe: describe, describeApplication: describeApplication,
-             ownerApplication: ownerApplication, onKeys: onKeys, makeObject: makeObject, removeObject: removeObject };
+             ownerApplication: ownerApplication, onKeys: onKeys, createObject: createObject, removeObject: removeObject };
 }());

@@ -1,4 +1,4 @@
-// A player for the remote control. What it offers stands in its address: ?media=ADDRESS&media=ADDRESS...
+// A media player for the remote control. The query string lists the media: ?media=URL&media=URL...
 (function () {
     'use strict';
 
@@ -38,15 +38,15 @@
         return (states[video.playState] || String(video.playState)) + error;
     }
 
-    function nameOf(address) {
-        return decodeURIComponent(address.split('?')[0].split('/').pop()) || address;
+    function nameOf(url) {
+        return decodeURIComponent(url.split('?')[0].split('/').pop()) || url;
     }
 
     function show() {
         var position = video.playPosition;
         var length = video.playTime;
-        tv.fill(byId('menu'), media.map(function (address, index) {
-            var line = tv.element('li', nameOf(address));
+        tv.fill(byId('menu'), media.map(function (url, index) {
+            var line = tv.element('li', nameOf(url));
             line.className = index === focused ? 'focused' : '';
             return line;
         }));
@@ -55,7 +55,7 @@
         byId('played').style.width = (length > 0 ? Math.min(100, position / length * 100) : 0) + '%';
     }
 
-    // Actions of the remote control.
+    // ---- Actions of keys
 
     function open() {
         video.data = media[focused];
@@ -64,11 +64,11 @@
 
     function play() {
         speed = speeds.indexOf(1);
-        log('play(1) gives ' + video.play(1));
+        log('play(1) returns ' + video.play(1));
     }
 
     function pause() {
-        log('play(0) gives ' + video.play(0));
+        log('play(0) returns ' + video.play(0));
     }
 
     function stop() {
@@ -78,12 +78,12 @@
 
     function seek(step) {
         var target = Math.max(0, video.playPosition + step);
-        log('seek(' + target + ') gives ' + video.seek(target));
+        log('seek(' + target + ') returns ' + video.seek(target));
     }
 
     function changeSpeed(step) {
         speed = Math.max(0, Math.min(speeds.length - 1, speed + step));
-        log('play(' + speeds[speed] + ') gives ' + video.play(speeds[speed]));
+        log('play(' + speeds[speed] + ') returns ' + video.play(speeds[speed]));
     }
 
     function moveFocus(step) {
@@ -109,7 +109,7 @@
         return;
     }
     if (media.length === 0) {
-        log('No media: name some in the address of this page, as ?media=ADDRESS');
+        log('No media: add ?media=URL to the URL of this page');
         show();
         return;
     }

@@ -1,4 +1,4 @@
-// The schemes of parental ratings that the set knows, with their ratings and the viewer's threshold.
+// The parental rating schemes of the set, with their ratings and thresholds.
 (function () {
     'use strict';
 

@@ -1,11 +1,13 @@
-// A page as the engine runs it for one application: settings, messages and failures.
+// The engine's page of one application: its settings, its messages and why it could not be loaded.
 #include "desktop/browser/ApplicationPage.h"
-
-#include "desktop/browser/Diagnostics.h"
 
 #include <QWebFrame>
 
 #include <utility>
+
+#include "desktop/browser/Diagnostics.h"
+
+namespace desktop {
 
 ApplicationPage::ApplicationPage(QString userAgent, QObject* parent)
     : QWebPage(parent), m_userAgent(std::move(userAgent)) {
@@ -18,35 +20,39 @@ bool ApplicationPage::supportsExtension(Extension extension) const {
     return extension == ErrorPageExtension;
 }
 
-// The engine asks for an error page when a load fails; the reason is all that is wanted here.
+// The engine asks for an error page when a load fails. None is given; only the reason is kept.
 bool ApplicationPage::extension(Extension extension, const ExtensionOption* option, ExtensionReturn*) {
-    if (extension != ErrorPageExtension)
+    if (extension != ErrorPageExtension) {
         return false;
+    }
     const auto* error = static_cast<const ErrorPageExtensionOption*>(option);
     if (error->frame == mainFrame()) {
         m_loadFailure = error->errorString;
         m_failedUrl = error->url;
     } else {
-        printError(QStringLiteral("can't load %1: %2").arg(error->url.toDisplayString(), error->errorString));
+        printError(
+            QStringLiteral("cannot load %1: %2").arg(error->url.toDisplayString(), error->errorString));
     }
     return false;
 }
 
 void ApplicationPage::javaScriptConsoleMessage(const QString& message, int line, const QString& source) {
-    // The engine does not always say which script a message comes from.
+    // The engine does not always name the script of a message.
     printConsoleMessage(source.isEmpty() ? mainFrame()->url().toString() : source, line, message);
 }
 
 void ApplicationPage::javaScriptAlert(QWebFrame*, const QString& message) {
-    printError(QStringLiteral("the page says: %1").arg(message));
+    printError(QStringLiteral("alert: %1").arg(message));
 }
 
 bool ApplicationPage::javaScriptConfirm(QWebFrame*, const QString& message) {
-    printError(QStringLiteral("the page asks, and is told no: %1").arg(message));
+    printError(QStringLiteral("confirm, answered with cancel: %1").arg(message));
     return false;
 }
 
 bool ApplicationPage::javaScriptPrompt(QWebFrame*, const QString& message, const QString&, QString*) {
-    printError(QStringLiteral("the page asks, and is told nothing: %1").arg(message));
+    printError(QStringLiteral("prompt, answered with cancel: %1").arg(message));
     return false;
 }
+
+} // namespace desktop

@@ -1,15 +1,17 @@
-// A page as the engine runs it for one application: settings, messages and failures.
+// The engine's page of one application: its settings, its messages and why it could not be loaded.
 #ifndef TELIX_DESKTOP_BROWSER_APPLICATIONPAGE_H
 #define TELIX_DESKTOP_BROWSER_APPLICATIONPAGE_H
 
 #include <QUrl>
 #include <QWebPage>
 
+namespace desktop {
+
 class ApplicationPage : public QWebPage {
     Q_OBJECT
 
 public:
-    // `userAgent`: what servers and scripts are told that this is.
+    // `userAgent`: the User-Agent header of requests, and navigator.userAgent.
     ApplicationPage(QString userAgent, QObject* parent);
 
     // Why the last document could not be loaded; empty when it could.
@@ -23,7 +25,8 @@ public:
 protected:
     QString userAgentForUrl(const QUrl&) const override { return m_userAgent; }
     void javaScriptConsoleMessage(const QString& message, int line, const QString& source) override;
-    // A television has no dialogs: a page's questions are printed and answered with no.
+    // A television has no dialogs: alert(), confirm() and prompt() print their message, and the last two
+    // return as if cancelled.
     void javaScriptAlert(QWebFrame* frame, const QString& message) override;
     bool javaScriptConfirm(QWebFrame* frame, const QString& message) override;
     bool javaScriptPrompt(QWebFrame* frame, const QString& message, const QString& proposal,
@@ -35,5 +38,7 @@ private:
     QString m_loadFailure;
     QUrl m_failedUrl;
 };
+
+} // namespace desktop
 
 #endif

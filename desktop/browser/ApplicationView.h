@@ -1,35 +1,37 @@
-// One application of the stack: its page on the screen, and the keys that reach it.
+// The widget of one application: paints its page and gives it keys and mouse events.
 #ifndef TELIX_DESKTOP_BROWSER_APPLICATIONVIEW_H
 #define TELIX_DESKTOP_BROWSER_APPLICATIONVIEW_H
 
 #include <QWebView>
 
+namespace desktop {
+
 class ApplicationPage;
 struct RemoteKey;
 
-// The page is laid out on 1280 by 720 pixels whatever the view's size, and painted enlarged or reduced:
-// script and plug-ins see the same geometry in every window.
+// The page is laid out for 1280x720 pixels whatever the size of the widget, and painted scaled: scripts and
+// plug-ins see the same geometry in every window.
 class ApplicationView : public QWebView {
     Q_OBJECT
 
 public:
-    // `userAgent`: what the page says it is, to servers and to its scripts.
+    // `userAgent`: the User-Agent header of requests, and navigator.userAgent.
     ApplicationView(const QString& userAgent, QWidget* parent);
     ~ApplicationView() override;
 
     ApplicationPage& applicationPage() const { return *m_page; }
-    // Whether a document is loaded and no other on its way.
+    // Whether a document is loaded and no other is being loaded.
     bool isLoaded() const { return m_loaded; }
-    // Whether there is a document, even if the next is on its way or could not be loaded.
+    // Whether there is a document, even if the next one is being loaded or could not be loaded.
     bool hasDocument() const { return m_hasDocument; }
-    // An application that isn't shown paints nothing; it goes on running and has the keys, so that it can
-    // show itself again at the press of one.
+    // A hidden application paints nothing. It keeps running and receiving keys, so that it can show itself
+    // again on a key press.
     void setShown(bool shown);
-    // Presses and releases a key as if it came from the keyboard.
+    // Sends the press and the release of a key, as the keyboard would.
     void press(const RemoteKey& key);
 
 signals:
-    // A document could not be loaded; the one before it stays.
+    // A document could not be loaded; the previous one stays.
     void loadFailed(const QString& reason);
 
 protected:
@@ -48,14 +50,16 @@ protected:
 
 private:
     void onLoadFinished(bool ok);
-    void tellVisibility();
-    QMouseEvent onPage(const QMouseEvent& event) const;
-    bool dispatch(const char* type, const RemoteKey& key);
+    void updateVisibilityState();
+    QMouseEvent inPageCoordinates(const QMouseEvent& event) const;
+    bool dispatchKeyEvent(const char* type, const RemoteKey& key);
 
     ApplicationPage* m_page;
     bool m_loaded = false;
     bool m_hasDocument = false;
     bool m_shown = true;
 };
+
+} // namespace desktop
 
 #endif

@@ -1,8 +1,6 @@
 // The options of telix-tv.
 #include "desktop/browser/CommandLine.h"
 
-#include "desktop/browser/Diagnostics.h"
-
 #include <QCommandLineParser>
 #include <QFileInfo>
 #include <QRegularExpression>
@@ -13,147 +11,194 @@
 #include <cmath>
 #include <cstdio>
 
+#include "desktop/browser/Diagnostics.h"
+
+namespace desktop {
+
 namespace {
 
-const char description[] =
-    R"(A television on the desk: shows a page of interactive television with the plug-in in it.
+const char kDescription[] =
+    R"(The window of the desktop television: shows a page of an HbbTV application with the plug-in.
 
-A run with a script goes through these steps, in this order, each only if asked for:
-  1. the page is loaded;
-  2. --keys are pressed, one after the other, each when the page before it is loaded;
-  3. --wait-for is evaluated again and again until it is true;
-  4. --wait-for-picture waits until a picture of broadcast or of a media player is there;
-  5. --eval is evaluated; its value is the last line on standard output;
-  6. --screenshot is written, also when what was waited for never came;
-  7. the program ends if --wait-for, --wait-for-picture, --eval or --screenshot was given.
-Expressions and keys go to the application on top, the one on the screen, once it is loaded. An expression that
-throws is not yet true. All steps together have --timeout seconds.
+Automation performs these steps in this order, each only if its option is given:
+  1. load the page;
+  2. press --keys, one after the other, each when the page that the previous one opened is loaded;
+  3. evaluate --wait-for repeatedly until it is true;
+  4. --wait-for-picture: wait until the video plane shows broadcast or media;
+  5. evaluate --eval and print its value as the last line on standard output;
+  6. write --screenshot, also after a timeout;
+  7. exit, if --wait-for, --wait-for-picture, --eval or --screenshot is given.
+Expressions and keys go to the topmost application, the visible one, when it is loaded. An expression that throws
+counts as false. --timeout applies to all steps together.
 
-Exit status: 0 when everything asked for was done, 1 when what was waited for never came, --eval threw or the keys could
-not be pressed in time, 2 for a bad option and for a page or a plug-in that can't be loaded.
+Exit status: 0 if all steps are done; 1 after a timeout or if --eval throws; 2 for a bad option and for a page or a
+plug-in that cannot be loaded.
 
-Keyboard: arrow keys, Enter as OK, Backspace or Escape as Back, F1 to F4 as red, green, yellow, blue, F5 to F10 (or
-the media keys) as play, pause, stop, rewind, fast forward, info, and the digits.)";
+Keyboard: arrow keys, Enter (OK), Backspace or Escape (Back), F1 to F4 (red, green, yellow, blue), F5 to F10 or the
+media keys (play, pause, stop, rewind, fast forward, info), and the digits.)";
 
-const int largestSide = 16384;
-const double longestTimeoutSeconds = 24 * 60 * 60;
+constexpr int kMaxSide = 16384;
+constexpr double kMaxTimeoutSeconds = 24 * 60 * 60;
 
-std::optional<int> reject(const QString& mistake) {
-    printError(mistake);
-    return exitUnusable;
-}
-
-std::optional<QSize> readSize(const QString& text) {
-    static const QRegularExpression pattern(QStringLiteral("^([1-9][0-9]{0,4})x([1-9][0-9]{0,4})$"));
-    const auto match = pattern.match(text);
+std::optional<QSize> parseSize(const QString& text) {
+    static const QRegularExpression kPattern(QStringLiteral("^([1-9][0-9]{0,4})x([1-9][0-9]{0,4})$"));
+    const auto match = kPattern.match(text);
     const QSize size(match.captured(1).toInt(), match.captured(2).toInt());
-    if (!match.hasMatch() || size.width() > largestSide || size.height() > largestSide)
+    if (!match.hasMatch() || size.width() > kMaxSide || size.height() > kMaxSide) {
         return std::nullopt;
+    }
     return size;
 }
 
-// The engine's own, and the token by which television services know a set: options that the set does not
-// have, maker, model, versions of software and of hardware, and a field that is kept free.
+// The engine's own string and the HbbTV token of TS 102 796: capabilities (none), vendor, model, software
+// version, hardware version, a reserved field.
 QString defaultUserAgent() {
     return QStringLiteral("Mozilla/5.0 (X11; Linux) AppleWebKit/%1 (KHTML, like Gecko) Safari/%1 "
                           "HbbTV/1.1.1 (;Telix;telix-tv;" TELIX_VERSION ";;)")
         .arg(qWebKitVersion());
 }
 
-// What has a scheme is an address, everything else the name of a file.
-QUrl readPage(const QString& text) {
-    static const QRegularExpression scheme(QStringLiteral("^([a-zA-Z][a-zA-Z0-9+.-]*://|data:|about:)"));
-    return scheme.match(text).hasMatch() ? QUrl(text)
-                                         : QUrl::fromLocalFile(QFileInfo(text).absoluteFilePath());
+// A string with a scheme is a URL, any other a file name.
+QUrl parsePage(const QString& text) {
+    static const QRegularExpression kScheme(QStringLiteral("^([a-zA-Z][a-zA-Z0-9+.-]*://|data:|about:)"));
+    return kScheme.match(text).hasMatch() ? QUrl(text)
+                                          : QUrl::fromLocalFile(QFileInfo(text).absoluteFilePath());
 }
 
 QString keyNames() {
     QStringList names;
-    for (const auto& key : remoteKeys())
+    for (const auto& key : remoteKeys()) {
         names << QLatin1String(key.name);
+    }
     return names.join(QLatin1String(", "));
+}
+
+struct Options {
+    QCommandLineOption size{"size",
+                            "Size of the window in pixels, default 1280x720. The page is scaled to it.",
+                            "WxH", "1280x720"};
+    QCommandLineOption fullscreen{"fullscreen", "Fill the screen."};
+    QCommandLineOption plugin{"plugin", "The plug-in to load, default " TELIX_DEFAULT_PLUGIN ".", "FILE",
+                              TELIX_DEFAULT_PLUGIN};
+    QCommandLineOption keys{"keys", "Press keys of the remote control: " + keyNames() + ".", "NAME,NAME..."};
+    QCommandLineOption waitFor{"wait-for", "Wait until the expression is true.", "EXPR"};
+    QCommandLineOption waitForPicture{"wait-for-picture", "Wait until the video plane shows something."};
+    QCommandLineOption timeout{"timeout", "Timeout of all steps in seconds, default 30.", "SECONDS", "30"};
+    QCommandLineOption eval{"eval", "Print the value of the expression as JSON.", "EXPR"};
+    QCommandLineOption screenshot{"screenshot", "Write a screenshot of the window.", "FILE.png"};
+    QCommandLineOption userAgent{"user-agent", "The user agent string, default " + defaultUserAgent() + ".",
+                                 "TEXT", defaultUserAgent()};
+    QCommandLineOption inspect{"inspect", "Open the web inspector."};
+    QCommandLineOption help{QStringList{"h", "help"}, "Print this text."};
+    QCommandLineOption version{"version", "Print the version."};
+
+    QList<QCommandLineOption> all() const {
+        return {size, fullscreen, plugin,    keys,    waitFor, waitForPicture, timeout,
+                eval, screenshot, userAgent, inspect, help,    version};
+    }
+};
+
+// Reports a usage error.
+std::optional<int> reject(const QString& error) {
+    printError(error);
+    return kExitBadInput;
+}
+
+// Handles --help and --version, which need nothing else of the command line.
+bool printInformation(const QCommandLineParser& parser, const Options& options) {
+    if (parser.isSet(options.help)) {
+        std::fputs(parser.helpText().toUtf8().constData(), stdout);
+        return true;
+    }
+    if (parser.isSet(options.version)) {
+        std::printf("telix-tv %s (QtWebKit %s, Qt %s)\n", TELIX_VERSION, QTWEBKIT_VERSION_STR, qVersion());
+        return true;
+    }
+    return false;
+}
+
+// The following functions return the usage error, a null string if there is none.
+
+QString parseKeys(const QString& list, QVector<const RemoteKey*>& keys) {
+    for (const auto& name : list.split(QLatin1Char(','))) {
+        const RemoteKey* key = remoteKeyByName(name);
+        if (!key) {
+            return QStringLiteral("--keys: unknown key \"%1\"").arg(name);
+        }
+        keys << key;
+    }
+    return {};
+}
+
+QString checkNotEmpty(const QCommandLineParser& parser, const Options& options) {
+    for (const auto& option :
+         {options.waitFor, options.eval, options.screenshot, options.plugin, options.userAgent}) {
+        if (parser.isSet(option) && parser.value(option).trimmed().isEmpty()) {
+            return QStringLiteral("--%1: empty value").arg(option.names().first());
+        }
+    }
+    // The user agent becomes a line of a request header.
+    const QString userAgent = parser.value(options.userAgent);
+    const auto isControl = [](QChar letter) { return letter.category() == QChar::Other_Control; };
+    if (std::any_of(userAgent.cbegin(), userAgent.cend(), isControl)) {
+        return QStringLiteral("--user-agent: control character in the user agent");
+    }
+    return {};
+}
+
+QString parseValues(const QCommandLineParser& parser, const Options& options, CommandLine& commandLine) {
+    if (parser.positionalArguments().size() != 1) {
+        return QStringLiteral("expected exactly one page, see --help");
+    }
+    commandLine.page = parsePage(parser.positionalArguments().first());
+
+    const auto size = parseSize(parser.value(options.size));
+    if (!size) {
+        return QStringLiteral("--size: bad size \"%1\", expected WxH").arg(parser.value(options.size));
+    }
+    commandLine.windowSize = *size;
+
+    bool isNumber = false;
+    const double timeout = parser.value(options.timeout).toDouble(&isNumber);
+    if (!isNumber || !(timeout > 0 && timeout <= kMaxTimeoutSeconds)) {
+        return QStringLiteral("--timeout: bad timeout \"%1\", expected seconds")
+            .arg(parser.value(options.timeout));
+    }
+    commandLine.timeoutSeconds = timeout;
+
+    const QString keyError =
+        parser.isSet(options.keys) ? parseKeys(parser.value(options.keys), commandLine.keys) : QString();
+    return keyError.isNull() ? checkNotEmpty(parser, options) : keyError;
 }
 
 } // namespace
 
 std::optional<int> readCommandLine(const QStringList& arguments, CommandLine& commandLine) {
+    const Options options;
     QCommandLineParser parser;
-    parser.setApplicationDescription(QString::fromUtf8(description));
-    const QCommandLineOption size(
-        "size",
-        "Size of the window in pixels (1280x720). The page always has 1280x720 and is "
-        "enlarged or reduced.",
-        "WxH", "1280x720");
-    const QCommandLineOption fullscreen("fullscreen", "Fill the screen.");
-    const QCommandLineOption plugin("plugin", "The plug-in to load (" TELIX_DEFAULT_PLUGIN ").", "FILE",
-                                    TELIX_DEFAULT_PLUGIN);
-    const QCommandLineOption keys("keys", "Press keys of the remote control: " + keyNames() + ".",
-                                  "NAME,NAME...");
-    const QCommandLineOption waitFor("wait-for", "Wait until the expression is true.", "EXPR");
-    const QCommandLineOption waitForPicture("wait-for-picture", "Wait until there is a picture.");
-    const QCommandLineOption timeout("timeout", "Give up after so many seconds (30).", "SECONDS", "30");
-    const QCommandLineOption eval("eval", "Print the value of the expression as JSON.", "EXPR");
-    const QCommandLineOption screenshot("screenshot", "Write a picture of the window.", "FILE.png");
-    const QCommandLineOption userAgent(
-        "user-agent", "What servers and pages are told that this is (" + defaultUserAgent() + ").", "TEXT",
-        defaultUserAgent());
-    const QCommandLineOption inspect("inspect", "Open the engine's inspector.");
-    const QCommandLineOption help(QStringList{"h", "help"}, "Print this text.");
-    const QCommandLineOption version("version", "Print the version.");
-    parser.addOptions({size, fullscreen, plugin, keys, waitFor, waitForPicture, timeout, eval, screenshot,
-                       userAgent, inspect, help, version});
-    parser.addPositionalArgument("page", "Address or file name of the page.", "URL-or-FILE");
+    parser.setApplicationDescription(QString::fromUtf8(kDescription));
+    parser.addOptions(options.all());
+    parser.addPositionalArgument("page", "URL or file name of the page.", "URL-or-FILE");
 
-    if (!parser.parse(arguments))
+    if (!parser.parse(arguments)) {
         return reject(parser.errorText());
-    if (parser.isSet(help)) {
-        std::fputs(parser.helpText().toUtf8().constData(), stdout);
-        return exitSuccess;
     }
-    if (parser.isSet(version)) {
-        std::printf("telix-tv %s (QtWebKit %s, Qt %s)\n", TELIX_VERSION, QTWEBKIT_VERSION_STR, qVersion());
-        return exitSuccess;
+    if (printInformation(parser, options)) {
+        return kExitSuccess;
     }
-
-    if (parser.positionalArguments().size() != 1)
-        return reject(QStringLiteral("exactly one page is needed, see --help"));
-    commandLine.page = readPage(parser.positionalArguments().first());
-
-    const auto sizeRead = readSize(parser.value(size));
-    if (!sizeRead)
-        return reject(QStringLiteral("bad size \"%1\", expected WxH").arg(parser.value(size)));
-    commandLine.size = *sizeRead;
-
-    bool isNumber = false;
-    commandLine.timeoutSeconds = parser.value(timeout).toDouble(&isNumber);
-    if (!isNumber || !(commandLine.timeoutSeconds > 0 && commandLine.timeoutSeconds <= longestTimeoutSeconds))
-        return reject(QStringLiteral("bad timeout \"%1\", expected seconds").arg(parser.value(timeout)));
-
-    if (parser.isSet(keys)) {
-        for (const auto& name : parser.value(keys).split(QLatin1Char(','))) {
-            const RemoteKey* key = remoteKeyByName(name);
-            if (!key)
-                return reject(QStringLiteral("unknown key \"%1\"").arg(name));
-            commandLine.keys << key;
-        }
+    const QString error = parseValues(parser, options, commandLine);
+    if (!error.isNull()) {
+        return reject(error);
     }
-    for (const auto& option : {waitFor, eval, screenshot, plugin, userAgent}) {
-        if (parser.isSet(option) && parser.value(option).trimmed().isEmpty())
-            return reject(QStringLiteral("option --%1 is empty").arg(option.names().first()));
-    }
-
-    commandLine.userAgent = parser.value(userAgent);
-    // It becomes a line of a request's head.
-    const auto isControl = [](QChar letter) { return letter.category() == QChar::Other_Control; };
-    if (std::any_of(commandLine.userAgent.cbegin(), commandLine.userAgent.cend(), isControl))
-        return reject(QStringLiteral("bad user agent, it holds a control character"));
-
-    commandLine.fullscreen = parser.isSet(fullscreen);
-    commandLine.inspect = parser.isSet(inspect);
-    commandLine.plugin = parser.value(plugin);
-    commandLine.waitForPicture = parser.isSet(waitForPicture);
-    commandLine.waitFor = parser.value(waitFor);
-    commandLine.eval = parser.value(eval);
-    commandLine.screenshot = parser.value(screenshot);
+    commandLine.fullscreen = parser.isSet(options.fullscreen);
+    commandLine.inspect = parser.isSet(options.inspect);
+    commandLine.plugin = parser.value(options.plugin);
+    commandLine.userAgent = parser.value(options.userAgent);
+    commandLine.waitForPicture = parser.isSet(options.waitForPicture);
+    commandLine.waitFor = parser.value(options.waitFor);
+    commandLine.eval = parser.value(options.eval);
+    commandLine.screenshot = parser.value(options.screenshot);
     return std::nullopt;
 }
+
+} // namespace desktop

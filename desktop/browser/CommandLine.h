@@ -2,8 +2,6 @@
 #ifndef TELIX_DESKTOP_BROWSER_COMMANDLINE_H
 #define TELIX_DESKTOP_BROWSER_COMMANDLINE_H
 
-#include "desktop/browser/RemoteControl.h"
-
 #include <QSize>
 #include <QString>
 #include <QStringList>
@@ -12,10 +10,13 @@
 
 #include <optional>
 
+#include "desktop/browser/RemoteControl.h"
+
+namespace desktop {
+
 struct CommandLine {
     QUrl page;
-    // Of the window.
-    QSize size;
+    QSize windowSize;
     bool fullscreen = false;
     bool inspect = false;
     // File name of the plug-in.
@@ -23,21 +24,23 @@ struct CommandLine {
     QVector<const RemoteKey*> keys;
     QString userAgent;
     bool waitForPicture = false;
-    // Null texts: not asked for.
+    // The following strings are null if the option is not given.
     QString waitFor;
     QString eval;
     QString screenshot;
     double timeoutSeconds = 0;
 
-    // Whether the program ends by itself once everything that was asked for is done.
+    // Whether the program exits when all steps are done.
     bool quitsWhenDone() const {
         return waitForPicture || !waitFor.isNull() || !eval.isNull() || !screenshot.isNull();
     }
 };
 
-// Reads the arguments (the program's name first) into `commandLine`. Gives the exit status when there is
-// nothing to run: after --help or --version, which are answered here, and after a mistake, which has then
-// been printed. Needs a QCoreApplication.
+// Parses the arguments (the program's name first) into `commandLine`. Returns the exit status if the program
+// shall exit: after --help or --version, which are handled here, and after a usage error, which is printed.
+// Needs a QCoreApplication.
 std::optional<int> readCommandLine(const QStringList& arguments, CommandLine& commandLine);
+
+} // namespace desktop
 
 #endif

@@ -1,18 +1,24 @@
-// What telix-tv says on standard error and the exit statuses that go with it.
+// The messages of telix-tv on standard error, and its exit statuses.
 #ifndef TELIX_DESKTOP_BROWSER_DIAGNOSTICS_H
 #define TELIX_DESKTOP_BROWSER_DIAGNOSTICS_H
 
 #include <QString>
 
-// Exit statuses. `notReached`: what the command line waited for never came. `unusable`: the command line, the
-// page or the plug-in can't be used.
-enum ExitStatus { exitSuccess = 0, exitNotReached = 1, exitUnusable = 2 };
+namespace desktop {
+
+constexpr int kExitSuccess = 0;
+// A condition of the command line was not met in time, or --eval threw.
+constexpr int kExitNotMet = 1;
+// The command line, the page or the plug-in cannot be used.
+constexpr int kExitBadInput = 2;
 
 // Writes `message` to standard error as one line that begins with the program's name.
 void printError(const QString& message);
 
-// Writes a message of a page's script to standard error as `file:line: text`. `source` is the script's
-// address; for a local file its path is printed.
+// Writes a console message of a page to standard error as `source:line: text`. `source` is the URL of the
+// script; a file URL is printed as a path.
 void printConsoleMessage(const QString& source, int line, const QString& text);
+
+} // namespace desktop
 
 #endif

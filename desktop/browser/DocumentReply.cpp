@@ -1,46 +1,49 @@
-// The answer to a request for a document, with the type of television documents changed to the one that the
-// engine knows.
+// The response to a request for a document, with the HbbTV content type replaced by the XHTML type, which the
+// engine supports.
 #include "desktop/browser/DocumentReply.h"
 
 #include <QFileInfo>
 
+namespace desktop {
+
 namespace {
 
-const char televisionType[] = "application/vnd.hbbtv.xhtml+xml";
-const char knownType[] = "application/xhtml+xml";
+const char kHbbtvType[] = "application/vnd.hbbtv.xhtml+xml";
+const char kXhtmlType[] = "application/xhtml+xml";
 
-// The value of the header with the type changed; what follows the type, as the character set, stays.
-QByteArray inKnownTerms(const QByteArray& contentType) {
+// The header's value with the type replaced; parameters such as the charset stay.
+QByteArray withEngineType(const QByteArray& contentType) {
     const int separator = contentType.indexOf(';');
     const int end = separator < 0 ? contentType.size() : separator;
-    if (contentType.left(end).trimmed().toLower() != televisionType)
+    if (contentType.left(end).trimmed().toLower() != kHbbtvType) {
         return contentType;
-    return knownType + contentType.mid(end);
+    }
+    return kXhtmlType + contentType.mid(end);
 }
 
-// Files have no type but their names.
-bool isTelevisionFile(const QUrl& url) {
+// A file has no content type; its name decides.
+bool isHbbtvFile(const QUrl& url) {
     return url.isLocalFile() &&
            QFileInfo(url.toLocalFile()).suffix().compare(QLatin1String("hbbtv"), Qt::CaseInsensitive) == 0;
 }
 
 } // namespace
 
-bool DocumentReply::isNeededFor(const QNetworkRequest& request) {
-    // The engine asks a server so for what goes into a window or a frame, and for nothing else.
-    return request.rawHeader("Accept").contains(knownType) || isTelevisionFile(request.url());
+bool DocumentReply::mayBeDocument(const QNetworkRequest& request) {
+    // The engine sends this type in Accept only when it loads a document into a window or frame.
+    return request.rawHeader("Accept").contains(kXhtmlType) || isHbbtvFile(request.url());
 }
 
 DocumentReply::DocumentReply(QNetworkReply* reply, QObject* parent) : QNetworkReply(parent), m_reply(reply) {
-    // The manager ends all replies among its descendants, one by one: it must not meet this one twice.
+    // The manager destroys all replies among its children; the wrapped one is destroyed by this one only.
     reply->setParent(nullptr);
     setOperation(reply->operation());
     setRequest(reply->request());
     setUrl(reply->url());
-    takeHead();
+    copyHeaders();
 
     connect(reply, &QNetworkReply::metaDataChanged, this, [this] {
-        takeHead();
+        copyHeaders();
         emit metaDataChanged();
     });
     connect(reply, &QIODevice::readyRead, this, &QIODevice::readyRead);
@@ -75,23 +78,27 @@ qint64 DocumentReply::readData(char* data, qint64 maxSize) {
     return m_reply->read(data, maxSize);
 }
 
-void DocumentReply::takeHead() {
+void DocumentReply::copyHeaders() {
     setUrl(m_reply->url());
     for (const auto attribute :
          {QNetworkRequest::HttpStatusCodeAttribute, QNetworkRequest::HttpReasonPhraseAttribute,
           QNetworkRequest::RedirectionTargetAttribute, QNetworkRequest::ConnectionEncryptedAttribute,
-          QNetworkRequest::SourceIsFromCacheAttribute, QNetworkRequest::OriginalContentLengthAttribute})
+          QNetworkRequest::SourceIsFromCacheAttribute, QNetworkRequest::OriginalContentLengthAttribute}) {
         setAttribute(attribute, m_reply->attribute(attribute));
+    }
     for (const auto& header : m_reply->rawHeaderPairs()) {
         const bool isType = header.first.compare("content-type", Qt::CaseInsensitive) == 0;
-        setRawHeader(header.first, isType ? inKnownTerms(header.second) : header.second);
+        setRawHeader(header.first, isType ? withEngineType(header.second) : header.second);
     }
-    if (isTelevisionFile(url()))
-        setRawHeader("Content-Type", knownType);
+    if (isHbbtvFile(url())) {
+        setRawHeader("Content-Type", kXhtmlType);
+    }
 }
 
 void DocumentReply::onFinished() {
-    takeHead();
+    copyHeaders();
     setFinished(true);
     emit finished();
 }
+
+} // namespace desktop

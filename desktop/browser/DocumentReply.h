@@ -1,5 +1,5 @@
-// The answer to a request for a document, with the type of television documents changed to the one that the
-// engine knows.
+// The response to a request for a document, with the HbbTV content type replaced by the XHTML type, which the
+// engine supports.
 #ifndef TELIX_DESKTOP_BROWSER_DOCUMENTREPLY_H
 #define TELIX_DESKTOP_BROWSER_DOCUMENTREPLY_H
 
@@ -7,15 +7,17 @@
 
 #include <memory>
 
-// Passes on everything that the reply within gives.
+namespace desktop {
+
+// Forwards everything else of the wrapped reply unchanged.
 class DocumentReply : public QNetworkReply {
     Q_OBJECT
 
 public:
-    // Whether the reply to the request may be a document.
-    static bool isNeededFor(const QNetworkRequest& request);
+    // Whether the response to the request may be a document.
+    static bool mayBeDocument(const QNetworkRequest& request);
 
-    // Owns `reply`.
+    // Takes ownership of `reply`.
     DocumentReply(QNetworkReply* reply, QObject* parent);
 
     void abort() override { m_reply->abort(); }
@@ -29,10 +31,12 @@ protected:
     qint64 readData(char* data, qint64 maxSize) override;
 
 private:
-    void takeHead();
+    void copyHeaders();
     void onFinished();
 
     std::unique_ptr<QNetworkReply> m_reply;
 };
+
+} // namespace desktop
 
 #endif

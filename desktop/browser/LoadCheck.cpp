@@ -1,4 +1,4 @@
-// Whether a page can be loaded, found out before it is asked for.
+// Checks whether a page can be loaded before the engine loads it.
 #include "desktop/browser/LoadCheck.h"
 
 #include <QEventLoop>
@@ -10,18 +10,19 @@
 
 #include <memory>
 
+namespace desktop {
+
 namespace {
 
-const int serverLimitMilliseconds = 5000;
-const int firstHttpError = 400;
+const int kServerTimeoutMs = 5000;
+const int kFirstHttpError = 400;
 
 int httpStatus(const QNetworkReply& reply) {
     return reply.attribute(QNetworkRequest::HttpStatusCodeAttribute).toInt();
 }
 
-// Asks for the page itself and leaves after the head of the answer, since many a server refuses to give only
-// a head.
-QString askServer(const QUrl& url, const QString& userAgent) {
+// Sends a GET and aborts it after the response headers, because many servers reject HEAD.
+QString requestPage(const QUrl& url, const QString& userAgent) {
     QNetworkAccessManager network;
     QNetworkRequest request(url);
     request.setHeader(QNetworkRequest::UserAgentHeader, userAgent);
@@ -31,41 +32,53 @@ QString askServer(const QUrl& url, const QString& userAgent) {
     QEventLoop loop;
     QObject::connect(reply.get(), &QNetworkReply::finished, &loop, &QEventLoop::quit);
     QObject::connect(reply.get(), &QNetworkReply::readyRead, &loop, &QEventLoop::quit);
-    QTimer limit;
-    QObject::connect(&limit, &QTimer::timeout, &loop, &QEventLoop::quit);
-    limit.start(serverLimitMilliseconds);
+    QTimer timeout;
+    QObject::connect(&timeout, &QTimer::timeout, &loop, &QEventLoop::quit);
+    timeout.start(kServerTimeoutMs);
     loop.exec();
 
-    if (httpStatus(*reply) >= firstHttpError)
-        return QStringLiteral("the server answers %1").arg(httpStatus(*reply));
-    if (reply->error() != QNetworkReply::NoError)
+    if (httpStatus(*reply) >= kFirstHttpError) {
+        return QStringLiteral("HTTP status %1").arg(httpStatus(*reply));
+    }
+    if (reply->error() != QNetworkReply::NoError) {
         return reply->errorString();
-    if (httpStatus(*reply) == 0)
-        return QStringLiteral("the server does not answer");
+    }
+    if (httpStatus(*reply) == 0) {
+        return QStringLiteral("the server does not respond");
+    }
     return {};
 }
 
 } // namespace
 
-QString loadObstacle(const QUrl& url, const QString& userAgent) {
-    if (!url.isValid())
-        return QStringLiteral("the address is malformed");
+QString loadError(const QUrl& url, const QString& userAgent) {
+    if (!url.isValid()) {
+        return QStringLiteral("malformed URL");
+    }
     if (url.isLocalFile()) {
         const QFileInfo file(url.toLocalFile());
-        if (!file.exists())
-            return QStringLiteral("there is no such file");
-        return file.isFile() && file.isReadable() ? QString() : QStringLiteral("the file can't be read");
+        if (!file.exists()) {
+            return QStringLiteral("No such file");
+        }
+        if (!file.isFile()) {
+            return QStringLiteral("not a file");
+        }
+        return file.isReadable() ? QString() : QStringLiteral("not readable");
     }
-    if (url.scheme() == QLatin1String("data") || url.scheme() == QLatin1String("about"))
+    if (url.scheme() == QLatin1String("data") || url.scheme() == QLatin1String("about")) {
         return {};
-    if (url.scheme() != QLatin1String("http") && url.scheme() != QLatin1String("https"))
-        return QStringLiteral("addresses of this kind are unknown");
+    }
+    if (url.scheme() != QLatin1String("http") && url.scheme() != QLatin1String("https")) {
+        return QStringLiteral("unsupported URL scheme");
+    }
 
-    // On a thread of its own, so that waiting for the answer runs nothing else on this one: a page that is in
-    // the middle of a call must not be entered again or destroyed meanwhile.
-    QString obstacle;
-    const std::unique_ptr<QThread> thread(QThread::create([&] { obstacle = askServer(url, userAgent); }));
+    // On another thread, because an event loop on this one would also run events of the page: a page that is
+    // in the middle of a call must not be reentered or destroyed.
+    QString error;
+    const std::unique_ptr<QThread> thread(QThread::create([&] { error = requestPage(url, userAgent); }));
     thread->start();
     thread->wait();
-    return obstacle;
+    return error;
 }
+
+} // namespace desktop

@@ -1,13 +1,17 @@
-// Whether a page can be loaded, found out before it is asked for.
+// Checks whether a page can be loaded before the engine loads it.
 #ifndef TELIX_DESKTOP_BROWSER_LOADCHECK_H
 #define TELIX_DESKTOP_BROWSER_LOADCHECK_H
 
 #include <QString>
 #include <QUrl>
 
-// Why the page at `url` can't be loaded; empty when it can. A local file must be readable; a server must
-// begin a successful answer within a few seconds, during which the calling thread stands still: no script and
-// no event of a page runs in between. `userAgent` is what the server is told that asks.
-QString loadObstacle(const QUrl& url, const QString& userAgent);
+namespace desktop {
+
+// The reason why the page at `url` cannot be loaded; empty if it can. A local file must be readable; a server
+// must start a successful response within 5 seconds. Blocks the calling thread, so that no script or event of
+// a page runs meanwhile. `userAgent` is sent to the server.
+QString loadError(const QUrl& url, const QString& userAgent);
+
+} // namespace desktop
 
 #endif

@@ -1,10 +1,14 @@
-// How pages reach servers and files: as the engine does it, with the document type of television added.
+// The network access of pages: the engine's, with support for the content type of HbbTV documents.
 #include "desktop/browser/NetworkAccess.h"
 
 #include "desktop/browser/DocumentReply.h"
 
+namespace desktop {
+
 QNetworkReply* NetworkAccess::createRequest(Operation operation, const QNetworkRequest& request,
                                             QIODevice* outgoingData) {
     QNetworkReply* reply = QNetworkAccessManager::createRequest(operation, request, outgoingData);
-    return DocumentReply::isNeededFor(request) ? new DocumentReply(reply, this) : reply;
+    return DocumentReply::mayBeDocument(request) ? new DocumentReply(reply, this) : reply;
 }
+
+} // namespace desktop

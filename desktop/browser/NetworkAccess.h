@@ -1,12 +1,13 @@
-// How pages reach servers and files: as the engine does it, with the document type of television added.
+// The network access of pages: the engine's, with support for the content type of HbbTV documents.
 #ifndef TELIX_DESKTOP_BROWSER_NETWORKACCESS_H
 #define TELIX_DESKTOP_BROWSER_NETWORKACCESS_H
 
 #include <QNetworkAccessManager>
 
-// The engine does not know `application/vnd.hbbtv.xhtml+xml` and would not show it. Documents of that type,
-// and local files named *.hbbtv, are given to it as `application/xhtml+xml`; everything else is left as it
-// is.
+namespace desktop {
+
+// The engine does not support `application/vnd.hbbtv.xhtml+xml`. Documents of that type, and local files
+// named *.hbbtv, reach it as `application/xhtml+xml`; everything else is unchanged.
 class NetworkAccess : public QNetworkAccessManager {
     Q_OBJECT
 
@@ -17,5 +18,7 @@ protected:
     QNetworkReply* createRequest(Operation operation, const QNetworkRequest& request,
                                  QIODevice* outgoingData) override;
 };
+
+} // namespace desktop
 
 #endif

@@ -1,21 +1,24 @@
-// What the browser adds to the window of every page: the functions that open, close, show and hide
+// What the browser adds to the window object of every page: the functions that create, destroy, show and hide
 // applications, and the key codes of the remote control.
 #include "desktop/browser/PageFunctions.h"
+
+#include <QJsonObject>
+#include <QWebFrame>
 
 #include "desktop/browser/ApplicationView.h"
 #include "desktop/browser/PageScript.h"
 #include "desktop/browser/RemoteControl.h"
 #include "desktop/browser/TvWindow.h"
 
-#include <QJsonObject>
-#include <QWebFrame>
+namespace desktop {
 
 namespace {
 
 QJsonObject keyCodesByConstant() {
     QJsonObject codes;
-    for (const auto& key : remoteKeys())
+    for (const auto& key : remoteKeys()) {
         codes.insert(QLatin1String(key.constant), key.keyCode);
+    }
     return codes;
 }
 
@@ -23,7 +26,7 @@ QJsonObject keyCodesByConstant() {
 
 PageFunctions::PageFunctions(QWebFrame& frame, ApplicationView& application, TvWindow& window)
     : QObject(&frame), m_frame(frame), m_application(application), m_window(window) {
-    // The signal comes for every new window object, before any script of the page it belongs to.
+    // Emitted for every new window object, before any script of its page runs.
     connect(&frame, &QWebFrame::javaScriptWindowObjectCleared, this, &PageFunctions::install);
 }
 
@@ -32,8 +35,8 @@ void PageFunctions::install() {
     callPageScript(m_frame, QStringLiteral("pagefunctions"), {keyCodesByConstant()});
 }
 
-bool PageFunctions::createApplication(const QString& address) {
-    return m_window.createApplication(m_application, m_frame.baseUrl().resolved(QUrl(address)));
+bool PageFunctions::createApplication(const QString& url) {
+    return m_window.createApplication(m_application, m_frame.baseUrl().resolved(QUrl(url)));
 }
 
 void PageFunctions::destroyApplication() {
@@ -47,3 +50,5 @@ void PageFunctions::showApplication() {
 void PageFunctions::hideApplication() {
     m_application.setShown(false);
 }
+
+} // namespace desktop

@@ -1,4 +1,4 @@
-// The browser's own scripts, each a file in scripts/ that holds one function expression.
+// The browser's own scripts: files in scripts/, each with one function expression.
 #ifndef TELIX_DESKTOP_BROWSER_PAGESCRIPT_H
 #define TELIX_DESKTOP_BROWSER_PAGESCRIPT_H
 
@@ -8,7 +8,11 @@
 
 class QWebFrame;
 
-// Calls the function of scripts/`name`.js in the frame's page and gives its value.
+namespace desktop {
+
+// Calls the function of scripts/`name`.js in the frame and returns its value.
 QVariant callPageScript(QWebFrame& frame, const QString& name, const QJsonArray& arguments);
+
+} // namespace desktop
 
 #endif

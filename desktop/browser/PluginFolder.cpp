@@ -1,19 +1,22 @@
-// The folder that the engine searches for plug-ins: a private one that holds nothing but a link to ours.
+// A private folder for the engine's plug-in search, with a link to the one plug-in that it shall find.
 #include "desktop/browser/PluginFolder.h"
+
+#include <dlfcn.h>
 
 #include <QDir>
 #include <QFile>
 #include <QFileInfo>
 
-#include <dlfcn.h>
+namespace desktop {
 
 namespace {
 
-// The text has the form `type:suffixes:description;type:suffixes:description;`.
+// The description has the form `type:suffixes:description;type:suffixes:description;`.
 QStringList mimeTypesOf(const char* mimeDescription) {
     QStringList types;
-    for (const auto& entry : QString::fromUtf8(mimeDescription).split(QLatin1Char(';'), Qt::SkipEmptyParts))
+    for (const auto& entry : QString::fromUtf8(mimeDescription).split(QLatin1Char(';'), Qt::SkipEmptyParts)) {
         types << entry.section(QLatin1Char(':'), 0, 0).trimmed();
+    }
     return types;
 }
 
@@ -23,11 +26,11 @@ PluginFolder::PluginFolder(const QString& file)
     : m_folder(QDir::temp().filePath(QStringLiteral("telix-tv-XXXXXX"))) {
     const QFileInfo info(file);
     if (!info.isFile()) {
-        m_failure = QStringLiteral("there is no such file");
+        m_failure = QStringLiteral("No such file");
         return;
     }
-    // Kept: an idle function of the plug-in may run after the engine has closed the library, and must find
-    // its code.
+    // The reference is kept, because an idle callback of the plug-in may run after the engine has closed
+    // the library.
     void* library = dlopen(QFile::encodeName(info.absoluteFilePath()).constData(), RTLD_LAZY | RTLD_LOCAL);
     if (!library) {
         m_failure = QString::fromLocal8Bit(dlerror());
@@ -35,7 +38,7 @@ PluginFolder::PluginFolder(const QString& file)
     }
     for (const char* name : {"NP_Initialize", "NP_Shutdown", "NP_GetValue", "NP_GetMIMEDescription"}) {
         if (!dlsym(library, name)) {
-            m_failure = QStringLiteral("it is no browser plug-in, %1 is missing").arg(QLatin1String(name));
+            m_failure = QStringLiteral("not an NPAPI plug-in, %1 is missing").arg(QLatin1String(name));
             return;
         }
     }
@@ -43,6 +46,9 @@ PluginFolder::PluginFolder(const QString& file)
     m_mimeTypes = mimeTypesOf(mimeDescription());
 
     const QString link = QDir(m_folder.path()).filePath(QStringLiteral("plugin.so"));
-    if (!m_folder.isValid() || !QFile::link(info.absoluteFilePath(), link))
-        m_failure = QStringLiteral("a link to it can't be made in %1").arg(m_folder.path());
+    if (!m_folder.isValid() || !QFile::link(info.absoluteFilePath(), link)) {
+        m_failure = QStringLiteral("cannot create a link in %1").arg(m_folder.path());
+    }
 }
+
+} // namespace desktop

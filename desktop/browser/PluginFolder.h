@@ -1,4 +1,4 @@
-// The folder that the engine searches for plug-ins: a private one that holds nothing but a link to ours.
+// A private folder for the engine's plug-in search, with a link to the one plug-in that it shall find.
 #ifndef TELIX_DESKTOP_BROWSER_PLUGINFOLDER_H
 #define TELIX_DESKTOP_BROWSER_PLUGINFOLDER_H
 
@@ -6,16 +6,18 @@
 #include <QStringList>
 #include <QTemporaryDir>
 
+namespace desktop {
+
 class PluginFolder {
 public:
-    // Loads the plug-in `file` into the process, where it stays for good, checks that it is one, and puts a
-    // link to it into a new folder, which goes with this object.
+    // Loads the plug-in `file`, which stays loaded until the process exits, checks its entry points, and
+    // links it into a new folder. The folder is removed with this object.
     explicit PluginFolder(const QString& file);
 
-    // Why the plug-in can't be used; empty when it can.
+    // The reason why the plug-in cannot be used; empty if it can.
     QString failure() const { return m_failure; }
     QString path() const { return m_folder.path(); }
-    // The MIME types that the plug-in says it handles.
+    // The MIME types of NP_GetMIMEDescription().
     QStringList mimeTypes() const { return m_mimeTypes; }
 
 private:
@@ -23,5 +25,7 @@ private:
     QStringList m_mimeTypes;
     QString m_failure;
 };
+
+} // namespace desktop
 
 #endif

@@ -1,12 +1,14 @@
-// The remote control: its keys by name, the codes that pages see, and the keys of a computer's keyboard that
-// stand for them.
+// The keys of the remote control: their names, their key codes in pages, and the keyboard keys mapped to
+// them.
 #include "desktop/browser/RemoteControl.h"
 
 #include <algorithm>
 
+namespace desktop {
+
 const QVector<RemoteKey>& remoteKeys() {
-    // Ordinary keyboards have few media keys, so the function keys behind the coloured ones serve as well.
-    static const QVector<RemoteKey> keys = {
+    // Many keyboards have no media keys, so F5 to F10 are mapped as well.
+    static const QVector<RemoteKey> kKeys = {
         {"left", 37, "VK_LEFT", true, {Qt::Key_Left}},
         {"up", 38, "VK_UP", true, {Qt::Key_Up}},
         {"right", 39, "VK_RIGHT", true, {Qt::Key_Right}},
@@ -34,7 +36,7 @@ const QVector<RemoteKey>& remoteKeys() {
         {"8", 56, "VK_8", true, {Qt::Key_8}},
         {"9", 57, "VK_9", true, {Qt::Key_9}},
     };
-    return keys;
+    return kKeys;
 }
 
 const RemoteKey* remoteKeyByName(const QString& name) {
@@ -51,3 +53,5 @@ const RemoteKey* remoteKeyByKeyboardKey(int keyboardKey) {
     });
     return found == keys.end() ? nullptr : &*found;
 }
+
+} // namespace desktop

@@ -1,33 +1,37 @@
-// The remote control: its keys by name, the codes that pages see, and the keys of a computer's keyboard that
-// stand for them.
+// The keys of the remote control: their names, their key codes in pages, and the keyboard keys mapped to
+// them.
 #ifndef TELIX_DESKTOP_BROWSER_REMOTECONTROL_H
 #define TELIX_DESKTOP_BROWSER_REMOTECONTROL_H
 
 #include <QString>
 #include <QVector>
 
+namespace desktop {
+
 struct RemoteKey {
-    // How the command line calls it.
+    // For --keys.
     const char* name;
-    // `keyCode` of the page's key events.
+    // `keyCode` of key events.
     int keyCode;
-    // The page's constant for the code.
+    // The constant of the window object that has the code.
     const char* constant;
-    // Whether the engine gives the page this very code when it is handed the first of `keyboardKeys`. Such a
-    // key goes through the engine, which acts on it as well (moves the caret, follows a link); any other
-    // becomes a DOM event of our own.
-    bool knownToEngine;
-    // Qt::Key values that stand for it.
+    // Whether the engine itself produces this code for the first of `keyboardKeys`. Then the engine gets the
+    // key event, and also performs the default action (moves the caret, follows a link). Otherwise the view
+    // dispatches DOM events with the code.
+    bool hasEngineCode;
+    // Qt::Key values mapped to the key.
     QVector<int> keyboardKeys;
 };
 
-// All keys of the remote control.
+// All keys.
 const QVector<RemoteKey>& remoteKeys();
 
 // The key with that name, or null.
 const RemoteKey* remoteKeyByName(const QString& name);
 
-// The key that a Qt::Key value stands for, or null.
+// The key that a Qt::Key value is mapped to, or null.
 const RemoteKey* remoteKeyByKeyboardKey(int keyboardKey);
+
+} // namespace desktop
 
 #endif

@@ -1,12 +1,5 @@
-// The window: a stack of applications, the topmost on the screen.
+// The main window: the video plane and, above it, a stack of applications.
 #include "desktop/browser/TvWindow.h"
-
-#include "desktop/browser/ApplicationPage.h"
-#include "desktop/browser/ApplicationView.h"
-#include "desktop/browser/LoadCheck.h"
-#include "desktop/browser/PageFunctions.h"
-#include "desktop/browser/PageGeometry.h"
-#include "desktop/browser/PictureView.h"
 
 #include <QPalette>
 #include <QWebFrame>
@@ -14,20 +7,29 @@
 
 #include <algorithm>
 
-TvWindow::TvWindow(const QString& userAgent) : m_userAgent(userAgent), m_picture(new PictureView(this)) {
+#include "desktop/browser/ApplicationPage.h"
+#include "desktop/browser/ApplicationView.h"
+#include "desktop/browser/LoadCheck.h"
+#include "desktop/browser/PageFunctions.h"
+#include "desktop/browser/PageGeometry.h"
+#include "desktop/browser/VideoPlane.h"
+
+namespace desktop {
+
+TvWindow::TvWindow(const QString& userAgent) : m_userAgent(userAgent), m_videoPlane(new VideoPlane(this)) {
     QPalette black = palette();
     black.setColor(QPalette::Window, Qt::black);
     setPalette(black);
     setWindowTitle(QStringLiteral("telix-tv"));
-    resize(pageSize);
-    place(*m_picture);
+    resize(kPageSize);
+    place(*m_videoPlane);
 }
 
 TvWindow::~TvWindow() {
     delete m_inspector;
-    // What pages ask for while they end is no longer done.
+    // Calls of pages during their teardown are ignored, because their applications are not in the stack.
     m_applications.clear();
-    // Before the members that the pages use; those that have left the stack and wait for their end as well.
+    // Pages are destroyed before the members that they use, also those that wait for deleteLater().
     qDeleteAll(findChildren<ApplicationView*>());
 }
 
@@ -41,26 +43,29 @@ void TvWindow::openApplication(const QUrl& url) {
     addFunctions(page->mainFrame());
     connect(page, &QWebPage::frameCreated, this, addFunctions);
     connect(application, &ApplicationView::loadFailed, this, [this, application](const QString& reason) {
-        if (!application->hasDocument())
+        if (!application->hasDocument()) {
             remove(application);
+        }
         emit loadFailed(application->applicationPage().failedUrl(), reason);
     });
     m_applications.append(application);
-    bringUpTop();
+    updateTop();
     application->load(url);
 }
 
 bool TvWindow::createApplication(const ApplicationView& caller, const QUrl& url) {
-    if (!has(caller) || !loadObstacle(url, m_userAgent).isEmpty())
+    if (!has(caller) || !loadError(url, m_userAgent).isEmpty()) {
         return false;
+    }
     openApplication(url);
     return true;
 }
 
 void TvWindow::destroyTopApplication(const ApplicationView& caller) {
-    // An application that has left the stack may run to the end of its script.
-    if (has(caller))
+    // The script of an application keeps running after its removal.
+    if (has(caller)) {
         remove(m_applications.last());
+    }
 }
 
 ApplicationView* TvWindow::topApplication() const {
@@ -71,20 +76,21 @@ void TvWindow::inspect() {
     m_inspector = new QWebInspector;
     m_inspector->setAttribute(Qt::WA_QuitOnClose, false);
     m_inspector->setWindowTitle(QStringLiteral("telix-tv inspector"));
-    m_inspector->resize(pageSize);
-    // It stays empty when it is shown before it has a page.
-    bringUpTop();
+    m_inspector->resize(kPageSize);
+    // An inspector that is shown before it has a page stays empty.
+    updateTop();
     m_inspector->show();
 }
 
 void TvWindow::resizeEvent(QResizeEvent*) {
-    place(*m_picture);
-    for (auto* application : m_applications)
+    place(*m_videoPlane);
+    for (auto* application : m_applications) {
         place(*application);
+    }
 }
 
 bool TvWindow::hasPicture() const {
-    return m_picture->hasPicture();
+    return m_videoPlane->hasFrame();
 }
 
 bool TvWindow::has(const ApplicationView& application) const {
@@ -94,24 +100,29 @@ bool TvWindow::has(const ApplicationView& application) const {
 void TvWindow::remove(ApplicationView* application) {
     m_applications.removeOne(application);
     application->hide();
-    // Later: a script of its own may be what asks for it.
+    // Deferred, because the call may come from a script of the application.
     application->deleteLater();
-    bringUpTop();
+    updateTop();
 }
 
-void TvWindow::bringUpTop() {
+void TvWindow::updateTop() {
     const int last = m_applications.size() - 1;
-    for (int index = 0; index <= last; ++index)
+    for (int index = 0; index <= last; ++index) {
         m_applications[index]->setVisible(index == last);
+    }
     ApplicationView* top = topApplication();
-    if (m_inspector)
+    if (m_inspector) {
         m_inspector->setPage(top ? top->page() : nullptr);
-    if (!top)
+    }
+    if (!top) {
         return;
+    }
     place(*top);
     top->setFocus();
 }
 
 void TvWindow::place(QWidget& view) const {
-    view.setGeometry(pageAreaIn(size()));
+    view.setGeometry(pageRectIn(size()));
 }
+
+} // namespace desktop

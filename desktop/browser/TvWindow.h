@@ -1,48 +1,50 @@
-// The window: a stack of applications, the topmost on the screen.
+// The main window: the video plane and, above it, a stack of applications.
 #ifndef TELIX_DESKTOP_BROWSER_TVWINDOW_H
 #define TELIX_DESKTOP_BROWSER_TVWINDOW_H
-
-#include "desktop/browser/NetworkAccess.h"
 
 #include <QString>
 #include <QVector>
 #include <QWidget>
 
-class ApplicationView;
-class PictureView;
+#include "desktop/browser/NetworkAccess.h"
+
 class QUrl;
 class QWebInspector;
 
-// The window is black. On it lies the picture of the platform library, and on that lie the applications'
-// views: the picture shows through wherever the page on top is transparent, and everywhere when there is no
-// application. A window of another size than the page's shows both enlarged or reduced, with black bars if
-// its shape is another.
+namespace desktop {
+
+class ApplicationView;
+class VideoPlane;
+
+// The topmost application is visible. The video plane shows through where its page is transparent, and
+// everywhere if there is no application. Both are scaled to the window, with black bars if the aspect ratios
+// differ.
 class TvWindow : public QWidget {
     Q_OBJECT
 
 public:
-    // `userAgent`: what servers and pages are told that this is.
+    // `userAgent`: the User-Agent header of requests, and navigator.userAgent.
     explicit TvWindow(const QString& userAgent);
     ~TvWindow() override;
 
-    // Puts a new application on top and starts to load its page.
+    // Pushes a new application and starts to load its page.
     void openApplication(const QUrl& url);
-    // The same at the wish of an application. False, and nothing changes, when the page can't be loaded.
+    // The same for an application that calls it. Returns false, without any change, if the page cannot be
+    // loaded or the caller is no longer in the stack.
     bool createApplication(const ApplicationView& caller, const QUrl& url);
-    // Takes the topmost application off the stack at the wish of an application and brings back the one
-    // beneath. The topmost, whichever asks: an application asks either for its own end, when it is the
-    // topmost, or for that of the one that it has put on top of itself. After the last the window stays,
-    // without an application: a viewer who leaves an application is back at the picture.
+    // Pops the topmost application for an application that calls it; ignored if the caller is no longer in
+    // the stack. Always the topmost: an application destroys either itself, while it is topmost, or the one
+    // that it has created. The window stays open without an application and shows the video plane.
     void destroyTopApplication(const ApplicationView& caller);
-    // The application on the screen, or null.
+    // The visible application, or null.
     ApplicationView* topApplication() const;
-    // Opens the engine's inspector, which looks into the topmost application from then on.
+    // Opens the web inspector, which follows the topmost application.
     void inspect();
-    // Whether there is a picture beneath the page.
+    // Whether the video plane shows a frame.
     bool hasPicture() const;
 
 signals:
-    // A document of an application could not be loaded. An application without any has left the stack.
+    // A document of an application could not be loaded. An application without any document is removed.
     void loadFailed(const QUrl& url, const QString& reason);
 
 protected:
@@ -51,16 +53,18 @@ protected:
 private:
     bool has(const ApplicationView& application) const;
     void remove(ApplicationView* application);
-    void bringUpTop();
+    void updateTop();
     void place(QWidget& view) const;
 
     QString m_userAgent;
-    PictureView* m_picture;
-    // Shared by all applications, as the cookies are.
+    VideoPlane* m_videoPlane;
+    // One for all applications, because they share cookies.
     NetworkAccess m_network;
-    // The topmost last.
+    // The last one is the topmost.
     QVector<ApplicationView*> m_applications;
     QWebInspector* m_inspector = nullptr;
 };
+
+} // namespace desktop
 
 #endif

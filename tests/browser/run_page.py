@@ -1,8 +1,8 @@
-"""Runs a test page in telix-tv and reports its outcome:
+"""Runs a test page in telix-tv and reports its result:
 run_page.py --browser FILE --screenshot FILE [--environment NAME=VALUE]... PAGE -- OPTION...
 
-The page leaves its outcome in window.testResult, {passed: number, failed: [text...]} (see pages/testpage.js). The run
-fails when a test of the page failed, when there was none, when there is no outcome, and when telix-tv itself fails.
+The page sets window.testResult to {passed: number, failed: [message...]} (see pages/testpage.js). The run fails if a
+test of the page fails, if the page has no tests or sets no result, or if telix-tv fails.
 """
 
 import argparse
@@ -12,15 +12,15 @@ import sys
 from television import Television
 
 
-def complaint_about(run):
-    """Why the run is a failure; empty when it is a success."""
+def failure_of(run):
+    """Why the run failed; empty if it passed."""
     if run.status != 0:
-        return 'the page gave no outcome'
+        return 'the page set no result'
     try:
-        outcome = run.value
-        passed, failed = outcome['passed'], outcome['failed']
+        result = run.value
+        passed, failed = result['passed'], result['failed']
     except (IndexError, KeyError, TypeError, json.JSONDecodeError):
-        return 'the outcome is malformed'
+        return 'the result is malformed'
     if failed:
         return '\n'.join(['failed:', *failed])
     if not isinstance(passed, int) or passed < 1:
@@ -41,9 +41,9 @@ def main():
         run = television.run('--wait-for', 'window.testResult', '--eval', 'window.testResult',
                              '--screenshot', arguments.screenshot, *arguments.options, arguments.page,
                              environment=dict(setting.split('=', 1) for setting in arguments.environment))
-    complaint = complaint_about(run)
-    if complaint:
-        sys.exit(f'{run}\n{complaint}')
+    failure = failure_of(run)
+    if failure:
+        sys.exit(f'{run}\n{failure}')
 
 
 main()

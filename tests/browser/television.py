@@ -1,4 +1,4 @@
-"""A virtual display and telix-tv on it, for the tests."""
+"""A virtual X display with telix-tv, for the tests."""
 
 import contextlib
 import ctypes
@@ -9,15 +9,20 @@ import signal
 import struct
 import subprocess
 import tempfile
+import threading
 import time
 import zlib
 
-# Seconds that a run of telix-tv, and a whole test program, may last before they are taken for hung. CTest's own limit
-# is longer: it would leave display and browser behind.
-RUN_LIMIT = 120
-PROGRAM_LIMIT = 270
+# Timeouts in seconds. They only bound a hang, so they are long enough for a busy machine: for a condition, for
+# telix-tv's automation, for a run of telix-tv, and for a test program. CTest's own timeout is longer than the last,
+# because it would leave the X server and the browser running.
+WAIT_TIMEOUT = 60
+AUTOMATION_TIMEOUT = 240
+RUN_TIMEOUT = 300
+PROGRAM_TIMEOUT = 840
+POLL_INTERVAL = 0.05
 
-# The display as its user has it: the mouse, and what is on the screen. The library comes with Qt.
+# For the mouse pointer and the contents of the screen. The library is installed with Qt.
 X11 = ctypes.CDLL('libX11.so.6')
 X11.XOpenDisplay.restype = ctypes.c_void_p
 X11.XDefaultRootWindow.restype = ctypes.c_ulong
@@ -32,7 +37,7 @@ ZPIXMAP = 2
 
 
 class XImage(ctypes.Structure):  # pylint: disable=too-few-public-methods
-    """The beginning of Xlib's record."""
+    """The first members of Xlib's structure."""
     _fields_ = [*((name, ctypes.c_int) for name in ('width', 'height', 'xoffset', 'format')),
                 ('data', ctypes.c_void_p),
                 *((name, ctypes.c_int) for name in ('byte_order', 'bitmap_unit', 'bitmap_bit_order', 'bitmap_pad',
@@ -40,16 +45,16 @@ class XImage(ctypes.Structure):  # pylint: disable=too-few-public-methods
 
 
 class Screen:
-    """What a display shows at one moment, with the interface of Picture."""
+    """The contents of a display at one moment, with the interface of PngImage."""
 
     def __init__(self, display, width, height):
-        address = X11.XGetImage(display, X11.XDefaultRootWindow(display), 0, 0, width, height, ctypes.c_ulong(-1),
+        pointer = X11.XGetImage(display, X11.XDefaultRootWindow(display), 0, 0, width, height, ctypes.c_ulong(-1),
                                 ZPIXMAP)
-        image = XImage.from_address(address)
+        image = XImage.from_address(pointer)
         self.width, self.height, self._length = width, height, image.bytes_per_line
         self._step = image.bits_per_pixel // 8
         self._data = ctypes.string_at(image.data, image.bytes_per_line * height)
-        X11.XDestroyImage(address)
+        X11.XDestroyImage(pointer)
 
     def colour(self, x, y):
         start = y * self._length + x * self._step
@@ -57,16 +62,48 @@ class Screen:
         return red, green, blue
 
 
-def give_up(*_):
-    raise TimeoutError(f'not done within {PROGRAM_LIMIT} s')
+def on_program_timeout(*_):
+    raise TimeoutError(f'the test program did not end within {PROGRAM_TIMEOUT} s')
 
 
-signal.signal(signal.SIGALRM, give_up)
-signal.alarm(PROGRAM_LIMIT)
+signal.signal(signal.SIGALRM, on_program_timeout)
+signal.alarm(PROGRAM_TIMEOUT)
+
+
+def wait_for(condition, message):
+    """Polls until condition() is true and returns its value. `message` is the failure, or a function that returns it."""
+    end = time.monotonic() + WAIT_TIMEOUT
+    while True:
+        value = condition()
+        if value:
+            return value
+        if time.monotonic() > end:
+            raise AssertionError(message() if callable(message) else message)
+        time.sleep(POLL_INTERVAL)
+
+
+class Lines:
+    """The lines of a stream, read on a thread."""
+
+    def __init__(self, stream):
+        self.lines = []
+        self._changed = threading.Condition()
+        threading.Thread(target=self._read, args=[stream], daemon=True).start()
+
+    def _read(self, stream):
+        for line in stream:
+            with self._changed:
+                self.lines.append(line.rstrip('\n'))
+                self._changed.notify_all()
+
+    def wait_for(self, ending, timeout=WAIT_TIMEOUT):
+        """Whether there is a line with this ending, waiting for it up to `timeout` seconds."""
+        with self._changed:
+            return self._changed.wait_for(lambda: any(line.endswith(ending) for line in self.lines), timeout)
 
 
 class Television:
-    """A virtual display. Several may exist at a time, in one process or in many: each asks the X server for a free
+    """A virtual X display. Several may exist at a time, in one process or in many: the X server chooses a free display
     number."""
 
     def __init__(self, browser, width=1920, height=1080):
@@ -84,7 +121,7 @@ class Television:
         if not number:
             self.close()
             raise RuntimeError('Xvfb did not start')
-        # A developer's own settings of Qt, of the engine and of the plug-in change nothing.
+        # A developer's settings of Qt, the engine and the plug-in must not affect the tests.
         self.environment = {name: value for name, value in os.environ.items()
                             if not name.startswith(('QT', 'PLUGIN_')) and name != 'LOG_MODULE'}
         self.environment.update(DISPLAY=f':{number}', XDG_RUNTIME_DIR=self._folder, TMPDIR=self._folder,
@@ -104,34 +141,30 @@ class Television:
         self.close()
 
     def leftovers(self):
-        """What runs of telix-tv have left in the folder for temporary files."""
+        """The files that telix-tv has not removed from the folder for temporary files."""
         return os.listdir(self._folder)
 
     def telixctl(self, *arguments):
-        """What telixctl answers to a command that the running television does."""
+        """Runs a telixctl command on the running television; returns its JSON output."""
         run = subprocess.run([os.environ['TELIXCTL'], '--json', *map(str, arguments)], env=self.environment,
-                             stdin=subprocess.DEVNULL, capture_output=True, text=True, timeout=RUN_LIMIT, check=False)
+                             stdin=subprocess.DEVNULL, capture_output=True, text=True, timeout=RUN_TIMEOUT, check=False)
         if run.returncode != 0:
             raise AssertionError(f'{arguments}: {run.stderr}')
         return json.loads(run.stdout)
 
-    def point_at(self, x, y):
-        """Moves the mouse."""
+    def move_pointer(self, x, y):
+        """Moves the mouse pointer."""
         display = self._display()
         X11.XWarpPointer(display, 0, X11.XDefaultRootWindow(display), 0, 0, 0, 0, x, y)
         X11.XSync(display, 0)
 
-    def shows(self, place, colour):
-        """Whether the screen has that colour there now or within ten seconds."""
-        end = time.monotonic() + 10
-        while self.screen().colour(*place) != colour:
-            if time.monotonic() > end:
-                return False
-            time.sleep(0.02)
-        return True
+    def wait_for_colour(self, point, colour):
+        """Waits until the screen has the colour at a point."""
+        wait_for(lambda: self.screen().colour(*point) == colour,
+                 lambda: f'{point} is {self.screen().colour(*point)}, expected {colour}')
 
     def screen(self):
-        """What is on the screen now."""
+        """The contents of the screen now."""
         return Screen(self._display(), *self._size)
 
     def _display(self):
@@ -140,24 +173,42 @@ class Television:
         return self._connection
 
     def start(self, *arguments, environment=None):
-        return subprocess.Popen([self._browser, *map(str, arguments)],
-                                env={**self.environment, **(environment or {})},
-                                stdin=subprocess.DEVNULL, stdout=subprocess.PIPE, stderr=subprocess.PIPE, text=True)
+        """Starts telix-tv, without a timeout of its own unless the arguments have one."""
+        return Process([self._browser, *map(str, arguments)], env={**self.environment, **(environment or {})},
+                       stdin=subprocess.DEVNULL, stdout=subprocess.PIPE, stderr=subprocess.PIPE, text=True)
 
     def run(self, *arguments, environment=None):
-        """Runs telix-tv to its end."""
-        with self.start(*arguments, environment=environment) as process:
+        """Runs telix-tv until it exits. Of two --timeout options the last one, in `arguments`, counts."""
+        with self.start('--timeout', AUTOMATION_TIMEOUT, *arguments, environment=environment) as process:
             try:
-                output, errors = process.communicate(timeout=RUN_LIMIT)
+                output, errors = process.communicate(timeout=RUN_TIMEOUT)
             except subprocess.TimeoutExpired:
                 process.kill()
                 output, errors = process.communicate()
-                raise RuntimeError(f'telix-tv did not end within {RUN_LIMIT} s\n{output}{errors}') from None
+                raise RuntimeError(f'telix-tv did not exit within {RUN_TIMEOUT} s\n{output}{errors}') from None
         return Run(process.returncode, output, errors)
+
+    def run_to_timeout(self, *arguments, error, environment=None):
+        """Runs telix-tv until its --timeout, which is longer in each attempt, until it reports the error and not that
+        the machine was too slow to get there. `error` has a place for the seconds."""
+        for seconds in (3, 15, 60):
+            run = self.run('--timeout', seconds, *arguments, environment=environment)
+            if error.format(seconds) in run.errors:
+                break
+        return run, error.format(seconds)
+
+
+class Process(subprocess.Popen):
+    """A running telix-tv, killed if its with block fails."""
+
+    def __exit__(self, kind, *details):
+        if kind:
+            self.kill()
+        super().__exit__(kind, *details)
 
 
 class Run:
-    """How a run of telix-tv ended."""
+    """The exit status and the output of a run of telix-tv."""
 
     def __init__(self, status, output, errors):
         self.status = status
@@ -170,12 +221,12 @@ class Run:
         return json.loads(self.output.rstrip('\n').split('\n')[-1])
 
     def __str__(self):
-        how = f'signal {signal.Signals(-self.status).name}' if self.status < 0 else f'status {self.status}'
-        return f'telix-tv ended with {how}\n--- standard output\n{self.output}--- standard error\n{self.errors}'
+        cause = f'signal {signal.Signals(-self.status).name}' if self.status < 0 else f'status {self.status}'
+        return f'telix-tv exited with {cause}\n--- standard output\n{self.output}--- standard error\n{self.errors}'
 
 
-class Picture:
-    """A PNG file as telix-tv writes it: eight bits a channel, red, green, blue and perhaps alpha, not interlaced."""
+class PngImage:
+    """A PNG file as telix-tv writes it: eight bits per channel, RGB or RGBA, not interlaced."""
 
     def __init__(self, file_name):
         with open(file_name, 'rb') as file:

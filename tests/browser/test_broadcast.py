@@ -1,4 +1,5 @@
-"""Events of the broadcast on a page that comes over HTTP, where a stream event's description is fetched."""
+"""Broadcast events in a page that is loaded over HTTP, where the stream event description is fetched, and the pages of
+apps/broadcast and apps/parental."""
 
 import functools
 import http.server
@@ -22,10 +23,10 @@ class OverHttp(unittest.TestCase):
         handler = functools.partial(SilentHandler, directory=PAGES)
         with http.server.ThreadingHTTPServer(('127.0.0.1', 0), handler) as server:
             threading.Thread(target=server.serve_forever, daemon=True).start()
-            address = f'http://127.0.0.1:{server.server_port}/broadcastevents.html'
+            url = f'http://127.0.0.1:{server.server_port}/broadcastevents.html'
             with Television(os.environ['TELIX_TV']) as television:
                 run = television.run('--plugin', os.environ['TELIX_PLUGIN'], '--wait-for', 'window.testResult',
-                                     '--eval', 'window.testResult', address)
+                                     '--eval', 'window.testResult', url)
             server.shutdown()
         self.assertEqual(run.status, 0, run)
         self.assertEqual(run.value['failed'], [])
@@ -33,7 +34,7 @@ class OverHttp(unittest.TestCase):
 
 
 class Applications(unittest.TestCase):
-    """The pages for viewers, driven by the remote control."""
+    """The pages in apps/, driven by remote control keys."""
 
     @classmethod
     def setUpClass(cls):

@@ -1,10 +1,9 @@
-"""Events sent with telixctl reach the page: telix-tv, the plug-in and the desktop's platform library."""
+"""Events that telixctl triggers reach the page: telix-tv, the plug-in and the desktop platform library together."""
 
 import os
-import threading
 import unittest
 
-from television import RUN_LIMIT, Television
+from television import Lines, Television
 
 PAGE = os.path.join(os.path.dirname(os.path.abspath(__file__)), 'pages', 'control.html')
 
@@ -13,28 +12,18 @@ class Control(unittest.TestCase):
     def setUp(self):
         self.television = self.enterContext(Television(os.environ['TELIX_TV']))
         self.process = self.enterContext(
-            self.television.start('--plugin', os.environ['TELIX_DESK_PLUGIN'], PAGE))
+            self.television.start('--plugin', os.environ['TELIX_DESKTOP_PLUGIN'], PAGE))
         self.addCleanup(self.process.kill)
-        self.lines = []
-        self.changed = threading.Condition()
-        threading.Thread(target=self.read, daemon=True).start()
+        self.messages = Lines(self.process.stderr)
 
     def enterContext(self, context):  # Python has it from 3.11 on
         value = context.__enter__()
         self.addCleanup(context.__exit__, None, None, None)
         return value
 
-    def read(self):
-        for line in self.process.stderr:
-            with self.changed:
-                self.lines.append(line.rstrip('\n'))
-                self.changed.notify_all()
-
-    def wait_for(self, note):
-        """Waits until the page has logged it."""
-        with self.changed:
-            self.assertTrue(self.changed.wait_for(lambda: any(line.endswith(': ' + note) for line in self.lines),
-                                               RUN_LIMIT / 4), f'no "{note}" in {self.lines}')
+    def wait_for(self, event):
+        """Waits until the page has logged the event."""
+        self.assertTrue(self.messages.wait_for(': ' + event), f'no "{event}" in {self.messages.lines}')
 
     def test_events_reach_the_page(self):
         self.wait_for('channel Telix One')

@@ -1,4 +1,4 @@
-"""Media objects, fed by a server of the test's own and observed at a platform that records."""
+"""A/V control objects, with media of the test's server and the calls that a recording platform gets."""
 
 import http.server
 import json
@@ -10,17 +10,16 @@ import time
 import unittest
 import urllib.parse
 
-from television import Picture, Television
+from television import PngImage, Television
 
 ROOT = os.path.abspath(__file__).rsplit('/tests/', 1)[0]
 TYPES = {'.html': 'text/html; charset=utf-8', '.js': 'text/javascript', '.css': 'text/css', '.mp4': 'video/mp4',
          '.mp3': 'audio/mpeg', '.asx': 'video/x-ms-asf'}
-# Seconds that a page may take in all its tests, and a stream without an end until somebody drops it.
-PAGE_LIMIT = 100
-STREAM_LIMIT = 60
-# A page that is drawn has many colours, for its letters are smoothed; an empty one has a single one.
+# How long the server sends an endless stream to a client that does not close the connection, in seconds.
+STREAM_TIMEOUT = 120
+# A rendered page has many colours, because its text is antialiased; an empty page has one.
 COLOURS_OF_A_PAGE = 50
-# Lines of the media page: its log, the latest first, and what it says on the media.
+# Lines of the media page: its log, the latest first, and its information on the media.
 LOG, PANEL = (f'Array.prototype.map.call(document.querySelectorAll("#{part} > *"), '
               'function (line) { return line.textContent; })' for part in ('log', 'panel'))
 
@@ -37,26 +36,26 @@ PLAYLIST = '''<ASX version="3.0">
 
 
 class Handler(http.server.BaseHTTPRequestHandler):
-    """Files of the project, and below a folder media/ what there is to play."""
+    """Serves the project's files, and media under a folder media/. Records requests, and clients that disconnect."""
 
     def do_GET(self):
         folder, name = self.path.split('?')[0].rsplit('/', 1)
         name = urllib.parse.unquote(name)
-        self.server.asked.append(name)
+        self.server.requested.append(name)
         if folder.endswith('/dropped'):
-            self.answer('text/plain', b'yes' if name in self.server.dropped else b'no')
+            self.respond('text/plain', b'yes' if name in self.server.dropped else b'no')
         elif not folder.endswith('/media') or folder.startswith('/apps/'):
             self.send_file(ROOT + folder + '/' + name)
         elif name.startswith('endless'):
             self.send_endlessly(name)
         elif name == 'list.asx':
-            self.answer(TYPES['.asx'], PLAYLIST.format(base=self.server.address + '/media').encode())
+            self.respond(TYPES['.asx'], PLAYLIST.format(base=self.server.url + '/media').encode())
         elif name.startswith('missing'):
             self.send_error(404)
         else:
-            self.answer(TYPES['.mp4'], b'a beginning')
+            self.respond(TYPES['.mp4'], b'some bytes')
 
-    def answer(self, kind, content):
+    def respond(self, kind, content):
         self.send_response(200)
         self.send_header('Content-Type', kind)
         self.send_header('Content-Length', str(len(content)))
@@ -68,13 +67,13 @@ class Handler(http.server.BaseHTTPRequestHandler):
             self.send_error(404)
             return
         with open(file_name, 'rb') as file:
-            self.answer(TYPES[os.path.splitext(file_name)[1]], file.read())
+            self.respond(TYPES[os.path.splitext(file_name)[1]], file.read())
 
     def send_endlessly(self, name):
         self.send_response(200)
         self.send_header('Content-Type', TYPES[os.path.splitext(name)[1]])
         self.end_headers()
-        end = time.monotonic() + STREAM_LIMIT
+        end = time.monotonic() + STREAM_TIMEOUT
         try:
             while time.monotonic() < end:
                 self.wfile.write(bytes(4096))
@@ -91,13 +90,13 @@ class Server(http.server.ThreadingHTTPServer):
 
     def __init__(self):
         super().__init__(('127.0.0.1', 0), Handler)
-        self.address = f'http://127.0.0.1:{self.server_port}'
-        self.asked = []
+        self.url = f'http://127.0.0.1:{self.server_port}'
+        self.requested = []
         self.dropped = set()
         threading.Thread(target=self.serve_forever, daemon=True).start()
 
     def handle_error(self, *_):
-        """A browser that goes away in the middle of an answer is nothing special."""
+        """Browsers may disconnect during a response."""
 
 
 class Served(unittest.TestCase):
@@ -112,23 +111,23 @@ class Served(unittest.TestCase):
         self.addCleanup(self.server.shutdown)
 
     def calls(self, run):
-        """The calls that the platform got, without the address of the server."""
-        return [line[len('call TELIX_JS_AV_'):].replace(self.server.address, '') for line in run.errors.splitlines()
+        """The A/V calls of the platform, without the server's part of URLs."""
+        return [line[len('call TELIX_JS_AV_'):].replace(self.server.url, '') for line in run.errors.splitlines()
                 if line.startswith('call TELIX_JS_AV_')]
 
     @staticmethod
     def plays(calls):
-        """What was played: name and codes of source, container and audio."""
+        """The Play calls: file name and codes of source, container and audio."""
         matches = (re.fullmatch(r'Play\(\d+, ".*/([^/"]*)", 1, (\d+), (\d+), (\d+), 0, 0\)', call) for call in calls)
         return [(match[1], *map(int, match.groups()[1:])) for match in matches if match]
 
 
 class Pages(Served):
     def run_page(self, page):
-        """Runs a page of tests; gives the calls that the platform got."""
-        run = self.television.run('--plugin', os.environ['TELIX_PLUGIN'], '--timeout', PAGE_LIMIT,
+        """Runs a test page; returns the calls that the platform got."""
+        run = self.television.run('--plugin', os.environ['TELIX_PLUGIN'],
                                   '--wait-for', 'window.testResult', '--eval', 'window.testResult',
-                                  f'{self.server.address}/tests/browser/pages/{page}')
+                                  f'{self.server.url}/tests/browser/pages/{page}')
         self.assertEqual(run.status, 0, run)
         self.assertEqual(run.value['failed'], [], run)
         self.assertGreater(run.value['passed'], 0, run)
@@ -136,11 +135,10 @@ class Pages(Served):
 
     def test_each_type_makes_a_player_with_its_codes(self):
         calls = self.run_page('mediatypes.html')
-        # Players are numbered as they are made, in an order of the engine's own; each object has told its player which
-        # one it is.
+        # The engine creates the objects in its own order, so each object identifies itself by a volume.
         created = [call for call in calls if call.startswith('CreatePlayer')]
-        told = [re.fullmatch(r'SetVolume\((\d+), (\d+)\)', call) for call in calls]
-        players = {int(match[2]): int(match[1]) for match in told if match}
+        volumes = [re.fullmatch(r'SetVolume\((\d+), (\d+)\)', call) for call in calls]
+        players = {int(match[2]): int(match[1]) for match in volumes if match}
         self.assertEqual([created[players[number] - 1] for number in range(9)], [
             f'CreatePlayer(out, {codes}, 0)' for codes in (
                 '2, 1', '512, 4', '512, 0', '512, 0', '512, 0', '512, 0', '512, 0', '512, 0', '512, 0')])
@@ -149,13 +147,13 @@ class Pages(Served):
         self.assertEqual(sum(call.startswith('DestroyPlayer') for call in calls), 10)
 
     def test_a_playlist_repeats_its_section(self):
-        # The browser fetches by itself what it takes for the address of the element, the plug-in asks for the rest.
+        # Depending on the attribute, the browser opens the stream on its own or the plug-in requests it.
         for element in ('object&data', 'object&src', 'embed&src'):
             with self.subTest(element):
                 played = [name for name, *_ in self.plays(self.run_page(f'mediaplaylist.html?{element}'))]
                 self.assertEqual(played, [f'{name}.mp4?length=200'
                                           for name in ('one', 'two', 'three', 'two', 'three', 'four')])
-                self.assertIn('list.asx', self.server.asked)
+                self.assertIn('list.asx', self.server.requested)
 
     def test_an_audio_stream_is_looked_at_and_dropped(self):
         self.assertEqual(self.plays(self.run_page('mediaaudio.html')), [
@@ -163,15 +161,15 @@ class Pages(Served):
 
     def test_a_stream_that_is_not_there(self):
         with socket.socket() as nobody:
-            # Bound and not listening: a connection is refused.
+            # Bound and not listening: connections are refused.
             nobody.bind(('127.0.0.1', 0))
             calls = self.run_page(f'mediamissing.html?{nobody.getsockname()[1]}')
         self.assertEqual(self.plays(calls), [])
-        self.assertIn('missing.mp4', self.server.asked)
+        self.assertIn('missing.mp4', self.server.requested)
 
     def test_a_page_that_has_just_changed_ends_well(self):
         changed = 'document.body.insertBefore(document.createElement("p"), document.body.firstChild).innerText = "x"'
-        page = f'{self.server.address}/tests/browser/pages/mediatypes.html'
+        page = f'{self.server.url}/tests/browser/pages/mediatypes.html'
         for expression, title in ((changed, '"x"'),
                                   (f'{changed}; location.href = "second.html"', '"second.html"'),
                                   (f'{changed}; document.body.innerHTML = ""', '""')):
@@ -185,37 +183,37 @@ class Pages(Served):
     def test_another_page_takes_the_place_of_one_that_has_just_changed(self):
         run = self.television.run(
             '--plugin', os.environ['TELIX_PLUGIN'], '--wait-for',
-            # Again and again until the other page is there: each time the layout is out of date.
+            # Repeated until the other page is loaded, so that the layout is always out of date.
             '(function () { if (!window.testResult) { return document.title === "second"; } '
             'if (!window.gone) { window.gone = true; location.href = "second.html"; } '
             'document.body.insertBefore(document.createElement("p"), document.body.firstChild).innerText = "x"; }())',
-            '--eval', 'document.title', f'{self.server.address}/tests/browser/pages/mediatypes.html')
+            '--eval', 'document.title', f'{self.server.url}/tests/browser/pages/mediatypes.html')
         self.assertEqual(run.status, 0, run)
         self.assertEqual(sum(call.startswith('DestroyPlayer') for call in self.calls(run)), 10)
 
     def test_states_and_events_come_in_order(self):
         calls = self.run_page('mediaevents.html')
-        asked = [re.sub(r'\((\d+, ".*/(\w+\.mp4)|\d+).*', r' \2', call) for call in calls
-                 if re.match(r'(Play|Pause|Resume|Seek)\(', call)]
-        self.assertEqual([words.strip() for words in asked], [
+        playback = [re.sub(r'\((\d+, ".*/(\w+\.mp4)|\d+).*', r' \2', call) for call in calls
+                    if re.match(r'(Play|Pause|Resume|Seek)\(', call)]
+        self.assertEqual([call.strip() for call in playback], [
             'Play clip.mp4', 'Pause', 'Resume', 'Pause', 'Resume', 'Seek',
             'Play clip.mp4', 'Play absent.mp4', 'Play clip.mp4', 'Play clip.mp4'])
 
 
 class Application(Served):
-    """The media page of the applications, driven by the remote control."""
+    """apps/media, driven by remote control keys."""
 
     def run_application(self, *arguments, media=('one.mp4', 'two%20clips.mp4', 'absent.mp4'), plugin='TELIX_PLUGIN'):
-        query = '&'.join(f'media={self.server.address}/media/{name}' for name in media)
+        query = '&'.join(f'media={self.server.url}/media/{name}' for name in media)
         run = self.television.run('--plugin', os.environ[plugin], *arguments,
-                                  f'{self.server.address}/apps/media/index.html?{query}')
+                                  f'{self.server.url}/apps/media/index.html?{query}')
         self.assertEqual(run.status, 0, run)
-        # Messages of its scripts carry the name of the file.
+        # Errors of scripts are printed with the name of their file.
         self.assertNotIn('/apps/', run.errors.replace('/apps/media/index.html', ''), run)
         return run
 
     def after(self, keys, condition, result):
-        """Presses keys, waits for a state of the page and gives the value of an expression."""
+        """Presses keys, waits for a condition and returns the value of an expression."""
         return self.run_application('--keys', keys, '--wait-for', condition, '--eval', result).value
 
     def test_it_names_its_media(self):
@@ -225,18 +223,19 @@ class Application(Served):
     def test_ok_plays_what_has_the_focus(self):
         run = self.run_application('--keys', 'down,ok', '--wait-for', 'video.playState === 1 && video.playPosition > 0',
                                    '--eval', LOG)
-        self.assertEqual(run.value, ['state: playing', 'play(1) gives true', 'state: buffering', 'state: connecting'])
+        self.assertEqual(run.value, ['state: playing', 'play(1) returns true', 'state: buffering', 'state: connecting'])
         self.assertEqual([name for name, *_ in self.plays(self.calls(run))], ['two%20clips.mp4'])
 
     def test_pause_play_and_stop(self):
         self.assertEqual(self.after('play,pause', 'video.playState === 2', PANEL)[0], 'paused')
         self.assertEqual(self.after('play,pause,play', 'video.playState === 1', LOG)[:3],
-                         ['play(1) gives false', 'state: playing', 'play(0) gives true'])
+                         ['play(1) returns false', 'state: playing', 'play(0) returns true'])
         self.assertEqual(self.after('play,stop', 'video.playState === 0', PANEL)[0], 'stopped')
 
     def test_the_arrows_seek(self):
         calls = self.calls(self.run_application(
-            '--keys', 'play,right,right,left', '--wait-for', 'video.playState === 1', '--eval', '1'))
+            # Paused, so that the position changes by seeks only.
+            '--keys', 'play,pause,right,right,left', '--wait-for', 'video.playState === 2', '--eval', '1'))
         targets = [int(re.search(r', (\d+)\)', call)[1]) for call in calls if call.startswith('Seek')]
         self.assertEqual([round(target, -4) for target in targets], [10000, 20000, 10000])
 
@@ -259,7 +258,7 @@ class Application(Served):
     def screenshot(self, name, *arguments):
         file_name = os.path.join(os.environ['TELIX_SCREENSHOTS'], f'media-{name}.png')
         self.run_application('--screenshot', file_name, *arguments)
-        return Picture(file_name)
+        return PngImage(file_name)
 
     def test_red_fills_the_screen_and_goes_back(self):
         calls = self.calls(self.run_application('--keys', 'red,red', '--eval', '1'))
@@ -270,9 +269,9 @@ class Application(Served):
 
     def test_the_page_has_a_hole_for_the_picture(self):
         page = self.screenshot('playing', '--keys', 'play,right,right', '--wait-for', 'video.playState === 1')
-        beneath = self.screenshot('full', '--keys', 'red').colour(626, 228)
-        self.assertEqual(page.colour(626, 228), beneath)
-        self.assertNotEqual(page.colour(830, 228), beneath)
+        video_plane = self.screenshot('full', '--keys', 'red').colour(626, 228)
+        self.assertEqual(page.colour(626, 228), video_plane)
+        self.assertNotEqual(page.colour(830, 228), video_plane)
 
     def test_everything_lies_within_the_safe_area_and_nothing_is_cut_off(self):
         outside = '''Array.prototype.filter.call(document.querySelectorAll('.screen > *'), function (element) {
@@ -288,7 +287,7 @@ class Application(Served):
         self.assertIn('No media', self.run_application('--eval', LOG, media=()).value[0])
 
     def test_without_the_plug_in_it_says_so(self):
-        text = self.run_application('--eval', 'document.body.innerText', plugin='TELIX_STRANGER').value
+        text = self.run_application('--eval', 'document.body.innerText', plugin='TELIX_FOREIGN_PLUGIN').value
         self.assertIn('The plug-in is missing', text)
         self.assertNotIn('Speed', text)
 

@@ -1,4 +1,4 @@
-"""The runner of test pages tells good pages from bad ones."""
+"""run_page.py reports which pages pass and why others fail."""
 
 import os
 import subprocess
@@ -10,7 +10,7 @@ from television import temporary_folder
 FOLDER = os.path.dirname(os.path.abspath(__file__))
 
 
-def run_page(content, *arguments, browser=os.environ['TELIX_TV']):
+def run_page(content, *arguments, browser=os.environ['TELIX_TV'], options=()):
     with temporary_folder() as folder:
         page = os.path.join(folder, 'page.html')
         with open(page, 'w', encoding='utf-8') as file:
@@ -18,14 +18,14 @@ def run_page(content, *arguments, browser=os.environ['TELIX_TV']):
         return subprocess.run(
             [sys.executable, '-B', os.path.join(FOLDER, 'run_page.py'), '--browser', browser,
              '--screenshot', os.path.join(folder, 'page.png'), *arguments, page, '--',
-             '--plugin', os.environ['TELIX_PLUGIN'], '--timeout', '5'],
+             '--plugin', os.environ['TELIX_PLUGIN'], *options],
             stdout=subprocess.PIPE, stderr=subprocess.STDOUT, text=True, check=False)
 
 
 class RunPage(unittest.TestCase):
-    def assert_fails(self, run, complaint):
+    def assert_fails(self, run, failure):
         self.assertEqual(run.returncode, 1, run.stdout)
-        self.assertIn(complaint, run.stdout)
+        self.assertIn(failure, run.stdout)
 
     def test_passing_checks_pass(self):
         run = run_page("testPage({'one': function () { check(true); }, 'two': function () { same(1, 1); },"
@@ -37,7 +37,7 @@ class RunPage(unittest.TestCase):
         content = """var element = document.createElement('object');
             element.type = 'application/oipfapplicationmanager';
             testPage({'object': function () { document.body.appendChild(element); check(!!element.getOwnerApplication);
-                                              throw new Error('to see the output'); }})"""
+                                              throw new Error('so that the output is printed'); }})"""
         self.assertIn('PLUGIN >>>', run_page(content, '--environment=LOG_MODULE=1').stdout)
         self.assertNotIn('PLUGIN >>>', run_page(content).stdout)
 
@@ -62,7 +62,7 @@ class RunPage(unittest.TestCase):
         self.assert_fails(run, 'bad: ')
 
     def test_a_test_that_never_ends_fails(self):
-        run = run_page("testLimit = 50; testPage({'bad': function (done) { check(true); }})")
+        run = run_page("testTimeout = 50; testPage({'bad': function (done) { check(true); }})")
         self.assert_fails(run, 'bad: not done within 50 ms')
 
     def test_a_test_without_a_check_fails(self):
@@ -72,10 +72,10 @@ class RunPage(unittest.TestCase):
         self.assert_fails(run_page('testPage({})'), 'the page has no tests')
 
     def test_a_page_without_an_outcome_fails(self):
-        self.assert_fails(run_page('nonsense('), 'the page gave no outcome')
+        self.assert_fails(run_page('nonsense(', options=['--timeout', '5']), 'the page set no result')
 
     def test_a_malformed_outcome_fails(self):
-        self.assert_fails(run_page('window.testResult = 1'), 'the outcome is malformed')
+        self.assert_fails(run_page('window.testResult = 1'), 'the result is malformed')
 
     def test_a_crash_fails(self):
         with temporary_folder() as folder:

@@ -1,4 +1,4 @@
-"""What ./run.sh refuses, before it builds anything."""
+"""The usage errors of ./run.sh, which it reports before it builds anything."""
 
 import os
 import subprocess
@@ -29,7 +29,7 @@ class Refusals(unittest.TestCase):
 
     def test_a_file_that_is_not_there(self):
         for name in ('missing.ts', 'missing.html', 'missing'):
-            self.assert_refused(os.path.join(self.folder, name), because=f'no such file: {self.folder}/{name}')
+            self.assert_refused(os.path.join(self.folder, name), because=f'{self.folder}/{name}: No such file')
 
     def test_a_file_that_is_neither_a_page_nor_a_transport_stream(self):
         packet = b'G' + 187 * b'x'
@@ -44,7 +44,7 @@ class Refusals(unittest.TestCase):
     def test_a_folder_that_has_the_name_of_a_page(self):
         folder = os.path.join(self.folder, 'page.html')
         os.mkdir(folder)
-        self.assert_refused(folder, because='is no file')
+        self.assert_refused(folder, because='not a file')
 
     def test_a_name_that_a_line_up_cannot_hold(self):
         for name in ('a;b.ts', 'a#1.ts'):
@@ -52,8 +52,8 @@ class Refusals(unittest.TestCase):
 
     def test_a_page_and_something_else(self):
         page = self.write('page.html', b'')
-        self.assert_refused(page, page, because='alone')
-        self.assert_refused('http://127.0.0.1/', page, because='alone')
+        self.assert_refused(page, page, because='only argument')
+        self.assert_refused('http://127.0.0.1/', page, because='only argument')
 
     def test_an_option_without_its_value(self):
         self.assert_refused('--size', because='--size')

@@ -1,41 +1,41 @@
-"""Television on the desk as a whole: browser, plug-in and platform library with real pictures. What the page is told, what
-the pipeline does and what the screen shows are held against the rules of the test multiplex."""
+"""The desktop television as a whole: browser, plug-in and platform library with decoded video. The events of the page, the
+state of the pipeline and the pixels of the screen are compared with the known content of the test multiplex."""
 
 import contextlib
 import http.server
 import json
 import os
 import queue
+import signal
 import subprocess
 import threading
 import time
 import unittest
 
-from television import Television, temporary_folder
-from test_demo import has_bars, is_dark, is_striped
+from television import RUN_TIMEOUT, WAIT_TIMEOUT, Television, temporary_folder, wait_for
+from patterns import has_bars, is_dark, is_striped
 
 TOP = os.path.abspath(__file__).rsplit('/tests/', 1)[0]
 PAGES = os.path.join(TOP, 'tests', 'browser', 'pages')
-LIMIT = 20  # seconds for anything to come true
 
-# The services of the test multiplex: the titles of their programmes, one after the other, and the pattern.
+# The services of the test multiplex: the titles of their programmes in turn, and the test pattern.
 SERVICES = {
     'Telix One': (['Morning Patterns', 'The Colour Hour', 'News at the Minute'], is_striped),
     'Telix Two': (['Bars of the World', 'Night of the Test Card'], has_bars),
     'Telix Three': (['Gradients', 'Slow Colours', 'Fast Colours', 'Colours Live'], is_dark),
 }
-PROGRAMME_SECONDS = 4  # as tests/desktop/tv.conf says
-# Of the first service.
-GERMAN_SOUND, ENGLISH_SOUND = 0x111, 0x112
-# Of the third.
+PROGRAMME_SECONDS = 4  # as in tests/desktop/tv.conf
+TABLE_SECONDS = 2  # at most, from the start of a programme to the table that names it
+# PIDs: audio of the first service, subtitles of the third.
+GERMAN_AUDIO, ENGLISH_AUDIO = 0x111, 0x112
 GERMAN_SUBTITLES = 0x133
 UNKNOWN_CHANNEL = 5
 
 
 class Handler(http.server.BaseHTTPRequestHandler):
-    """The page's files, and the two ends of the line to it."""
+    """Serves the page's files, hands it expressions (GET /command) and receives their values (POST)."""
 
-    # Qt asks a second time when an answer has no length and its end is that of the connection.
+    # With HTTP/1.0 Qt repeats a request whose response has no length.
     protocol_version = 'HTTP/1.1'
     FILES = {'/television.xhtml': (os.path.join(PAGES, 'television.xhtml'), 'application/vnd.hbbtv.xhtml+xml'),
              '/television.js': (os.path.join(PAGES, 'television.js'), 'application/javascript'),
@@ -57,7 +57,7 @@ class Handler(http.server.BaseHTTPRequestHandler):
     def do_POST(self):  # pylint: disable=invalid-name
         body = self.rfile.read(int(self.headers['Content-Length']))
         self.reply(204, 'text/plain', b'')
-        self.server.answers.put(json.loads(body))
+        self.server.results.put(json.loads(body))
 
     def reply(self, status, kind, body):
         with contextlib.suppress(ConnectionError):
@@ -72,9 +72,9 @@ class Handler(http.server.BaseHTTPRequestHandler):
 
 
 @contextlib.contextmanager
-def line_to_page():
+def page_server():
     with http.server.ThreadingHTTPServer(('127.0.0.1', 0), Handler) as server:
-        server.commands, server.answers = queue.Queue(), queue.Queue()
+        server.commands, server.results = queue.Queue(), queue.Queue()
         thread = threading.Thread(target=server.serve_forever)
         thread.start()
         try:
@@ -84,8 +84,8 @@ def line_to_page():
             thread.join()
 
 
-class OnTheDesk(unittest.TestCase):
-    """Base of all: one television for all tests of the class."""
+class DesktopTelevision(unittest.TestCase):
+    """Base class: one television for all tests of the class."""
 
     environment = {}
 
@@ -94,45 +94,36 @@ class OnTheDesk(unittest.TestCase):
         stack = contextlib.ExitStack()
         cls.addClassCleanup(stack.close)
         cls.television = stack.enter_context(Television(os.environ['TELIX_TV']))
-        cls.line = stack.enter_context(line_to_page())
+        cls.server = stack.enter_context(page_server())
         cls.process = cls.television.start(
-            '--plugin', os.environ['TELIX_DESK_PLUGIN'],
-            f'http://127.0.0.1:{cls.line.server_port}/television.xhtml', environment=cls.environment)
-        stack.callback(cls.end_of_television)
+            '--plugin', os.environ['TELIX_DESKTOP_PLUGIN'],
+            f'http://127.0.0.1:{cls.server.server_port}/television.xhtml', environment=cls.environment)
+        stack.callback(cls.stop_television)
 
     @classmethod
-    def end_of_television(cls):
+    def stop_television(cls):
         cls.process.terminate()
         try:
-            _, errors = cls.process.communicate(timeout=LIMIT)
+            _, errors = cls.process.communicate(timeout=RUN_TIMEOUT)
         except subprocess.TimeoutExpired:
             cls.process.kill()
             raise
-        if cls.process.returncode != 128 + 15 or 'television.js:' in errors:
-            raise RuntimeError(f'telix-tv ended with {cls.process.returncode}\n{errors}')
+        if cls.process.returncode != 128 + signal.SIGTERM or 'television.js:' in errors:
+            raise RuntimeError(f'telix-tv exited with {cls.process.returncode}\n{errors}')
 
     def setUp(self):
-        self.value('renew()')
+        self.value('replaceObject()')
 
     def value(self, expression):
         """The value of an expression in the page."""
-        self.line.commands.put(expression)
-        answer = self.line.answers.get(timeout=LIMIT)
-        self.assertNotIn('error', answer, expression)
-        return answer['value']
-
-    def wait(self, condition, message):
-        """Gives the first value of the function that is true."""
-        end = time.monotonic() + LIMIT
-        while True:
-            value = condition()
-            if value:
-                return value
-            self.assertLess(time.monotonic(), end, message() if callable(message) else message)
-            time.sleep(0.05)
+        self.server.commands.put(expression)
+        result = self.server.results.get(timeout=WAIT_TIMEOUT)
+        self.assertNotIn('error', result, expression)
+        return result['value']
 
     def wait_for(self, expression):
-        return self.wait(lambda: self.value(expression), lambda: f'{expression}: {self.value("events")}')
+        """Waits until an expression in the page is true."""
+        return wait_for(lambda: self.value(expression), lambda: f'{expression}: {self.value("events")}')
 
     def tune(self, name):
         self.value(f'tune({json.dumps(name)})')
@@ -142,50 +133,54 @@ class OnTheDesk(unittest.TestCase):
         return self.television.telixctl('state')
 
     def wait_for_state(self, key, value):
-        self.wait(lambda: self.state()[key] == value, lambda: f'{key}: {self.state()[key]}')
+        wait_for(lambda: self.state()[key] == value, lambda: f'{key}: {self.state()[key]}')
 
-    def is_near(self, place, colour, distance=40):
-        """Whether the screen nearly has that colour there."""
-        return all(abs(part - other) < distance
-                   for part, other in zip(self.television.screen().colour(*place), colour))
+    def is_near(self, point, colour, tolerance=40):
+        """Whether the screen has about that colour at a point."""
+        return all(abs(component - expected) < tolerance
+                   for component, expected in zip(self.television.screen().colour(*point), colour))
 
     def patterns(self):
-        """The services of the test multiplex whose pattern the screen may show."""
+        """The services of the test multiplex whose test pattern matches the screen."""
         screen = self.television.screen()
         return [name for name, (_, pattern) in SERVICES.items() if pattern(screen)]
 
+    def wait_for_pattern(self, name):
+        wait_for(lambda: self.patterns() == [name], lambda: f'expected {name}, matching: {self.patterns()}')
 
-class Broadcast(OnTheDesk):
+
+class Broadcast(DesktopTelevision):
     def test_each_channel_has_its_name_and_its_picture(self):
         self.assertEqual(self.value('channels().map(function (each) { return each.name; })'), list(SERVICES))
         for name in [*SERVICES, 'Telix One']:
             self.tune(name)
             self.assertEqual(self.value('tv.currentChannel.name'), name)
-            self.wait(lambda name=name: self.patterns() == [name], lambda name=name: f'{name}: {self.patterns()}')
+            self.wait_for_pattern(name)
             self.assertEqual(self.state()['channel']['name'], name)
 
     def test_the_viewer_changes_the_channel_as_well(self):
         self.tune('Telix One')
         self.television.telixctl('channel', '2')
         self.wait_for('hasTuned("Telix Two")')
-        self.wait(lambda: self.patterns() == ['Telix Two'], self.patterns)
+        self.wait_for_pattern('Telix Two')
 
-    def present_and_next(self, name):
-        """Tunes with a new object, which keeps the programmes that it sees first. Empty when the table of the next one has
-        not come by then."""
-        self.value('renew()')
+    def present_and_following(self, name):
+        """Tunes with a new object, because an object keeps the programmes that it reads first. Empty if the following
+        programme has not been received by then, or if the present one is over, as on a machine that is too busy."""
+        begin = time.time()
+        self.value('replaceObject()')
         self.tune(name)
         self.wait_for('tv.programmes && tv.programmes.length > 0')
         programmes = self.value('programmes()')
-        return programmes if len(programmes) > 1 else []
+        start = programmes[0][1]
+        is_present = start <= time.time() and begin < start + PROGRAMME_SECONDS + TABLE_SECONDS
+        return programmes if is_present and len(programmes) > 1 else []
 
     def assert_scheduled(self, name):
-        """What is on now and next is what the time says; gives the number of the present one since 1970."""
+        """The present and the following programme are those of the current time. Returns the number of the present one
+        since 1970."""
         titles = SERVICES[name][0]
-        programmes, now = self.wait(lambda: self.present_and_next(name), 'no next programme'), time.time()
-        # The tables come twice a second, and the object may have been there a moment before.
-        self.assertLessEqual(programmes[0][1], now)
-        self.assertLess(now, programmes[0][1] + PROGRAMME_SECONDS + 2)
+        programmes = wait_for(lambda: self.present_and_following(name), 'no present and following programme')
         slot = programmes[0][1] // PROGRAMME_SECONDS
         self.assertEqual(programmes, [[titles[each % len(titles)], each * PROGRAMME_SECONDS, PROGRAMME_SECONDS,
                                        f'A programme of {name}.'] for each in (slot, slot + 1)])
@@ -195,55 +190,55 @@ class Broadcast(OnTheDesk):
         for name in SERVICES:
             first = self.assert_scheduled(name)
             known = len(self.value('events'))
-            # A programme ends, and the page is told.
-            self.wait(lambda first=first: time.time() > (first + 1) * PROGRAMME_SECONDS + 1, 'the clock stands')
+            # The page gets an event when the present programme ends.
+            wait_for(lambda first=first: time.time() > (first + 1) * PROGRAMME_SECONDS + 1, 'the clock does not advance')
             self.wait_for(f'events.slice({known}).some(function (each) {{ return each[0] === "programmes"; }})')
             self.assertGreater(self.assert_scheduled(name), first)
 
     def test_sound_of_another_language_is_heard_when_it_is_selected(self):
         self.tune('Telix One')
-        self.wait_for_state('activeAudioPid', GERMAN_SOUND)
+        self.wait_for_state('activeAudioPid', GERMAN_AUDIO)
         self.assertEqual(self.value('active(1)'), ['deu'])
-        for language, pid in (('eng', ENGLISH_SOUND), ('deu', GERMAN_SOUND)):
+        for language, pid in (('eng', ENGLISH_AUDIO), ('deu', GERMAN_AUDIO)):
             self.value(f'tv.selectComponent(component(1, "{language}"))')
             self.wait_for_state('activeAudioPid', pid)
             self.assertEqual(self.value('active(1)'), [language])
 
-    def letters(self):
-        """How many pixels are white where subtitles stand; the third service has none of its own there."""
+    def white_pixels(self):
+        """The number of white pixels in the area of the subtitles; the test pattern of the third service has none."""
         screen = self.television.screen()
         return sum(min(screen.colour(x, y)) > 200 for y in range(560, 720, 3) for x in range(200, 1080, 3))
 
     def assert_no_subtitles(self):
-        # The pauses between them are shorter.
+        # The gaps between subtitles are shorter than 2 s.
         end = time.monotonic() + 2
         while time.monotonic() < end:
-            self.assertEqual(self.letters(), 0)
+            self.assertEqual(self.white_pixels(), 0)
             time.sleep(0.1)
 
     def test_subtitles_are_on_the_screen_while_they_are_selected(self):
         self.tune('Telix Three')
-        self.wait(lambda: self.patterns() == ['Telix Three'], self.patterns)
-        self.assertEqual((self.value('active(2)'), self.state()['activeSubtitlePid']), ([], None))
+        self.wait_for_pattern('Telix Three')
+        self.assertEqual((self.value('active(2)'), self.state()['shownSubtitle']), ([], None))
         self.assert_no_subtitles()
         self.value('tv.selectComponent(component(2, "deu"))')
         self.wait_for_state('activeSubtitlePid', GERMAN_SUBTITLES)
         self.assertEqual(self.value('active(2)'), ['deu'])
-        self.wait(lambda: self.letters() > 100, 'no subtitles')
+        wait_for(lambda: self.white_pixels() > 100, 'no subtitles')
         self.value('tv.unselectComponent(component(2, "deu"))')
-        self.wait_for_state('activeSubtitlePid', None)
-        self.wait(lambda: self.letters() == 0, 'subtitles')
+        self.wait_for_state('shownSubtitle', None)
+        wait_for(lambda: self.white_pixels() == 0, 'subtitles')
         self.assert_no_subtitles()
 
     def test_stream_events_of_the_channel_reach_the_page(self):
         for name in ('Telix One', 'Telix Two'):
-            self.value('renew()')
+            self.value('replaceObject()')
             self.tune(name)
             self.value('watchStreamEvents()')
             event = json.dumps(['streamEvent', 'red-button', f'Red button on {name}', 'trigger'])
             count = f'events.filter(function (each) {{ return JSON.stringify(each) === {json.dumps(event)}' \
                     '.replace(/, /g, ","); }).length'
-            # One a second: each of them once, and no end of them.
+            # The event is sent once a second.
             self.wait_for(f'{count} >= 2')
             self.assertEqual({each[2] for each in self.value('events') if each[0] == 'streamEvent'},
                              {f'Red button on {name}'})
@@ -256,25 +251,25 @@ class Broadcast(OnTheDesk):
 
     def test_the_picture_stands_where_the_page_wants_it(self):
         self.tune('Telix One')
-        self.wait(lambda: self.patterns() == ['Telix One'], self.patterns)
+        self.wait_for_pattern('Telix One')
         self.value('tv.style.cssText = "left: 640px; top: 360px; width: 640px; height: 360px"')
-        # The first and the last stripe, and black where there was one.
-        for place, colour in (((1270, 700), (0, 255, 255)), ((660, 700), (255, 0, 0)), ((30, 300), (0, 0, 0))):
-            self.wait(lambda place=place, colour=colour: self.is_near(place, colour), f'{place} is not {colour}')
+        # The first and the last stripe of the pattern, and black outside the video.
+        for point, colour in (((1270, 700), (0, 255, 255)), ((660, 700), (255, 0, 0)), ((30, 300), (0, 0, 0))):
+            wait_for(lambda point=point, colour=colour: self.is_near(point, colour), f'{point} is not {colour}')
         self.assertEqual(self.state()['picture']['area'], {'x': 640, 'y': 360, 'width': 640, 'height': 360})
         self.television.telixctl('full-screen', 'on')
-        self.wait(lambda: self.patterns() == ['Telix One'], self.patterns)
+        self.wait_for_pattern('Telix One')
         self.wait_for('events.some(function (each) { return each[0] === "fullScreen"; })')
         self.assertEqual(self.value('tv.fullScreen'), True)
 
     def test_a_released_picture_is_black(self):
         self.tune('Telix One')
-        self.wait(lambda: self.patterns() == ['Telix One'], self.patterns)
+        self.wait_for_pattern('Telix One')
         self.value('tv.release()')
-        self.wait(lambda: self.is_near((300, 300), (0, 0, 0)) and self.is_near((1200, 300), (0, 0, 0)), 'not black')
+        wait_for(lambda: self.is_near((300, 300), (0, 0, 0)) and self.is_near((1200, 300), (0, 0, 0)), 'not black')
 
 
-class Files(OnTheDesk):
+class Files(DesktopTelevision):
     """Transport streams of one colour each in a folder."""
 
     COLOURS = {'Sea': (32, 64, 192), 'Meadow': (32, 160, 64)}
@@ -297,9 +292,9 @@ class Files(OnTheDesk):
                          sorted(self.COLOURS))
         for name in [*self.COLOURS, 'Sea']:
             self.tune(name)
-            for place in ((5, 5), (640, 360), (1275, 715)):
-                self.wait(lambda name=name, place=place: self.is_near(place, self.COLOURS[name], 12),
-                          f'{name} at {place}')
+            for point in ((5, 5), (640, 360), (1275, 715)):
+                wait_for(lambda name=name, point=point: self.is_near(point, self.COLOURS[name], 12),
+                         f'{name} at {point}')
 
 
 if __name__ == '__main__':

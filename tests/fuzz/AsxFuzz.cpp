@@ -1,5 +1,5 @@
-// Feeds arbitrary bytes to the playlist scanner and walks the list that comes out. Beyond the sanitizers it
-// checks what holds for every list, so that a wrong link shows where it arises.
+// Fuzz target of the playlist parser: parses arbitrary bytes and walks through the resulting list. The
+// assertions check invariants of every list.
 #include <cassert>
 #include <cstddef>
 #include <cstdint>
@@ -37,7 +37,7 @@ void walk(unsigned count) {
     }
 }
 
-// Play either comes to the last clip or turns back for ever within one section.
+// Playback either reaches the last clip or loops in one repeat section.
 void play(unsigned count) {
     unsigned start = 0;
     unsigned end = 0;
@@ -59,8 +59,8 @@ void play(unsigned count) {
 } // namespace
 
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
-    // The texts about the list outlast a parse by design; one that sets them all to nothing makes each input
-    // stand for itself.
+    // By design a parse keeps the header elements of the previous list; this one clears them, so that inputs
+    // are independent of each other.
     asxParseAsx("<ASX><BASE HREF=\"\"/><TITLE></TITLE><Author></Author><Copyright></Copyright>"
                 "<ABSTRACT></ABSTRACT>",
                 "");

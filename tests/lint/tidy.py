@@ -1,8 +1,8 @@
 #!/usr/bin/env python3
-"""Runs clang-tidy over the sources of some folders, as the build compiles them.
+"""Runs clang-tidy on the sources of some folders, with the commands of the build.
 
-A file that has passed is not looked at again until it, a header of it, its command or the checks change. What it
-depends on is what the build has noted, so the build comes first."""
+A source that has passed is skipped until it, one of its headers, its command or the checks change. The headers are
+those that the build has recorded, so the sources must have been built."""
 
 import argparse
 import collections
@@ -17,9 +17,9 @@ import sys
 
 
 def read_dependencies(build):
-    """The files from which the build has made each object, by the object's name."""
+    """The files that each object depends on, by the object's name."""
     if not os.path.exists(os.path.join(build, 'build.ninja')):
-        return {}  # other build programs tell nothing
+        return {}  # only Ninja can list them
     output = subprocess.run(['ninja', '-C', build, '-t', 'deps'], capture_output=True, text=True, check=True).stdout
     dependencies = collections.defaultdict(list)
     name = None
@@ -37,9 +37,9 @@ def digest_of(path):
         return hashlib.sha256(file.read()).digest()
 
 
-def key_of(commands, dependencies, means):
-    """Stands for all that the outcome depends on; None if the build has not noted that."""
-    key = hashlib.sha256(means)
+def key_of(commands, dependencies, tool_digest):
+    """A digest of everything that the result depends on; None if the build has not recorded the dependencies."""
+    key = hashlib.sha256(tool_digest)
     for command in commands:
         words = shlex.split(command)
         files = dependencies.get(words[words.index('-o') + 1])
@@ -51,52 +51,80 @@ def key_of(commands, dependencies, means):
     return key.hexdigest()
 
 
-def main():
+def parse_arguments():
     parser = argparse.ArgumentParser(description=__doc__)
     parser.add_argument('--clang-tidy', required=True, metavar='PROGRAM')
     parser.add_argument('--build', required=True, metavar='FOLDER', help='with compile_commands.json')
-    parser.add_argument('--checks', required=True, metavar='FILE', help='the .clang-tidy of the sources')
-    parser.add_argument('--passed', required=True, metavar='FOLDER', help='where it is noted what has passed')
+    parser.add_argument('--checks', required=True, action='append', metavar='FILE', help='a .clang-tidy of the sources')
+    parser.add_argument('--passed', required=True, metavar='FOLDER', help='records the sources that have passed')
     parser.add_argument('--jobs', type=int, default=os.cpu_count())
     parser.add_argument('folders', nargs='+', metavar='FOLDER')
-    arguments, options = parser.parse_known_args()  # what is not known goes to clang-tidy
+    return parser.parse_known_args()  # unknown options are for clang-tidy
 
-    with open(os.path.join(arguments.build, 'compile_commands.json'), encoding='utf-8') as file:
+
+def commands_of_sources(build, folders):
+    """All commands that compile each source of the folders, by the source's name."""
+    with open(os.path.join(build, 'compile_commands.json'), encoding='utf-8') as file:
         entries = json.load(file)
-    prefixes = tuple(os.path.join(folder, '') for folder in arguments.folders)
-    sources = collections.defaultdict(list)  # with all the commands that compile them
+    prefixes = tuple(os.path.join(folder, '') for folder in folders)
+    sources = collections.defaultdict(list)
     for entry in entries:
         if entry['file'].startswith(prefixes):
             sources[entry['file']].append(entry['command'])
     if not sources:
-        sys.exit(f'tidy.py: no sources of these folders in {arguments.build}')
+        sys.exit(f'tidy.py: {build}: no sources of these folders')
+    return sources
 
+
+def digest_of_tool(command, checks):
+    """A digest of clang-tidy's version, its arguments and the checks."""
+    version = subprocess.run([command[0], '--version'], capture_output=True, check=True).stdout
+    return hashlib.sha256(version + b''.join(map(digest_of, checks)) + '\0'.join(command).encode()).digest()
+
+
+class PassedSources:
+    """The record of the sources that have passed: an empty file for each key."""
+
+    def __init__(self, folder, keys):
+        """Removes all records but those with one of the keys."""
+        self._folder = folder
+        os.makedirs(folder, exist_ok=True)
+        self._passed = set(os.listdir(folder))
+        for outdated in self._passed - set(keys):
+            os.unlink(os.path.join(folder, outdated))
+
+    def __contains__(self, key):
+        return key in self._passed
+
+    def add(self, key):
+        with open(os.path.join(self._folder, key), 'w', encoding='utf-8'):
+            pass
+
+
+def main():
+    arguments, options = parse_arguments()
+    sources = commands_of_sources(arguments.build, arguments.folders)
     command = [arguments.clang_tidy, '-quiet', f'-p={arguments.build}', *options]
-    version = subprocess.run([arguments.clang_tidy, '--version'], capture_output=True, check=True).stdout
-    means = hashlib.sha256(version + digest_of(arguments.checks) + '\0'.join(command).encode()).digest()
+    tool_digest = digest_of_tool(command, arguments.checks)
     dependencies = read_dependencies(arguments.build)
-    os.makedirs(arguments.passed, exist_ok=True)
-    keys = {source: key_of(commands, dependencies, means) for source, commands in sources.items()}
-    passed = set(os.listdir(arguments.passed))
-    for outdated in passed - set(keys.values()):
-        os.unlink(os.path.join(arguments.passed, outdated))
-    waiting = [source for source, key in keys.items() if key not in passed]
+    keys = {source: key_of(commands, dependencies, tool_digest) for source, commands in sources.items()}
+    passed = PassedSources(arguments.passed, keys.values())
+    unchecked = [source for source, key in keys.items() if key not in passed]
 
-    def look_at(source):
+    def check(source):
         result = subprocess.run([*command, source], capture_output=True, text=True)
         if result.returncode == 0 and keys[source]:
-            with open(os.path.join(arguments.passed, keys[source]), 'w', encoding='utf-8'):
-                pass
+            passed.add(keys[source])
         return source, result
 
     failed = 0
     with concurrent.futures.ThreadPoolExecutor(arguments.jobs) as pool:
-        for source, result in pool.map(look_at, waiting):
+        for source, result in pool.map(check, unchecked):
             if result.returncode != 0:
                 failed += 1
                 print(f'{source}:\n{result.stdout}{result.stderr}', flush=True)
-    print(f'{len(sources)} files: {len(waiting)} looked at, {failed} with faults, {len(sources) - len(waiting)} as they '
-          'were when they passed')
+    print(f'{len(sources)} sources: {len(unchecked)} checked, {failed} failed, {len(sources) - len(unchecked)} unchanged '
+          'since they passed')
     sys.exit(1 if failed else 0)
 
 

@@ -1,4 +1,4 @@
-// The value of an expression, as truth and as JSON, or the text of what it threw.
+// Evaluates an expression. Returns its value as a boolean and as JSON, or the exception as a string.
 (function (expression) {
     try {
         var value = (0, eval)('(' + expression + '\n)');

@@ -1,5 +1,6 @@
-// What every page of a TV browser finds in its window before its own scripts run: the functions that open, close, show
-// and hide applications, and the key codes of the remote control. Called once per window with the key codes by name.
+// Adds to the window object what pages of a TV browser expect: the functions that create, destroy, show and hide
+// applications, and the key codes of the remote control. Called once per window object, before any script of the page,
+// with the key codes by name.
 (function (keyCodes) {
     var browser = window.telixTvBrowser;
     delete window.telixTvBrowser;

@@ -1,14 +1,14 @@
-// Tells a document that it is unloaded.
+// Dispatches the unload events of a document.
 (function () {
-    function tell(type) {
+    function dispatch(type) {
         var event = document.createEvent('Event');
         event.initEvent(type, false, false);
         window.dispatchEvent(event);
     }
 
-    // As the engine does it, only a document that is complete is told.
+    // Like the engine, only for a complete document.
     if (document.readyState === 'complete') {
-        tell('pagehide');
-        tell('unload');
+        dispatch('pagehide');
+        dispatch('unload');
     }
 })

@@ -1,15 +1,14 @@
-// What the pages for the broadcast objects share: the platform of platforms/broadcast.cpp, asked through a
+// Shared by the test pages of the broadcast object: access to the platform library of platforms/broadcast.cpp through a
 // video/broadcast object. The page has one in `tv`.
-var OCCURRENCES = { programmesChange: 1, ratingChanges: 2, ratingFails: 3, streamEventComes: 4, playStateFails: 5,
-                    channelListFails: 6, currentChannelGoes: 7 };
+var PLATFORM_EVENTS = { programmesChange: 1, ratingChange: 2, ratingError: 3, streamEvent: 4, playStateError: 5,
+                        channelListError: 6, currentChannelError: 7 };
 
-// Makes something happen at the platform.
-function provoke(object, occurrence, argument) {
-    object.setChannelByTriplet(0xFFFE, OCCURRENCES[occurrence], argument || 0);
+// Triggers an event of the platform.
+function trigger(object, event, argument) {
+    object.setChannelByTriplet(0xFFFE, PLATFORM_EVENTS[event], argument || 0);
 }
 
-// callsOf(object, NAME...): the calls of these names that the platform has got since the last question, as it wrote them
-// down. All other calls up to now are forgotten.
+// callsOf(object, NAME...): the platform calls of these names since the last callsOf(), which clears the record.
 function callsOf(object) {
     var names = Array.prototype.slice.call(arguments, 1);
     return object.createChannelObject(0, 0xFFFF, 0, 0).name.split('\n').filter(function (call) {
@@ -17,23 +16,23 @@ function callsOf(object) {
     });
 }
 
-// How often reading that property makes the plug-in ask the platform with the call of that name. The browser makes a
-// new wrapper whenever it hands out an object of the plug-in, so === does not tell which one it is; what it has read and
-// kept does. Nor does the browser ask such an object for a plain number: entries are read with item(), or by a name
-// that only begins with a digit.
-function questionsFor(object, property, call) {
+// How many platform calls of that name the plug-in makes when the property is read. The browser creates a new wrapper
+// each time it returns an object of the plug-in, so that === cannot compare them, but the values that an object has
+// cached identify it. The browser does not pass numeric names to such an object: entries are read with item(), or by a
+// name that only starts with a digit.
+function platformCallsForRead(object, property, call) {
     callsOf(tv);
     var value = object[property];
     check(value !== null && value !== undefined);
     return callsOf(tv, call).length;
 }
 
-// Whether the page reads this channel object for the first time; it counts as read then.
+// Whether the page has not read this channel object before; now it has.
 function isNewChannel(channel) {
-    return questionsFor(channel, 'onid', 'TELIX_JS_CM_GetOnid') > 0;
+    return platformCallsForRead(channel, 'onid', 'TELIX_JS_CM_GetOnid') > 0;
 }
 
-// Takes the next call of a handler property: next(arguments...) runs in a turn of its own, where checks count.
+// Sets the handler for one call: next(arguments...) runs in a later turn, because an exception in a handler is lost.
 function onceCalled(object, handler, next) {
     object[handler] = function () {
         var values = arguments;
@@ -42,19 +41,19 @@ function onceCalled(object, handler, next) {
     };
 }
 
-// Runs `action` and then `next` with the channel that the object has been tuned to.
+// Runs `action`, and `next` with the channel when the object has been tuned.
 function whenTuned(object, action, next) {
     onceCalled(object, 'onChannelChangeSucceeded', next);
     action();
 }
 
-// A further object in the page; it goes with removeChild().
+// Adds another object to the page.
 function addObject(id) {
-    var made = document.createElement('object');
-    made.type = 'video/broadcast';
+    var added = document.createElement('object');
+    added.type = 'video/broadcast';
     if (id) {
-        made.id = id;
+        added.id = id;
     }
-    document.body.appendChild(made);
-    return made;
+    document.body.appendChild(added);
+    return added;
 }

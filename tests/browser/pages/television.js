@@ -1,40 +1,40 @@
-// A page that a test drives while it runs: it fetches expressions from its server, evaluates them and sends their values
-// back. For the expressions there are a broadcast object and what it has told.
+// A page that a test drives: it fetches expressions from its server, evaluates them and sends back their values. The
+// expressions use a broadcast object, the record of its events, and the functions below.
 var tv = null;
-var events = []; // [name, argument...] of each, a channel as its name
-var objectsMade = 0;
-var isThere = false;
+var events = []; // [name, argument...] of each, with a channel's name for a channel
+var objectsCreated = 0;
+var hasPlugin = false;
 var commands = 0;
 
-function simple(value) {
+function toJson(value) {
     var isChannel = value !== null && value !== undefined && value.ccid !== undefined;
     return isChannel ? value.name : value === undefined ? null : value;
 }
 
-function keep(name) {
+function recorder(name) {
     return function () {
-        events.push([name].concat([].slice.call(arguments).map(simple)));
+        events.push([name].concat([].slice.call(arguments).map(toJson)));
     };
 }
 
-// A new object in the place of the one before it: an object keeps the lists of components that it has handed out.
-function renew() {
-    var former = tv;
-    objectsMade += 1;
+// Replaces the object by a new one, because an object caches its component lists.
+function replaceObject() {
+    var previous = tv;
+    objectsCreated += 1;
     tv = document.createElement('object');
-    tv.id = 'tv' + objectsMade;
+    tv.id = 'tv' + objectsCreated;
     tv.type = 'video/broadcast';
     document.body.appendChild(tv);
-    // The browser would make the plug-in some time later; reading a property makes it do so now.
-    isThere = tv.offsetWidth > 0 && tv.playState !== undefined;
-    if (former) {
-        document.body.removeChild(former);
+    // Forces the layout, which creates the plug-in instance.
+    hasPlugin = tv.offsetWidth > 0 && tv.playState !== undefined;
+    if (previous) {
+        document.body.removeChild(previous);
     }
     events = [];
-    tv.onChannelChangeSucceeded = keep('succeeded');
-    tv.onChannelChangeError = keep('failed');
-    tv.onProgrammesChanged = keep('programmes');
-    tv.onFullScreenChange = keep('fullScreen');
+    tv.onChannelChangeSucceeded = recorder('succeeded');
+    tv.onChannelChangeError = recorder('failed');
+    tv.onProgrammesChanged = recorder('programmes');
+    tv.onFullScreenChange = recorder('fullScreen');
 }
 
 function items(list) {
@@ -64,13 +64,13 @@ function programmes() {
     });
 }
 
-// Of a kind: 1 audio, 2 subtitles.
-function component(kind, language) {
-    return items(tv.getComponents(kind)).filter(function (each) { return each.language === language; })[0];
+// `type`: 1 audio, 2 subtitles.
+function component(type, language) {
+    return items(tv.getComponents(type)).filter(function (each) { return each.language === language; })[0];
 }
 
-function active(kind) {
-    return items(tv.getCurrentActiveComponents(kind)).map(function (each) { return each.language; });
+function active(type) {
+    return items(tv.getCurrentActiveComponents(type)).map(function (each) { return each.language; });
 }
 
 function watchStreamEvents() {
@@ -79,35 +79,35 @@ function watchStreamEvents() {
     });
 }
 
-function answer(value) {
+function sendResult(result) {
     var request = new XMLHttpRequest();
-    request.open('POST', 'answer');
-    request.onload = next;
-    request.send(JSON.stringify(value));
+    request.open('POST', 'result');
+    request.onload = runNextCommand;
+    request.send(JSON.stringify(result));
 }
 
-function next() {
+function runNextCommand() {
     var request = new XMLHttpRequest();
     commands += 1;
     request.open('GET', 'command?' + commands);
     request.onload = function () {
         if (request.status !== 200) {
-            next();
+            runNextCommand();
             return;
         }
-        var value = {};
+        var result = {};
         try {
-            value.value = (0, eval)(request.responseText);
+            result.value = (0, eval)(request.responseText);
         } catch (error) {
-            value.error = String(error);
+            result.error = String(error);
         }
-        if (value.value === undefined) {
-            value.value = null;
+        if (result.value === undefined) {
+            result.value = null;
         }
-        answer(value);
+        sendResult(result);
     };
     request.send();
 }
 
-renew();
-window.addEventListener('load', next, false);
+replaceObject();
+window.addEventListener('load', runNextCommand, false);

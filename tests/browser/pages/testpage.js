@@ -1,25 +1,25 @@
-// Tests in a page. The page calls testPage() once with its tests by sentence; each is a function that passes when it
-// makes at least one check and none fails:
+// Tests in a page. The page calls testPage() once with its tests by name. A test is a function; it passes if it makes at
+// least one check and none fails:
 //
 //     testPage({
 //         'a call gives an object': function () { same(typeof manager.call(), 'object'); },
 //         'an event comes': function (done) { element.addEventListener('x', function () { check(true); done(); }); }
 //     });
 //
-// A test that takes `done` goes on until it calls it, at most `testLimit` milliseconds. They run one after the other
-// when the page is loaded. The outcome is then in window.testResult: {passed: number, failed: [text, ...]}.
-var testLimit = 10000;
+// An asynchronous test takes `done` and calls it within `testTimeout` milliseconds, which only bounds a hang. Tests run
+// one after the other when the page is loaded. Then window.testResult is {passed: number, failed: [message, ...]}.
+var testTimeout = 60000;
 var checksMade = 0;
 
 // Fails the test unless `condition` is true.
-function check(condition, text) {
+function check(condition, message) {
     checksMade++;
     if (condition !== true) {
-        throw new Error(text || 'a condition is ' + condition);
+        throw new Error(message || 'a condition is ' + condition);
     }
 }
 
-// Fails the test unless both values are the same, arrays element by element.
+// Fails the test unless both values are strictly equal; arrays are compared by element.
 function same(actual, expected) {
     var bothArrays = Array.isArray(actual) && Array.isArray(expected);
     check(bothArrays ? JSON.stringify(actual) === JSON.stringify(expected) : actual === expected,
@@ -37,7 +37,7 @@ function throws(action) {
     check(thrown, 'nothing is thrown');
 }
 
-// Calls `next` as soon as condition() is true; never calls it otherwise.
+// Polls until condition() is true, then calls `next`.
 function whenTrue(condition, next) {
     if (condition()) {
         next();
@@ -47,17 +47,17 @@ function whenTrue(condition, next) {
 }
 
 function testPage(tests) {
-    var sentences = Object.keys(tests);
+    var names = Object.keys(tests);
     var passed = 0;
     var failed = [];
 
     function runFrom(index) {
-        if (index === sentences.length) {
+        if (index === names.length) {
             window.testResult = { passed: passed, failed: failed };
             return;
         }
-        var sentence = sentences[index];
-        var test = tests[sentence];
+        var name = names[index];
+        var test = tests[name];
         var ended = false;
         var timer = 0;
 
@@ -72,7 +72,7 @@ function testPage(tests) {
                 failure = 'nothing was checked';
             }
             if (failure) {
-                failed.push(sentence + ': ' + failure);
+                failed.push(name + ': ' + failure);
             } else {
                 passed++;
             }
@@ -80,9 +80,9 @@ function testPage(tests) {
         }
 
         checksMade = 0;
-        // Checks of a later turn throw into nowhere else.
+        // Catches exceptions of checks that run in callbacks.
         window.onerror = function (message) { end(String(message)); };
-        timer = setTimeout(function () { end('not done within ' + testLimit + ' ms'); }, testLimit);
+        timer = setTimeout(function () { end('not done within ' + testTimeout + ' ms'); }, testTimeout);
         try {
             test(function () { end(); });
         } catch (error) {

@@ -1,10 +1,10 @@
-// A television with three channels, two programmes, components and schemes of ratings. It answers every
-// request later, from a thread of its own, and hands a page its own record of the calls that it got.
+// A platform with three channels, two programmes, components and parental rating schemes. It completes every
+// request later, on a thread of its own, and makes the record of its calls available to the page.
 //
-// Two original networks are not real ones. A channel made from a triplet of `recordNetwork` has the calls
-// since the last such channel for a name, one a line. Tuning to a triplet of `occurrenceNetwork` tunes to
-// nothing: it makes happen what the transport stream id names (see Occurrence), with the service id for an
-// argument.
+// Two original network ids have a special meaning. The name of a channel created from a triplet of
+// kRecordNetwork is the list of calls since the previous such channel, one per line. Tuning to a triplet of
+// kEventNetwork triggers the event that the transport stream id stands for (see Event), with the service id
+// as its argument.
 #include "tests/support/RecordingPlatform.h"
 
 #include <algorithm>
@@ -22,20 +22,21 @@
 
 namespace {
 
-constexpr TELIX_RETCODE_ENUM_T refused = 1;
-constexpr uint32_t recordNetwork = 0xFFFF;
-constexpr int32_t occurrenceNetwork = 0xFFFE;
-constexpr TELIX_ERR_STATE_ENUM_T unknownChannel = 5;
-constexpr TELIX_JS_SI_HANDLE guardedProgramme = 202; // refuses what pages write
+constexpr TELIX_RETCODE_ENUM_T kError = 1;
+constexpr uint32_t kRecordNetwork = 0xFFFF;
+constexpr int32_t kEventNetwork = 0xFFFE;
+constexpr uint32_t kAnyTransportStream = 8191;
+constexpr TELIX_ERR_STATE_ENUM_T kUnknownChannel = 5;
+constexpr TELIX_JS_SI_HANDLE kReadOnlyProgramme = 202; // rejects what pages write
 
-enum Occurrence {
-    programmesChange = 1,
-    ratingChanges = 2,     // the argument is the handle of the rating
-    ratingFails = 3,       // likewise
-    streamEventComes = 4,  // of the stream event that was registered last
-    playStateFails = 5,    // the argument is the new play state
-    channelListFails = 6,  // from now on for one request
-    currentChannelGoes = 7 // for one request
+enum class Event {
+    ProgrammesChange = 1,
+    RatingChange = 2,       // the argument is the handle of the rating
+    RatingError = 3,        // likewise
+    StreamEvent = 4,        // the one that was registered last
+    PlayStateError = 5,     // the argument is the new play state
+    ChannelListError = 6,   // of the next request
+    CurrentChannelError = 7 // of the next request
 };
 
 struct Channel {
@@ -66,20 +67,20 @@ struct Rating {
     int32_t value, labels;
 };
 
-const std::map<TELIX_JS_AVCOMPHANDLE, Component> components{
+const std::map<TELIX_JS_AVCOMPHANDLE, Component> kComponents{
     {501, {0, "video/mpeg", "", 1.7777778F, 0, 1, 0, 0}},
     {511, {1, "audio/mpeg", "eng", 0, 2, 0, 0, 0}},
     {512, {1, "audio/mp4", "deu", 0, 6, 0, 1, 0}},
     {521, {2, "", "fra", 0, 0, 0, 0, 1}},
 };
 
-const std::map<TELIX_JS_SI_PARENTALRATING_HANDLE, Rating> ratings{
+const std::map<TELIX_JS_SI_PARENTALRATING_HANDLE, Rating> kRatings{
     {301, {"12", "dvb-si", "", 9, 1}},
     {302, {"FSK 16", "fsk", "de", 3, 0}},
 };
 
-// What the browser's thread and those of the answers share.
-std::mutex guard;
+// Shared by the browser thread and the threads that complete requests.
+std::mutex mutex;
 std::map<TELIX_JS_CM_HANDLE, Channel> channels{
     {11, {0, 1, 10, 101, "One", "dsd one"}},
     {12, {1, 1, 10, 102, "Two", ""}},
@@ -87,14 +88,14 @@ std::map<TELIX_JS_CM_HANDLE, Channel> channels{
 };
 TELIX_JS_CM_HANDLE channelList[]{11, 12, 13};
 TELIX_JS_CM_HANDLE currentChannel = 11;
-std::string callsSinceTheLastRecord;
+std::string recordedCalls;
 
-// What the browser's thread alone touches. The library keeps what it gives out.
+// Accessed by the browser thread only. The library owns the lists that it returns.
 std::map<TELIX_JS_SI_HANDLE, Programme> programmes{
     {201, {"News", "What has happened", "11", 1700000000, 1800, {301}}},
-    {guardedProgramme, {"Film", "", "12", 1700001800, 5400, {302}}},
+    {kReadOnlyProgramme, {"Film", "", "12", 1700001800, 5400, {302}}},
 };
-TELIX_JS_SI_HANDLE programmeList[]{201, guardedProgramme};
+TELIX_JS_SI_HANDLE programmeList[]{201, kReadOnlyProgramme};
 std::map<TELIX_JS_AVCOMPTYPE, std::vector<TELIX_JS_AVCOMPHANDLE>> componentLists{
     {0, {501}}, {1, {511, 512}}, {2, {521}}};
 std::map<TELIX_JS_AVCOMPTYPE, std::vector<TELIX_JS_AVCOMPHANDLE>> activeComponents{
@@ -102,8 +103,8 @@ std::map<TELIX_JS_AVCOMPTYPE, std::vector<TELIX_JS_AVCOMPHANDLE>> activeComponen
 TELIX_JS_VB_HANDLE lastObject = 0;
 TELIX_JS_CM_HANDLE lastMadeChannel = 1000;
 TELIX_PLAYSTATE_ENUM_T playState = TELIX_PLAYSTATE_UNREALIZED;
-bool channelListRefused = false;
-bool currentChannelRefused = false;
+bool channelListFails = false;
+bool currentChannelFails = false;
 std::string streamEventId, streamEventTag, streamEventName;
 
 std::atomic<___UINT8> fullScreen{0};
@@ -116,7 +117,7 @@ std::atomic<TELIX_JS_VB_PARENTAL_RATING_CB> onRatingChange{nullptr};
 std::atomic<TELIX_JS_VB_PARENTAL_RATING_CB> onRatingError{nullptr};
 std::atomic<TELIX_JS_VB_STREAM_EVENT_CB> onStreamEvent{nullptr};
 
-// Calls back from another thread, unless the registration has been given up by then.
+// Runs the callback on another thread, unless it has been unregistered by then.
 template <class Callback, class... Arguments>
 void report(const std::atomic<Callback>& registered, Arguments... arguments) {
     std::thread([&registered, arguments...] {
@@ -127,32 +128,33 @@ void report(const std::atomic<Callback>& registered, Arguments... arguments) {
 }
 
 ___UINT8* bytes(const char* text) {
-    // The callbacks only read it.
+    // The callbacks do not write to it.
     return reinterpret_cast<___UINT8*>(const_cast<char*>(text));
 }
 
-TELIX_RETCODE_ENUM_T give(char** out, const std::string& text) {
+TELIX_RETCODE_ENUM_T returnString(char** out, const std::string& text) {
     *out = strdup(text.c_str());
     return TELIX_RETCODE_SUCCESS;
 }
 
-// As stream events carry their payload.
+// The form in which stream events carry their payload.
 std::string hexadecimal(const std::string& text) {
-    static const char digits[] = "0123456789abcdef";
+    static const char kDigits[] = "0123456789abcdef";
     std::string result;
     for (const char c : text) {
-        result += digits[static_cast<unsigned char>(c) >> 4];
-        result += digits[static_cast<unsigned char>(c) & 0xF];
+        result += kDigits[static_cast<unsigned char>(c) >> 4];
+        result += kDigits[static_cast<unsigned char>(c) & 0xF];
     }
     return result;
 }
 
-// 0 if there is none.
+// The handle of the channel; 0 if there is none.
 TELIX_JS_CM_HANDLE listedChannel(uint32_t onid, uint32_t tsid, uint32_t sid) {
-    std::lock_guard<std::mutex> lock(guard);
+    std::lock_guard<std::mutex> lock(mutex);
     for (TELIX_JS_CM_HANDLE handle : channelList) {
         const Channel& channel = channels.at(handle);
-        if (channel.onid == onid && (channel.tsid == tsid || tsid == 8191) && channel.sid == sid) {
+        if (channel.onid == onid && (channel.tsid == tsid || tsid == kAnyTransportStream) &&
+            channel.sid == sid) {
             return handle;
         }
     }
@@ -164,7 +166,7 @@ bool isListed(TELIX_JS_CM_HANDLE channel) {
 }
 
 TELIX_JS_CM_HANDLE makeChannel(Channel channel) {
-    std::lock_guard<std::mutex> lock(guard);
+    std::lock_guard<std::mutex> lock(mutex);
     channels.emplace(++lastMadeChannel, std::move(channel));
     return lastMadeChannel;
 }
@@ -173,12 +175,12 @@ TELIX_RETCODE_ENUM_T tune(TELIX_JS_VB_HANDLE object, TELIX_JS_CM_HANDLE channel)
     std::thread([object, channel] {
         if (!isListed(channel)) {
             if (auto callback = onChannelError.load()) {
-                callback(object, channel, unknownChannel);
+                callback(object, channel, kUnknownChannel);
             }
             return;
         }
         {
-            std::lock_guard<std::mutex> lock(guard);
+            std::lock_guard<std::mutex> lock(mutex);
             currentChannel = channel;
         }
         if (auto callback = onChannelChange.load()) {
@@ -188,33 +190,33 @@ TELIX_RETCODE_ENUM_T tune(TELIX_JS_VB_HANDLE object, TELIX_JS_CM_HANDLE channel)
     return TELIX_RETCODE_SUCCESS;
 }
 
-// Selects a neighbour in the list at once, as both calls promise; the tuning itself follows.
-TELIX_RETCODE_ENUM_T step(TELIX_JS_VB_HANDLE object, std::size_t distance, TELIX_JS_CM_HANDLE* channel) {
+// Selects another channel of the list synchronously, as both calls require, and tunes to it later.
+TELIX_RETCODE_ENUM_T step(TELIX_JS_VB_HANDLE object, std::size_t offset, TELIX_JS_CM_HANDLE* channel) {
     {
-        std::lock_guard<std::mutex> lock(guard);
+        std::lock_guard<std::mutex> lock(mutex);
         const std::size_t count = std::size(channelList);
-        const auto here = static_cast<std::size_t>(
+        const auto index = static_cast<std::size_t>(
             std::find(std::begin(channelList), std::end(channelList), currentChannel) - channelList);
-        currentChannel = channelList[(here + distance) % count];
+        currentChannel = channelList[(index + offset) % count];
         *channel = currentChannel;
     }
     return tune(object, *channel);
 }
 
-void happen(TELIX_JS_VB_HANDLE object, int32_t occurrence, int32_t argument) {
+void trigger(TELIX_JS_VB_HANDLE object, Event event, int32_t argument) {
     const auto rating = static_cast<TELIX_JS_SI_PARENTALRATING_HANDLE>(argument);
-    switch (occurrence) {
-    case programmesChange:
+    switch (event) {
+    case Event::ProgrammesChange:
         report(onProgrammes, object);
         break;
-    case ratingChanges:
+    case Event::RatingChange:
         report(onRatingChange, object, bytes("content-7"), rating, static_cast<___UINT8*>(nullptr));
         break;
-    case ratingFails:
+    case Event::RatingError:
         report(onRatingError, object, static_cast<___UINT8*>(nullptr), rating,
                bytes("urn:dvb:casystemid:4096"));
         break;
-    case streamEventComes:
+    case Event::StreamEvent:
         std::thread([object, name = streamEventName,
                      data = hexadecimal("id " + streamEventId + " tag " + streamEventTag)] {
             if (auto callback = onStreamEvent.load()) {
@@ -223,24 +225,24 @@ void happen(TELIX_JS_VB_HANDLE object, int32_t occurrence, int32_t argument) {
             }
         }).detach();
         break;
-    case playStateFails:
-        report(onPlayState, object, 0U, argument, unknownChannel);
+    case Event::PlayStateError:
+        report(onPlayState, object, 0U, argument, kUnknownChannel);
         break;
-    case channelListFails:
-        channelListRefused = true;
+    case Event::ChannelListError:
+        channelListFails = true;
         break;
-    case currentChannelGoes:
-        currentChannelRefused = true;
+    case Event::CurrentChannelError:
+        currentChannelFails = true;
         break;
     default:
-        std::fprintf(stderr, "occurrence %d does not exist\n", occurrence);
+        std::fprintf(stderr, "event %d does not exist\n", static_cast<int>(event));
     }
 }
 
 void scriptChannels(RecordingPlatform& platform) {
     platform.TELIX_JS_CM_GetChannelList = [](uint32_t* count, TELIX_JS_CM_HANDLE** list) {
-        if (std::exchange(channelListRefused, false)) {
-            return refused;
+        if (std::exchange(channelListFails, false)) {
+            return kError;
         }
         *count = std::size(channelList);
         *list = channelList;
@@ -249,14 +251,14 @@ void scriptChannels(RecordingPlatform& platform) {
     platform.TELIX_JS_CM_GetChannelByTriplet = [](uint32_t onid, uint32_t tsid, uint32_t sid,
                                                   TELIX_JS_CM_HANDLE* channel) {
         *channel = listedChannel(onid, tsid, sid);
-        return *channel == 0 ? refused : TELIX_RETCODE_SUCCESS;
+        return *channel == 0 ? kError : TELIX_RETCODE_SUCCESS;
     };
     const auto read = [](auto& call, auto deliver) {
         call = [deliver](TELIX_JS_CM_HANDLE handle, auto* out) {
-            std::lock_guard<std::mutex> lock(guard);
+            std::lock_guard<std::mutex> lock(mutex);
             const auto found = channels.find(handle);
             if (found == channels.end()) {
-                return refused;
+                return kError;
             }
             deliver(found->second, out);
             return TELIX_RETCODE_ENUM_T{TELIX_RETCODE_SUCCESS};
@@ -267,9 +269,10 @@ void scriptChannels(RecordingPlatform& platform) {
     read(platform.TELIX_JS_CM_GetOnid, [](const Channel& channel, uint32_t* out) { *out = channel.onid; });
     read(platform.TELIX_JS_CM_GetTsid, [](const Channel& channel, uint32_t* out) { *out = channel.tsid; });
     read(platform.TELIX_JS_CM_GetSid, [](const Channel& channel, uint32_t* out) { *out = channel.sid; });
-    read(platform.TELIX_JS_CM_GetName, [](const Channel& channel, char** out) { give(out, channel.name); });
+    read(platform.TELIX_JS_CM_GetName,
+         [](const Channel& channel, char** out) { returnString(out, channel.name); });
     read(platform.TELIX_JS_CM_GetDsd,
-         [](const Channel& channel, char** out) { give(out, channel.descriptor); });
+         [](const Channel& channel, char** out) { returnString(out, channel.descriptor); });
 }
 
 void scriptTuning(RecordingPlatform& platform) {
@@ -278,17 +281,17 @@ void scriptTuning(RecordingPlatform& platform) {
         return TELIX_RETCODE_SUCCESS;
     };
     platform.TELIX_JS_VB_GetCurrentChannel = [](TELIX_JS_VB_HANDLE, TELIX_JS_CM_HANDLE* channel) {
-        std::lock_guard<std::mutex> lock(guard);
+        std::lock_guard<std::mutex> lock(mutex);
         *channel = currentChannel;
-        return std::exchange(currentChannelRefused, false) ? refused : TELIX_RETCODE_SUCCESS;
+        return std::exchange(currentChannelFails, false) ? kError : TELIX_RETCODE_SUCCESS;
     };
     platform.TELIX_JS_VB_SetChannel = [](TELIX_JS_VB_HANDLE object, TELIX_JS_CM_HANDLE channel, ___UINT8) {
         return tune(object, channel);
     };
     platform.TELIX_JS_VB_SetChannelByTriplet = [](TELIX_JS_VB_HANDLE object, int32_t onid, int32_t tsid,
                                                   int32_t sid) {
-        if (onid == occurrenceNetwork) {
-            happen(object, tsid, sid);
+        if (onid == kEventNetwork) {
+            trigger(object, static_cast<Event>(tsid), sid);
             return TELIX_RETCODE_ENUM_T{TELIX_RETCODE_SUCCESS};
         }
         return tune(object, listedChannel(static_cast<uint32_t>(onid), static_cast<uint32_t>(tsid),
@@ -301,29 +304,35 @@ void scriptTuning(RecordingPlatform& platform) {
         return step(object, std::size(channelList) - 1, channel);
     };
     platform.TELIX_JS_VB_BindToCurrChannel = [](TELIX_JS_VB_HANDLE object) {
-        std::unique_lock<std::mutex> lock(guard);
+        std::unique_lock<std::mutex> lock(mutex);
         const TELIX_JS_CM_HANDLE channel = currentChannel;
         lock.unlock();
         return tune(object, channel);
     };
+}
+
+void scriptChannelObjects(RecordingPlatform& platform) {
     platform.TELIX_JS_VB_CreateChannelObjectByTriplet = [](TELIX_JS_VB_HANDLE, ___UINT8, uint32_t onid,
                                                            uint32_t tsid, uint32_t sid,
                                                            TELIX_JS_CM_HANDLE* channel) {
-        if (onid == recordNetwork) {
-            std::unique_lock<std::mutex> lock(guard);
-            std::string calls = std::exchange(callsSinceTheLastRecord, "");
+        if (onid == kRecordNetwork) {
+            std::unique_lock<std::mutex> lock(mutex);
+            std::string calls = std::exchange(recordedCalls, "");
             lock.unlock();
             *channel = makeChannel({0, onid, tsid, sid, std::move(calls), ""});
         } else {
             *channel = listedChannel(onid, tsid, sid);
         }
-        return *channel == 0 ? refused : TELIX_RETCODE_SUCCESS;
+        return *channel == 0 ? kError : TELIX_RETCODE_SUCCESS;
     };
     platform.TELIX_JS_VB_CreateChannelObjectByDsd = [](TELIX_JS_VB_HANDLE, ___UINT8, const ___UINT8*,
                                                        uint32_t, uint32_t sid, TELIX_JS_CM_HANDLE* channel) {
         *channel = makeChannel({0, 0, 0, sid, "Made by descriptor", "dsd"});
         return TELIX_RETCODE_SUCCESS;
     };
+}
+
+void scriptPresentation(RecordingPlatform& platform) {
     platform.TELIX_JS_VB_SetFullScreen = [](TELIX_JS_VB_HANDLE object, ___UINT8 wanted) {
         fullScreen = wanted;
         report(onFullScreen, object);
@@ -397,8 +406,8 @@ void scriptProgrammes(RecordingPlatform& platform) {
     };
     const auto write = [](auto& call, auto member) {
         call = [member](TELIX_JS_SI_HANDLE programme, auto value) {
-            if (programme == guardedProgramme) {
-                return refused;
+            if (programme == kReadOnlyProgramme) {
+                return kError;
             }
             programmes.at(programme).*member = value;
             return TELIX_RETCODE_ENUM_T{TELIX_RETCODE_SUCCESS};
@@ -413,13 +422,13 @@ void scriptProgrammes(RecordingPlatform& platform) {
         call = [member](TELIX_JS_SI_HANDLE programme, char** out, ___UINT8* length) {
             const std::string& text = programmes.at(programme).*member;
             *length = static_cast<___UINT8>(text.size());
-            return text.empty() ? TELIX_RETCODE_SUCCESS : give(out, text);
+            return text.empty() ? TELIX_RETCODE_SUCCESS : returnString(out, text);
         };
     };
     readText(platform.TELIX_JS_SI_GetName, &Programme::name);
     readText(platform.TELIX_JS_SI_GetDescription, &Programme::description);
     platform.TELIX_JS_SI_GetChannelID = [](TELIX_JS_SI_HANDLE programme, char** out) {
-        return give(out, programmes.at(programme).channelId);
+        return returnString(out, programmes.at(programme).channelId);
     };
     platform.TELIX_JS_SI_GetStartTime = [](TELIX_JS_SI_HANDLE programme, uint32_t* out) {
         *out = programmes.at(programme).startTime;
@@ -441,20 +450,20 @@ void scriptRatings(RecordingPlatform& platform) {
     };
     const auto read = [](auto& call, auto deliver) {
         call = [deliver](TELIX_JS_SI_PARENTALRATING_HANDLE handle, auto* out) {
-            const auto found = ratings.find(handle);
-            if (found == ratings.end()) {
-                return refused;
+            const auto found = kRatings.find(handle);
+            if (found == kRatings.end()) {
+                return kError;
             }
             deliver(found->second, out);
             return TELIX_RETCODE_ENUM_T{TELIX_RETCODE_SUCCESS};
         };
     };
     read(platform.TELIX_JS_SI_PARENTALRATING_GetName,
-         [](const Rating& rating, char** out) { give(out, rating.name); });
+         [](const Rating& rating, char** out) { returnString(out, rating.name); });
     read(platform.TELIX_JS_SI_PARENTALRATING_GetScheme,
-         [](const Rating& rating, char** out) { give(out, rating.scheme); });
+         [](const Rating& rating, char** out) { returnString(out, rating.scheme); });
     read(platform.TELIX_JS_SI_PARENTALRATING_GetRegion,
-         [](const Rating& rating, char** out) { give(out, rating.region); });
+         [](const Rating& rating, char** out) { returnString(out, rating.region); });
     read(platform.TELIX_JS_SI_PARENTALRATING_GetValue,
          [](const Rating& rating, int32_t* out) { *out = rating.value; });
     read(platform.TELIX_JS_SI_PARENTALRATING_GetLabels,
@@ -483,7 +492,7 @@ void scriptRatings(RecordingPlatform& platform) {
     platform.TELIX_JS_SI_PARENTALRATINGSCHEME_GetThreshold =
         [](TELIX_JS_SI_PARENTALRATINGSCHEME_HANDLE scheme, int32_t* threshold) {
             *threshold = 12;
-            return scheme == 401 ? TELIX_RETCODE_SUCCESS : refused;
+            return scheme == 401 ? TELIX_RETCODE_SUCCESS : kError;
         };
 }
 
@@ -512,14 +521,14 @@ void scriptComponents(RecordingPlatform& platform) {
     };
     const auto text = [](auto& call, const char* Component::*member) {
         call = [member](TELIX_JS_AVCOMPHANDLE handle, TELIX_JS_AVCOMPTYPE, char** out) {
-            return give(out, components.at(handle).*member);
+            return returnString(out, kComponents.at(handle).*member);
         };
     };
     text(platform.TELIX_JS_VB_AVComponent_GetEncoding, &Component::encoding);
     text(platform.TELIX_JS_VB_AVComponent_GetLanguage, &Component::language);
     const auto number = [](auto& call, auto member) {
         call = [member](TELIX_JS_AVCOMPHANDLE handle, TELIX_JS_AVCOMPTYPE, auto* out) {
-            *out = components.at(handle).*member;
+            *out = kComponents.at(handle).*member;
             return TELIX_RETCODE_SUCCESS;
         };
     };
@@ -533,11 +542,13 @@ void scriptComponents(RecordingPlatform& platform) {
 const bool scenario = [] {
     RecordingPlatform& platform = *telix_recording_platform();
     platform.onCall = [](const std::string& call) {
-        std::lock_guard<std::mutex> lock(guard);
-        callsSinceTheLastRecord += call + "\n";
+        std::lock_guard<std::mutex> lock(mutex);
+        recordedCalls += call + "\n";
     };
     scriptChannels(platform);
     scriptTuning(platform);
+    scriptChannelObjects(platform);
+    scriptPresentation(platform);
     scriptEvents(platform);
     scriptProgrammes(platform);
     scriptRatings(platform);

@@ -1,5 +1,5 @@
-// A platform with a device: settings, a key mask, capabilities, and a DRM system that answers each message
-// from a thread of its own with the message turned round.
+// A platform with settings, a key mask, capabilities, and a DRM system that responds to each message with the
+// reversed message, on a thread of its own.
 #include "tests/support/RecordingPlatform.h"
 
 #include <algorithm>
@@ -22,15 +22,15 @@ std::atomic<uint32_t> keyMask{0x1F};
 std::atomic<int> messages{0};
 std::atomic<TELIX_JS_DRM_MESSAGE_RESULT_CB> drmCallback{nullptr};
 
-TELIX_RETCODE_ENUM_T give(char** text, const std::string& value) {
+TELIX_RETCODE_ENUM_T returnString(char** text, const std::string& value) {
     *text = strdup(value.c_str());
     return TELIX_RETCODE_SUCCESS;
 }
 
-void answer(const std::string& id, std::string message) {
+void reportResult(const std::string& id, std::string message) {
     std::reverse(message.begin(), message.end());
     if (TELIX_JS_DRM_MESSAGE_RESULT_CB callback = drmCallback) {
-        // The plug-in copies both texts during the call.
+        // The plug-in copies both strings during the call.
         auto* idText = reinterpret_cast<___UINT8*>(const_cast<char*>(id.c_str()));
         auto* resultText = reinterpret_cast<___UINT8*>(const_cast<char*>(message.c_str()));
         callback(idText, resultText, 0);
@@ -39,9 +39,13 @@ void answer(const std::string& id, std::string message) {
 
 const bool scenario = [] {
     RecordingPlatform& platform = *telix_recording_platform();
-    platform.TELIX_JS_APP_Config_GetPreferredAudioLanguage = [](char** text) { return give(text, "deu"); };
-    platform.TELIX_JS_APP_Config_GetPreferredSubtitleLanguage = [](char** text) { return give(text, "eng"); };
-    platform.TELIX_JS_APP_Config_GetCountryId = [](char** text) { return give(text, "DEU"); };
+    platform.TELIX_JS_APP_Config_GetPreferredAudioLanguage = [](char** text) {
+        return returnString(text, "deu");
+    };
+    platform.TELIX_JS_APP_Config_GetPreferredSubtitleLanguage = [](char** text) {
+        return returnString(text, "eng");
+    };
+    platform.TELIX_JS_APP_Config_GetCountryId = [](char** text) { return returnString(text, "DEU"); };
     platform.TELIX_JS_APP_GetFreeMem = [](uint32_t* amount) {
         *amount = 123456;
         return TELIX_RETCODE_SUCCESS;
@@ -50,7 +54,7 @@ const bool scenario = [] {
         *mask = keyMask;
         return TELIX_RETCODE_SUCCESS;
     };
-    // The set has no alphanumeric keys to give.
+    // The remote control has no alphanumeric keys.
     platform.TELIX_JS_APP_SetKeySetValue = [](uint32_t mask, uint32_t* granted) {
         keyMask = mask & 0x1FF;
         *granted = keyMask;
@@ -61,9 +65,9 @@ const bool scenario = [] {
         return TELIX_RETCODE_SUCCESS;
     };
     platform.TELIX_JS_CM_GetName = [](TELIX_JS_CM_HANDLE channel, char** name) {
-        return give(name, "Channel " + std::to_string(channel));
+        return returnString(name, "Channel " + std::to_string(channel));
     };
-    platform.TELIX_JS_CAP_GetXmlCapabilities = [](char** xml) { return give(xml, kCapabilities); };
+    platform.TELIX_JS_CAP_GetXmlCapabilities = [](char** xml) { return returnString(xml, kCapabilities); };
     platform.TELIX_JS_CAP_HasCapability = [](const char* profile, ___UINT8* supported) {
         *supported = std::strcmp(profile, "OITF_HD_UIPROF") == 0;
         return TELIX_RETCODE_SUCCESS;
@@ -80,14 +84,14 @@ const bool scenario = [] {
         drmCallback = callback;
         return TELIX_RETCODE_SUCCESS;
     };
-    // A message "refuse" is refused.
+    // The message "refuse" returns an error.
     platform.TELIX_JS_DRM_SendDRMMessage = [](const char*, const char* message, const char*, char** id) {
         if (std::strcmp(message, "refuse") == 0) {
             return TELIX_RETCODE_NOT_AVAILABLE;
         }
         const std::string number = "message " + std::to_string(++messages);
-        std::thread(answer, number, std::string(message)).detach();
-        return static_cast<decltype(TELIX_RETCODE_NOT_AVAILABLE)>(give(id, number));
+        std::thread(reportResult, number, std::string(message)).detach();
+        return static_cast<decltype(TELIX_RETCODE_NOT_AVAILABLE)>(returnString(id, number));
     };
     return true;
 }();

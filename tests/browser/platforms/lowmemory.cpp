@@ -1,5 +1,5 @@
-// A platform that is short of memory as soon as somebody wants to know. It tells from a thread of its own,
-// and says on standard error which calls it got and when the browser thread has dealt with the notice.
+// A platform that reports low memory as soon as a callback is registered, on its own thread. It logs to
+// standard error which calls it gets, and when the browser thread has handled the callback.
 #include "tests/support/RecordingPlatform.h"
 
 #include <cstdio>
@@ -9,15 +9,15 @@
 
 namespace {
 
-gboolean sayThatTheNoticeIsThrough(gpointer) {
-    std::fputs("notice dealt with\n", stderr);
+gboolean logHandled(gpointer) {
+    std::fputs("callback handled\n", stderr);
     return G_SOURCE_REMOVE;
 }
 
 void notify(TELIX_JS_APP_LOW_MEMORY_CB callback) {
     callback();
-    // Behind whatever the callback has queued.
-    g_idle_add(sayThatTheNoticeIsThrough, nullptr);
+    // Runs after the idle source that the callback has added.
+    g_idle_add(logHandled, nullptr);
 }
 
 const bool scenario = [] {

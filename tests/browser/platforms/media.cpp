@@ -1,9 +1,9 @@
-// A platform with one media pipeline that runs by itself: media connects, plays along with the clock, and
-// ends. It reports from a thread of its own and says on standard error which calls it got.
+// A platform with one simulated media pipeline: media connects, plays and ends. It sends its messages on a
+// thread of its own and logs to standard error which calls it gets.
 //
-// The address says how media behaves: "length=NUMBER" in it is its length in milliseconds, a minute
-// otherwise, and "absent" makes it unavailable. Up to the first change of the volume there is no report on
-// what is buffered; from then on the volume is the amount, in seconds.
+// The URL controls the media: "length=NUMBER" is its duration in milliseconds (default 60000), "absent" makes
+// it unavailable. The volume controls the buffer level: it is not reported until the first change of the
+// volume, and is then the volume in seconds.
 #include "tests/support/RecordingPlatform.h"
 
 #include <algorithm>
@@ -21,12 +21,12 @@ constexpr int kTicksToConnect = 5;
 constexpr double kMinute = 60000;
 constexpr uint32_t kNoBufferReport = 0xFFFFFFFF;
 
-enum class Stage { IDLE, CONNECTING, PLAYING, PAUSED, ENDED };
+enum class Stage { Idle, Connecting, Playing, Paused, Ended };
 
 struct Pipeline {
     std::mutex mutex; // guards everything here
-    Stage stage = Stage::IDLE;
-    Stage stageBeforePause = Stage::IDLE;
+    Stage stage = Stage::Idle;
+    Stage stageBeforePause = Stage::Idle;
     TELIX_JS_AV_HANDLE player = 0;
     bool available = true;
     int ticks = 0;
@@ -38,7 +38,7 @@ struct Pipeline {
     std::map<TELIX_JS_AV_HANDLE, TELIX_JS_AV_PLAY_INFO> records; // by player
 };
 
-// Never taken down: the pipeline's thread runs as long as the process.
+// Never destroyed, because the thread of the pipeline runs until the process exits.
 Pipeline& pipeline = *new Pipeline;
 
 double lengthOf(const std::string& url) {
@@ -54,13 +54,13 @@ void report(TELIX_AV_CB_MSG message) {
 
 void tick() {
     const std::lock_guard<std::mutex> lock(pipeline.mutex);
-    if (pipeline.stage == Stage::CONNECTING && ++pipeline.ticks == kTicksToConnect) {
-        pipeline.stage = pipeline.available ? Stage::PLAYING : Stage::IDLE;
+    if (pipeline.stage == Stage::Connecting && ++pipeline.ticks == kTicksToConnect) {
+        pipeline.stage = pipeline.available ? Stage::Playing : Stage::Idle;
         report(pipeline.available ? TELIX_AV_CB_MSG_PLAYSTART : TELIX_AV_CB_MSG_ERR_NOT_FOUND);
-    } else if (pipeline.stage == Stage::PLAYING) {
+    } else if (pipeline.stage == Stage::Playing) {
         pipeline.position = std::max(0.0, pipeline.position + kTickMilliseconds * pipeline.speed);
         if (pipeline.position >= pipeline.length) {
-            pipeline.stage = Stage::ENDED;
+            pipeline.stage = Stage::Ended;
             report(TELIX_AV_CB_MSG_PLAYEND);
         }
     }
@@ -76,10 +76,10 @@ void run() {
 TELIX_RETCODE_ENUM_T play(TELIX_JS_AV_HANDLE player, const char* url, uint32_t, int32_t, int32_t, int32_t,
                           uint32_t, uint16_t) {
     const std::lock_guard<std::mutex> lock(pipeline.mutex);
-    if (pipeline.stage != Stage::IDLE) {
-        pipeline.position = 0; // a seek of what has been stopped is for what plays now
+    if (pipeline.stage != Stage::Idle) {
+        pipeline.position = 0; // only a seek in a stopped pipeline applies to what is played next
     }
-    pipeline.stage = Stage::CONNECTING;
+    pipeline.stage = Stage::Connecting;
     pipeline.player = player;
     pipeline.available = std::string(url).find("absent") == std::string::npos;
     pipeline.ticks = 0;
@@ -89,23 +89,23 @@ TELIX_RETCODE_ENUM_T play(TELIX_JS_AV_HANDLE player, const char* url, uint32_t, 
 
 TELIX_RETCODE_ENUM_T stop(TELIX_JS_AV_HANDLE) {
     const std::lock_guard<std::mutex> lock(pipeline.mutex);
-    pipeline.stage = Stage::IDLE;
+    pipeline.stage = Stage::Idle;
     pipeline.position = 0;
     return TELIX_RETCODE_SUCCESS;
 }
 
 TELIX_RETCODE_ENUM_T pause(TELIX_JS_AV_HANDLE) {
     const std::lock_guard<std::mutex> lock(pipeline.mutex);
-    if (pipeline.stage != Stage::PAUSED) {
+    if (pipeline.stage != Stage::Paused) {
         pipeline.stageBeforePause = pipeline.stage;
-        pipeline.stage = Stage::PAUSED;
+        pipeline.stage = Stage::Paused;
     }
     return TELIX_RETCODE_SUCCESS;
 }
 
 TELIX_RETCODE_ENUM_T resume(TELIX_JS_AV_HANDLE) {
     const std::lock_guard<std::mutex> lock(pipeline.mutex);
-    if (pipeline.stage == Stage::PAUSED) {
+    if (pipeline.stage == Stage::Paused) {
         pipeline.stage = pipeline.stageBeforePause;
     }
     return TELIX_RETCODE_SUCCESS;
@@ -132,7 +132,7 @@ TELIX_RETCODE_ENUM_T setVolume(TELIX_JS_AV_HANDLE, uint32_t volume) {
 TELIX_RETCODE_ENUM_T getPlayInfo(TELIX_JS_AV_HANDLE player, TELIX_JS_AV_PLAY_INFO** info) {
     const std::lock_guard<std::mutex> lock(pipeline.mutex);
     TELIX_JS_AV_PLAY_INFO& record = pipeline.records[player];
-    record.state = pipeline.stage == Stage::IDLE ? 0 : 2;
+    record.state = pipeline.stage == Stage::Idle ? 0 : 2;
     record.playPosition = static_cast<uint32_t>(pipeline.position);
     record.duration = static_cast<uint32_t>(pipeline.length);
     record.buffered = pipeline.buffered;

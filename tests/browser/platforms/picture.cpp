@@ -1,7 +1,8 @@
-// A platform whose picture is a known pattern: four quarters of one colour each, red, green in the upper
-// half, blue, white in the lower. A page places it as it places any broadcast; setChannelByTriplet(WIDTH,
-// HEIGHT, WHAT) shows it in the shape WIDTH to HEIGHT, or removes it, or wakes the window without end (see
-// What). What the window does with the picture goes to standard error when it lets go of it.
+// A platform whose video frame is a test pattern: four quadrants, red and green above, blue and white below.
+// A page sets the display area as for any broadcast; setChannelByTriplet(WIDTH, HEIGHT, CONTENT) shows the
+// frame with the aspect ratio WIDTH to HEIGHT, removes it, or calls the wake-up callback continuously (see
+// Content). When the window removes its callback, and for each frame that it releases afterwards, a line is
+// written to standard error.
 #include "desktop/platform/telix_picture.h"
 #include "tests/support/RecordingPlatform.h"
 
@@ -12,18 +13,20 @@
 
 namespace {
 
-enum What { nothing = 0, pattern = 1, patternInOtherColours = 2, storm = 3 };
+enum class Content { None = 0, Pattern = 1, InvertedPattern = 2, WakeupStorm = 3 };
 
-constexpr uint32_t width = 64;
-constexpr uint32_t height = 36;
-constexpr uint32_t stride = width + 8; // in pixels; those behind the lines are never to be seen
-constexpr uint32_t hidden = 0xFF123456;
-constexpr TELIX_JS_VB_HANDLE onlyObject = 1;
+constexpr uint32_t kWidth = 64;
+constexpr uint32_t kHeight = 36;
+constexpr uint32_t kStride = kWidth + 8; // in pixels, with padding after each line
+constexpr uint32_t kPadding = 0xFF123456;
+constexpr int kStormThreads = 3;
+constexpr TELIX_JS_VB_HANDLE kObject = 1;
 
-uint32_t pixels[2][stride * height];
-std::mutex mutex; // over what follows
+uint32_t pattern[kStride * kHeight];
+uint32_t invertedPattern[kStride * kHeight];
+std::mutex mutex; // guards `current`
 telix_desktop_frame current{};
-std::atomic<int> framesOut{0};
+std::atomic<int> acquiredFrames{0};
 
 std::mutex wakeupMutex; // held while the wake-up runs
 telix_desktop_wakeup wakeup = nullptr;
@@ -37,30 +40,39 @@ void wake() {
 }
 
 void draw() {
-    for (uint32_t y = 0; y < height; ++y) {
-        for (uint32_t x = 0; x < stride; ++x) {
-            const bool isRight = x >= width / 2;
+    for (uint32_t y = 0; y < kHeight; ++y) {
+        for (uint32_t x = 0; x < kStride; ++x) {
+            const bool isRight = x >= kWidth / 2;
             const uint32_t upper = isRight ? 0x0000FF00 : 0x00FF0000;
             const uint32_t lower = isRight ? 0x00FFFFFF : 0x000000FF;
-            const uint32_t colour = x >= width ? hidden : y < height / 2 ? upper : lower;
-            pixels[0][y * stride + x] = colour;
-            pixels[1][y * stride + x] = x >= width ? hidden : colour ^ 0x00FFFFFF;
+            const uint32_t colour = x >= kWidth ? kPadding : y < kHeight / 2 ? upper : lower;
+            pattern[y * kStride + x] = colour;
+            invertedPattern[y * kStride + x] = x >= kWidth ? kPadding : colour ^ 0x00FFFFFF;
         }
     }
 }
 
-void show(int32_t shapeWidth, int32_t shapeHeight, int32_t what) {
+const uint32_t* pixelsOf(Content content) {
+    switch (content) {
+    case Content::None:
+        return nullptr;
+    case Content::InvertedPattern:
+        return invertedPattern;
+    default:
+        return pattern;
+    }
+}
+
+void show(int32_t aspectWidth, int32_t aspectHeight, Content content) {
     {
         std::lock_guard<std::mutex> lock(mutex);
-        current.visible = what == nothing ? 0 : 1;
-        current.pixels =
-            what == nothing ? nullptr
-                            : reinterpret_cast<const uint8_t*>(pixels[what == patternInOtherColours ? 1 : 0]);
-        current.width = width;
-        current.height = height;
-        current.stride = stride * sizeof(uint32_t);
-        current.aspectWidth = static_cast<uint32_t>(shapeWidth);
-        current.aspectHeight = static_cast<uint32_t>(shapeHeight);
+        current.visible = content == Content::None ? 0 : 1;
+        current.pixels = reinterpret_cast<const uint8_t*>(pixelsOf(content));
+        current.width = kWidth;
+        current.height = kHeight;
+        current.stride = kStride * sizeof(uint32_t);
+        current.aspectWidth = static_cast<uint32_t>(aspectWidth);
+        current.aspectHeight = static_cast<uint32_t>(aspectHeight);
         ++current.serial;
     }
     wake();
@@ -77,7 +89,7 @@ void place(int32_t x, int32_t y, uint32_t areaWidth, uint32_t areaHeight) {
     wake();
 }
 
-void wakeWithoutEnd() {
+void wakeContinuously() {
     for (;;) {
         {
             std::lock_guard<std::mutex> lock(mutex);
@@ -91,10 +103,10 @@ const bool scenario = [] {
     draw();
     RecordingPlatform& platform = *telix_recording_platform();
     platform.TELIX_JS_VB_GetHandle = [](TELIX_JS_VB_HANDLE* object) {
-        *object = onlyObject;
+        *object = kObject;
         return TELIX_RETCODE_SUCCESS;
     };
-    // Nobody places the picture any more: it fills the page.
+    // Without a broadcast object the video fills the page.
     platform.TELIX_JS_VB_Release = [](TELIX_JS_VB_HANDLE) {
         place(0, 0, 1280, 720);
         return TELIX_RETCODE_SUCCESS;
@@ -118,9 +130,10 @@ const bool scenario = [] {
     };
     platform.TELIX_JS_VB_SetChannelByTriplet = [](TELIX_JS_VB_HANDLE, int32_t onid, int32_t tsid,
                                                   int32_t sid) {
-        show(onid, tsid, sid);
-        for (int number = 0; sid == storm && number < 3; ++number) {
-            std::thread(wakeWithoutEnd).detach();
+        const auto content = static_cast<Content>(sid);
+        show(onid, tsid, content);
+        for (int number = 0; content == Content::WakeupStorm && number < kStormThreads; ++number) {
+            std::thread(wakeContinuously).detach();
         }
         return TELIX_RETCODE_SUCCESS;
     };
@@ -135,7 +148,7 @@ extern "C" void telix_desktop_set_wakeup(telix_desktop_wakeup function, void* da
         wakeup = function;
         wakeupData = data;
         if (!function) {
-            std::fprintf(stderr, "picture: no wake-up any more\n");
+            std::fprintf(stderr, "picture: wake-up removed\n");
         }
     }
     wake();
@@ -143,18 +156,18 @@ extern "C" void telix_desktop_set_wakeup(telix_desktop_wakeup function, void* da
 
 extern "C" void telix_desktop_acquire_frame(telix_desktop_frame* frame) {
     std::lock_guard<std::mutex> lock(mutex);
-    ++framesOut;
+    ++acquiredFrames;
     *frame = current;
-    frame->owner = &framesOut;
+    frame->owner = &acquiredFrames;
 }
 
 extern "C" void telix_desktop_release_frame(telix_desktop_frame* frame) {
     if (frame->owner) {
-        --framesOut;
+        --acquiredFrames;
     }
     *frame = {};
     std::lock_guard<std::mutex> lock(wakeupMutex);
     if (!wakeup) {
-        std::fprintf(stderr, "picture: %d frames still out\n", framesOut.load());
+        std::fprintf(stderr, "picture: %d frames not released\n", acquiredFrames.load());
     }
 }

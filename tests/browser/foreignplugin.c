@@ -1,5 +1,5 @@
-/* A browser plug-in that has nothing to do with television: it loads, offers one type of its own, and refuses
- * every instance. */
+/* A third-party browser plug-in: it registers one MIME type and rejects every
+ * instance. */
 #include "npapi/npfunctions.h"
 
 #define EXPORT __attribute__((visibility("default")))
@@ -9,7 +9,7 @@ EXPORT NPError NP_Shutdown(void);
 EXPORT NPError NP_GetValue(void* future, NPPVariable variable, void* value);
 EXPORT const char* NP_GetMIMEDescription(void);
 
-static NPError refuseInstance(NPMIMEType type, NPP instance, uint16_t mode, int16_t argc, char* argn[],
+static NPError rejectInstance(NPMIMEType type, NPP instance, uint16_t mode, int16_t argc, char* argn[],
                               char* argv[], NPSavedData* saved) {
     (void)type, (void)instance, (void)mode, (void)argc, (void)argn, (void)argv, (void)saved;
     return NPERR_GENERIC_ERROR;
@@ -18,7 +18,7 @@ static NPError refuseInstance(NPMIMEType type, NPP instance, uint16_t mode, int1
 NPError NP_Initialize(NPNetscapeFuncs* browser, NPPluginFuncs* plugin) {
     (void)browser;
     plugin->version = NP_VERSION_MINOR;
-    plugin->newp = refuseInstance;
+    plugin->newp = rejectInstance;
     return NPERR_NO_ERROR;
 }
 
@@ -31,7 +31,7 @@ NPError NP_GetValue(void* future, NPPVariable variable, void* value) {
     switch (variable) {
     case NPPVpluginNameString:
     case NPPVpluginDescriptionString:
-        *(const char**)value = "Stranger";
+        *(const char**)value = "Foreign Plug-in";
         return NPERR_NO_ERROR;
     default:
         return NPERR_INVALID_PARAM;
@@ -39,5 +39,5 @@ NPError NP_GetValue(void* future, NPPVariable variable, void* value) {
 }
 
 const char* NP_GetMIMEDescription(void) {
-    return "application/x-telix-stranger::Nothing;";
+    return "application/x-telix-foreign::Nothing;";
 }

@@ -1,32 +1,35 @@
-// The picture of the platform library that the plug-in has opened: found when it is there, read frame by
-// frame.
-#include "desktop/browser/PictureSource.h"
-
-#include <cstring>
-#include <string>
+// The video frames of the platform library that the plug-in has loaded.
+#include "desktop/browser/FrameSource.h"
 
 #include <dlfcn.h>
 #include <link.h>
 
+#include <cstring>
+#include <string>
+
+namespace desktop {
+
 namespace {
 
-const char* const libraryName = "libtelix.so";
+const char* const kLibraryName = "libtelix.so";
 
-// What the walk through the loaded libraries brings back.
+// Input and result of the search through the loaded libraries.
 struct Search {
-    unsigned long long loadsSeen;
+    unsigned long long knownLoads;
     unsigned long long loads;
     std::string file;
 };
 
-int lookAt(dl_phdr_info* library, size_t, void* data) {
+int findPlatformLibrary(dl_phdr_info* library, size_t, void* data) {
     auto* search = static_cast<Search*>(data);
     search->loads = library->dlpi_adds;
-    if (search->loads == search->loadsSeen)
+    if (search->loads == search->knownLoads) {
         return 1;
+    }
     const char* slash = std::strrchr(library->dlpi_name, '/');
-    if (std::strcmp(slash ? slash + 1 : library->dlpi_name, libraryName) != 0)
+    if (std::strcmp(slash ? slash + 1 : library->dlpi_name, kLibraryName) != 0) {
         return 0;
+    }
     search->file = library->dlpi_name;
     return 1;
 }
@@ -39,30 +42,32 @@ bool bindFunction(void* library, const char* name, Function& function) {
 
 } // namespace
 
-PictureSource::PictureSource(telix_desktop_wakeup wakeup, void* data)
-    : m_wakeup(wakeup), m_wakeupData(data) {}
+FrameSource::FrameSource(telix_desktop_wakeup wakeup, void* data) : m_wakeup(wakeup), m_wakeupData(data) {}
 
-PictureSource::~PictureSource() {
-    if (!m_setWakeup)
+FrameSource::~FrameSource() {
+    if (!m_setWakeup) {
         return;
+    }
     m_setWakeup(nullptr, nullptr);
     m_release(&m_frame);
 }
 
-bool PictureSource::find() {
-    if (m_setWakeup)
+bool FrameSource::find() {
+    if (m_setWakeup) {
         return true;
-    Search search{m_loadsSeen, 0, {}};
-    dl_iterate_phdr(lookAt, &search);
-    m_loadsSeen = search.loads;
+    }
+    Search search{m_knownLoads, 0, {}};
+    dl_iterate_phdr(findPlatformLibrary, &search);
+    m_knownLoads = search.loads;
     return !search.file.empty() && bind(search.file.c_str());
 }
 
-bool PictureSource::bind(const char* file) {
-    // Kept: the plug-in may close the library while a frame of it is on the screen.
+bool FrameSource::bind(const char* file) {
+    // The reference is kept, because the plug-in may close the library while one of its frames is shown.
     void* library = dlopen(file, RTLD_LAZY | RTLD_NOLOAD);
-    if (!library)
+    if (!library) {
         return false;
+    }
     telix_desktop_set_wakeup_function setWakeup = nullptr;
     if (!bindFunction(library, "telix_desktop_acquire_frame", m_acquire) ||
         !bindFunction(library, "telix_desktop_release_frame", m_release) ||
@@ -75,9 +80,12 @@ bool PictureSource::bind(const char* file) {
     return true;
 }
 
-void PictureSource::refresh() {
-    if (!m_setWakeup)
+void FrameSource::refresh() {
+    if (!m_setWakeup) {
         return;
+    }
     m_release(&m_frame);
     m_acquire(&m_frame);
 }
+
+} // namespace desktop
