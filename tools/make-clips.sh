@@ -1,11 +1,11 @@
 #!/usr/bin/env bash
-# Makes the short clips of the demonstration and of the tests: tools/make-clips.sh FOLDER. What is there already stays.
-#   clip.mp4       20 s of picture with a running clock, and a tone: H.264, AAC
-#   second.mp4     8 s, another picture
-#   languages.mp4  8 s with German and English sound (low and high) and English subtitles, one a second
-#   tune.mp3, tune.aac, tune.wav   3 s of sound
+# Makes the clips of the demonstration and of the tests that FOLDER does not have yet: tools/make-clips.sh FOLDER
+#   clip.mp4       20 s of video with a running clock, and a tone: H.264, AAC
+#   second.mp4     8 s, other video
+#   languages.mp4  8 s with German and English audio (low and high) and English subtitles, one a second
+#   tune.mp3, tune.aac, tune.wav   3 s of audio
 #   hls/index.m3u8 6 s in three segments, for HTTP live streaming
-#   playlist.asx   clip.mp4 and second.mp4; the address of their folder comes from media_server.py
+#   playlist.asx   clip.mp4 and second.mp4; media_server.py inserts the URL of their folder
 set -euo pipefail
 
 if [ $# -ne 1 ] || [ "${1#-}" != "$1" ]; then
@@ -14,7 +14,7 @@ if [ $# -ne 1 ] || [ "${1#-}" != "$1" ]; then
 fi
 folder=$1
 if ! command -v ffmpeg >/dev/null; then
-    echo "$0: ffmpeg is missing" >&2
+    echo "${0##*/}: ffmpeg: command not found" >&2
     exit 2
 fi
 if ! mkdir -p "$folder"; then
@@ -23,7 +23,7 @@ fi
 work=$(mktemp -d "$folder/unfinished.XXXXXX")
 trap 'rm -rf "$work"' EXIT
 
-# make NAME ARGUMENT...: one clip, which appears in the folder when it is whole.
+# make NAME ARGUMENT...: one clip, which is moved to the folder when it is complete.
 make() {
     local name=$1
     shift
@@ -32,13 +32,13 @@ make() {
     mv "$work/$name" "$folder/$name"
 }
 
-# label TEXT: a name on the left and a running clock on the right of a picture.
+# label TEXT: a filter that draws a name on the left and a running clock on the right.
 label() {
     local box=fontsize=32:fontcolor=white:box=1:boxcolor=black@0.6:boxborderw=8
     echo "drawtext=text='$1':x=32:y=32:$box,drawtext=text='%{pts\\:hms}':x=w-tw-32:y=32:$box"
 }
 
-# Key frames twice a second: a seek lands near its goal.
+# Two keyframes a second, so that seeks are fast.
 video=(-c:v libx264 -preset veryfast -profile:v main -pix_fmt yuv420p -g 12 -bf 0 -b:v 500k -maxrate 800k -bufsize 400k)
 audio=(-c:a aac -b:a 96k -ac 2)
 size=640x360

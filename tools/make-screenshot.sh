@@ -1,5 +1,5 @@
 #!/usr/bin/env bash
-# Renews docs/television.png, the picture of the demonstration in README.md, or makes FILE.png instead of it.
+# Makes docs/television.png, the screenshot of the demonstration in README.md, or FILE.png instead.
 # Usage: tools/make-screenshot.sh [FILE.png]
 set -euo pipefail
 if [ $# -gt 1 ] || [[ ${1:-} == -* ]]; then
@@ -8,7 +8,7 @@ if [ $# -gt 1 ] || [[ ${1:-} == -* ]]; then
 fi
 top=$(cd "$(dirname "${BASH_SOURCE[0]}")/.." && pwd)
 
-# The third service some seconds after the change of the channel, with what is on. No settings of the viewer's.
+# The third service, some seconds after the channel change, with its programmes. The viewer's settings are not used.
 ready='document.getElementById("banner-name").textContent === "Telix Three" &&
     document.getElementById("banner-next").textContent &&
     Date.now() > (window.readySince = window.readySince || Date.now()) + 2500'

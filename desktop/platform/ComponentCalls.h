@@ -40,7 +40,8 @@ inline TELIX_RETCODE_ENUM_T returnTrait(const std::optional<ComponentTraits>& fo
     return found ? returnFlag(out, (*found).*trait) : kRefused;
 }
 
-// The plug-in asks for a number until it gets one: refuses until the decoder has told it.
+// The plug-in repeats a call for a number until it succeeds: refuses until the decoder has reported the
+// number.
 template <typename Number>
 TELIX_RETCODE_ENUM_T returnTrait(const std::optional<ComponentTraits>& found, Number ComponentTraits::*trait,
                                  Number* out) {

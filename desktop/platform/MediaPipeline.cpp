@@ -97,7 +97,7 @@ bool MediaPipeline::createPlaybin(Picture& picture, Picture::Token token, std::s
     if (!m_playbin || !videoSink || !audioSink) {
         dropElement(videoSink);
         dropElement(audioSink);
-        error = "elements of GStreamer are missing";
+        error = "a GStreamer element is missing";
         return false;
     }
     gst_util_set_object_arg(G_OBJECT(m_playbin), "flags", kPlaybinFlags);

@@ -3,7 +3,7 @@
 //   MediaPipeline.cpp         creation, bus messages, state
 //   MediaPipelineSeek.cpp     seeks and speeds
 //   MediaPipelineStreams.cpp  streams and their selection, audio
-//   MediaPipelineProgress.cpp position, duration, buffering
+//   MediaPipelineProgress.cpp position, duration, buffering, inspection
 //   MediaPipelineErrors.cpp   what a GStreamer error means to the plug-in
 //   DeferredTeardown.h        the end of the pipeline
 //
@@ -71,7 +71,7 @@ public:
         uint32_t buffered = kNoBufferReport; // seconds from the position
     };
 
-    // What is really played, asked of GStreamer.
+    // What GStreamer plays at the moment, as it reports itself; for tests.
     struct Output {
         GstState state = GST_STATE_NULL; // VOID_PENDING during a change of state or a seek
         double rate = 1;                 // of the segment at the sinks

@@ -24,7 +24,8 @@ void unref(GstSample* sample) {
     }
 }
 
-// Maps the pixels and describes them in `frame`. Takes the reference; false if the sample is no video frame.
+// Maps the pixels and describes them in `frame`. Takes the reference; false if the sample is not a video
+// frame.
 bool mapFrame(GstSample* sample, telix_desktop_frame& frame) {
     GstVideoInfo info;
     auto* mapped = new MappedFrame{sample, {}};

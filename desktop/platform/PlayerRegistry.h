@@ -4,7 +4,7 @@
 //   PlayerRegistry.cpp           the table, callbacks, phases
 //   PlayerRegistryRequests.cpp   play, queue, stop, pause, seek, speed, volume, view
 //   PlayerRegistrySession.cpp    the pipeline, and what it reports
-//   PlayerRegistryProgress.cpp   play info, states for the control tool
+//   PlayerRegistryProgress.cpp   play info, inspection
 //   PlayerRegistryComponents.cpp lists and selection of components
 //   PlayerRegistryInjection.cpp  what the control tool injects
 //
@@ -115,6 +115,8 @@ public:
     // Overrides the field `buffered` in the play info of every player; without a value it is the real one
     // again. Always true.
     bool injectBuffered(std::optional<uint32_t> raw);
+
+    // ---- Inspection, for the control tool and for tests
 
     std::vector<State> states() const;
 
