@@ -1,5 +1,5 @@
-// The DRM agent: messages to the platform, and the way of the results from the platform's threads to the
-// page.
+// The DRM agent: messages to the platform, and the results from the platform's threads to the page.
+#include <chrono>
 #include <cstdlib>
 #include <cstring>
 #include <limits>
@@ -18,10 +18,11 @@ using ::testing::Not;
 namespace {
 
 const char* const kType = "application/oipfdrmagent";
+constexpr std::chrono::seconds kBound(50); // for what comes at once unless it never comes
 
 class DRMAgentTest : public BorderTest {
 protected:
-    // What the platform does when a result has come. The texts are gone when the callback returns.
+    // What the platform does when a result has come. The strings are gone when the callback returns.
     void platformReports(const std::string& messageId, const std::string& message, int32_t code) const {
         std::vector<unsigned char> id(messageId.begin(), messageId.end());
         std::vector<unsigned char> text(message.begin(), message.end());
@@ -53,7 +54,7 @@ protected:
 
     Outcome send() const { return agent.call("sendDRMMessage", "type", "message", "system"); }
 
-    // What each call of a handler leaves: its reference and the blocks of both texts.
+    // What each call of a handler leaves: its reference and the blocks of both strings.
     void callsLeave(const ScriptFunction& handler, int calls) {
         leftBehind(handler, calls);
         memoryLeftBehind(2 * static_cast<size_t>(calls));
@@ -653,7 +654,7 @@ TEST_F(DRMAgentTest, ResultsOfSeveralThreadsAtOnceAllArriveEachThreadsInOrderEve
     log.clear();
     // The browser's thread delivers while the others report.
     std::thread platformThreads([&] { onPlatformThreads(reporters); });
-    browser.pumpUntil([&] { return second.count() == size_t{threads} * results; });
+    browser.pumpUntil([&] { return second.count() == size_t{threads} * results; }, kBound);
     platformThreads.join();
     EXPECT_EQ(ended, threads);
     EXPECT_EQ(first.count(), 0U);
@@ -694,12 +695,14 @@ TEST_F(DRMAgentTest, AgentsMayComeAndGoWhileThreadsReport) {
         ended = true;
     });
     int round = 0;
-    browser.pumpUntil([&] {
-        if (++round % 5 == 0) {
-            browser.embed(kType, {{"id", "agent" + std::to_string(round)}}).destroy();
-        }
-        return ended.load();
-    });
+    browser.pumpUntil(
+        [&] {
+            if (++round % 5 == 0) {
+                browser.embed(kType, {{"id", "agent" + std::to_string(round)}}).destroy();
+            }
+            return ended.load();
+        },
+        kBound);
     platformThreads.join();
     const EmbeddedObject last = browser.embed(kType, {{"id", "last"}});
     browser.pump();
