@@ -1,4 +1,4 @@
-// The A/V control object: its kind, its creation and its end, the display area and the play report.
+// The A/V control object: its kind, its creation and destruction, the display area and the play report.
 #include "src/avcontrol/AVControl.h"
 
 #include <strings.h>
@@ -182,7 +182,7 @@ void AVControl::readAttribute(const char* name, const char* value) {
 
 void AVControl::openPlayerPage() {
     const char* page = std::getenv("PLUGIN_PLAYER_URL");
-    // The address goes in as it is, without escaping.
+    // The URL is appended as it is, without escaping.
     const std::string url = std::string(page ? page : "file:///mnt/browser/pages/player/index.html") +
                             "?qv_media_url=" + getURL();
     if (NPN_GetURL(m_npp, url.c_str(), "_self") != NPERR_NO_ERROR) {

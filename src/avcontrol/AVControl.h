@@ -1,7 +1,7 @@
 // The model of the embedded A/V control object: one player of the platform, the media that it plays and the
-// play state that script sees. The largest class of the system; its implementation stands in one file a
+// play state that script sees. The largest class of the system; its implementation is one file for each
 // concern:
-//   AVControl.cpp           creation, destruction, display area, play report
+//   AVControl.cpp           kind, creation, destruction, display area, play report
 //   AVControlMedia.cpp      the choice of media: MIME types, `data`
 //   AVControlState.cpp      play state, ready state, the platform's messages
 //   AVControlMonitor.cpp    the buffering monitor, a thread of its own
@@ -61,7 +61,7 @@ enum avcontrol_ce_error {
 
 class AVControl;
 
-// The object that last handed an address to the platform; null if there is none. The platform has one media
+// The object that last handed a URL to the platform; null if there is none. The platform has one media
 // pipeline: its messages go to this object, and no other may stop it. Any thread.
 extern std::atomic<AVControl*> g_lastPlayedInstance;
 
@@ -76,9 +76,9 @@ public:
     AVControl(NPP npp, unsigned short objectKind);
     ~AVControl();
 
-    // Reads the element's attributes and makes the player. NPERR_GENERIC_ERROR if the platform gives none.
+    // Reads the element's attributes and makes the player. NPERR_GENERIC_ERROR if the platform refuses one.
     NPError initAV(unsigned short mode, int argc, char** argn, char** argv, char* mimeType);
-    // Gives the player back and has the object deleted on a later turn of the browser thread. Always 1: the
+    // Releases the player and has the object deleted on a later turn of the browser thread. Always 1: the
     // caller must not delete it.
     int destroyAV();
 
@@ -94,12 +94,13 @@ public:
     // Media.
     void setData(const std::string& url);
     std::string getData() const { return m_data; }
-    // Looks at the content that a MIME type promises; an empty type looks at the header text of the stream.
+    // Looks at the content that a MIME type promises; an empty type looks at the stream's headers.
     void detectMediaType(const std::string& type);
-    // Has the browser fetch the address, to look at its content.
+    // Has the browser fetch the URL, to look at its content.
     void getURLValue(const std::string& url);
 
-    // Display area. setWindow tells the platform of it, unless it is the one told last; always 0.
+    // Display area. setWindow gives it to the platform, unless it is the one that the platform accepted last;
+    // always 0.
     NPError setWindow(const NPWindow* window, bool forceReset);
     // Reads the element's place in the page.
     void setPluginRegionFromDOM();
@@ -186,7 +187,7 @@ public:
     void printMonitoringInfo(int kind);
 
 private:
-    // What the player is told that it plays: `source` of the platform's codes.
+    // The kind of source, in the platform's codes.
     enum class SourceCode : int32_t { Ordinary = 6, OneShot = 7, SmoothStreaming = 23, Hls = 25 };
 
     // Whether the browser has to deliver a stream before a clip from the network may play.
@@ -250,7 +251,7 @@ private:
     int32_t m_audioCodecCode = 0;
     SourceCode m_sourceCode = SourceCode::Ordinary;
     std::atomic<play_state> m_playState{PLAY_STATE_STOPPED};
-    std::string m_mimeType;      // after the first bytes of a stream: its whole header text
+    std::string m_mimeType;      // after the first bytes of a stream: all of its headers
     bool m_downloadable = false; // stored; nothing reads it
     bool m_buffering = true;
     bool m_playPending = false;                     // stored; nothing reads it
@@ -261,7 +262,7 @@ private:
     uint32_t m_lowerLimit = 4;
     uint32_t m_upperLimit = 10;
     uint32_t m_playCount = 1;
-    std::string m_data; // the address as script sees it
+    std::string m_data; // the URL as script sees it
     bool m_fetchStream = true;
     StreamState m_streamState = StreamState::NotRequested;
     int32_t m_mediaType = -1;
@@ -282,7 +283,7 @@ private:
     bool m_memoryAudio = false;
     // Its sizes are apart from the attributes that the base class keeps.
     DisplayArea m_displayArea{RectangleResult::Tested};
-    // The address in play: an immutable text that is exchanged as a whole, since the monitor reports it.
+    // The URL in play: an immutable string that is exchanged as a whole, since the monitor reports it.
     std::shared_ptr<const std::string> m_currentMedia = std::make_shared<const std::string>();
     NPObject* m_onFullScreenChange = nullptr; // meant: never released at the end
     NPObject* m_onPlaySpeedChanged = nullptr;

@@ -1,4 +1,4 @@
-// The script listeners, the notices of a new speed and position, and the way of a DRM rights error from the
+// The script listeners, the notification of a new speed and position, and DRM rights errors from the
 // platform to the page.
 #include <cstdlib>
 #include <cstring>
@@ -12,36 +12,36 @@
 
 namespace {
 
-// A rights error on its way to the browser thread, with copies of the platform's texts.
+// A rights error that is posted to the browser thread, with copies of the platform's strings.
 class DRMRgtsErrEvtData {
 public:
-    // The texts must not be null. Without memory a text and those after it stay null.
+    // The strings must not be null. If memory runs out, a string and those after it stay null.
     DRMRgtsErrEvtData(unsigned int handle, TELIX_AV_DRM_ERR_STATE_ENUM_T state, const char* contentId,
                       const char* drmSystemId, const char* rightsIssuerUrl)
         : m_playerHandle(handle), m_errorState(state) {
-        const char* const texts[] = {contentId, drmSystemId, rightsIssuerUrl};
-        for (size_t i = 0; i < kTexts && (m_texts[i] = strdup(texts[i])); ++i) {
+        const char* const strings[] = {contentId, drmSystemId, rightsIssuerUrl};
+        for (size_t i = 0; i < kStrings && (m_strings[i] = strdup(strings[i])); ++i) {
         }
     }
     DRMRgtsErrEvtData(const DRMRgtsErrEvtData&) = delete;
     DRMRgtsErrEvtData& operator=(const DRMRgtsErrEvtData&) = delete;
     ~DRMRgtsErrEvtData() {
-        for (char*& text : m_texts) {
-            std::free(text);
-            text = nullptr;
+        for (char*& string : m_strings) {
+            std::free(string);
+            string = nullptr;
         }
     }
 
-    static constexpr size_t kTexts = 3;
+    static constexpr size_t kStrings = 3;
 
     TELIX_AV_DRM_ERR_STATE_ENUM_T errorState() const { return m_errorState; }
     // Content id, DRM system id, rights issuer URL.
-    const char* text(size_t index) const { return m_texts[index]; }
+    const char* string(size_t index) const { return m_strings[index]; }
 
 private:
     const unsigned int m_playerHandle; // selects nothing: the event is the last played object's
     const TELIX_AV_DRM_ERR_STATE_ENUM_T m_errorState;
-    char* m_texts[kTexts] = {};
+    char* m_strings[kStrings] = {};
 };
 
 int handleDRMRightsErrorEvent(void* record) {
@@ -53,24 +53,24 @@ int handleDRMRightsErrorEvent(void* record) {
     }
     // A control that plays must have an id for this.
     instance->invokeJScript(domEventScript(instance->getId(), "DRMRightsError", false, false));
-    // Meant: the getter's reference is left behind, and the texts stay with whoever took the arguments.
+    // Meant: the getter's reference is left behind, and the strings stay with whoever took the arguments.
     if (NPObject* listener = instance->getOnDRMRightsError()) {
-        NPVariant arguments[1 + DRMRgtsErrEvtData::kTexts] = {};
+        NPVariant arguments[1 + DRMRgtsErrEvtData::kStrings] = {};
         setResult(arguments[0], event->errorState());
-        for (size_t i = 0; i < DRMRgtsErrEvtData::kTexts; ++i) {
-            const char* text = event->text(i);
+        for (size_t i = 0; i < DRMRgtsErrEvtData::kStrings; ++i) {
+            const char* string = event->string(i);
             NPVariant& argument = arguments[1 + i];
-            if (!text || !setText(argument, text, std::strlen(text))) {
+            if (!string || !setText(argument, string, std::strlen(string))) {
                 setNull(argument);
             }
         }
-        instance->invokeJScriptFunc(listener, arguments, 1 + DRMRgtsErrEvtData::kTexts);
+        instance->invokeJScriptFunc(listener, arguments, 1 + DRMRgtsErrEvtData::kStrings);
     }
     delete event;
     return 0;
 }
 
-const char* textOf(const unsigned char* bytes) {
+const char* stringOf(const unsigned char* bytes) {
     return reinterpret_cast<const char*>(bytes);
 }
 
@@ -82,9 +82,10 @@ int AVControl::onDRMRightsErrorCb(unsigned int handle, TELIX_AV_DRM_ERR_STATE_EN
     PLUGIN_LOG(DRMAGENT,
                " Received Callback from system. Player Handle: %u, Error State: (%u), Content Id: (%s), DRM "
                "System Id: (%s),  RightsIssuerURL: (%s) \n",
-               handle, state, textOf(contentId), textOf(drmSystemId), textOf(rightsIssuerUrl));
-    postIdle(handleDRMRightsErrorEvent, new DRMRgtsErrEvtData(handle, state, textOf(contentId),
-                                                              textOf(drmSystemId), textOf(rightsIssuerUrl)));
+               handle, state, stringOf(contentId), stringOf(drmSystemId), stringOf(rightsIssuerUrl));
+    postIdle(handleDRMRightsErrorEvent,
+             new DRMRgtsErrEvtData(handle, state, stringOf(contentId), stringOf(drmSystemId),
+                                   stringOf(rightsIssuerUrl)));
     return 0;
 }
 

@@ -30,7 +30,7 @@ struct PlatformSpeed {
     uint16_t tenths;
 };
 
-// False if the text has no decimal point.
+// False if the string has no decimal point.
 bool parseSpeed(const std::string& text, PlatformSpeed& speed) {
     speed.positive = text[0] != '-';
     const std::string amount = speed.positive ? text : text.substr(1);
@@ -184,7 +184,7 @@ bool AVControl::seek(unsigned int ms) {
     if (!m_playerHandle || currentMedia().empty()) {
         return false;
     }
-    // A stream of these kinds can't be moved in: it starts again at the new place.
+    // These kinds of stream can't seek: they restart at the new position.
     const bool restart = m_containerCode == kContainerMp3 || startsWith(currentMedia(), "mms://");
     if (restart) {
         changePlayState(PLAY_STATE_BUFFERING);
@@ -232,7 +232,7 @@ void AVControl::setPlaySpeed(double speed) {
     }
 }
 
-// Short sounds change no state, have no monitor and don't take the pipeline over.
+// Short sounds change no state, have no monitor and don't take over the pipeline.
 void AVControl::playSound() {
     invokeJScript(getPlayCountVal(getId()));
     NPVariant count{};
@@ -261,7 +261,7 @@ bool AVControl::queue(const std::string& url) {
     if (url.empty()) {
         PLUGIN_LOG(AVCONTROL, " is called with url value as NULL\n");
     }
-    // Without an address the platform drops what waits there.
+    // Without a URL the platform drops its queue.
     if (TELIX_JS_AV_Queue(m_playerHandle, url.empty() ? nullptr : url.c_str(), m_playCount,
                           static_cast<int32_t>(m_sourceCode), m_containerCode, m_audioCodecCode, 0, 0) != 0) {
         PLUGIN_LOG(AVCONTROL, " AVControl call ended \n");

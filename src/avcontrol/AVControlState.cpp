@@ -1,5 +1,5 @@
-// Play state and ready state: the way of a platform message to the browser thread, what it means, and how a
-// change of state reaches the page.
+// Play state and ready state: how a platform message is posted to the browser thread, what it means, and how
+// a change of state reaches the page.
 #include <cstdlib>
 #include <new>
 
@@ -13,13 +13,13 @@ std::atomic<uint32_t> g_lastReceivedMessage{0};
 
 namespace {
 
-// A platform message on its way to the browser thread.
+// A platform message that is posted to the browser thread.
 struct AVPlayStateEvent {
     unsigned int playerHandle = 0;
     TELIX_AV_CB_MSG message = 0;
 };
 
-// A change of state on its way to the browser thread; a block of malloc.
+// A change of state that is posted to the browser thread; a block of malloc.
 struct PlayStateChange {
     LiveRef<AVControl> object;
     play_state from;
@@ -97,7 +97,7 @@ void AVControl::handlePlayStateChange(unsigned int handle, TELIX_AV_CB_MSG msg) 
         return;
     }
     if (instance != this && !isBrowserThread()) {
-        // Another object can be on the point of dying: its message takes the platform's road.
+        // Another object may be about to end: its message is posted as the platform's are.
         onPlayStateChangeCb(handle, msg);
         return;
     }

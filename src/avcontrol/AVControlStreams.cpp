@@ -1,4 +1,4 @@
-// What the browser streams: the media itself plays from its address, so a stream serves only to learn the
+// What the browser streams: the media itself plays from its URL, so a stream serves only to learn the
 // media's type from its headers and to gather a playlist.
 #include <cstdlib>
 #include <cstring>
@@ -16,7 +16,7 @@ constexpr int32_t kChunkSize = 1024;
 
 NPError AVControl::newStream(NPMIMEType, NPStream* stream, NPBool, uint16_t*) {
     m_streamState = StreamState::Ready;
-    // One stream in an object's life; what another address brings is not looked at.
+    // One stream in an object's life; the content of another URL is not looked at.
     if (m_streamSeen) {
         NPN_DestroyStream(m_npp, stream, NPRES_DONE);
         return NPERR_NO_ERROR;

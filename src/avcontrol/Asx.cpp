@@ -1,6 +1,6 @@
-// The playlist scanner and the list that it fills. This is no XML parser: it looks for a fixed set of tag
+// The playlist scanner and the list that it fills. This is not an XML parser: it looks for a fixed set of tag
 // beginnings and takes nearly anything in between, as players of these lists always have. The position of the
-// scan only ever moves forwards, which keeps a parse linear in the text.
+// scan only ever moves forwards, which keeps a parse linear in the length of the string.
 #include "src/avcontrol/Asx.h"
 
 #include <algorithm>
@@ -13,8 +13,8 @@
 
 namespace {
 
-// The texts of parameters and clips are parts of the playlist's text, which the list keeps, or of its joined
-// URLs: a clip is read without an allocation for each of its texts.
+// The strings of parameters and clips are views of the playlist, which the list keeps, or of its joined
+// URLs: a clip is read without an allocation for each of its strings.
 struct AsxParam {
     std::string_view name;
     std::string_view value;
@@ -61,30 +61,30 @@ char lowerCase(char c) {
     return c >= 'A' && c <= 'Z' ? static_cast<char>(c + 32) : c;
 }
 
-constexpr size_t npos = std::string_view::npos;
-constexpr std::string_view blanks = "\t\n\r ";
+constexpr size_t kNpos = std::string_view::npos;
+constexpr std::string_view kBlanks = "\t\n\r ";
 
-// Whether `lower`, which is in lower case, stands at `at`, a position in the text or its end.
+// Whether `lower`, which is in lower case, stands at `at`, a position in the string or its end.
 bool standsAt(std::string_view text, size_t at, std::string_view lower) {
     return text.size() - at >= lower.size() &&
            std::equal(lower.begin(), lower.end(), text.begin() + at,
                       [](char wanted, char c) { return lowerCase(c) == wanted; });
 }
 
-// The next position at which the tag beginning `lower` stands, or npos.
+// The next position at which the tag beginning `lower` stands, or kNpos.
 size_t searchTag(std::string_view text, size_t from, std::string_view lower) {
     size_t at = text.find('<', from);
-    while (at != npos && !standsAt(text, at, lower)) {
+    while (at != kNpos && !standsAt(text, at, lower)) {
         at = text.find('<', at + 1);
     }
     return at;
 }
 
-// The number that the text begins with. One too large gives 0 when it shows by getting smaller; one that
+// The number that the string begins with. One too large gives 0 when it shows by getting smaller; one that
 // wraps to something larger passes.
 uint32_t parseNumber(std::string_view text) {
     uint32_t value = 0;
-    for (size_t at = text.find_first_not_of(blanks); at < text.size(); ++at) {
+    for (size_t at = text.find_first_not_of(kBlanks); at < text.size(); ++at) {
         const char c = text[at];
         if (c < '0' || c > '9') {
             break;
@@ -99,7 +99,7 @@ uint32_t parseNumber(std::string_view text) {
 }
 
 // The next colon from positions that never go back. The last hit is remembered, so that all the searches of a
-// parse together read the text once.
+// parse together read the string once.
 class ColonSearch {
 public:
     explicit ColonSearch(std::string_view text) : m_text(text), m_hit(text.find(':')) {}
@@ -113,24 +113,24 @@ public:
 
 private:
     std::string_view m_text;
-    size_t m_hit; // npos, which is behind any position, if no colon follows
+    size_t m_hit; // kNpos, which is after any position, if no colon follows
 };
 
-// One parse. A search that fails leaves the position at npos, and the scan ends there with what it has read.
+// One parse. A search that fails leaves the position at kNpos, and the scan ends there with what it has read.
 class AsxScanner {
 public:
     explicit AsxScanner(std::string_view text) : m_text(text), m_firstColon(text), m_secondColon(text) {}
 
-    // Moves to the start of the playlist; false if the text is none.
+    // Moves to the start of the playlist; false if there is none.
     bool findStart() {
         m_at = searchTag(m_text, 0, "<asx");
-        return m_at != npos;
+        return m_at != kNpos;
     }
 
     // Reads the clips and returns their number.
     uint32_t scan() {
         search('>');
-        while (m_at != npos && search('<')) {
+        while (m_at != kNpos && search('<')) {
             readTag();
         }
         return m_count;
@@ -139,12 +139,12 @@ public:
 private:
     bool search(char c) {
         m_at = m_text.find(c, m_at);
-        return m_at != npos;
+        return m_at != kNpos;
     }
 
     void pass(std::string_view token) {
         m_at = m_text.find(token, m_at);
-        if (m_at != npos) {
+        if (m_at != kNpos) {
             m_at += token.size();
         }
     }
@@ -159,11 +159,11 @@ private:
 
     // Whether the tag's next attribute is `lower`, of which only these letters are compared.
     bool atAttribute(std::string_view lower) {
-        m_at = std::min(m_text.find_first_not_of(blanks, m_at), m_text.size());
+        m_at = std::min(m_text.find_first_not_of(kBlanks, m_at), m_text.size());
         return standsAt(m_text, m_at, lower);
     }
 
-    // The text between the next two double quotes; leaves the position at the second.
+    // The string between the next two double quotes; leaves the position at the second.
     bool readQuoted(std::string_view& value) {
         if (!search('"')) {
             return false;
@@ -244,7 +244,7 @@ void AsxScanner::readText(std::string_view closingTag, std::string_view AsxEntry
                           std::string AsxData::*ofList) {
     const size_t start = m_at;
     m_at = searchTag(m_text, m_at, closingTag);
-    if (m_at == npos) {
+    if (m_at == kNpos) {
         return;
     }
     const std::string_view text = m_text.substr(start, m_at - start);
@@ -334,11 +334,11 @@ void AsxScanner::readEntry() {
     if (!search('>')) {
         return;
     }
-    // Only within the tag, so that not each clip looks through the whole text.
+    // Only within the tag, so that not each clip searches the whole string.
     const std::string_view attributes = m_text.substr(start, m_at - start);
-    constexpr std::string_view noSkip = "clientskip=\"no\"";
+    constexpr std::string_view kNoSkip = "clientskip=\"no\"";
     const bool skips =
-        std::search(attributes.begin(), attributes.end(), noSkip.begin(), noSkip.end(),
+        std::search(attributes.begin(), attributes.end(), kNoSkip.begin(), kNoSkip.end(),
                     [](char c, char wanted) { return lowerCase(c) == wanted; }) == attributes.end();
     m_entry = &s_asxData.entries.emplace_back();
     m_entry->index = ++m_count;
@@ -359,7 +359,7 @@ void AsxScanner::readRef() {
         if (!readQuoted(href)) {
             return;
         }
-        href.remove_prefix(std::min(href.find_first_not_of(blanks), href.size()));
+        href.remove_prefix(std::min(href.find_first_not_of(kBlanks), href.size()));
         if (href.empty()) {
             return;
         }
@@ -394,7 +394,7 @@ void AsxScanner::readTime(uint32_t AsxEntry::*field, const char* outsideMessage)
     pass(">");
 }
 
-// Any address of the text closes the entry, one of an earlier entry too.
+// Any URL closes the entry, one of an earlier entry too.
 void AsxScanner::readEntryEnd() {
     if (!m_entry) {
         ASX_PARSE_LOG("end of entry without start?");
@@ -406,7 +406,7 @@ void AsxScanner::readEntryEnd() {
 }
 
 // Seconds, or minutes and seconds, or hours, minutes and seconds, into seconds. Colons count wherever in the
-// text they follow: "30" before one colon is 30 minutes, before two 30 hours. Meant.
+// playlist they follow: "30" before one colon is 30 minutes, before two 30 hours. Meant.
 uint32_t AsxScanner::parseTime(std::string_view value) {
     const auto start = static_cast<size_t>(value.data() - m_text.data());
     const size_t end = start + value.size();
@@ -415,12 +415,12 @@ uint32_t AsxScanner::parseTime(std::string_view value) {
     };
     const uint32_t first = parseNumber(value);
     size_t colon = m_firstColon.from(start);
-    if (colon == npos) {
+    if (colon == kNpos) {
         return first;
     }
     const uint32_t second = numberAfter(colon);
     colon = m_secondColon.from(colon + 1);
-    if (colon == npos) {
+    if (colon == kNpos) {
         return first * 60 + second;
     }
     return (first * 60 + second) * 60 + numberAfter(colon);
@@ -428,7 +428,7 @@ uint32_t AsxScanner::parseTime(std::string_view value) {
 
 #define ASX_PRINT_LOG(...) PLUGIN_LOG_FOR(LogModule::AVCONTROL, "asxPrintAsxData", __VA_ARGS__)
 
-// The texts that the list as a whole and a clip have in common.
+// The strings that the list as a whole and a clip have in common.
 template <class Record>
 void logTexts(const Record& record) {
     ASX_PRINT_LOG("ASX File Name: %s", std::string(record.fileName).c_str());
@@ -463,7 +463,7 @@ std::string ofCurrentClip(std::string_view AsxEntry::*field) {
 
 std::string asxIsAsxfile(const void* data, unsigned /*size*/) {
     const std::string_view text = data ? static_cast<const char*>(data) : "";
-    return std::string(searchTag(text, 0, "<asx") != npos ? text : "");
+    return std::string(searchTag(text, 0, "<asx") != kNpos ? text : "");
 }
 
 int asxParseAsx(const char* text, const std::string& url) {

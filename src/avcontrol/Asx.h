@@ -1,4 +1,4 @@
-// ASX playlists: reads the list of clips behind an A/V control object and answers which clip is current,
+// ASX playlists: reads the list of clips of an A/V control object and says which clip is current,
 // which comes next and where a repeat section turns back.
 //
 // There is one list in the process; the next parse replaces it. No input is an error. Nothing is locked: all
@@ -9,15 +9,16 @@
 
 #include <string>
 
-// The text if it is a playlist, else an empty string. `data` is read as a zero-terminated text whatever
+// The playlist if `data` is one, else an empty string. `data` is read as a zero-terminated string whatever
 // `size` says, so the caller terminates it; null gives an empty string.
 std::string asxIsAsxfile(const void* data, unsigned size);
 
 // Reads the playlist `text` (zero-terminated, not null), which was found at `url`, and makes its first clip
-// the current one. A text without clips leaves the list empty. Takes time proportional to the text. Always 0.
+// the current one. A playlist without clips leaves the list empty. Takes time proportional to the length.
+// Always 0.
 int asxParseAsx(const char* text, const std::string& url);
 
-// Empties the list. The texts about the list as a whole and its base URL stay until a parse sets others.
+// Empties the list. The strings of the list as a whole and its base URL stay until a parse sets others.
 void asxClear();
 
 // Logs everything that the list holds; afterwards the first clip is the current one.

@@ -11,7 +11,7 @@ Model& controlOf(PluginBase& model) {
     return static_cast<Model&>(model);
 }
 
-// Undefined, not null, where there was no memory for the text.
+// Undefined, not null, where there was no memory for the string.
 bool readData(PluginBase& model, NPVariant& result) {
     const std::string data = controlOf(model).getData();
     if (data.empty()) {
@@ -68,7 +68,7 @@ bool invokeChangeClip(PluginBase& model, const NPVariant*, unsigned int, NPVaria
     return true;
 }
 
-// An address, or null to withdraw one; anything else gives script the result false.
+// A URL, or null to withdraw one; anything else gives script the result false.
 bool invokeQueue(PluginBase& model, const NPVariant* args, unsigned int, NPVariant& result) {
     bool queued = false;
     if (args[0].type == NPVariantType_String) {

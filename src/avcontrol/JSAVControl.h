@@ -1,4 +1,4 @@
-// The script face of the A/V control object.
+// The script interface of the A/V control object.
 #ifndef TELIX_SRC_AVCONTROL_JSAVCONTROL_H
 #define TELIX_SRC_AVCONTROL_JSAVCONTROL_H
 

@@ -1,4 +1,4 @@
-// The DRM agent: messages to the platform, and the way of a result from the platform's thread to the page.
+// The DRM agent: messages to the platform, and results from the platform's thread to the page.
 #include "src/drm/DRMAgent.h"
 
 #include <glib.h>
@@ -19,17 +19,17 @@ namespace {
 
 const char* const kMimeTypes[] = {"application/oipfdrmagent", nullptr};
 
-// A copy of the platform's text, null if there is no memory.
-char* copyOf(const unsigned char* text) {
-    const size_t size = std::strlen(reinterpret_cast<const char*>(text)) + 1;
+// A copy of the platform's string, null if there is no memory.
+char* copyOf(const unsigned char* string) {
+    const size_t size = std::strlen(reinterpret_cast<const char*>(string)) + 1;
     void* copy = std::malloc(size);
-    return copy ? static_cast<char*>(std::memcpy(copy, text, size)) : nullptr;
+    return copy ? static_cast<char*>(std::memcpy(copy, string, size)) : nullptr;
 }
 
-// An empty text is a string of length 0, unless the browser gives no block for it.
-NPVariant textArgument(const char* text) {
+// An empty string has the length 0, unless the browser gives no block for it.
+NPVariant stringArgument(const char* string) {
     NPVariant argument{};
-    if (!text || !setText(argument, text, std::strlen(text))) {
+    if (!string || !setText(argument, string, std::strlen(string))) {
         setNull(argument);
     }
     return argument;
@@ -71,10 +71,11 @@ int handleDRMMessageResultEvent(void* data) {
         // A listener of the event may have taken the element out of the page, and put another one in.
         NPObject* handler = receiver.get() ? agent->getOnDRMMessageResult() : nullptr;
         if (handler) {
-            NPVariant args[3] = {textArgument(result->messageId), textArgument(result->resultMessage), {}};
+            NPVariant args[3] = {
+                stringArgument(result->messageId), stringArgument(result->resultMessage), {}};
             setResult(args[2], result->resultCode);
             agent->invokeJScriptFunc(handler, args, 3);
-            // Meant: left behind are the handler's reference from the getter and the blocks of both texts.
+            // Meant: left behind are the handler's reference from the getter and the blocks of both strings.
         }
     }
     delete result;

@@ -1,5 +1,5 @@
 // The model of the embedded DRM agent: hands messages of the page to the platform, and the platform's later
-// answers to the page. Browser thread only, but for the platform's callback.
+// results to the page. Browser thread only, but for the platform's callback.
 #ifndef TELIX_SRC_DRM_DRMAGENT_H
 #define TELIX_SRC_DRM_DRMAGENT_H
 
@@ -16,10 +16,10 @@ extern const ObjectKind kDrmAgentKind;
 // results then go nowhere.
 extern LiveRef<DRMAgent> drmAgentInst;
 
-// One result on its way from the platform's thread to the browser's.
+// One result that is posted from the platform's thread to the browser's.
 struct DRMMsgEventData {
-    // Copies both texts, neither of which may be null. A text for which there was no memory stays null, and
-    // then so does the one behind it. Any thread.
+    // Copies both strings, neither of which may be null. A string for which there was no memory stays null,
+    // and then so does the one after it. Any thread.
     DRMMsgEventData(unsigned char* id, unsigned char* message, TELIX_DRM_RESULT_CODE_ENUM_T_tag code);
     DRMMsgEventData(const DRMMsgEventData&) = delete;
     DRMMsgEventData& operator=(const DRMMsgEventData&) = delete;
@@ -42,8 +42,8 @@ public:
 
     NPObject* getJSObject() override;
 
-    // Sends a message and returns its id; if the platform refuses, the id of the message before, empty if
-    // there was none. The answer comes as a result.
+    // Sends a message and returns its id; if the platform refuses, the id of the previous message, empty if
+    // there was none. The outcome comes as a result.
     std::string sendDRMMessage(const std::string& type, const std::string& message,
                                const std::string& systemId);
 
@@ -52,7 +52,7 @@ public:
     NPObject* getOnDRMMessageResult();
     void setOnDRMMessageResult(NPObject* handler);
 
-    // The platform's callback. Any thread; the texts need to be valid only during the call. Always 0.
+    // The platform's callback. Any thread; the strings need to be valid only during the call. Always 0.
     static int onDRMMessageResultCb(unsigned char* messageId, unsigned char* resultMessage,
                                     TELIX_DRM_RESULT_CODE_ENUM_T_tag resultCode);
 

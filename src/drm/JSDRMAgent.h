@@ -1,4 +1,4 @@
-// The script face of the DRM agent.
+// The script interface of the DRM agent.
 #ifndef TELIX_SRC_DRM_JSDRMAGENT_H
 #define TELIX_SRC_DRM_JSDRMAGENT_H
 

@@ -11,7 +11,7 @@ GModule* g_platformModule = nullptr;
 
 namespace {
 
-constexpr const char* platformLibrary = "libtelix.so";
+constexpr const char* kPlatformLibrary = "libtelix.so";
 
 } // namespace
 
@@ -21,7 +21,7 @@ int should_load_telix_library() {
         return 1;
     }
     printf("libtelix.so library will load for first time now.\n");
-    load_library(TELIX_PLATFORM_DIRECTORY, platformLibrary);
+    load_library(TELIX_PLATFORM_DIRECTORY, kPlatformLibrary);
     // Only an open that failed is tried again: the handle decides, not what load_library says.
     lib_loaded = g_platformModule != nullptr ? 1 : 0;
     return lib_loaded;
@@ -40,7 +40,7 @@ int load_library(const char* directory, const char* libraryName) {
         g_free(path);
         return 0;
     }
-    int bound = bindPlatformCalls(g_platformModule);
+    const int bound = bindPlatformCalls(g_platformModule);
     if (bound == 0) {
         g_module_close(g_platformModule); // the handle stays set on purpose: there is no second attempt
     }

@@ -1,4 +1,4 @@
-// The list of live video/broadcast objects: publishing it to platform threads and clearing up behind.
+// The list of live video/broadcast objects: publishing it to platform threads, and freeing what is replaced.
 #include "src/videobroadcast/InstanceList.h"
 
 #include <glib.h>
@@ -10,16 +10,15 @@ InstanceList::~InstanceList() {
         g_source_remove(m_sweepSource);
     }
     m_replaced.emplace_back(m_published.exchange(nullptr));
-    // Whoever looks something up from here on finds an empty list; the last look-up before is over in no
-    // time.
+    // Whoever looks something up from here on finds an empty list; the last look-up before that ends at once.
     while (m_readers.load() != 0) {
         std::this_thread::yield();
     }
 }
 
 LiveRef<VideoBroadcast> InstanceList::find(unsigned int handle) const {
-    // Counted in before the copy is taken up: a sweep that counts nobody knows that whoever comes later finds
-    // a newer copy than those that it frees.
+    // Counted in before the copy is taken up: a sweep that counts no reader knows that a later reader finds a
+    // newer copy than those that it frees.
     m_readers.fetch_add(1);
     LiveRef<VideoBroadcast> found;
     if (const Entries* published = m_published.load()) {

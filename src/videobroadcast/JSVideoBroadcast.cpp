@@ -33,14 +33,14 @@ bool invokeCounted(PluginBase& model, const NPVariant* args, unsigned int argCou
     return argCount >= std::tuple_size_v<Arguments> && invoke<Operation>(model, args, argCount, result);
 }
 
-// Meant: unlike the other handlers, whatever is no object clears it.
+// Meant: unlike the other handlers, whatever is not an object clears it.
 bool writeOnParentalRatingChange(PluginBase& model, const NPVariant& value) {
     videoBroadcast(model).setOnParentalRatingChange(fits<NPObject*>(value) ? value.value.objectValue
                                                                            : nullptr);
     return true;
 }
 
-// Meant: whatever is no object clears the handler of rating changes and leaves this one as it was.
+// Meant: whatever is not an object clears the handler of rating changes and leaves this one as it was.
 bool writeOnParentalRatingError(PluginBase& model, const NPVariant& value) {
     if (fits<NPObject*>(value)) {
         videoBroadcast(model).setOnParentalRatingError(value.value.objectValue);
@@ -71,7 +71,7 @@ bool setChannelByTriplet(PluginBase& model, const NPVariant* args, unsigned int 
     return false;
 }
 
-// Takes a channel or null; a second argument that is no boolean counts as false.
+// Takes a channel or null; a second argument that is not a boolean counts as false.
 bool setChannel(PluginBase& model, const NPVariant* args, unsigned int argCount, NPVariant&) {
     if (argCount < 1 || !(fits<NPObject*>(args[0]) || args[0].type == NPVariantType_Null)) {
         return false;
@@ -86,8 +86,8 @@ bool setChannel(PluginBase& model, const NPVariant* args, unsigned int argCount,
     return true;
 }
 
-// Refused even with the types that it asks for: it would read the object as a text and the last text as a
-// listener, and neither is one.
+// Refused even with the types that it asks for: it would read the object as a string and the last string as a
+// listener.
 bool addCarouselListener(PluginBase&, const NPVariant* args, unsigned int argCount, NPVariant&) {
     if (argCount >= 3 && fits<std::string>(args[0]) && fits<NPObject*>(args[1]) &&
         fits<std::string>(args[2])) {
@@ -96,7 +96,7 @@ bool addCarouselListener(PluginBase&, const NPVariant* args, unsigned int argCou
     return false;
 }
 
-// The page's form (address, name, listener), or the registering one (address, name, id, component tag).
+// The page's form (URL, name, listener), or the registering one (URL, name, id, component tag).
 bool addStreamEventListener(PluginBase& model, const NPVariant* args, unsigned int argCount,
                             NPVariant& result) {
     using PageForm = void (Model::*)(const std::string&, const std::string&, NPObject*);

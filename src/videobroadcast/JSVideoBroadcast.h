@@ -1,4 +1,4 @@
-// The script face of the video/broadcast object.
+// The script interface of the video/broadcast object.
 #ifndef TELIX_SRC_VIDEOBROADCAST_JSVIDEOBROADCAST_H
 #define TELIX_SRC_VIDEOBROADCAST_JSVIDEOBROADCAST_H
 

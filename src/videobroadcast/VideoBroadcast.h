@@ -46,7 +46,7 @@ public:
     static LiveRef<VideoBroadcast> refOf(unsigned int handle);
 
     static void addInstance(VideoBroadcast* instance);
-    // The last object to go takes the platform's callbacks along.
+    // The last object to go unregisters the platform's callbacks.
     static void deleteInstance(VideoBroadcast* instance);
     // Whether the address is that of a listed object, which need not be the one that was there before.
     static bool checkValidInstance(VideoBroadcast* instance);
@@ -82,11 +82,11 @@ public:
     void setPlayState(int state);
     int getPlayState();
 
-    // Meant: hides the base's operation, which knows nothing of the platform.
+    // Meant: hides the base's operation, which does not ask the platform.
     bool isFullScreen();
     void setFullScreenChange(bool bFullScreen);
 
-    // Gives the platform handle back and keeps its value: later calls are still made with it.
+    // Releases the platform handle and keeps its value: later calls are still made with it.
     void release();
 
     bool isActive() const { return m_isActive; }
@@ -117,10 +117,10 @@ public:
                                 NPObject* streamEventListener);
     void addStreamEventListener(const std::string& targetUrl, const std::string& eventName,
                                 const std::string& eventId, const std::string& componentTag);
-    // Ends the latest subscription to the address, whatever its name.
+    // Ends the latest subscription to the URL, whatever its name.
     void removeStreamEventListener(const std::string& targetUrl, const std::string& eventName,
                                    NPObject* streamEventListener);
-    // The index of the latest subscription to the address, or -1.
+    // The index of the latest subscription to the URL, or -1.
     unsigned int getStreamEventInfo(const std::string& targetUrl);
     void deleteStreamEventInfo();
 
@@ -133,7 +133,7 @@ public:
     void stop();
 
     // What is on. Each gives null where there is nothing; the caller owns one reference of what it is given,
-    // unless another number is told.
+    // unless another number is stated.
     NPObject* createChannelObject(unsigned int idType, unsigned int onid, unsigned int tsid,
                                   unsigned int sid);
     NPObject* createChannelObject(unsigned int idType, const unsigned char* dsd, unsigned int length,

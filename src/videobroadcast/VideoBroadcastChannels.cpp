@@ -1,4 +1,4 @@
-// The video/broadcast object: tuning, and what it tells of channels, programmes and components.
+// The video/broadcast object: tuning, channels, programmes and components.
 #include <iterator>
 
 #include "common/Log.h"
@@ -162,7 +162,7 @@ NPObject* VideoBroadcast::getChannelConfig() {
     return config;
 }
 
-// Meant: a collection once made is never made anew, whatever changes.
+// Meant: a collection once made is never made again, whatever changes.
 NPObject* VideoBroadcast::getProgrammes() {
     if (!m_programmesObj) {
         uint32_t count = 0;

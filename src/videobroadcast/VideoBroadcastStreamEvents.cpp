@@ -16,8 +16,8 @@
 
 namespace {
 
-bool startsWithIgnoringCase(const std::string& text, const char* start) {
-    return strncasecmp(text.c_str(), start, std::strlen(start)) == 0;
+bool startsWithIgnoringCase(const std::string& string, const char* start) {
+    return strncasecmp(string.c_str(), start, std::strlen(start)) == 0;
 }
 
 // Calls the element's addEventListener or removeEventListener for stream events.
@@ -85,7 +85,7 @@ void VideoBroadcast::addStreamEventListener(const std::string& targetUrl, const 
     m_StreamEventList.push_back({targetUrl, tag, eventId, eventName});
     PLUGIN_LOG(VIDEOBCAST, "Event Name: %s , Id: %s , CTag: %s \n", eventName.c_str(), eventId.c_str(),
                tag.c_str());
-    // The subscription stays whatever the platform answers.
+    // The subscription stays whatever the platform returns.
     TELIX_JS_VB_RegisterStreamEvent(m_vbHandle, streamEventHandler, eventId.c_str(), tag.c_str(),
                                     eventName.c_str());
 }

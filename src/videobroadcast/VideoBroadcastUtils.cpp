@@ -1,5 +1,5 @@
-// The road of a broadcast event: callback on a platform thread, record, main loop, delivery to the page. Each
-// event's payload, copy, disposal, delivery and callback stand together below.
+// The events of the broadcast: callback on a platform thread, record, main loop, delivery to the page. Each
+// event's payload, copy, disposal, delivery and callback are together below.
 #include "src/videobroadcast/VideoBroadcastUtils.h"
 
 #include <glib.h>
@@ -30,7 +30,7 @@ VideoBcastEvent* newEvent(TELIX_JS_VB_HANDLE vbHandle, VBEventType type) {
     auto* event = new VideoBcastEvent;
     event->vbInstance = VideoBroadcast::refOf(vbHandle);
     if (!event->vbInstance.address()) {
-        // Left behind: the record of an event that nobody gets.
+        // Left behind: the record of an event without a receiver.
         // NOLINTNEXTLINE(clang-analyzer-cplusplus.NewDeleteLeaks)
         return nullptr;
     }
@@ -79,7 +79,7 @@ void deliverNoEvent(VideoBroadcast&, const std::string&, void*) {
 
 struct StreamEventData {
     StreamEventData(const void* szName, const void* bytes, size_t length, const void* szStatus) {
-        // Memory that runs out leaves the texts behind it away.
+        // If memory runs out, the strings that follow stay null.
         name = copyOf(szName, std::strlen(static_cast<const char*>(szName)));
         data = name ? copyOf(bytes, length) : nullptr;
         status = data ? copyOf(szStatus, std::strlen(static_cast<const char*>(szStatus))) : nullptr;
@@ -232,7 +232,7 @@ TELIX_RETCODE_ENUM_T onProgrammesChangedCb(TELIX_JS_VB_HANDLE vbHandle) {
 
 namespace {
 
-// ---- Parental rating that changed, or that could not be told
+// ---- Parental rating that changed, or that could not be determined
 
 struct ParentalRatingEvent {
     ParentalRatingEvent(const ___UINT8* first, TELIX_JS_SI_PARENTALRATING_HANDLE handle,
@@ -256,7 +256,7 @@ void deliverParentalRating(VideoBroadcast& videoBroadcast, const std::string&, v
     if (!handler || !rating) {
         return;
     }
-    // The browser reads the text where it stands.
+    // The browser reads the string in place.
     const auto textArgument = [](NPVariant& argument, const std::string& text) {
         if (text.empty()) {
             setNull(argument);

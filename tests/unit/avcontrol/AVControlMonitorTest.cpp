@@ -531,7 +531,7 @@ TEST_F(AVControlMonitor, TheEndWaitsThreeSecondsForAPostedChangeAndThenGoesOn) {
     const EmbeddedObject object = watched();
     auto* model = static_cast<AVControl*>(object.model());
     object.destroy();
-    // A change that is posted now comes behind the step that deletes the object.
+    // A change that is posted now comes after the step that deletes the object.
     onPlatformThread([&] { model->changePlayState(PLAY_STATE_PLAYING, PLAY_STATE_ERROR); });
     onPlatformThread([&] { model->changeReadyState(5); });
     onPlatformThread([&] { model->handlePlayPositionChanged(); });

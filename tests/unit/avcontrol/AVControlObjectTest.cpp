@@ -209,7 +209,7 @@ INSTANTIATE_TEST_SUITE_P(
 TEST_F(AVControlObject, AnUnknownTypeStaysUnknownWhateverItsAddressEndsIn) {
     const EmbeddedObject object =
         element("video/mp4", {{"id", "video"}, {"src", "http://media.example/a.mp4"}});
-    // The header text of a stream takes the place of the MIME type.
+    // The headers of a stream take the place of the MIME type.
     object.newStream("http://other.example/a", "Content-Type: application/octet-stream\r\n").write("data");
     object.set("data", "http://media.example/b.mp4");
     object.call("play", 1);
@@ -283,7 +283,7 @@ TEST_F(AVControlObject, AShortSoundMarksTheObjectForGood) {
         const EmbeddedObject object = video(sound);
         object.set("data", kClip);
         EXPECT_EQ(object.call("play", 1), true) << sound;
-        EXPECT_EQ(state(object), Stopped) << sound; // the way of the sounds, which changes no state
+        EXPECT_EQ(state(object), Stopped) << sound; // sounds change no state
         destroy(object);
     }
 }

@@ -26,7 +26,7 @@ TEST_F(AVControlRights, ReachTheListenerWithFourArgumentsAfterTheEvent) {
     EXPECT_EQ(state(object), Playing);
     EXPECT_EQ(object.get("error"), undefined);
     leftBehind(listener); // each event leaves one
-    memoryLeftBehind(3);  // and the texts of its arguments
+    memoryLeftBehind(3);  // and the strings of its arguments
 }
 
 TEST_F(AVControlRights, LeaveAReferenceToTheListenerEachTime) {

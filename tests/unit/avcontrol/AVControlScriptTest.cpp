@@ -1,4 +1,4 @@
-// The script interface: every name, what it reads, takes and refuses, and the components behind it.
+// The script interface: every name, what it reads, takes and refuses, and the components.
 #include "tests/unit/avcontrol/AVControlTest.h"
 
 using ::testing::ElementsAre;
@@ -271,7 +271,7 @@ TEST_F(AVControlScript, ArgumentsOfAnotherTypeAreRefused) {
 }
 
 TEST_F(AVControlScript, TheArgumentCountIsNotLookedAt) {
-    // The browser's array reads as undefined behind its last argument.
+    // The browser's array reads as undefined after its last argument.
     EXPECT_FALSE(object.call("play").succeeded);
     EXPECT_EQ(object.call("play", 1, "more", nullptr), true);
     EXPECT_EQ(object.call("stop", 1, 2, 3), undefined);

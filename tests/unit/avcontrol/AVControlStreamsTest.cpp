@@ -1,5 +1,5 @@
-// Streams of the browser: what is kept of them, what they tell of the media, and playlists that play as soon
-// as they are read.
+// Streams of the browser: what is kept of them, what they say about the media, and playlists that play as
+// soon as they are read.
 #include "tests/unit/avcontrol/AVControlTest.h"
 
 using ::testing::ElementsAre;
@@ -159,7 +159,7 @@ TEST_F(AVControlStreams, TheFirstChunkIsReadToItsFirstZeroByteAndNotBeyondItsEnd
     const EmbeddedObject object = fetching();
     BrowserStream& stream = object.newStream(kList);
     const std::string head = "<ASX>" + entry("http://media.example/1");
-    // Exactly as long as what is written: whatever lies behind isn't read.
+    // Exactly as long as what is written: whatever follows isn't read.
     std::vector<char> exact(head.begin(), head.end());
     EXPECT_EQ(browser.plugin().write(object.npp(), &stream.record(), 0, static_cast<int32_t>(exact.size()),
                                      exact.data()),
@@ -194,7 +194,7 @@ TEST_F(AVControlStreams, APlaylistWithoutClipsHasNothingToPlay) {
     EXPECT_EQ(object.get("nrTracks"), 0);
     EXPECT_THAT(playerCalls(), IsEmpty());
     EXPECT_EQ(state(object), Stopped);
-    EXPECT_EQ(object.call("play", 1), false); // it stays a playlist, with an empty address
+    EXPECT_EQ(object.call("play", 1), false); // it stays a playlist, with an empty URL
 }
 
 TEST_F(AVControlStreams, TheSamePlaylistEndsTwiceWithNothingLeft) {
@@ -202,7 +202,7 @@ TEST_F(AVControlStreams, TheSamePlaylistEndsTwiceWithNothingLeft) {
     BrowserStream& stream = object.newStream(kList);
     stream.write(asx({entry("http://media.example/1")}));
     stream.destroy();
-    stream.destroy(); // the text has been read
+    stream.destroy(); // the playlist has been read
     EXPECT_EQ(object.get("nrTracks"), 0);
 }
 

@@ -26,8 +26,8 @@ void onForeignThread(const std::function<void()>& function) {
     std::thread(function).join();
 }
 
-// Between the first double quote behind `before` and the next.
-std::string quotedBehind(const std::string& text, const std::string& before) {
+// Between the first double quote after `before` and the next.
+std::string quotedAfter(const std::string& text, const std::string& before) {
     const size_t first = text.find(before) + before.size();
     return text.substr(first, text.find('"', first) - first);
 }
@@ -68,7 +68,7 @@ AVControlTest::AVControlTest() {
     platform.TELIX_JS_AV_GetPlayInfo = [](TELIX_JS_AV_HANDLE, TELIX_JS_AV_PLAY_INFO**) { return 1; };
 
     browser.whenEvaluatingTextFrom("window.getEncodedURL = ").does([this](const Evaluation& evaluation) {
-        const std::string url = encoded(quotedBehind(evaluation.text, "encodeURI(\""));
+        const std::string url = encoded(quotedAfter(evaluation.text, "encodeURI(\""));
         browser.window().method("getEncodedURL", [url](const Values&) { return Value(url); });
         return undefined;
     });

@@ -1,5 +1,5 @@
 // The fixture of the A/V control tests: a page with one media element or several, the platform's callbacks, a
-// page that encodes addresses as a browser does, and the clock of the monitors.
+// page that encodes URLs as a browser does, and the clock of the monitors.
 #ifndef TELIX_TESTS_UNIT_AVCONTROL_AVCONTROLTEST_H
 #define TELIX_TESTS_UNIT_AVCONTROL_AVCONTROLTEST_H
 
@@ -70,7 +70,7 @@ private:
     TELIX_JS_AV_DRM_RIGHTS_CB m_rightsCallback = nullptr;
 };
 
-// A playlist document of these clips; what a clip is given beside its address stands behind a blank.
+// A playlist document of these clips; what a clip is given beside its URL follows a blank.
 std::string asx(const std::vector<std::string>& entries);
 std::string entry(const std::string& url, const std::string& more = "");
 

@@ -1,4 +1,4 @@
-// Playlists: what a text is read as, what is logged on the way, and the order in which clips come.
+// Playlists: how a string is read, what is logged, and the order of the clips.
 #include "src/avcontrol/Asx.h"
 
 #include <gtest/gtest.h>
@@ -43,7 +43,7 @@ std::vector<std::string> logOf(const std::function<void()>& work) {
     EXPECT_EQ(waitpid(child, &status, 0), child);
     EXPECT_EQ(status, 0);
 
-    // The texts end without a line end, so the lines are parted by what each begins with.
+    // The statements end without a line end, so the lines are parted by what each begins with.
     const std::string start = " PLUGIN >>> AVCONTROL :: ";
     std::vector<std::string> lines;
     size_t at = text.find(start);
@@ -61,7 +61,7 @@ using Lines = std::vector<std::string>;
 
 class Asx : public testing::Test {
 protected:
-    // The texts about the whole list outlast a parse, so each test begins by setting them to nothing.
+    // The strings of the whole list outlast a parse, so each test begins by setting them to nothing.
     void SetUp() override {
         asxParseAsx("<ASX><TITLE></TITLE><Author></Author><Copyright></Copyright><ABSTRACT></ABSTRACT>"
                     "<BASE HREF=\"\"/></ASX>",
@@ -280,7 +280,7 @@ TEST_F(Asx, ListWithoutClipsKeepsNoParametersAndNoRepeat) {
                                        "asxSetCurrentClipIndex :: ASX error (i=1, total=0)"}));
 }
 
-// Tags with a text
+// Tags with a string
 
 class AsxTextTag : public Asx, public testing::WithParamInterface<TagAndField<std::string>> {
 protected:
@@ -462,7 +462,7 @@ TEST_F(Asx, NoNameLeadsToAParametersValue) {
     EXPECT_EQ(asxGetParam(9, "a"), "");
 }
 
-// Addresses
+// URLs
 
 TEST_F(Asx, BaseAndPathAreJoinedByOneSlash) {
     EXPECT_EQ(asxAppendBaseUrl("http://a", "b"), "http://a/b");
@@ -950,8 +950,8 @@ TEST_F(Asx, PrintOfAnEmptyListLogsItsFailureToFindAClip) {
     EXPECT_EQ(lines[8], "asxPrintAsxData :: ASX Total Clip Number: 0");
 }
 
-// Large texts: each of these would take minutes or hours if a search ran through the rest of the text for
-// every tag.
+// Large playlists: each of these would take minutes or hours if a search ran through the rest of the string
+// for every tag.
 
 TEST_F(Asx, HundredThousandClipsInTenMegabytesAreRead) {
     std::string body;
@@ -1008,7 +1008,7 @@ TEST_F(Asx, TagsThatNothingClosesAreSteppedOver) {
     }
 }
 
-// Random texts
+// Random playlists
 
 std::string randomText(std::mt19937& random) {
     static const char* const pieces[] = {"<ASX>",
@@ -1066,7 +1066,7 @@ std::string randomText(std::mt19937& random) {
     return text;
 }
 
-// All that can be read from the list, in one text.
+// All that can be read from the list, in one string.
 std::string contents() {
     std::string all;
     const auto add = [&all](const std::string& text) { all.append(text).append("|"); };

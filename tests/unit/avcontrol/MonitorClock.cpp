@@ -1,4 +1,4 @@
-// The clock behind the test's own `sleep`. It waits with plain pthread calls, since a monitor is cancelled
+// The clock of the test's own `sleep`. It waits with plain pthread calls, since a monitor is cancelled
 // while it sleeps.
 #include "tests/unit/avcontrol/MonitorClock.h"
 

@@ -1,5 +1,4 @@
-// The DRM agent: messages to the platform, and the way of the results from the platform's threads to the
-// page.
+// The DRM agent: messages to the platform, and the results from the platform's threads to the page.
 #include <cstdlib>
 #include <cstring>
 #include <limits>
@@ -21,7 +20,7 @@ const char* const kType = "application/oipfdrmagent";
 
 class DRMAgentTest : public BorderTest {
 protected:
-    // What the platform does when a result has come. The texts are gone when the callback returns.
+    // What the platform does when a result has come. The strings are gone when the callback returns.
     void platformReports(const std::string& messageId, const std::string& message, int32_t code) const {
         std::vector<unsigned char> id(messageId.begin(), messageId.end());
         std::vector<unsigned char> text(message.begin(), message.end());
@@ -53,7 +52,7 @@ protected:
 
     Outcome send() const { return agent.call("sendDRMMessage", "type", "message", "system"); }
 
-    // What each call of a handler leaves: its reference and the blocks of both texts.
+    // What each call of a handler leaves: its reference and the blocks of both strings.
     void callsLeave(const ScriptFunction& handler, int calls) {
         leftBehind(handler, calls);
         memoryLeftBehind(2 * static_cast<size_t>(calls));

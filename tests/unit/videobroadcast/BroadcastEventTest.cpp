@@ -1,4 +1,4 @@
-// The events of the broadcast on their way from a platform thread to the page.
+// The events of the broadcast, from a platform thread to the page.
 #include "src/videobroadcast/VideoBroadcastUtils.h"
 
 #include <memory>
@@ -27,7 +27,7 @@ protected:
         };
     }
 
-    // A new object with a handler in the slot and a clean log behind it.
+    // A new object with a handler in the slot; the log is cleared afterwards.
     EmbeddedObject ready(const std::string& slot = "", const std::string& id = "tv") {
         const EmbeddedObject vb = embed(id);
         vb.scriptObject();
@@ -389,7 +389,7 @@ TEST_F(BroadcastEventTest, AChangeOfChannelBringsTheListsOwnObject) {
     const ObjectRef list = config.get("channelList").object();
     const ObjectRef channel = handler.last()[0].object();
     EXPECT_EQ(channel, list.call("item", 1).object());
-    // The references that the handler was prepared with stay behind.
+    // The references that the handler was prepared with are never released.
     EXPECT_EQ(handler.pluginReferences(), 2);
     EXPECT_EQ(config.pluginReferences(), 2);
     EXPECT_EQ(list.pluginReferences(), 2);

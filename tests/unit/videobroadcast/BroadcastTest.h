@@ -44,7 +44,8 @@ protected:
         };
     }
 
-    // The first object has the platform handle 7, the next one 8 and so on. An empty id leaves it away.
+    // The first object has the platform handle 7, the next one 8 and so on. An empty id leaves the attribute
+    // out.
     EmbeddedObject embed(const std::string& id = "tv") {
         return browser.embed("video/broadcast", id.empty() ? Attributes{} : Attributes{{"id", id}});
     }

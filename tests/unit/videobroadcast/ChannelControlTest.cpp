@@ -1,4 +1,4 @@
-// Tuning, and what the video/broadcast object tells of channels, programmes and components.
+// Tuning, channels, programmes and components of the video/broadcast object.
 #include <gmock/gmock.h>
 
 #include "tests/unit/videobroadcast/BroadcastTest.h"

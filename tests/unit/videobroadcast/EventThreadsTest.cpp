@@ -99,7 +99,7 @@ protected:
 
     void startThreads(unsigned int handles) {
         for (int thread = 0; thread < kThreads; ++thread) {
-            // With a copy of the callbacks: the platform is given them anew whenever a first object comes.
+            // With a copy of the callbacks: the platform is given them again whenever a first object comes.
             threads.emplace_back(
                 [this, given = callbacks, thread, handles] { call(given, thread, handles); });
         }
