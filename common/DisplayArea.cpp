@@ -5,6 +5,7 @@
 
 namespace {
 
+// quirk 62: full screen is this size whatever the screen.
 constexpr int32_t kScreenWidth = 1280;
 constexpr int32_t kScreenHeight = 720;
 

@@ -22,7 +22,7 @@ std::string fillIn(std::string_view script, std::initializer_list<std::string_vi
 
 // Fetches the description and looks for the event in its XML form, then in its comma-separated form.
 // quirk 12: names that are not declared become globals of the page.
-// quirk 91: the loop over the comma-separated form compares `event`, not the entry just split.
+// quirk 92: the loop over the comma-separated form compares `event`, not the entry just split.
 const std::string_view kStreamEventRequestScript = R"js(
 var requestURL = '@@'; var eventName = '@@';
 var httpReq = new XMLHttpRequest();

@@ -47,8 +47,8 @@ const StreamOperations kStreamOperations = {
         controlOf(model).urlNotify(url, reason, notifyData);
     }};
 
-// The length of a clip. Meant: a clip of less than an hour leaves the hours of an earlier one, and one that
-// is not longer than a second leaves all three.
+// The length of a clip, for the log. A clip of less than an hour leaves the hours of an earlier one, and one
+// that is not longer than a second leaves all three.
 struct ReportedLength {
     std::atomic<int> hours{0};
     std::atomic<int> minutes{0};

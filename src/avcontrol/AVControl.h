@@ -105,6 +105,7 @@ public:
     // Reads the element's place in the page.
     void setPluginRegionFromDOM();
     // The sizes last read there. Script may overwrite them until the next reading.
+    // quirk 61: the next read of the region replaces both.
     void setWidth(int32_t width) { m_displayArea.region().width = width; }
     void setHeight(int32_t height) { m_displayArea.region().height = height; }
     int32_t getWidth() const { return m_displayArea.region().width; }
@@ -285,7 +286,7 @@ private:
     DisplayArea m_displayArea{RectangleResult::Tested};
     // The URL in play: an immutable string that is exchanged as a whole, since the monitor reports it.
     std::shared_ptr<const std::string> m_currentMedia = std::make_shared<const std::string>();
-    NPObject* m_onFullScreenChange = nullptr; // meant: never released at the end
+    NPObject* m_onFullScreenChange = nullptr; // never released at the end
     NPObject* m_onPlaySpeedChanged = nullptr;
     NPObject* m_onPlayPositionChanged = nullptr;
     std::queue<std::string> m_urlQueue; // mirrors what the platform has been given to play next

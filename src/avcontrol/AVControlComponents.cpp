@@ -17,6 +17,7 @@ NPObject* AVControl::getComponents(int32_t type) {
     };
     switch (type) {
     case AVCOMP_TYPE_VIDEO:
+        // quirk 36: a list is built once, whatever media follow.
         return cached(m_videoComponents);
     case AVCOMP_TYPE_AUDIO:
         return cached(m_audioComponents);
@@ -28,7 +29,7 @@ NPObject* AVControl::getComponents(int32_t type) {
 }
 
 NPObject* AVControl::getCurrentActiveComponents(int32_t type) {
-    // Meant: one reference more than the caller's, so that each of these lists stays for good.
+    // One reference more than the caller's, never released: each of these lists stays for good.
     return handOut(getComponentList(type, true));
 }
 

@@ -49,11 +49,11 @@ int handleDRMRightsErrorEvent(void* record) {
     AVControl* instance = g_lastPlayedInstance;
     auto* event = static_cast<DRMRgtsErrEvtData*>(record);
     if (!instance || !event) {
-        return 0; // meant: the record is left behind
+        return 0; // the record is not freed
     }
-    // A control that plays must have an id for this.
+    // quirk 75: an element without an id stops the process here.
     instance->invokeJScript(domEventScript(instance->getId(), "DRMRightsError", false, false));
-    // Meant: the getter's reference is left behind, and the strings stay with whoever took the arguments.
+    // The getter's reference is never released, and the strings stay with whoever took the arguments.
     if (NPObject* listener = instance->getOnDRMRightsError()) {
         NPVariant arguments[1 + DRMRgtsErrEvtData::kStrings] = {};
         setResult(arguments[0], event->errorState());

@@ -74,8 +74,8 @@ void AVControl::detectMediaType(const std::string& type) {
     const std::string url = getURL();
     const size_t dot = url.rfind('.');
     if (m_mediaType == kMediaUnknown && dot != std::string::npos) {
-        // Meant: the tail keeps its dot and the table's extensions have none, so an unknown type stays
-        // unknown whatever its URL ends in.
+        // The tail keeps its dot and the table's extensions have none, so an unknown type stays unknown
+        // whatever its URL ends in.
         const std::string tail = url.substr(dot);
         for (const PluginMimeType* row = pluginMimeType; row->extension && *row->extension; ++row) {
             if (equal(tail, row->extension)) {
@@ -88,7 +88,7 @@ void AVControl::detectMediaType(const std::string& type) {
 void AVControl::setData(const std::string& url) {
     const size_t dot = url.rfind('.');
     if (dot != std::string::npos) {
-        // Meant: neither flag is cleared by a later URL.
+        // quirk 64: neither mark is taken back by a later URL.
         const std::string tail = url.substr(dot);
         if (equal(tail, ".aac") || equal(tail, ".wav")) {
             PLUGIN_LOG(AVCONTROL, "Memory audio with file extension .aac or .wav ");
@@ -101,7 +101,7 @@ void AVControl::setData(const std::string& url) {
     stop();
     m_data = !url.empty() && url.find("://") == std::string::npos ? getBaseURL(url) : url;
     encodeURL();
-    // What script reads back is the encoded form; if the page could not encode it, the previous URL.
+    // quirk 63: script reads back the encoded form; if the page could not encode, the URL before.
     m_data = getURL();
     m_mediaType = kMediaUnknown;
     detectMediaType(m_mimeType);

@@ -199,7 +199,7 @@ void AVControl::Monitor::poll() {
     }
     pthread_setcancelstate(PTHREAD_CANCEL_DISABLE, nullptr);
     if (!player) {
-        return; // meant: cancellation stays disabled
+        return; // cancellation stays disabled on this way out
     }
     pollPlayer(player);
     pthread_setcancelstate(PTHREAD_CANCEL_ENABLE, nullptr);
@@ -244,7 +244,7 @@ bool AVControl::Monitor::readPlayInfo(uint32_t player, TELIX_JS_AV_PLAY_INFO& in
     }
     const bool hasReport = record->buffered != kNoBufferReport;
     if (hasReport && record->buffered >> 24 == kFlagged) {
-        record->buffered &= kAmountMask; // meant: in the platform's own record
+        record->buffered &= kAmountMask; // in the platform's own record
         control->setRunBufferingThread(false);
         return false;
     }

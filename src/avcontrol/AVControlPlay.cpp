@@ -95,8 +95,8 @@ bool AVControl::play(double speed) {
         break;
     case PLAY_STATE_PAUSED:
         m_playSpeed = 1.0;
-        // Meant: no event for the ready state, the play state changes whatever the platform said, and the
-        // result stays false.
+        // quirk 54: the play state changes whatever the platform said, and the result stays false.
+        // The ready state changes without an event.
         if (TELIX_JS_AV_Resume(m_playerHandle) == 0 && m_readyState == kReadyStateRefilled) {
             m_readyState = kReadyStateHaveFutureData;
         }
@@ -122,6 +122,7 @@ bool AVControl::waitsForStream() {
     return true;
 }
 
+// quirk 53: a refusal leaves the buffering state until a message comes.
 bool AVControl::beginMedia() {
     if (currentMedia().empty()) {
         return false;
@@ -171,7 +172,7 @@ bool AVControl::beginStop() {
     m_durationLast = 0;
     m_currentPositionLast = 0;
     destroyBufferingThread();
-    // The pipeline of another object is left alone.
+    // quirk 51: the pipeline of another object is not stopped.
     return m_playerHandle && g_lastPlayedInstance == this;
 }
 
@@ -184,13 +185,13 @@ bool AVControl::seek(unsigned int ms) {
     if (!m_playerHandle || currentMedia().empty()) {
         return false;
     }
-    // These kinds of stream can't seek: they restart at the new position.
+    // quirk 58: a stream of these kinds starts again at the seek target; the page stands still meanwhile.
     const bool restart = m_containerCode == kContainerMp3 || startsWith(currentMedia(), "mms://");
     if (restart) {
         changePlayState(PLAY_STATE_BUFFERING);
         destroyBufferingThread();
         if (TELIX_JS_AV_Stop(m_playerHandle) == 0) {
-            sleep(1); // meant, also on the browser thread: lets the pipeline settle
+            sleep(1); // also on the browser thread: lets the pipeline settle
         }
     }
     const bool taken = TELIX_JS_AV_Seek(m_playerHandle, ms) == 0;
@@ -212,7 +213,7 @@ void AVControl::setPlaySpeed(double speed) {
     if (!m_playerHandle) {
         return;
     }
-    // Meant: what is sent is the speed in force until now; a change reaches the platform one call late.
+    // quirk 55: what is sent is the speed in force until now; a change reaches the platform one call late.
     const std::string text = withOneDecimal(m_playSpeed);
     PlatformSpeed sent{};
     if (!parseSpeed(text, sent)) {
@@ -232,7 +233,7 @@ void AVControl::setPlaySpeed(double speed) {
     }
 }
 
-// Short sounds change no state, have no monitor and don't take over the pipeline.
+// quirk 65: short sounds change no state, have no monitor and don't take the pipeline over.
 void AVControl::playSound() {
     invokeJScript(getPlayCountVal(getId()));
     NPVariant count{};
@@ -244,7 +245,7 @@ void AVControl::playSound() {
     }
     selectMedia();
     PLUGIN_LOG(AVCONTROL, "Media File URL:: %s, PlayCount:: %d \n", currentMedia().c_str(), m_playCount);
-    // Meant: not the platform's function for sounds, whatever the log says.
+    // Not the platform's function for sounds, whatever the log says.
     if (!currentMedia().empty() && handOverMedia()) {
         PLUGIN_LOG(AVCONTROL, " Called:: IF API TELIX_JS_AV_PlaySound returned success \n");
     }
@@ -271,7 +272,8 @@ bool AVControl::queue(const std::string& url) {
     if (!url.empty()) {
         m_urlQueue.push(url);
     } else if (!m_urlQueue.empty()) {
-        m_urlQueue.pop(); // meant: the front one
+        // quirk 59: the front one goes, not the last.
+        m_urlQueue.pop();
     }
     return true;
 }
@@ -308,6 +310,7 @@ unsigned int AVControl::getNrTracks() const {
 void AVControl::getPlayInfo(unsigned int* duration, unsigned int* position) {
     *duration = 0;
     *position = 0;
+    // quirk 57: after the end of a clip both read 0.
     if (!m_playerHandle || g_lastReceivedMessage == TELIX_AV_CB_MSG_PLAYEND) {
         PLUGIN_LOG(AVCONTROL, "Error:m_playerHandle=( %d ), g_lastReceivedMessage=( %d )\n", m_playerHandle,
                    g_lastReceivedMessage.load());
@@ -317,7 +320,7 @@ void AVControl::getPlayInfo(unsigned int* duration, unsigned int* position) {
     if (TELIX_JS_AV_GetPlayInfo(m_playerHandle, &info) == 0 && info &&
         !(info->state == 1 && info->duration == 0 && info->playPosition == 0)) {
         m_durationLast = info->duration;
-        // Within the last second a clip reads as complete.
+        // quirk 56: within the last second a clip reads as complete.
         m_currentPositionLast =
             info->duration - info->playPosition < kLastSecond ? info->duration : info->playPosition;
     }

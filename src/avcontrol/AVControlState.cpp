@@ -66,7 +66,7 @@ constexpr ScriptError kScriptErrors[] = {
 
 } // namespace
 
-// The message selects its object by no handle: whatever player has sent it, it is for the one pipeline.
+// quirk 51: the handle selects nothing; a message is for the object that played last.
 int AVControl::onPlayStateChangeCb(unsigned int handle, TELIX_AV_CB_MSG msg) {
     PLUGIN_LOG(AVCONTROL, "Received message from tv : (%x)\n", msg);
     auto* event = new AVPlayStateEvent;
@@ -82,7 +82,7 @@ int AVControl::onPlayStateChangeCb(void* record) {
     auto* event = static_cast<AVPlayStateEvent*>(record);
     AVControl* instance = g_lastPlayedInstance;
     if (!event || !instance) {
-        // Meant: the small record of a message after the last player has gone is left behind.
+        // The small record of a message after the last player has gone is not freed.
         return 0;
     }
     instance->handlePlayStateChange(event->playerHandle, event->message);
@@ -150,12 +150,13 @@ void AVControl::endOfClip() {
     if (asxIsEndofRepeat()) {
         asxGotoStartofRepeat();
     } else if (!asxNextClip()) {
-        // Meant: the other way round than for a single clip.
+        // In the reverse order of a single clip.
         changePlayState(PLAY_STATE_FINISHED);
         destroyBufferingThread();
         return;
     }
     setCurrentMedia(asxShowClipFileName());
+    // quirk 52: a state of its own until the clip plays.
     changePlayState(PLAY_STATE_NEXT_CLIP);
 }
 
@@ -203,9 +204,11 @@ void AVControl::changePlayState(play_state from, play_state to) {
         play(m_playSpeed);
         return;
     }
+    // quirk 47: without an id neither events nor the listener.
     if (getId().empty()) {
         return;
     }
+    // quirk 49: "Error", "Buffering" and the two of the ready state are of the plug-in's own.
     if (to == PLAY_STATE_ERROR) {
         dispatchDomEvent("Error", false);
     }
@@ -215,12 +218,13 @@ void AVControl::changePlayState(play_state from, play_state to) {
         dispatchDomEvent("Buffering", false);
     }
     dispatchDomEvent("PlayStateChange", false);
+    // quirk 48: listeners of this object read the new value themselves.
     if (m_onPlayStateChange) {
         invokeJScriptFunc(m_onPlayStateChange, nullptr, 0);
     }
 }
 
-// Meant: a change that was posted before the object began to go still runs.
+// A change that was posted before the teardown of the object began still runs.
 void AVControl::changePlayStateCb(void* record) {
     auto* change = static_cast<PlayStateChange*>(record);
     if (AVControl* object = change->object.get()) {

@@ -17,6 +17,7 @@ constexpr int32_t kChunkSize = 1024;
 NPError AVControl::newStream(NPMIMEType, NPStream* stream, NPBool, uint16_t*) {
     m_streamState = StreamState::Ready;
     // One stream in an object's life; the content of another URL is not looked at.
+    // quirk 69: an object takes one stream in its life.
     if (m_streamSeen) {
         NPN_DestroyStream(m_npp, stream, NPRES_DONE);
         return NPERR_NO_ERROR;
@@ -45,7 +46,7 @@ int32_t AVControl::write(NPStream* stream, int32_t offset, int32_t length, void*
         detectMediaType("");
     }
     if (buffer) {
-        // Meant: without memory the bytes before are given up as well, and the stream goes on.
+        // Without memory the bytes before are given up as well, and the stream goes on.
         m_bodyData = static_cast<char*>(std::realloc(m_bodyData, m_bodySize + length)); // NOLINT
         if (m_bodyData) {
             std::memcpy(m_bodyData + m_bodySize, buffer, length);
@@ -69,7 +70,8 @@ int32_t AVControl::write(NPStream* stream, int32_t offset, int32_t length, void*
     return length;
 }
 
-// Meant: the reason isn't looked at, so what has come of a broken playlist plays.
+// quirk 67: a playlist plays as soon as it has been read.
+// quirk 68: the reason isn't looked at, so what has come of a broken playlist plays.
 NPError AVControl::destroyStream(NPStream*, NPReason) {
     if (!m_isPlayList) {
         return NPERR_NO_ERROR;

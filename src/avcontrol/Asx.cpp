@@ -55,6 +55,7 @@ struct AsxData {
     std::deque<std::string> joinedUrls;
 };
 
+// quirk 70: one record for the process.
 AsxData s_asxData;
 
 char lowerCase(char c) {
@@ -216,7 +217,8 @@ void AsxScanner::readTag() {
         readText("</copyright>", &AsxEntry::copyright, &AsxData::copyright);
     } else if (passPrefix("<abstract>")) {
         readText("</abstract>", &AsxEntry::description, &AsxData::description);
-    } else if (passPrefix("<repeat")) { // nothing parts it from longer names: meant, as for "<entry"
+        // quirk 74: nothing parts these two from longer names.
+    } else if (passPrefix("<repeat")) {
         readRepeat();
     } else if (passPrefix("</repeat>")) {
         readRepeatEnd();
@@ -267,7 +269,7 @@ void AsxScanner::readParam() {
         param = &params.emplace_back(AsxParam{text, {}});
     }
     // Past the closing quote. A tag without a name loses a character of its own, so "<PARAM />" doesn't close
-    // itself: meant.
+    // itself.
     m_at = std::min(m_at + 1, m_text.size());
     if (atAttribute("value")) {
         if (!readQuoted(text) || text.empty() || !param) {
@@ -290,7 +292,8 @@ void AsxScanner::readBase() {
             s_asxData.baseUrl = url;
         }
     }
-    pass("/>"); // a tag closed by ">" alone hides all up to the next "/>": meant
+    // quirk 74: a tag closed by ">" alone hides all up to the next "/>".
+    pass("/>");
 }
 
 void AsxScanner::readRepeat() {
@@ -312,7 +315,7 @@ void AsxScanner::readRepeat() {
     pass(">");
 }
 
-// The section stays marked as opened: a second one is refused, and its end makes the first endless. Meant.
+// quirk 72: the section stays marked as opened; a second one is refused, and its end makes the first endless.
 void AsxScanner::readRepeatEnd() {
     if (!m_repeatOpened) {
         ASX_PARSE_LOG("end of repeat without start");
@@ -365,7 +368,8 @@ void AsxScanner::readRef() {
         }
         m_entry->fileName = href;
         m_lastHref = href;
-        // The joined URL outlives its entry: a later entry under no base at all gets it again. Meant.
+        // quirk 73: the base goes before any URL, and a later entry under no base at all gets the joined one
+        // again.
         const std::string_view base = m_entry->baseUrl.empty() ? s_asxData.baseUrl : m_entry->baseUrl;
         if (!base.empty()) {
             m_joinedUrl =
@@ -405,8 +409,8 @@ void AsxScanner::readEntryEnd() {
     }
 }
 
-// Seconds, or minutes and seconds, or hours, minutes and seconds, into seconds. Colons count wherever in the
-// playlist they follow: "30" before one colon is 30 minutes, before two 30 hours. Meant.
+// Seconds, or minutes and seconds, or hours, minutes and seconds, into seconds.
+// quirk 71: colons count wherever in the playlist they follow; "30" before one is 30 minutes.
 uint32_t AsxScanner::parseTime(std::string_view value) {
     const auto start = static_cast<size_t>(value.data() - m_text.data());
     const size_t end = start + value.size();
@@ -643,7 +647,7 @@ std::string asxGetParamName(unsigned index, unsigned n) {
 }
 
 // Names are looked for in the head of a list, which has neither a name nor a value, and not in its elements.
-// So no name leads to a value, and that is what callers have always been given. Meant.
+// So no name leads to a value, and that is what callers have always been given.
 std::string asxGetParam(unsigned /*index*/, const std::string& /*name*/) {
     return {};
 }

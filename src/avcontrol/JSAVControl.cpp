@@ -53,7 +53,7 @@ bool readError(PluginBase& model, NPVariant& result) {
     return true;
 }
 
-// Meant: null clears the listener of the play state and leaves this one in place.
+// quirk 50: null clears the listener of the play state and leaves this one in place.
 bool writeOnFullScreenChange(PluginBase& model, const NPVariant& value) {
     if (value.type == NPVariantType_Null) {
         controlOf(model).setOnPlayStateChange(nullptr);
@@ -94,6 +94,7 @@ constexpr ScriptMember kMembers[] = {
              writeListener<&Model::setOnPlayStateChange>),
     property("nrTracks", read<&Model::getNrTracks>),
     property("currentTrackIndex", read<&Model::getCurTrackIndex>, write<&Model::setCurTrackIndex>),
+    // quirk 60: stored and read back; no other effect.
     property("persist", read<&Model::getPersist>, write<&Model::setPersist>),
     property("width", read<&Model::getWidth>, write<&Model::setWidth>),
     property("height", read<&Model::getHeight>, write<&Model::setHeight>),

@@ -67,6 +67,7 @@ int handleDRMMessageResultEvent(void* data) {
     auto* result = static_cast<DRMMsgEventData*>(data);
     const LiveRef<DRMAgent> receiver = drmAgentInst;
     if (DRMAgent* agent = receiver.get()) {
+        // quirk 44: an element without an id stops the process here.
         agent->invokeJScript(domEventScript(agent->getId(), "DRMMessageResult", false, false));
         // A listener of the event may have taken the element out of the page, and put another one in.
         NPObject* handler = receiver.get() ? agent->getOnDRMMessageResult() : nullptr;
@@ -75,7 +76,7 @@ int handleDRMMessageResultEvent(void* data) {
                 stringArgument(result->messageId), stringArgument(result->resultMessage), {}};
             setResult(args[2], result->resultCode);
             agent->invokeJScriptFunc(handler, args, 3);
-            // Meant: left behind are the handler's reference from the getter and the blocks of both strings.
+            // Neither the handler's reference from the getter nor the blocks of both strings are released.
         }
     }
     delete result;
@@ -88,7 +89,7 @@ DRMAgent::DRMAgent(NPP npp, unsigned short objectId) : PluginBase(npp, objectId)
 }
 
 DRMAgent::~DRMAgent() {
-    // Meant: once for each agent, also while others live on.
+    // quirk 46: once for each agent, also while others live on.
     TELIX_JS_DRM_UnregisterOnDRMMessageResult(onDRMMessageResultCb);
     releaseHeld(m_jsObject);
     releaseHeld(m_onDRMMessageResult);
@@ -102,6 +103,7 @@ std::string DRMAgent::sendDRMMessage(const std::string& type, const std::string&
                                      const std::string& systemId) {
     PLUGIN_LOG(DRMAGENT, " msgType = ( %s ), msg = ( %s ), DRMSystemID = ( %s ) \n", type.c_str(),
                message.c_str(), systemId.c_str());
+    // quirk 45: a message that is refused gets the id of the preceding one.
     char* id = nullptr;
     if (TELIX_JS_DRM_SendDRMMessage(type.c_str(), message.c_str(), systemId.c_str(), &id) == 0 && id) {
         PLUGIN_LOG(DRMAGENT, " Message Id value returned from IF API = ( %s ) \n", id);

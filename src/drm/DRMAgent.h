@@ -12,8 +12,8 @@ struct ObjectKind;
 
 extern const ObjectKind kDrmAgentKind;
 
-// The agent that every result goes to: the one constructed last. Meant: it stays so when that agent has gone;
-// results then go nowhere.
+// quirk 43: every result goes to the agent constructed last.
+// It stays so when that agent has gone; results then go nowhere.
 extern LiveRef<DRMAgent> drmAgentInst;
 
 // One result that is posted from the platform's thread to the browser's.

@@ -33,14 +33,14 @@ bool invokeCounted(PluginBase& model, const NPVariant* args, unsigned int argCou
     return argCount >= std::tuple_size_v<Arguments> && invoke<Operation>(model, args, argCount, result);
 }
 
-// Meant: unlike the other handlers, whatever is not an object clears it.
+// quirk 79: unlike the other handlers, whatever is not an object clears it.
 bool writeOnParentalRatingChange(PluginBase& model, const NPVariant& value) {
     videoBroadcast(model).setOnParentalRatingChange(fits<NPObject*>(value) ? value.value.objectValue
                                                                            : nullptr);
     return true;
 }
 
-// Meant: whatever is not an object clears the handler of rating changes and leaves this one as it was.
+// quirk 80: whatever is not an object clears the handler of rating changes and leaves this one as it was.
 bool writeOnParentalRatingError(PluginBase& model, const NPVariant& value) {
     if (fits<NPObject*>(value)) {
         videoBroadcast(model).setOnParentalRatingError(value.value.objectValue);
@@ -86,8 +86,8 @@ bool setChannel(PluginBase& model, const NPVariant* args, unsigned int argCount,
     return true;
 }
 
-// Refused even with the types that it asks for: it would read the object as a string and the last string as a
-// listener.
+// quirk 90: refused even with the types that it asks for.
+// It would read the object as a string and the last string as a listener.
 bool addCarouselListener(PluginBase&, const NPVariant* args, unsigned int argCount, NPVariant&) {
     if (argCount >= 3 && fits<std::string>(args[0]) && fits<NPObject*>(args[1]) &&
         fits<std::string>(args[2])) {
@@ -97,6 +97,7 @@ bool addCarouselListener(PluginBase&, const NPVariant* args, unsigned int argCou
 }
 
 // The page's form (URL, name, listener), or the registering one (URL, name, id, component tag).
+// quirk 91: the registering form is open to pages too.
 bool addStreamEventListener(PluginBase& model, const NPVariant* args, unsigned int argCount,
                             NPVariant& result) {
     using PageForm = void (Model::*)(const std::string&, const std::string&, NPObject*);
@@ -108,8 +109,9 @@ bool addStreamEventListener(PluginBase& model, const NPVariant* args, unsigned i
            invokeCounted<registeringForm>(model, args, argCount, result);
 }
 
-// Meant: any argument with a value is accepted, of whatever type. Only an object has a component to unselect;
-// any other value is logged as the operation logs its object, and that is all.
+// quirk 89: any argument with a value is accepted, of whatever type.
+// Only an object has a component to unselect; any other value is logged as the operation logs its object, and
+// that is all.
 bool unselectComponent(PluginBase& model, const NPVariant* args, unsigned int argCount, NPVariant&) {
     if (argCount < 1 || !args[0].value.objectValue) {
         return false;
@@ -124,7 +126,7 @@ bool unselectComponent(PluginBase& model, const NPVariant* args, unsigned int ar
     return true;
 }
 
-// (idType, onid, tsid, sid), (idType, onid, sid) or (idType, descriptor, sid).
+// quirk 96: exactly (idType, onid, tsid, sid), (idType, onid, sid) or (idType, descriptor, sid).
 bool createChannelObject(PluginBase& model, const NPVariant* args, unsigned int argCount, NPVariant& result) {
     if (argCount < 3 || !fits<uint32_t>(args[0]) || !fits<uint32_t>(args[2])) {
         return false;
@@ -171,6 +173,7 @@ constexpr ScriptMember kMembers[] = {
     property("width", read<&Model::getWidth>, write<&Model::setWidth>),
     property("height", read<&Model::getHeight>, write<&Model::setHeight>),
     property("fullScreen", read<&Model::isFullScreen>),
+    // quirk 84: a write asks the platform for that state.
     property("playState", read<&Model::getPlayState>, write<&Model::setPlayState>),
     property("onFullScreenChange", read<&Model::getOnFullScreenChange>,
              writeListener<&Model::setOnFullScreenChange>),
@@ -188,6 +191,7 @@ constexpr ScriptMember kMembers[] = {
     property("currentChannel", read<&Model::getCurrChannel>),
     method("getChannelConfig", invoke<&Model::getChannelConfig>),
     method("setChannelByTriplet", setChannelByTriplet),
+    // quirk 85: no result.
     method("bindToCurrentChannel", invoke<&Model::bindToCurrentChannel>),
     method("setChannel", setChannel),
     method("prevChannel", invoke<&Model::prevChannel>),
@@ -214,6 +218,7 @@ constexpr ScriptClass kClass("JSVideoBroadcast", LogModule::VIDEOBCAST, kMembers
 
 JSVideoBroadcast::JSVideoBroadcast(NPP npp) : EmbeddedObjectWrapper(npp, kClass) {}
 
+// quirk 97: without a model each of these stops the process.
 bool JSVideoBroadcast::Invoke(NPIdentifier name, const NPVariant* args, unsigned int argCount,
                               NPVariant* result) {
     const PluginBase* pPlugin = model();

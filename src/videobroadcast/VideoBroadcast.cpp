@@ -119,7 +119,7 @@ VideoBroadcast::~VideoBroadcast() {
     releaseHeld(m_onParentalRatingChangeObj);
     releaseHeld(m_onParentalRatingErrorObj);
     releaseHeld(m_jsObject);
-    // Meant: the platform handle goes before the subscriptions that were made with it.
+    // The platform handle goes before the subscriptions that were made with it.
     release();
     deleteInstance(this);
     deleteStreamEventInfo();
@@ -142,7 +142,7 @@ void VideoBroadcast::setHandle(unsigned int handle) {
     }
 }
 
-// Meant: three of the registrations name the object that happens to register for all, the removals name none.
+// Three of the registrations name the object that happens to register for all, the removals name none.
 void VideoBroadcast::registerCallbacks() {
     if (bCallbacksRegistered) {
         return;
@@ -188,6 +188,7 @@ int VideoBroadcast::getPlayState() {
     return m_playState;
 }
 
+// quirk 88: the handle stays, and with it the events.
 void VideoBroadcast::release() {
     if (m_vbHandle) {
         TELIX_JS_VB_Release(m_vbHandle);

@@ -82,7 +82,7 @@ public:
     void setPlayState(int state);
     int getPlayState();
 
-    // Meant: hides the base's operation, which does not ask the platform.
+    // Hides the base's operation, which does not ask the platform.
     bool isFullScreen();
     void setFullScreenChange(bool bFullScreen);
 

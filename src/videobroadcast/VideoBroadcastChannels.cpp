@@ -48,7 +48,7 @@ void VideoBroadcast::setChannel(NPObject* channel, bool trickPlay) {
     const unsigned int channelHandle = channel ? channelOf(channel)->getChannelHandle() : 0;
     if (m_vbHandle && TELIX_JS_VB_SetChannel(m_vbHandle, channelHandle, trickPlay) == 0) {
         PLUGIN_LOG(VIDEOBCAST, "TELIX_JS_VB_SetChannel call succeeded \n");
-        // Meant: no channel marks the object active too.
+        // No channel marks the object active too.
         m_isActive = true;
     }
 }
@@ -73,10 +73,10 @@ void VideoBroadcast::nextChannel() {
     }
 }
 
-// The object that the page holds becomes the new channel in place, before any event.
+// quirk 86: the object that the page holds becomes the new channel in place, before any event.
 void VideoBroadcast::resetCurrentChannel(unsigned int channelHandle) {
     if (!m_pCurChannel) {
-        m_pCurChannel = getCurrChannel(); // left behind: one reference more than is held
+        m_pCurChannel = getCurrChannel(); // one reference more than is held, never released
     }
     if (m_pCurChannel) {
         channelOf(m_pCurChannel)->reset(channelHandle);
@@ -143,7 +143,7 @@ NPObject* VideoBroadcast::getCurrChannel() {
 
 NPObject* VideoBroadcast::getChannel(unsigned int channelHandle) {
     if (channelHandle) {
-        // Left behind: the references to the configuration and the list.
+        // The references to the configuration and the list are never released.
         if (NPObject* config = getChannelConfig()) {
             if (NPObject* list = wrapperOf<JSChannelConfig>(config)->impl()->getChannelList()) {
                 if (NPObject* channel = wrapperOf<JSChannelList>(list)->impl()->getChannel(channelHandle)) {
@@ -162,7 +162,7 @@ NPObject* VideoBroadcast::getChannelConfig() {
     return config;
 }
 
-// Meant: a collection once made is never made again, whatever changes.
+// quirk 87: a collection once made is never made again, whatever changes.
 NPObject* VideoBroadcast::getProgrammes() {
     if (!m_programmesObj) {
         uint32_t count = 0;
@@ -181,7 +181,8 @@ NPObject* VideoBroadcast::getParentalRatingObj(unsigned int ratingHandle) {
     if (!ratingHandle) {
         return nullptr;
     }
-    NPObject* programmes = getProgrammes(); // left behind
+    // quirk 81: the rating comes from a programme; without one the handler is not called.
+    NPObject* programmes = getProgrammes(); // the reference is never released
     return programmes ? wrapperOf<JSProgrammeCollection>(programmes)
                             ->impl()
                             ->getJSParentalRatingForHandle(ratingHandle)
@@ -210,7 +211,7 @@ NPObject* VideoBroadcast::getComponentList(unsigned int type, bool active) {
     return list;
 }
 
-// Meant: the lists are kept through channel changes.
+// quirk 36: the lists are kept through channel changes.
 NPObject* VideoBroadcast::getComponents(unsigned int type) {
     NPObject** const lists[] = {&m_videoComponents, &m_audioComponents, &m_subtitleComponents};
     if (type >= std::size(lists)) {
@@ -225,7 +226,7 @@ NPObject* VideoBroadcast::getComponents(unsigned int type) {
 
 NPObject* VideoBroadcast::getCurrentActiveComponents(unsigned int type) {
     PLUGIN_LOG(VIDEOBCAST, "Comp Type :: %d\n", type);
-    return handOut(getComponentList(type, true)); // left behind: the reference of the creation
+    return handOut(getComponentList(type, true)); // the reference of the creation is never released
 }
 
 void VideoBroadcast::selectComponent(NPObject* component) {

@@ -5,6 +5,7 @@
 #include "src/videobroadcast/VideoBroadcast.h"
 #include "telix/telix_platform.h"
 
+// quirk 83: a size is applied on a later turn of the main loop.
 void VideoBroadcast::setWidth(int width) {
     PLUGIN_LOG(VIDEOBCAST, ":: new Width= %d \n", width);
     m_nWidth = width;
@@ -33,7 +34,7 @@ int VideoBroadcast::shouldChangeHeight(void* object) {
 void VideoBroadcast::applySize(const char* step, const char* callName, SetSize call, int wanted,
                                int& applied) {
     if (!m_vbHandle) {
-        // Meant: despite its words the step goes on without a handle.
+        // Despite its words the step goes on without a handle.
         PLUGIN_LOG_FOR(LogModule::VIDEOBCAST, step, "m_vbHandle is NULL. Nothing to do, return. \n");
     }
     if (wanted == applied) {
@@ -110,7 +111,7 @@ void VideoBroadcast::setFullScreenChange(bool bFullScreen) {
     PLUGIN_LOG(VIDEOBCAST, "TELIX_JS_VB_SetFullScreen is called :: bFullScreen: %d :: m_isFullScreen :%d \n",
                bFullScreen, m_isFullScreen);
     setFullScreen(bFullScreen);
-    // Meant: the platform's own report of the change calls the handler once more.
+    // quirk 82: the platform's own report of the change calls the handler once more.
     if (NPObject* handler = getOnFullScreenChange()) {
         NPVariant state{};
         setResult(state, bFullScreen);

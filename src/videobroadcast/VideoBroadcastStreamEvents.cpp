@@ -22,6 +22,7 @@ bool startsWithIgnoringCase(const std::string& string, const char* start) {
 
 // Calls the element's addEventListener or removeEventListener for stream events.
 void changeDOMListener(NPP npp, NPObject* element, const char* operation, NPObject* listener) {
+    // quirk 94: all subscriptions share this type.
     static const NPString eventType{"StreamEvent", 11};
     NPVariant args[3]{};
     args[0].type = NPVariantType_String;
@@ -71,7 +72,8 @@ void VideoBroadcast::addStreamEventListener(const std::string& targetUrl, const 
         if (startsWithIgnoringCase(urlPath, "http")) {
             const std::string targetUrlSubStr = targetUrl.substr(0, 6);
             PLUGIN_LOG(VIDEOBCAST, "targetUrlSubStr:-- %s \n", targetUrlSubStr.c_str());
-            // A description that came over http writes the tag in decimal; the platform wants it in hex.
+            // quirk 93: a description that came over http writes the tag in decimal; the platform wants it in
+            // hex.
             if (strcasecmp(targetUrlSubStr.c_str(), "dvb://") != 0) {
                 const int number = std::atoi(tag.c_str());
                 PLUGIN_LOG(VIDEOBCAST, "comp_tag value: Decimal value:-- %d \n", number);
@@ -110,6 +112,7 @@ void VideoBroadcast::removeStreamEventListener(const std::string& targetUrl, con
                    static_cast<void*>(element), static_cast<void*>(streamEventListener));
         changeDOMListener(m_npp, element, "removeEventListener", streamEventListener);
     }
+    // quirk 95: the last subscription of the URL goes, whatever its name.
     const unsigned int count = getStreamEventInfo(targetUrl);
     if (count == static_cast<unsigned int>(-1)) {
         return;
@@ -120,7 +123,7 @@ void VideoBroadcast::removeStreamEventListener(const std::string& targetUrl, con
     if (m_vbHandle) {
         PLUGIN_LOG(VIDEOBCAST, "Event Name: %s, Id: %s, CTag: %s \n", eventName.c_str(),
                    removed.eventId.c_str(), removed.componentTag.c_str());
-        // Meant: the caller's name, which need not be that of the subscription that went.
+        // The caller's name, which need not be that of the subscription that went.
         TELIX_JS_VB_UnRegisterStreamEvent(m_vbHandle, streamEventHandler, removed.eventId.c_str(),
                                           removed.componentTag.c_str(), eventName.c_str());
     }

@@ -30,7 +30,7 @@ VideoBcastEvent* newEvent(TELIX_JS_VB_HANDLE vbHandle, VBEventType type) {
     auto* event = new VideoBcastEvent;
     event->vbInstance = VideoBroadcast::refOf(vbHandle);
     if (!event->vbInstance.address()) {
-        // Left behind: the record of an event without a receiver.
+        // The record of an event without a receiver is not freed.
         // NOLINTNEXTLINE(clang-analyzer-cplusplus.NewDeleteLeaks)
         return nullptr;
     }
@@ -56,7 +56,7 @@ TELIX_RETCODE_ENUM_T carry(const char* callback, TELIX_JS_VB_HANDLE vbHandle, VB
     if (event->eventData) {
         queueEvent(callback, vbHandle, event);
     }
-    // Left behind: the record that found no memory for its payload.
+    // A record that found no memory for its payload is not freed.
     // NOLINTNEXTLINE(clang-analyzer-cplusplus.NewDeleteLeaks)
     return TELIX_RETCODE_SUCCESS;
 }
@@ -162,9 +162,8 @@ struct ChannelChange {
 // None of the references that the steps below are given is released: the objects stay alive.
 
 void deliverChannelChange(VideoBroadcast& videoBroadcast, const std::string&, void* payload) {
-    NPObject* handler = videoBroadcast.getOnChannelChangeSucceeded(); // left behind
-    NPObject* channel =
-        videoBroadcast.getChannel(static_cast<const ChannelChange*>(payload)->channelHandle); // left behind
+    NPObject* handler = videoBroadcast.getOnChannelChangeSucceeded();
+    NPObject* channel = videoBroadcast.getChannel(static_cast<const ChannelChange*>(payload)->channelHandle);
     if (handler && channel) {
         NPVariant argument{};
         setResult(argument, channel);
@@ -194,8 +193,8 @@ struct ChannelChangeEvent {
 
 void deliverChannelChangeError(VideoBroadcast& videoBroadcast, const std::string&, void* payload) {
     const auto* event = static_cast<const ChannelChangeEvent*>(payload);
-    NPObject* handler = videoBroadcast.getOnChannelChangeError();        // left behind
-    NPObject* channel = videoBroadcast.getChannel(event->channelHandle); // left behind
+    NPObject* handler = videoBroadcast.getOnChannelChangeError();
+    NPObject* channel = videoBroadcast.getChannel(event->channelHandle);
     if (handler && channel) {
         NPVariant args[2]{};
         setResult(args[0], channel);
@@ -218,7 +217,7 @@ namespace {
 // ---- Programmes that changed
 
 void deliverProgrammesChanged(VideoBroadcast& videoBroadcast, const std::string&, void*) {
-    if (NPObject* handler = videoBroadcast.getOnProgrammesChanged()) { // left behind
+    if (NPObject* handler = videoBroadcast.getOnProgrammesChanged()) {
         videoBroadcast.invokeJScriptFunc(handler, nullptr, 0);
     }
 }
@@ -248,11 +247,11 @@ struct ParentalRatingEvent {
     unsigned int ratingHandle;
 };
 
-// Meant: both events call the handler of the change; the handler of the error is never called.
+// quirk 78: both events call the handler of the change; the handler of the error is never called.
 void deliverParentalRating(VideoBroadcast& videoBroadcast, const std::string&, void* payload) {
     const auto* event = static_cast<const ParentalRatingEvent*>(payload);
-    NPObject* handler = videoBroadcast.getOnParentalRatingChange();              // left behind
-    NPObject* rating = videoBroadcast.getParentalRatingObj(event->ratingHandle); // left behind
+    NPObject* handler = videoBroadcast.getOnParentalRatingChange();
+    NPObject* rating = videoBroadcast.getParentalRatingObj(event->ratingHandle);
     if (!handler || !rating) {
         return;
     }
@@ -307,9 +306,9 @@ void deliverPlayState(VideoBroadcast& videoBroadcast, const std::string&, void* 
     const auto* event = static_cast<const PlayStateEvent*>(payload);
     HANDLER_LOG("VBEvent_PlayStateChange:: Case. VB State: %d, Plugin State: %d \n", event->state,
                 videoBroadcast.getPluginState());
-    NPObject* handler = videoBroadcast.getOnPlayStateChange(); // left behind
+    NPObject* handler = videoBroadcast.getOnPlayStateChange();
     if (!handler) {
-        // Meant: without a handler the object stays as active as it was.
+        // Without a handler the object stays as active as it was.
         return;
     }
     HANDLER_LOG("VBEvent_PlayStateChange:: Case. State: %d \n", event->state);
@@ -343,7 +342,7 @@ namespace {
 // ---- Full screen that changed
 
 void deliverFullScreenChange(VideoBroadcast& videoBroadcast, const std::string&, void*) {
-    if (NPObject* handler = videoBroadcast.getOnFullScreenChange()) { // left behind
+    if (NPObject* handler = videoBroadcast.getOnFullScreenChange()) {
         videoBroadcast.invokeJScriptFunc(handler, nullptr, 0);
     }
 }
@@ -372,7 +371,8 @@ constexpr EventClass carrying(const char* domEvent, Deliver deliver) {
     return {domEvent, deliver, [](void* payload) { delete static_cast<Payload*>(payload); }};
 }
 
-// Meant: the DOM event is "ChannelChangeSucceded", while the page's property is "onChannelChangeSucceeded".
+// quirk 77: the DOM event is "ChannelChangeSucceded", while the page's property is
+// "onChannelChangeSucceeded".
 constexpr EventClass kEvents[] = {
     {nullptr, deliverNoEvent, nullptr},
     carrying<StreamEventData>(nullptr, deliverStreamEvent),
@@ -417,7 +417,7 @@ int handleVideoBroadcastEvent(void* eventData) {
     if (!address || !VideoBroadcast::callbacksRegistered()) {
         PLUGIN_LOG(VIDEOBCAST, "Could not process eventData:( %p ), eventType:( %d ), VBInstance: (%p)\n",
                    eventData, event ? event->eventType : VBEvent_NoEvent, static_cast<void*>(address));
-        return G_SOURCE_REMOVE; // left behind: record and payload
+        return G_SOURCE_REMOVE; // neither record nor payload is freed
     }
     PLUGIN_LOG(VIDEOBCAST, "VB EventType: %d, VB Instance from eventData : %p \n", event->eventType,
                static_cast<void*>(address));
@@ -425,14 +425,14 @@ int handleVideoBroadcastEvent(void* eventData) {
     const bool isListed = VideoBroadcast::checkValidInstance(address);
     VideoBroadcast* instance = isListed ? event->vbInstance.get() : nullptr;
     const std::string id = instance ? instance->getId() : std::string();
-    // Meant: an element without an id gets neither DOM events nor calls of its handlers.
+    // quirk 76: an element without an id gets neither DOM events nor calls of its handlers.
     if (id.empty()) {
         PLUGIN_LOG(
             VIDEOBCAST,
             "Invalid VB Instance received or Id attribute is not present with object. isValidInst: %d\n",
             instance != nullptr);
         delete event;
-        return G_SOURCE_REMOVE; // left behind: the payload
+        return G_SOURCE_REMOVE; // the payload is not freed
     }
     deliverEvent(*instance, id, *event);
     delete event;
