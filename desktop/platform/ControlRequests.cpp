@@ -274,7 +274,7 @@ Object channels(const Request& request) {
     size_t number = 0;
     for (const TELIX_JS_CM_HANDLE handle : broadcast().channels().list()) {
         Object channel = channelObject(++number, *broadcast().channels().find(handle));
-        list.add(std::move(channel.flag("current", handle == broadcast().currentChannel())));
+        list.add(std::move(channel.flag("current", handle == broadcast().arbiter().currentChannel())));
     }
     Object answer;
     answer.array("channels", std::move(list));
@@ -287,15 +287,15 @@ Object tune(const Request& request) {
     if (number > list.size()) {
         throw Refusal("there are " + std::to_string(list.size()) + " channels");
     }
-    require(broadcast().zap(list[number - 1]), "the channel can't be tuned");
+    require(broadcast().arbiter().zap(list[number - 1]), "the channel can't be tuned");
     Object answer;
     setChannel(answer, "channel", list[number - 1]);
     return answer;
 }
 
 Object channelError(const Request& request) {
-    require(broadcast().onChannelError.isSet(), "nobody listens to channel errors");
-    require(broadcast().injectChannelError(static_cast<int32_t>(request.number("error"))), noHolder);
+    require(broadcast().callbacks().onChannelError.isSet(), "nobody listens to channel errors");
+    require(broadcast().faults().channelError(static_cast<int32_t>(request.number("error"))), noHolder);
     return {};
 }
 
@@ -308,14 +308,15 @@ Object rating(const Request& request) {
     if (region.size() != 3) {
         throw Refusal("\"region\" must be a code of three letters");
     }
-    require(broadcast().onRatingChange.isSet(), "nobody listens to ratings");
-    require(broadcast().injectRating(region, static_cast<uint8_t>(age == 0 ? 0 : age - 3)), noHolder);
+    require(broadcast().callbacks().onRatingChange.isSet(), "nobody listens to ratings");
+    require(broadcast().faults().rating(region, static_cast<uint8_t>(age == 0 ? 0 : age - 3)), noHolder);
     return {};
 }
 
 Object ratingError(const Request& request) {
-    require(broadcast().onRatingError.isSet(), "nobody listens to errors of ratings");
-    require(broadcast().injectRatingError(request.text("content-id"), request.text("drm-system")), noHolder);
+    require(broadcast().callbacks().onRatingError.isSet(), "nobody listens to errors of ratings");
+    require(broadcast().faults().ratingError(request.text("content-id"), request.text("drm-system")),
+            noHolder);
     return {};
 }
 
@@ -333,12 +334,12 @@ Bytes bytesOfHex(const std::string& digits) {
 }
 
 Object streamEvent(const Request& request) {
-    Broadcast::InjectedEvent event;
+    FaultInjection::Event event;
     if (request.has("id")) {
         event.id = static_cast<uint16_t>(request.number("id"));
     }
     if (request.has("tag")) {
-        event.tag = static_cast<uint8_t>(request.number("tag"));
+        event.componentTag = static_cast<uint8_t>(request.number("tag"));
     }
     if (request.has("name")) {
         event.name = request.text("name");
@@ -352,7 +353,7 @@ Object streamEvent(const Request& request) {
     if (event.status != "trigger" && event.status != "error") {
         throw Refusal("\"status\" must be trigger or error");
     }
-    const size_t listeners = broadcast().injectStreamEvent(event);
+    const size_t listeners = broadcast().faults().streamEvent(event);
     require(listeners > 0, "nobody listens to such a stream event");
     Object answer;
     answer.number("listeners", static_cast<int64_t>(listeners));
@@ -360,7 +361,7 @@ Object streamEvent(const Request& request) {
 }
 
 Object fullScreen(const Request& request) {
-    require(broadcast().injectFullScreen(request.flag("on")), noHolder);
+    require(broadcast().faults().fullScreen(request.flag("on")), noHolder);
     return {};
 }
 
@@ -472,7 +473,7 @@ Array objectsOf(const Broadcast::State& state) {
         object.number("handle", each.handle)
             .text("playState", nameOf(each.playState))
             .number("playStateNumber", each.playState)
-            .flag("holdsTuner", each.holdsTuner)
+            .flag("holdsTuner", each.ownsTuner)
             .number("channel", each.channel)
             .object("area", areaObject(each.view.x, each.view.y, each.view.width, each.view.height))
             .flag("fullScreen", each.view.fullScreen);
@@ -484,8 +485,8 @@ Array objectsOf(const Broadcast::State& state) {
 Array componentsOf(const Broadcast::State& state) {
     static const char* const types[] = {"video", "audio", "subtitle"};
     Array components;
-    for (const Broadcast::State::Available& each : state.components) {
-        const Component& component = each.component;
+    for (const BroadcastComponents::Available& each : state.components) {
+        const BroadcastComponent& component = each.component;
         Object object;
         object.number("handle", each.handle)
             .text("type", types[component.type])
@@ -541,7 +542,7 @@ Object pictureObject() {
 }
 
 Object registrations(const Broadcast::State& state) {
-    Broadcast& source = broadcast();
+    const BroadcastCallbacks& source = broadcast().callbacks();
     Object object;
     object.flag("channelChange", source.onChannelChange.isSet())
         .flag("channelError", source.onChannelError.isSet())
@@ -553,11 +554,11 @@ Object registrations(const Broadcast::State& state) {
         .flag("lowMemory", device().onLowMemory.isSet())
         .flag("drmMessageResult", device().onDrmMessageResult.isSet());
     Array watches;
-    for (const Broadcast::State::Watch& each : state.watches) {
+    for (const StreamEvents::Subscription& each : state.subscriptions) {
         Object watch;
         watch.number("object", each.object)
             .number("id", each.eventId)
-            .number("tag", each.tag)
+            .number("tag", each.componentTag)
             .text("name", each.name);
         watches.add(std::move(watch));
     }
@@ -571,13 +572,13 @@ Object tellState(const Request& request) {
     Object answer;
     setChannel(answer, "channel", state.channel);
     answer.array("objects", objectsOf(state)).array("components", componentsOf(state));
-    if (const auto pid = broadcast().heardAudio()) {
+    if (const auto pid = broadcast().activeAudioPid()) {
         answer.number("heardAudio", *pid);
     } else {
         answer.none("heardAudio");
     }
     answer.none("shownSubtitle");
-    for (const Broadcast::State::Available& each : state.components) {
+    for (const BroadcastComponents::Available& each : state.components) {
         if (each.isActive && each.component.type == TELIX_JS_AVCOMPTYPE_SUBTITLE) {
             answer.number("shownSubtitle", each.component.pid);
         }

@@ -325,12 +325,12 @@ TELIX_CALL(TELIX_JS_VB_Stop, (TELIX_JS_VB_HANDLE object), (object))
 TELIX_CALL(TELIX_JS_VB_BindToCurrChannel, (TELIX_JS_VB_HANDLE object), (object))
 
 /* Requests to tune; they return at once, and TELIX_JS_VB_CHANNEL_CHANGE_CB or TELIX_JS_VB_CHANNEL_ERROR_CB
- * follows. The channel 0 means none. `flag` is the second argument of the page's call of setChannel, true or
+ * follows. The channel 0 means none. `trickPlay` is the second argument of the page's call of setChannel, true or
  * false (trick play), 0 where the page left it out. PrevChannel and NextChannel give out the channel that is
  * selected now, before it is tuned: the page's current channel object takes it over at once. Refused: no
  * error is shown to the page. */
-TELIX_CALL(TELIX_JS_VB_SetChannel, (TELIX_JS_VB_HANDLE object, TELIX_JS_CM_HANDLE channel, ___UINT8 flag),
-           (object, channel, flag))
+TELIX_CALL(TELIX_JS_VB_SetChannel, (TELIX_JS_VB_HANDLE object, TELIX_JS_CM_HANDLE channel, ___UINT8 trickPlay),
+           (object, channel, trickPlay))
 TELIX_CALL(TELIX_JS_VB_PrevChannel, (TELIX_JS_VB_HANDLE object, TELIX_JS_CM_HANDLE* channel),
            (object, channel))
 TELIX_CALL(TELIX_JS_VB_NextChannel, (TELIX_JS_VB_HANDLE object, TELIX_JS_CM_HANDLE* channel),
