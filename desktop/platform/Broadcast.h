@@ -6,7 +6,7 @@
 //   PresentFollowing    present and following programme
 //   RatingMonitor       parental rating of the present programme
 //   StreamEvents        subscriptions to stream events
-//   FaultInjection      what is provoked from outside
+//   FaultInjection      errors and events that a test provokes
 //   BroadcastCallbacks  callbacks of the plug-in
 //   Channels            the channel list
 //   Programmes          programmes and ratings by handle
@@ -16,9 +16,8 @@
 //
 // Threads and locks: the plug-in calls on any thread, and these calls read or change plain data under
 // Platform::mutex() and post the rest. Tunes, reports and all callbacks of the plug-in happen on the platform
-// thread, in the order of the requests. The playout thread and GStreamer's threads only post. The mutex of
-// StreamEvents is taken first, Platform::mutex() never while a callback runs; the receiver's mutex is held
-// while it posts.
+// thread, in the order of the requests. The playout thread and GStreamer's threads only post. Lock order: the
+// mutex of StreamEvents, then Platform::mutex(). No callback of the plug-in runs under Platform::mutex().
 #ifndef TELIX_DESKTOP_PLATFORM_BROADCAST_H
 #define TELIX_DESKTOP_PLATFORM_BROADCAST_H
 

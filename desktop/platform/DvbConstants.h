@@ -27,6 +27,7 @@ constexpr uint8_t kContinuityCounterMask = 0x0F;
 // The adaptation field: flags byte, and the size of the flags and the PCR together.
 constexpr uint8_t kPcrFlag = 0x10;
 constexpr uint8_t kAdaptationFieldWithPcrLength = 7;
+constexpr uint8_t kPcrReservedBits = 0x7E; // of the fifth byte of a PCR
 
 // The system clock has 27 MHz and counts 300 ticks for each tick of 90 kHz; a PCR, a PTS and a DTS hold 33
 // bits of the latter.
@@ -39,8 +40,11 @@ constexpr int64_t kPcrPeriod = kTimestampPeriod * kSystemClockTicksPerBaseTick;
 
 constexpr size_t kPesFixedHeaderSize = 9; // up to PES_header_data_length
 constexpr size_t kPesTimestampSize = 5;
+constexpr uint8_t kPesHeaderMarker = 0x80; // of the byte before the flags
 constexpr uint8_t kPtsFlag = 0x80;
 constexpr uint8_t kDtsFlag = 0x40;
+constexpr uint8_t kTimestampPrefixPts = 0x30; // of a PTS that a DTS follows
+constexpr uint8_t kTimestampPrefixDts = 0x10;
 
 constexpr uint8_t kStreamIdPrivateStream1 = 0xBD;
 constexpr uint8_t kStreamIdFirstAudio = 0xC0; // audio streams, and after them the video streams
@@ -68,8 +72,24 @@ constexpr size_t kLongSectionHeaderSize = 8;
 constexpr size_t kCrcSize = 4;
 constexpr size_t kMaxPrivateSectionSize = 4096;
 constexpr uint8_t kSectionSyntaxIndicator = 0x80; // of the second byte
+constexpr uint8_t kCurrentNextIndicator = 0x01;   // of the sixth byte
 constexpr uint16_t kLengthMask = 0x0FFF;          // of section_length and of the lengths of loops
 constexpr uint8_t kVersionCount = 32;             // version_number has five bits
+constexpr uint32_t kCrcPolynomial = 0x04C11DB7;
+constexpr uint32_t kCrcStart = 0xFFFFFFFF;
+
+// Flags and reserved bits, which are set, above section_length: tables of ISO/IEC 13818, those of EN 300 468,
+// and those of the latter that have no CRC.
+constexpr uint16_t kMpegSectionFlags = 0xB000;
+constexpr uint16_t kDvbSectionFlags = 0xF000;
+constexpr uint16_t kDvbShortSectionFlags = 0x7000;
+
+// Reserved bits, which are set, around other fields.
+constexpr uint16_t kReservedBeforePid = 0xE000;
+constexpr uint16_t kReservedBeforeLength = 0xF000;
+constexpr uint8_t kReservedBeforeVersion = 0xC0;
+constexpr uint8_t kReservedByte = 0xFF;
+constexpr uint8_t kReservedBeforeEitFlags = 0xFC; // in the SDT
 
 // table_id: ISO/IEC 13818-1; EN 300 468, 5.1.3; ISO/IEC 13818-6 for DSM-CC
 constexpr uint8_t kTableIdPat = 0x00;

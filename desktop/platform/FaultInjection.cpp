@@ -1,4 +1,4 @@
-// Events that nothing but a test provokes.
+// Injected errors and events.
 #include "desktop/platform/FaultInjection.h"
 
 #include <mutex>

@@ -1,4 +1,4 @@
-// What can be provoked from outside as if the broadcast or the viewer had done it, to test how pages react.
+// Errors and events as if they came from the broadcast or the viewer, to test how pages react.
 #ifndef TELIX_DESKTOP_PLATFORM_FAULTINJECTION_H
 #define TELIX_DESKTOP_PLATFORM_FAULTINJECTION_H
 

@@ -19,7 +19,7 @@ struct TestService {
     const char* name;
     std::vector<ElementaryStream> streams; // the first one is the video, with the PCR
     const char* picture;                   // a source of ffmpeg's lavfi
-    std::vector<const char*> programmes;   // titles, in the order of their time
+    std::vector<const char*> programmes;   // titles, in broadcast order
     std::vector<uint8_t> ratings;          // of the programmes, as EitRating::value; 0: none
 };
 

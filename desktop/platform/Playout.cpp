@@ -29,8 +29,8 @@ struct UnrefMapping {
 };
 using Mapping = std::unique_ptr<GMappedFile, UnrefMapping>;
 
-// The duration of the file as the number of its frames gives it: the next repetition begins at the frame that
-// would follow, which PCRs, sent between frames, do not tell.
+// The duration of the file in whole frames, so that the next repetition begins where the following frame
+// would be. It cannot be derived from PCRs, which stand between frames.
 class FrameCount {
 public:
     void add(const uint8_t* packet) {

@@ -116,7 +116,6 @@ void Restamper::restampPcr(uint8_t* packet) const {
     if (!pcr) {
         return;
     }
-    constexpr int64_t kReservedBits = 0x7E;
     const int64_t shifted = (*pcr + m_shift) % kPcrPeriod;
     const int64_t base = shifted / kSystemClockTicksPerBaseTick;
     const int64_t extension = shifted % kSystemClockTicksPerBaseTick;
@@ -125,7 +124,7 @@ void Restamper::restampPcr(uint8_t* packet) const {
     bytes[1] = static_cast<uint8_t>(base >> 17);
     bytes[2] = static_cast<uint8_t>(base >> 9);
     bytes[3] = static_cast<uint8_t>(base >> 1);
-    bytes[4] = static_cast<uint8_t>((base & 1) << 7 | kReservedBits | (extension >> 8 & 1));
+    bytes[4] = static_cast<uint8_t>((base & 1) << 7 | kPcrReservedBits | (extension >> 8 & 1));
     bytes[5] = static_cast<uint8_t>(extension);
 }
 

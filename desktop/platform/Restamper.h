@@ -18,7 +18,7 @@ std::optional<int64_t> ptsOf(const uint8_t* packet);
 class Restamper {
 public:
     // The file starts again. All times in it are shifted by `ticks` of 27 MHz more, rounded down to ticks of
-    // 90 kHz, so that PCR and PTS keep their distance.
+    // 90 kHz, so that PCR and PTS shift alike.
     void repeat(int64_t ticks);
 
     // Changes one packet of the file in place.

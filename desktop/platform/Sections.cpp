@@ -78,7 +78,6 @@ struct LongSection {
 };
 
 std::optional<LongSection> openSection(const Bytes& section, uint8_t tableId) {
-    constexpr uint8_t kCurrentNextIndicator = 0x01;
     if (section.size() < kLongSectionHeaderSize + kCrcSize || section[0] != tableId ||
         (section[5] & kCurrentNextIndicator) == 0) {
         return std::nullopt;

@@ -13,7 +13,7 @@
 
 namespace desktop {
 
-// The offset of the first of several packets in a row; nothing if there is no such row.
+// The offset of the first of several packets in a row; nothing if there are none.
 std::optional<size_t> findPackets(const uint8_t* bytes, size_t length);
 
 // Reassembles the sections of one PID.

@@ -10,13 +10,6 @@ namespace desktop {
 
 namespace {
 
-constexpr uint32_t kCrcPolynomial = 0x04C11DB7U; // ISO/IEC 13818-1, annex A
-constexpr uint32_t kCrcStart = 0xFFFFFFFFU;
-
-// Fields that stand before a PID or a length and are reserved have all bits set.
-constexpr unsigned int kReservedBeforePid = 0xE000;
-constexpr unsigned int kReservedBeforeLength = 0xF000;
-
 // Our own limits, in bytes: a descriptor with all its strings must fit into its length.
 constexpr size_t kMaxNameSize = 100;
 constexpr size_t kMaxTextSize = 150;
@@ -108,20 +101,18 @@ struct SectionHeader {
     uint8_t lastNumber = 0;
 };
 
-// The second byte: all tables of EN 300 468 have the reserved bit set that is 0 in those of ISO/IEC 13818.
+// Whose table it is, which shows in a bit of the header.
 enum class Family { Mpeg, Dvb };
 
 // A section of the long form around `body`, with length and CRC.
 Bytes packSection(const SectionHeader& header, Family family, const Bytes& body) {
-    constexpr unsigned int kMpegFlags = 0xB000;
-    constexpr unsigned int kDvbFlags = 0xF000;
-    constexpr unsigned int kReservedAndCurrent = 0xC1; // reserved bits, and current_next_indicator
     const size_t length = kLongSectionHeaderSize - kSectionHeaderSize + body.size() + kCrcSize;
     Bytes bytes;
     put8(bytes, header.tableId);
-    put16(bytes, (family == Family::Dvb ? kDvbFlags : kMpegFlags) | static_cast<unsigned int>(length));
+    put16(bytes,
+          (family == Family::Dvb ? kDvbSectionFlags : kMpegSectionFlags) | static_cast<unsigned int>(length));
     put16(bytes, header.tableIdExtension);
-    put8(bytes, kReservedAndCurrent | (header.version % kVersionCount) << 1U);
+    put8(bytes, kReservedBeforeVersion | kCurrentNextIndicator | (header.version % kVersionCount) << 1U);
     put8(bytes, header.number);
     put8(bytes, header.lastNumber);
     putBytes(bytes, body);
@@ -191,8 +182,6 @@ Bytes pack(const Nit& nit) {
 }
 
 Bytes pack(const Sdt& sdt) {
-    constexpr unsigned int kReservedByte = 0xFF;
-    constexpr unsigned int kReservedBeforeEitFlags = 0xFC;
     constexpr unsigned int kRunningAndFreeOfCharge = kRunningStatusRunning << 13U;
     Bytes body;
     put16(body, sdt.originalNetworkId);
@@ -244,11 +233,10 @@ Bytes pack(const StreamEvent& event) {
 }
 
 Bytes packTdt(int64_t utcSeconds) {
-    constexpr unsigned int kShortDvbFlags = 0x7000;
     constexpr unsigned int kTimeSize = 5;
     Bytes bytes;
     put8(bytes, kTableIdTdt);
-    put16(bytes, kShortDvbFlags | kTimeSize);
+    put16(bytes, kDvbShortSectionFlags | kTimeSize);
     putTime(bytes, utcSeconds);
     return bytes;
 }

@@ -21,7 +21,7 @@ constexpr TELIX_ERR_STATE_ENUM_T kErrorNoSignal = 1;
 constexpr TELIX_ERR_STATE_ENUM_T kErrorUnknownChannel = 5;
 constexpr TELIX_ERR_STATE_ENUM_T kErrorInterrupted = 6;
 
-// A request to tune. Ids rise; 0 means that there is no tune.
+// A request to tune. Each has a higher id than the one before; 0 stands for no tune.
 struct Tune {
     uint64_t id = 0;
     TELIX_JS_VB_HANDLE object = 0;

@@ -215,7 +215,7 @@ TEST_F(PlayoutTest, RefusesWhatIsNoTransportStream) {
     EXPECT_EQ(error, withoutPcr.name() + ": no PCR");
 }
 
-// The line-up is read once in a process, so this test needs one of its own.
+// The channel list is read once in a process, so this test needs a process of its own.
 Received<TELIX_ERR_STATE_ENUM_T> errors;
 
 TELIX_RETCODE_ENUM_T onError(TELIX_JS_VB_HANDLE, TELIX_JS_CM_HANDLE, TELIX_ERR_STATE_ENUM_T error) {

@@ -123,7 +123,7 @@ TEST(TablesTest, KeepProgrammesTimesRatingsAndEvents) {
 TEST(TablesTest, HaveTheBytesOfTheStandards) {
     Bytes section = pack(StreamEvent{0x0123, 5, {0xAB}});
     section.resize(section.size() - kCrcSize);
-    EXPECT_EQ(section, (Bytes{0x3D, 0xB0, 0x16, 0x01, 0x23, 0xCB, 0x00, 0x00,            // header
+    EXPECT_EQ(section, (Bytes{0x3D, 0xB0, 0x16, 0x01, 0x23, 0xCB, 0x00, 0x00,             // header
                               0x1A, 0x0B, 0x01, 0x23, 0xFF, 0xFF, 0xFF, 0xFE, 0, 0, 0, 0, // event id, no NPT
                               0xAB}));
     EXPECT_EQ(packTdt(0), (Bytes{0x70, 0x70, 0x05, 0x9E, 0x8B, 0, 0, 0}));
@@ -177,7 +177,7 @@ TEST(SectionFilterTest, TakesAnyDamageWithoutHarmAndLetsNoneThrough) {
     std::mt19937 random(20261121);
     size_t whole = 0;
     for (int round = 0; round < 20000; ++round) {
-        uint8_t continuity = static_cast<uint8_t>(round & 0x0F);
+        uint8_t continuity = static_cast<uint8_t>(round & kContinuityCounterMask);
         Bytes packets = packetsOf(section, kPidEit, continuity);
         const Bytes more = packetsOf(section, kPidEit, continuity);
         packets.insert(packets.end(), more.begin(), more.end());
@@ -234,7 +234,7 @@ Bytes makeFramePacket(uint8_t continuity, int64_t pcr, int64_t pts, int64_t dts)
     const int64_t base = pcr / kSystemClockTicksPerBaseTick;
     const int64_t extension = pcr % kSystemClockTicksPerBaseTick;
     const uint8_t header[] = {kSyncByte,
-                              kPayloadUnitStartIndicator | 0x01, // PID 0x110
+                              kPayloadUnitStartIndicator | 0x01, // PID 0x0110
                               0x10,
                               static_cast<uint8_t>(kAdaptationFieldFlag | kPayloadFlag | continuity),
                               kAdaptationFieldWithPcrLength,
@@ -243,7 +243,7 @@ Bytes makeFramePacket(uint8_t continuity, int64_t pcr, int64_t pts, int64_t dts)
                               static_cast<uint8_t>(base >> 17),
                               static_cast<uint8_t>(base >> 9),
                               static_cast<uint8_t>(base >> 1),
-                              static_cast<uint8_t>((base & 1) << 7 | 0x7E | extension >> 8),
+                              static_cast<uint8_t>((base & 1) << 7 | kPcrReservedBits | extension >> 8),
                               static_cast<uint8_t>(extension),
                               0, // packet_start_code_prefix
                               0,
@@ -251,12 +251,12 @@ Bytes makeFramePacket(uint8_t continuity, int64_t pcr, int64_t pts, int64_t dts)
                               kStreamIdFirstVideo,
                               0,
                               0,
-                              0x80,
+                              kPesHeaderMarker,
                               kPtsFlag | kDtsFlag,
                               2 * kPesTimestampSize};
     std::copy(std::begin(header), std::end(header), packet.begin());
-    stamp(packet.data() + std::size(header), 0x30, pts);
-    stamp(packet.data() + std::size(header) + kPesTimestampSize, 0x10, dts);
+    stamp(packet.data() + std::size(header), kTimestampPrefixPts, pts);
+    stamp(packet.data() + std::size(header) + kPesTimestampSize, kTimestampPrefixDts, dts);
     return packet;
 }
 
@@ -269,7 +269,7 @@ TEST(RestamperTest, LetsClockStampsAndCountersRunOnAcrossTheSeam) {
     for (int round = 0; round < 3; ++round) {
         for (int index = 0; index < kFrames; ++index) {
             const int64_t time = 90000 + index * kFrame;
-            Bytes packet = makeFramePacket(static_cast<uint8_t>((5 + index) & 0x0F),
+            Bytes packet = makeFramePacket(static_cast<uint8_t>((5 + index) & kContinuityCounterMask),
                                            time * kSystemClockTicksPerBaseTick + 7, time + kFrame, time);
             restamper.restamp(packet.data());
             EXPECT_EQ(packet[3] & kContinuityCounterMask, continuity);
@@ -278,7 +278,7 @@ TEST(RestamperTest, LetsClockStampsAndCountersRunOnAcrossTheSeam) {
             const Bytes expectedPacket = makeFramePacket(
                 continuity, expected * kSystemClockTicksPerBaseTick + 7, expected + kFrame, expected);
             EXPECT_EQ(packet, expectedPacket); // the DTS, too, and nothing else
-            continuity = (continuity + 1) & 0x0F;
+            continuity = (continuity + 1) & kContinuityCounterMask;
             expected += kFrame;
         }
         restamper.repeat(kFrames * kFrame * kSystemClockTicksPerBaseTick);
