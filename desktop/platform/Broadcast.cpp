@@ -32,7 +32,9 @@ Broadcast::Broadcast(Clock& clock)
     : m_platform(Platform::instance()), m_channels(m_platform.configuration().sources),
       m_ratings(m_programmes, m_callbacks), m_arbiter(m_channels, m_callbacks, arbiterListener()),
       m_presentFollowing(m_programmes, m_arbiter, m_ratings, m_callbacks),
-      m_presentation(m_channels, m_arbiter, m_components, clock, presentationListener()), m_faults(*this) {}
+      m_presentation(m_channels, m_arbiter, m_components, clock, presentationListener()), m_faults(*this) {
+    m_presentation.start();
+}
 
 TunerArbiter::Listener Broadcast::arbiterListener() {
     TunerArbiter::Listener listener;

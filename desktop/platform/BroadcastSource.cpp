@@ -8,23 +8,21 @@
 
 namespace desktop {
 
-BroadcastSource::BroadcastSource(Clock& clock, bool usesTestMultiplex, std::function<void()> onTestMultiplex)
+BroadcastSource::BroadcastSource(Clock& clock, std::function<void()> onTestMultiplex)
     : m_platform(Platform::instance()), m_onTestMultiplex(std::move(onTestMultiplex)),
-      m_playout(clock, [this](const uint8_t* packets, size_t size) { m_receiver.push(packets, size); }),
-      m_isMakingTestFile(usesTestMultiplex) {
-    if (usesTestMultiplex) {
-        std::thread(&BroadcastSource::makeTestFile, this)
-            .detach(); // this object lives as long as the process
-    }
-}
+      m_playout(clock, [this](const uint8_t* packets, size_t size) { m_receiver.push(packets, size); }) {}
 
-void BroadcastSource::makeTestFile() {
-    std::string error;
-    const std::string file = makeTestMultiplex(error);
-    if (file.empty()) {
-        std::fprintf(stderr, "libtelix: test multiplex: %s\n", error.c_str());
-    }
-    m_platform.post([this, file, error] { onTestFile(file, error); });
+void BroadcastSource::makeTestMultiplexFile() {
+    m_isMakingTestFile = true;
+    const auto make = [this] {
+        std::string error;
+        const std::string file = makeTestMultiplex(error);
+        if (file.empty()) {
+            std::fprintf(stderr, "libtelix: test multiplex: %s\n", error.c_str());
+        }
+        m_platform.post([this, file, error] { onTestFile(file, error); });
+    };
+    std::thread(make).detach(); // this object lives as long as the process
 }
 
 void BroadcastSource::onTestFile(const std::string& file, const std::string& error) {

@@ -21,9 +21,11 @@ public:
         Failed,  // there is no signal, or the channel has no source
     };
 
-    // If `usesTestMultiplex`, its file is made in the background. `onTestMultiplex` is called once that has
-    // ended, whether it succeeded or not.
-    BroadcastSource(Clock& clock, bool usesTestMultiplex, std::function<void()> onTestMultiplex);
+    // `onTestMultiplex` is called once after makeTestMultiplexFile(), whether it succeeded or not.
+    BroadcastSource(Clock& clock, std::function<void()> onTestMultiplex);
+
+    // Makes the file of the test multiplex in the background. At most once, before the first open().
+    void makeTestMultiplexFile();
 
     // Plays out the multiplex of the channel unless it plays already. `error` has the reason of a failure.
     Result open(const Channel& channel, std::string& error);
@@ -31,7 +33,6 @@ public:
     Receiver& receiver() { return m_receiver; }
 
 private:
-    void makeTestFile();
     void onTestFile(const std::string& file, const std::string& error);
 
     Platform& m_platform;
@@ -42,7 +43,7 @@ private:
     std::string m_playedFile; // empty: none
     std::string m_testFile;   // empty: not made
     std::string m_testError;
-    bool m_isMakingTestFile;
+    bool m_isMakingTestFile = false;
 };
 
 } // namespace desktop

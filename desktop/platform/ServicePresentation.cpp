@@ -16,11 +16,18 @@ constexpr auto kTuneTimeout = std::chrono::milliseconds(6000);
 ServicePresentation::ServicePresentation(const Channels& channels, TunerArbiter& arbiter,
                                          BroadcastComponents& components, Clock& clock, Listener listener)
     : m_platform(Platform::instance()), m_channels(channels), m_arbiter(arbiter), m_components(components),
-      m_clock(clock), m_listener(std::move(listener)), m_source(clock, channels.usesTestMultiplex(), [this] {
+      m_clock(clock), m_listener(std::move(listener)), m_source(clock, [this] {
           if (m_pendingTune.id != 0) {
               present(m_pendingTune);
           }
       }) {}
+
+// Not in the constructor, because the platform thread may use this object as soon as the file is there.
+void ServicePresentation::start() {
+    if (m_channels.usesTestMultiplex()) {
+        m_source.makeTestMultiplexFile();
+    }
+}
 
 void ServicePresentation::tune(const Tune& tune) {
     stop();

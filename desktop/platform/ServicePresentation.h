@@ -34,6 +34,10 @@ public:
     ServicePresentation(const Channels& channels, TunerArbiter& arbiter, BroadcastComponents& components,
                         Clock& clock, Listener listener);
 
+    // Prepares the sources of the channels. Once, before the first tune, on the thread that makes this
+    // object.
+    void start();
+
     // Replaces what is presented. The outcome is reported to the arbiter.
     void tune(const Tune& tune);
 
