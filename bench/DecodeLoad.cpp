@@ -1,6 +1,5 @@
-// Decodes a transport stream in real time and shows it to nobody, for so many seconds, and tells how much of
-// a processor that took: what the television of the desk has to do at least. Usage: decode_load FILE.ts
-// SECONDS
+// Decodes a transport stream in real time without showing it, and prints the processor time that took per
+// second: the least that the television can need. Usage: decode_load FILE.ts SECONDS
 #include <gst/gst.h>
 #include <sys/resource.h>
 
@@ -28,7 +27,7 @@ int main(int argc, char* argv[]) {
         return 2;
     }
     gst_init(nullptr, nullptr);
-    // Elements and formats as in the television: the picture as the window wants it, the sound decoded.
+    // The elements and formats of the television: frames in the format of the window, decoded audio.
     const std::string description = "filesrc location=\"" + std::string(argv[1]) +
                                     "\" ! tsdemux name=streams"
                                     " streams. ! queue ! mpegvideoparse ! avdec_mpeg2video ! videoconvert ! "
@@ -43,7 +42,7 @@ int main(int argc, char* argv[]) {
     }
     gst_element_set_state(pipeline, GST_STATE_PLAYING);
     if (gst_element_get_state(pipeline, nullptr, nullptr, 10 * GST_SECOND) != GST_STATE_CHANGE_SUCCESS) {
-        std::fprintf(stderr, "%s: %s does not play\n", argv[0], argv[1]);
+        std::fprintf(stderr, "%s: %s: the pipeline does not preroll\n", argv[0], argv[1]);
         return 2;
     }
     const double before = usedSeconds();
@@ -52,7 +51,7 @@ int main(int argc, char* argv[]) {
         gst_bus_timed_pop_filtered(bus, static_cast<guint64>(seconds) * GST_SECOND,
                                    static_cast<GstMessageType>(GST_MESSAGE_ERROR | GST_MESSAGE_EOS));
     if (message) {
-        std::fprintf(stderr, "%s: %s ended before the time was over\n", argv[0], argv[1]);
+        std::fprintf(stderr, "%s: %s: the stream ended or failed too early\n", argv[0], argv[1]);
         return 2;
     }
     std::printf("%.4f\n", (usedSeconds() - before) / seconds);

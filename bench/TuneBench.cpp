@@ -1,6 +1,6 @@
 // How long a channel change of the desk's television takes: from the request to the first new frame of the
-// test multiplex, beside a pipeline that decodes the same service from the beginning of its file, where a
-// picture that stands for itself comes first and nothing is sent in real time.
+// test multiplex; compared with a pipeline that decodes the same service from the start of its file, where
+// the first frame is a keyframe and nothing is sent in real time.
 #include <benchmark/benchmark.h>
 #include <gst/gst.h>
 
@@ -34,7 +34,7 @@ void onWakeup(void* data) {
     g_woken.notify_all();
 }
 
-uint64_t newestFrame() {
+uint64_t latestFrame() {
     telix_desktop_frame frame{};
     telix_desktop_acquire_frame(&frame);
     const uint64_t serial = frame.visible != 0 ? frame.serial : 0;
@@ -43,7 +43,7 @@ uint64_t newestFrame() {
 }
 
 // Waits until the picture is black, or until there is one.
-bool waitForPicture(bool wanted) {
+bool waitForPicture(bool isVisible) {
     const auto end = Clock::now() + kLimit;
     for (;;) {
         uint64_t before = 0;
@@ -51,7 +51,7 @@ bool waitForPicture(bool wanted) {
             std::lock_guard<std::mutex> lock(g_mutex);
             before = g_wakeups;
         }
-        if ((newestFrame() != 0) == wanted) {
+        if ((latestFrame() != 0) == isVisible) {
             return true;
         }
         std::unique_lock<std::mutex> lock(g_mutex);
@@ -61,40 +61,39 @@ bool waitForPicture(bool wanted) {
     }
 }
 
-// The set, with its channels, once.
-struct Set {
+// The platform with one object, for all iterations.
+struct Television {
     TELIX_JS_VB_HANDLE object = 0;
     TELIX_JS_CM_HANDLE* channels = nullptr;
     uint32_t count = 0;
 
-    Set() {
+    Television() {
         TELIX_JS_VB_GetHandle(&object);
         TELIX_JS_CM_GetChannelList(&count, &channels);
         telix_desktop_set_wakeup(onWakeup, nullptr);
     }
-    ~Set() {
+    ~Television() {
         telix_desktop_set_wakeup(nullptr, nullptr);
         TELIX_JS_VB_Release(object);
     }
 };
 
 void channelChange(benchmark::State& state) {
-    static Set set;
+    static Television television;
     static uint32_t next = 0;
     for (auto each : state) {
         (void)each;
-        if (set.count < 2) {
-            state.SkipWithError("there are no channels to change between");
+        if (television.count < 2) {
+            state.SkipWithError("fewer than two channels");
             return;
         }
-        // Right after a picture that stands for itself the next one is furthest away: viewers zap at any
-        // time.
+        // The wait for the next random access point depends on the moment of the tune, so that moment varies.
         std::this_thread::sleep_for(std::chrono::milliseconds(next * 137 % 500));
         const auto begin = Clock::now();
-        TELIX_JS_VB_SetChannel(set.object, set.channels[next++ % set.count], 0);
-        // The frame of the channel before goes first.
+        TELIX_JS_VB_SetChannel(television.object, television.channels[next++ % television.count], 0);
+        // The last frame of the channel before disappears first.
         if (!waitForPicture(false) || !waitForPicture(true)) {
-            state.SkipWithError("no picture came");
+            state.SkipWithError("no frame arrived");
             return;
         }
         state.SetIterationTime(std::chrono::duration<double>(Clock::now() - begin).count());
@@ -113,19 +112,19 @@ void decodeFromFile(benchmark::State& state) {
         (void)each;
         GstElement* pipeline = gst_parse_launch(description.c_str(), nullptr);
         if (!pipeline) {
-            state.SkipWithError("the pipeline cannot be made");
+            state.SkipWithError("gst_parse_launch failed");
             return;
         }
         const auto begin = Clock::now();
         gst_element_set_state(pipeline, GST_STATE_PAUSED);
-        // The sink holds the first frame then.
+        // Prerolled: the sink has the first frame.
         const bool isReady =
             gst_element_get_state(pipeline, nullptr, nullptr, 10 * GST_SECOND) == GST_STATE_CHANGE_SUCCESS;
         state.SetIterationTime(std::chrono::duration<double>(Clock::now() - begin).count());
         gst_element_set_state(pipeline, GST_STATE_NULL);
         gst_object_unref(pipeline);
         if (!isReady) {
-            state.SkipWithError("no frame came");
+            state.SkipWithError("no frame was decoded");
             return;
         }
     }

@@ -1,4 +1,4 @@
-// The calls of the video/broadcast object.
+// The platform calls for video/broadcast objects.
 #include "desktop/platform/Broadcast.h"
 #include "desktop/platform/ComponentCalls.h"
 #include "desktop/platform/Output.h"
@@ -11,14 +11,22 @@ Broadcast& broadcast() {
     return Broadcast::instance();
 }
 
+TunerArbiter& arbiter() {
+    return Broadcast::instance().arbiter();
+}
+
+BroadcastCallbacks& callbacks() {
+    return Broadcast::instance().callbacks();
+}
+
 template <typename Function>
-TELIX_RETCODE_ENUM_T registered(Callback<Function>& callback, Function function) {
+TELIX_RETCODE_ENUM_T registerCallback(Callback<Function>& callback, Function function) {
     callback.set(function);
     return TELIX_RETCODE_SUCCESS;
 }
 
 template <typename Function>
-TELIX_RETCODE_ENUM_T unregistered(Callback<Function>& callback, Function function) {
+TELIX_RETCODE_ENUM_T unregisterCallback(Callback<Function>& callback, Function function) {
     callback.clear(function);
     return TELIX_RETCODE_SUCCESS;
 }
@@ -26,60 +34,60 @@ TELIX_RETCODE_ENUM_T unregistered(Callback<Function>& callback, Function functio
 } // namespace
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_GetHandle(TELIX_JS_VB_HANDLE* object) {
-    *object = broadcast().newObject();
+    *object = arbiter().newObject();
     return TELIX_RETCODE_SUCCESS;
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_Release(TELIX_JS_VB_HANDLE object) {
-    return resultOf(broadcast().release(object));
+    return resultOf(arbiter().release(object));
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_Stop(TELIX_JS_VB_HANDLE object) {
-    return resultOf(broadcast().stop(object));
+    return resultOf(arbiter().stop(object));
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_BindToCurrChannel(TELIX_JS_VB_HANDLE object) {
-    return resultOf(broadcast().bind(object));
+    return resultOf(arbiter().bind(object));
 }
 
-// There is no recording, so trick play makes no difference.
+// Nothing is recorded, so trick play is the same as none.
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_SetChannel(TELIX_JS_VB_HANDLE object, TELIX_JS_CM_HANDLE channel,
-                                            ___UINT8 flag) {
-    (void)flag;
-    return resultOf(broadcast().tune(object, channel));
+                                            ___UINT8 trickPlay) {
+    (void)trickPlay;
+    return resultOf(arbiter().tune(object, channel));
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_PrevChannel(TELIX_JS_VB_HANDLE object, TELIX_JS_CM_HANDLE* channel) {
-    *channel = broadcast().step(object, -1);
+    *channel = arbiter().step(object, -1);
     return resultOf(*channel != 0);
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_NextChannel(TELIX_JS_VB_HANDLE object, TELIX_JS_CM_HANDLE* channel) {
-    *channel = broadcast().step(object, 1);
+    *channel = arbiter().step(object, 1);
     return resultOf(*channel != 0);
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_GetCurrentChannel(TELIX_JS_VB_HANDLE object, TELIX_JS_CM_HANDLE* channel) {
-    *channel = broadcast().channelOf(object);
+    *channel = arbiter().channelOf(object);
     return resultOf(*channel != 0);
 }
 
-// A service that the set does not know ends in an error of the tune.
+// An unknown service is not refused: its tune fails.
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_SetChannelByTriplet(TELIX_JS_VB_HANDLE object, int32_t onid, int32_t tsid,
                                                      int32_t sid) {
-    if (!broadcast().exists(object)) {
+    if (!arbiter().exists(object)) {
         return kRefused;
     }
     const TELIX_JS_CM_HANDLE channel = broadcast().channels().makeByTriplet(
         static_cast<uint32_t>(onid), static_cast<uint32_t>(tsid), static_cast<uint32_t>(sid));
-    return resultOf(channel != 0 && broadcast().tune(object, channel));
+    return resultOf(channel != 0 && arbiter().tune(object, channel));
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_CreateChannelObjectByTriplet(TELIX_JS_VB_HANDLE object, ___UINT8 idType,
                                                               uint32_t onid, uint32_t tsid, uint32_t sid,
                                                               TELIX_JS_CM_HANDLE* channel) {
-    (void)idType; // every kind of broadcast is the same file here
-    if (!broadcast().exists(object)) {
+    (void)idType; // satellite, cable and terrestrial services all come from files
+    if (!arbiter().exists(object)) {
         return kRefused;
     }
     *channel = broadcast().channels().makeByTriplet(onid, tsid, sid);
@@ -90,7 +98,7 @@ TELIX_RETCODE_ENUM_T TELIX_JS_VB_CreateChannelObjectByDsd(TELIX_JS_VB_HANDLE obj
                                                           const ___UINT8* descriptor, uint32_t length,
                                                           uint32_t sid, TELIX_JS_CM_HANDLE* channel) {
     (void)idType;
-    if (!broadcast().exists(object)) {
+    if (!arbiter().exists(object)) {
         return kRefused;
     }
     *channel = broadcast().channels().makeByDescriptor(Bytes(descriptor, descriptor + length), sid);
@@ -103,7 +111,7 @@ TELIX_RETCODE_ENUM_T TELIX_JS_VB_SetFullScreen(TELIX_JS_VB_HANDLE object, ___UIN
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_IsFullScreen(TELIX_JS_VB_HANDLE object, ___UINT8* fullScreen) {
-    const auto view = broadcast().viewOf(object);
+    const auto view = arbiter().viewOf(object);
     return view ? returnFlag(fullScreen, view->fullScreen) : kRefused;
 }
 
@@ -120,7 +128,7 @@ TELIX_RETCODE_ENUM_T TELIX_JS_VB_SetHeight(TELIX_JS_VB_HANDLE object, int32_t he
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_GetWidth(TELIX_JS_VB_HANDLE object, int32_t* width) {
-    const auto view = broadcast().viewOf(object);
+    const auto view = arbiter().viewOf(object);
     if (view) {
         *width = static_cast<int32_t>(view->width);
     }
@@ -128,7 +136,7 @@ TELIX_RETCODE_ENUM_T TELIX_JS_VB_GetWidth(TELIX_JS_VB_HANDLE object, int32_t* wi
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_GetHeight(TELIX_JS_VB_HANDLE object, int32_t* height) {
-    const auto view = broadcast().viewOf(object);
+    const auto view = arbiter().viewOf(object);
     if (view) {
         *height = static_cast<int32_t>(view->height);
     }
@@ -136,11 +144,11 @@ TELIX_RETCODE_ENUM_T TELIX_JS_VB_GetHeight(TELIX_JS_VB_HANDLE object, int32_t* h
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_SetPlayBackState(TELIX_JS_VB_HANDLE object, TELIX_PLAYSTATE_ENUM_T state) {
-    return resultOf(broadcast().setPlayState(object, state));
+    return resultOf(arbiter().setPlayState(object, state));
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_GetPlayBackState(TELIX_JS_VB_HANDLE object, TELIX_PLAYSTATE_ENUM_T* state) {
-    const auto found = broadcast().playState(object);
+    const auto found = arbiter().playState(object);
     if (found) {
         *state = *found;
     }
@@ -158,144 +166,85 @@ TELIX_RETCODE_ENUM_T TELIX_JS_VB_SetDisplayArea(TELIX_JS_VB_HANDLE object,
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_RegisterOnChannelChangeSucceeded(TELIX_JS_VB_CHANNEL_CHANGE_CB callback) {
-    return registered(broadcast().onChannelChange, callback);
+    return registerCallback(callbacks().onChannelChange, callback);
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_UnRegisterOnChannelChangeSucceeded(TELIX_JS_VB_CHANNEL_CHANGE_CB callback) {
-    return unregistered(broadcast().onChannelChange, callback);
+    return unregisterCallback(callbacks().onChannelChange, callback);
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_RegisterOnChannelChangeError(TELIX_JS_VB_CHANNEL_ERROR_CB callback) {
-    return registered(broadcast().onChannelError, callback);
+    return registerCallback(callbacks().onChannelError, callback);
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_UnRegisterOnChannelChangeError(TELIX_JS_VB_CHANNEL_ERROR_CB callback) {
-    return unregistered(broadcast().onChannelError, callback);
+    return unregisterCallback(callbacks().onChannelError, callback);
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_RegisterOnFullScreenChange(TELIX_JS_VB_FULLSCREEN_CB callback) {
-    return registered(broadcast().onFullScreen, callback);
+    return registerCallback(callbacks().onFullScreen, callback);
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_UnRegisterOnFullScreenChange(TELIX_JS_VB_FULLSCREEN_CB callback) {
-    return unregistered(broadcast().onFullScreen, callback);
+    return unregisterCallback(callbacks().onFullScreen, callback);
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_RegisterOnPlayStateChange(TELIX_JS_VB_PLAYSTATE_CB callback) {
-    return registered(broadcast().onPlayState, callback);
+    return registerCallback(callbacks().onPlayState, callback);
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_UnRegisterOnPlayStateChange(TELIX_JS_VB_PLAYSTATE_CB callback) {
-    return unregistered(broadcast().onPlayState, callback);
+    return unregisterCallback(callbacks().onPlayState, callback);
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_RegisterOnProgrammesChanged(TELIX_JS_VB_HANDLE object,
                                                              TELIX_JS_VB_PROGRAMMES_CB callback) {
     (void)object; // the registration is for all objects
-    return registered(broadcast().onProgrammes, callback);
+    return registerCallback(callbacks().onProgrammes, callback);
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_RegisterOnParentalRatingChange(TELIX_JS_VB_HANDLE object,
                                                                 TELIX_JS_VB_PARENTAL_RATING_CB callback) {
     (void)object;
-    return registered(broadcast().onRatingChange, callback);
+    return registerCallback(callbacks().onRatingChange, callback);
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_RegisterOnParentalRatingError(TELIX_JS_VB_HANDLE object,
                                                                TELIX_JS_VB_PARENTAL_RATING_CB callback) {
     (void)object;
-    return registered(broadcast().onRatingError, callback);
+    return registerCallback(callbacks().onRatingError, callback);
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_UnRegisterOnProgrammesChanged(TELIX_JS_VB_PROGRAMMES_CB callback) {
-    return unregistered(broadcast().onProgrammes, callback);
+    return unregisterCallback(callbacks().onProgrammes, callback);
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_UnRegisterOnParentalRatingChange(TELIX_JS_VB_PARENTAL_RATING_CB callback) {
-    return unregistered(broadcast().onRatingChange, callback);
+    return unregisterCallback(callbacks().onRatingChange, callback);
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_UnRegisterOnParentalRatingError(TELIX_JS_VB_PARENTAL_RATING_CB callback) {
-    return unregistered(broadcast().onRatingError, callback);
+    return unregisterCallback(callbacks().onRatingError, callback);
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_RegisterStreamEvent(TELIX_JS_VB_HANDLE object,
                                                      TELIX_JS_VB_STREAM_EVENT_CB callback,
                                                      const char* eventId, const char* componentTag,
                                                      const char* eventName) {
-    return resultOf(broadcast().watch(object, callback, eventId, componentTag, eventName));
+    if (!callback || !arbiter().exists(object)) {
+        return kRefused;
+    }
+    broadcast().streamEvents().subscribe(object, callback, eventId, componentTag, eventName);
+    return TELIX_RETCODE_SUCCESS;
 }
 
-// The name may differ from the one of the start.
+// The name may differ from that of the registration.
 TELIX_RETCODE_ENUM_T TELIX_JS_VB_UnRegisterStreamEvent(TELIX_JS_VB_HANDLE object,
                                                        TELIX_JS_VB_STREAM_EVENT_CB callback,
                                                        const char* eventId, const char* componentTag,
                                                        const char* eventName) {
     (void)eventName;
-    return resultOf(broadcast().unwatch(object, callback, eventId, componentTag));
+    return resultOf(broadcast().streamEvents().unsubscribe(object, callback, eventId, componentTag));
 }
 
-TELIX_RETCODE_ENUM_T TELIX_JS_VB_GetComponents(TELIX_JS_VB_HANDLE object, TELIX_JS_AVCOMPTYPE type,
-                                               TELIX_JS_AVCOMPHANDLE** components, uint32_t* count) {
-    static std::vector<TELIX_JS_AVCOMPHANDLE> kept; // valid until the next call
-    return returnComponents(kept, broadcast().components(object, type, false), components, count);
-}
-
-TELIX_RETCODE_ENUM_T TELIX_JS_VB_GetCurrActiveComponents(TELIX_JS_VB_HANDLE object, TELIX_JS_AVCOMPTYPE type,
-                                                         TELIX_JS_AVCOMPHANDLE** components,
-                                                         uint32_t* count) {
-    static std::vector<TELIX_JS_AVCOMPHANDLE> kept; // valid until the next call
-    return returnComponents(kept, broadcast().components(object, type, true), components, count);
-}
-
-TELIX_RETCODE_ENUM_T TELIX_JS_VB_SelectComponent(TELIX_JS_VB_HANDLE object, TELIX_JS_AVCOMPHANDLE component,
-                                                 TELIX_JS_AVCOMPTYPE type) {
-    return resultOf(broadcast().select(object, component, type, true));
-}
-
-TELIX_RETCODE_ENUM_T TELIX_JS_VB_UnselectComponent(TELIX_JS_VB_HANDLE object, TELIX_JS_AVCOMPHANDLE component,
-                                                   TELIX_JS_AVCOMPTYPE type) {
-    return resultOf(broadcast().select(object, component, type, false));
-}
-
-TELIX_RETCODE_ENUM_T TELIX_JS_VB_AVComponent_GetEncoding(TELIX_JS_AVCOMPHANDLE component,
-                                                         TELIX_JS_AVCOMPTYPE type, char** encoding) {
-    return returnTrait(broadcast().findComponent(component, type), &ComponentTraits::encoding, encoding);
-}
-
-TELIX_RETCODE_ENUM_T TELIX_JS_VB_AVComponent_GetEncrypted(TELIX_JS_AVCOMPHANDLE component,
-                                                          TELIX_JS_AVCOMPTYPE type, ___UINT8* encrypted) {
-    return returnTrait(broadcast().findComponent(component, type), &ComponentTraits::isEncrypted, encrypted);
-}
-
-TELIX_RETCODE_ENUM_T TELIX_JS_VB_AVComponent_GetAspectRatio(TELIX_JS_AVCOMPHANDLE component,
-                                                            TELIX_JS_AVCOMPTYPE type, float* aspectRatio) {
-    return returnTrait(broadcast().findComponent(component, type), &ComponentTraits::aspectRatio,
-                       aspectRatio);
-}
-
-TELIX_RETCODE_ENUM_T TELIX_JS_VB_AVComponent_GetLanguage(TELIX_JS_AVCOMPHANDLE component,
-                                                         TELIX_JS_AVCOMPTYPE type, char** language) {
-    return returnTrait(broadcast().findComponent(component, type), &ComponentTraits::language, language);
-}
-
-TELIX_RETCODE_ENUM_T TELIX_JS_VB_AVComponent_GetAudioDescription(TELIX_JS_AVCOMPHANDLE component,
-                                                                 TELIX_JS_AVCOMPTYPE type,
-                                                                 ___UINT8* audioDescription) {
-    return returnTrait(broadcast().findComponent(component, type), &ComponentTraits::isAudioDescription,
-                       audioDescription);
-}
-
-TELIX_RETCODE_ENUM_T TELIX_JS_VB_AVComponent_GetAudioChannels(TELIX_JS_AVCOMPHANDLE component,
-                                                              TELIX_JS_AVCOMPTYPE type,
-                                                              uint32_t* audioChannels) {
-    return returnTrait(broadcast().findComponent(component, type), &ComponentTraits::audioChannels,
-                       audioChannels);
-}
-
-TELIX_RETCODE_ENUM_T TELIX_JS_VB_AVComponent_GetHearingImpaired(TELIX_JS_AVCOMPHANDLE component,
-                                                                TELIX_JS_AVCOMPTYPE type,
-                                                                ___UINT8* hearingImpaired) {
-    return returnTrait(broadcast().findComponent(component, type), &ComponentTraits::isForHearingImpaired,
-                       hearingImpaired);
-}
+TELIX_DEFINE_COMPONENT_CALLS(TELIX_JS_VB, TELIX_JS_VB_HANDLE, Broadcast)

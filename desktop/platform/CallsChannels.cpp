@@ -1,4 +1,4 @@
-// The calls on channels.
+// The platform calls for channels.
 #include "desktop/platform/Broadcast.h"
 #include "desktop/platform/Output.h"
 
@@ -6,11 +6,11 @@ using namespace desktop;
 
 namespace {
 
-// Gives one property of a channel out, or refuses.
-template <typename Give>
-TELIX_RETCODE_ENUM_T ofChannel(TELIX_JS_CM_HANDLE handle, Give give) {
+// Returns a property of a channel, or refuses.
+template <typename Function>
+TELIX_RETCODE_ENUM_T ofChannel(TELIX_JS_CM_HANDLE handle, Function function) {
     const auto channel = Broadcast::instance().channels().find(handle);
-    return channel ? give(*channel) : kRefused;
+    return channel ? function(*channel) : kRefused;
 }
 
 } // namespace
@@ -18,7 +18,7 @@ TELIX_RETCODE_ENUM_T ofChannel(TELIX_JS_CM_HANDLE handle, Give give) {
 TELIX_RETCODE_ENUM_T TELIX_JS_CM_GetChannelList(uint32_t* count, TELIX_JS_CM_HANDLE** channels) {
     static std::vector<TELIX_JS_CM_HANDLE> handles; // valid until the next call
     handles = Broadcast::instance().channels().list();
-    handles.reserve(1); // also an empty array is somewhere
+    handles.reserve(1); // the address of an empty array is not null either
     *count = static_cast<uint32_t>(handles.size());
     *channels = handles.data();
     return TELIX_RETCODE_SUCCESS;
@@ -52,23 +52,23 @@ TELIX_RETCODE_ENUM_T TELIX_JS_CM_GetTsid(TELIX_JS_CM_HANDLE channel, uint32_t* t
     });
 }
 
-// Each byte is one character, as pages give a descriptor back. No text can hold a zero: such a descriptor is
-// refused.
+// Each byte becomes the character with its code, in UTF-8, as pages hand descriptors back. A descriptor with
+// a zero byte is refused, because a string ends at a zero.
 TELIX_RETCODE_ENUM_T TELIX_JS_CM_GetDsd(TELIX_JS_CM_HANDLE channel, char** descriptor) {
     return ofChannel(channel, [=](const Channel& found) -> TELIX_RETCODE_ENUM_T {
-        std::string text;
+        std::string string;
         for (const uint8_t byte : found.deliveryDescriptor) {
             if (byte == 0) {
                 return kRefused;
             }
             if (byte < 0x80) {
-                text += static_cast<char>(byte);
+                string += static_cast<char>(byte);
             } else {
-                text += static_cast<char>(0xC0 | byte >> 6);
-                text += static_cast<char>(0x80 | (byte & 0x3F));
+                string += static_cast<char>(0xC0 | byte >> 6);
+                string += static_cast<char>(0x80 | (byte & 0x3F));
             }
         }
-        return returnString(descriptor, text);
+        return returnString(descriptor, string);
     });
 }
 
@@ -87,6 +87,6 @@ TELIX_RETCODE_ENUM_T TELIX_JS_CM_GetChannelByTriplet(uint32_t onid, uint32_t tsi
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_APP_GetCurrentChannel(TELIX_JS_CM_HANDLE* channel) {
-    *channel = Broadcast::instance().currentChannel();
+    *channel = Broadcast::instance().arbiter().currentChannel();
     return resultOf(*channel != 0);
 }

@@ -1,21 +1,22 @@
-// The calls on programmes and parental ratings.
+// The platform calls for programmes and parental ratings.
 #include "desktop/platform/Broadcast.h"
 #include "desktop/platform/Output.h"
+#include "desktop/platform/Utf8.h"
 
 using namespace desktop;
 
 namespace {
 
-template <typename Give>
-TELIX_RETCODE_ENUM_T ofProgramme(TELIX_JS_SI_HANDLE handle, Give give) {
+template <typename Function>
+TELIX_RETCODE_ENUM_T ofProgramme(TELIX_JS_SI_HANDLE handle, Function function) {
     const auto programme = Broadcast::instance().programmes().find(handle);
-    return programme ? give(*programme) : kRefused;
+    return programme ? function(*programme) : kRefused;
 }
 
-template <typename Give>
-TELIX_RETCODE_ENUM_T ofRating(TELIX_JS_SI_PARENTALRATING_HANDLE handle, Give give) {
+template <typename Function>
+TELIX_RETCODE_ENUM_T ofRating(TELIX_JS_SI_PARENTALRATING_HANDLE handle, Function function) {
     const auto rating = Broadcast::instance().programmes().findRating(handle);
-    return rating ? give(*rating) : kRefused;
+    return rating ? function(*rating) : kRefused;
 }
 
 template <typename Value>
@@ -25,21 +26,21 @@ TELIX_RETCODE_ENUM_T setProperty(TELIX_JS_SI_HANDLE programme, Value Programme::
                                                                               : kRefused;
 }
 
-// A text of at most 255 bytes, cut between characters; none for the length 0.
-TELIX_RETCODE_ENUM_T giveShortText(char** text, ___UINT8* length, const std::string& value) {
-    size_t size = std::min<size_t>(value.size(), 255);
-    while (size < value.size() && size > 0 && (static_cast<uint8_t>(value[size]) & 0xC0) == 0x80) {
-        --size;
-    }
-    *length = static_cast<___UINT8>(size);
-    return size == 0 ? TELIX_RETCODE_SUCCESS : returnString(text, value.substr(0, size));
+// The length of a name or description is returned in one byte.
+constexpr size_t kMaxStringSize = 255;
+
+// Returns a string of at most kMaxStringSize bytes; none for an empty one.
+TELIX_RETCODE_ENUM_T returnShortString(char** out, ___UINT8* length, const std::string& value) {
+    const std::string string = truncateUtf8(value, kMaxStringSize);
+    *length = static_cast<___UINT8>(string.size());
+    return string.empty() ? TELIX_RETCODE_SUCCESS : returnString(out, string);
 }
 
 } // namespace
 
 TELIX_RETCODE_ENUM_T TELIX_JS_SI_GetProgrammeHandles(uint32_t* count, TELIX_JS_SI_HANDLE** programmes) {
     static std::vector<TELIX_JS_SI_HANDLE> handles; // valid until the next call
-    handles = Broadcast::instance().currentProgrammes();
+    handles = Broadcast::instance().presentFollowing().handles();
     handles.reserve(1);
     *count = static_cast<uint32_t>(handles.size());
     *programmes = handles.data();
@@ -68,13 +69,13 @@ TELIX_RETCODE_ENUM_T TELIX_JS_SI_SetDuration(TELIX_JS_SI_HANDLE programme, uint3
 
 TELIX_RETCODE_ENUM_T TELIX_JS_SI_GetName(TELIX_JS_SI_HANDLE programme, char** name, ___UINT8* length) {
     return ofProgramme(programme,
-                       [=](const Programme& found) { return giveShortText(name, length, found.name); });
+                       [=](const Programme& found) { return returnShortString(name, length, found.name); });
 }
 
 TELIX_RETCODE_ENUM_T TELIX_JS_SI_GetDescription(TELIX_JS_SI_HANDLE programme, char** description,
                                                 ___UINT8* length) {
     return ofProgramme(programme, [=](const Programme& found) {
-        return giveShortText(description, length, found.description);
+        return returnShortString(description, length, found.description);
     });
 }
 
@@ -109,7 +110,7 @@ TELIX_RETCODE_ENUM_T TELIX_JS_SI_GetParentalRatingHandles(TELIX_JS_SI_HANDLE pro
     });
 }
 
-// The age as a text; a number of the broadcaster's own has no name.
+// The age as a string; a broadcaster's own value has no name.
 TELIX_RETCODE_ENUM_T TELIX_JS_SI_PARENTALRATING_GetName(TELIX_JS_SI_PARENTALRATING_HANDLE rating,
                                                         char** name) {
     return ofRating(rating, [=](const ParentalRating& found) {

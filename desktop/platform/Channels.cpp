@@ -1,21 +1,23 @@
-// Services of transport stream files, and looking channels up.
+// The services of transport stream files, and channel lookup.
 #include "desktop/platform/Channels.h"
 
-#include "desktop/platform/Multiplex.h"
-#include "desktop/platform/Sections.h"
+#include <glib.h>
 
 #include <algorithm>
 #include <cstdio>
 #include <memory>
 
+#include "desktop/platform/Multiplex.h"
+#include "desktop/platform/Sections.h"
+
 namespace desktop {
 
 namespace {
 
-constexpr size_t bytesScanned = size_t{8} << 20; // tables come round every two seconds at the latest
-constexpr size_t mostUnlisted = 256;
+constexpr size_t kBytesScanned = size_t{8} << 20; // tables are repeated every two seconds at least
+constexpr size_t kMaxUnlisted = 256;
 
-// The tables of a file that name its services.
+// The tables of a file that describe its services.
 struct Scan {
     std::optional<Pat> pat;
     std::optional<Sdt> sdt;
@@ -35,44 +37,55 @@ Scan scanFile(const std::string& file) {
         return scan;
     }
     const auto* bytes = reinterpret_cast<const uint8_t*>(g_mapped_file_get_contents(mapping.get()));
-    const size_t length = std::min(g_mapped_file_get_length(mapping.get()), bytesScanned);
+    const size_t length = std::min(g_mapped_file_get_length(mapping.get()), kBytesScanned);
     const auto start = findPackets(bytes, length);
     if (!start) {
-        std::fprintf(stderr, "libtelix: %s is no transport stream\n", file.c_str());
+        std::fprintf(stderr, "libtelix: %s: not a transport stream\n", file.c_str());
         return scan;
     }
     SectionDemultiplexer demultiplexer([&](uint16_t pid, const Bytes& section) {
-        if (pid == patPid && !scan.pat) {
+        if (pid == kPidPat && !scan.pat) {
             scan.pat = parsePat(section);
-        } else if (pid == sdtPid && !scan.sdt) {
+        } else if (pid == kPidSdt && !scan.sdt) {
             scan.sdt = parseSdt(section);
-        } else if (pid == nitPid && !scan.nit) {
+        } else if (pid == kPidNit && !scan.nit) {
             scan.nit = parseNit(section);
         }
     });
-    for (const uint16_t pid : {patPid, sdtPid, nitPid}) {
+    for (const uint16_t pid : {kPidPat, kPidSdt, kPidNit}) {
         demultiplexer.add(pid);
     }
-    for (size_t at = *start; at + packetSize <= length && !(scan.pat && scan.sdt && scan.nit);
-         at += packetSize) {
+    for (size_t at = *start; at + kPacketSize <= length && !(scan.pat && scan.sdt && scan.nit);
+         at += kPacketSize) {
         demultiplexer.push(bytes + at);
     }
     return scan;
 }
 
-int32_t typeOf(uint8_t serviceType) {
+Channel::Type typeOf(uint8_t serviceType) {
     switch (serviceType) {
-    case 0x01:
-    case 0x11:
-    case 0x16:
-    case 0x19:
-    case 0x1F:
-        return 0;
-    case 0x02:
-    case 0x0A:
-        return 1;
+    case kServiceTypeDigitalTelevision:
+    case kServiceTypeMpeg2HdTelevision:
+    case kServiceTypeAdvancedCodecSdTelevision:
+    case kServiceTypeAdvancedCodecHdTelevision:
+    case kServiceTypeHevcTelevision:
+        return Channel::Television;
+    case kServiceTypeDigitalRadio:
+    case kServiceTypeAdvancedCodecRadio:
+        return Channel::Radio;
     default:
-        return 2;
+        return Channel::Other;
+    }
+}
+
+// What the SDT says of the channel's service.
+void describe(Channel& channel, const Sdt& sdt) {
+    channel.onid = sdt.originalNetworkId;
+    for (const SdtService& service : sdt.services) {
+        if (service.serviceId == channel.sid) {
+            channel.type = typeOf(service.type);
+            channel.name = service.name.empty() ? channel.name : service.name;
+        }
     }
 }
 
@@ -103,8 +116,8 @@ Channels::Channels(const std::vector<Configuration::Source>& sources) {
         if (source.path.empty()) {
             for (const TestService& service : testServices()) {
                 if (!source.service || *source.service == service.serviceId) {
-                    add({0, Channel::Origin::testMultiplex, "", 0, testOriginalNetworkId,
-                         testTransportStreamId, service.serviceId, service.name, testDeliveryDescriptor()});
+                    add({0, Channel::Origin::TestMultiplex, "", Channel::Television, kTestOriginalNetworkId,
+                         kTestTransportStreamId, service.serviceId, service.name, testDeliveryDescriptor()});
                 }
             }
         } else if (g_file_test(source.path.c_str(), G_FILE_TEST_IS_DIR)) {
@@ -128,35 +141,29 @@ void Channels::add(Channel channel) {
 void Channels::addFile(const std::string& file, std::optional<uint16_t> service) {
     const Scan scan = scanFile(file);
     Channel channel;
-    channel.origin = Channel::Origin::file;
+    channel.origin = Channel::Origin::File;
     channel.file = file;
     if (scan.nit) {
         channel.deliveryDescriptor = scan.nit->deliveryDescriptor;
     }
     bool isFound = false;
-    for (const auto& [sid, pid] : scan.pat ? scan.pat->programmes : decltype(Pat::programmes)()) {
-        if (sid == 0 || (service && *service != sid)) {
+    for (const auto& [sid, pid] : scan.pat ? scan.pat->programs : decltype(Pat::programs)()) {
+        if (sid == kProgramNumberNetwork || (service && *service != sid)) {
             continue;
         }
         isFound = true;
         channel.sid = sid;
         channel.tsid = scan.pat->transportStreamId;
         channel.name = stemOf(file);
-        if (scan.pat->programmes.size() > 1) {
+        if (scan.pat->programs.size() > 1) {
             channel.name += " " + std::to_string(sid);
         }
         if (scan.sdt) {
-            channel.onid = scan.sdt->originalNetworkId;
-            for (const SdtService& described : scan.sdt->services) {
-                if (described.serviceId == sid) {
-                    channel.type = typeOf(described.type);
-                    channel.name = described.name.empty() ? channel.name : described.name;
-                }
-            }
+            describe(channel, *scan.sdt);
         }
         add(channel);
     }
-    if (!isFound) { // tuning to it tells what is wrong
+    if (!isFound) { // the viewer learns the reason by tuning to it
         channel.sid = service.value_or(0);
         channel.name = stemOf(file);
         add(channel);
@@ -175,7 +182,7 @@ TELIX_JS_CM_HANDLE Channels::findByTriplet(uint32_t onid, uint32_t tsid, uint32_
     std::lock_guard<std::mutex> lock(m_mutex);
     for (const TELIX_JS_CM_HANDLE handle : m_list) {
         const Channel& channel = m_channels[handle - 1];
-        const bool isStream = tsid == anyTransportStream || channel.tsid == tsid;
+        const bool isStream = tsid == kAnyTransportStream || channel.tsid == tsid;
         if (channel.onid == onid && isStream && channel.sid == sid) {
             return handle;
         }
@@ -219,14 +226,14 @@ TELIX_JS_CM_HANDLE Channels::addUnlisted(Channel channel) {
             return each.handle;
         }
     }
-    if (m_channels.size() - m_list.size() >= mostUnlisted) {
+    if (m_channels.size() - m_list.size() >= kMaxUnlisted) {
         return 0;
     }
     add(std::move(channel));
     return m_channels.back().handle;
 }
 
-TELIX_JS_CM_HANDLE Channels::neighbour(TELIX_JS_CM_HANDLE handle, int distance) const {
+TELIX_JS_CM_HANDLE Channels::neighbour(TELIX_JS_CM_HANDLE handle, int offset) const {
     if (m_list.empty()) {
         return 0;
     }
@@ -235,13 +242,13 @@ TELIX_JS_CM_HANDLE Channels::neighbour(TELIX_JS_CM_HANDLE handle, int distance) 
         return m_list.front();
     }
     const auto count = static_cast<int>(m_list.size());
-    const int index = (static_cast<int>(at - m_list.begin()) + distance % count + count) % count;
+    const int index = (static_cast<int>(at - m_list.begin()) + offset % count + count) % count;
     return m_list[static_cast<size_t>(index)];
 }
 
 bool Channels::usesTestMultiplex() const {
     return std::any_of(m_channels.begin(), m_channels.end(),
-                       [](const Channel& each) { return each.origin == Channel::Origin::testMultiplex; });
+                       [](const Channel& each) { return each.origin == Channel::Origin::TestMultiplex; });
 }
 
 } // namespace desktop

@@ -33,15 +33,15 @@ JsonObjectWriter tuneToChannel(const ControlRequest& request) {
         throw ControlError("\"number\" is out of range: there are " + std::to_string(list.size()) +
                            " channels");
     }
-    require(broadcast().zap(list[number - 1]), "the channel cannot be tuned");
+    require(broadcast().arbiter().zap(list[number - 1]), "the channel cannot be tuned");
     JsonObjectWriter response;
     setChannel(response, "channel", list[number - 1]);
     return response;
 }
 
 JsonObjectWriter sendChannelError(const ControlRequest& request) {
-    require(broadcast().onChannelError.isSet(), "no listener is registered for channel errors");
-    require(broadcast().injectChannelError(static_cast<int32_t>(request.number("error"))), kNoObject);
+    require(broadcast().callbacks().onChannelError.isSet(), "no listener is registered for channel errors");
+    require(broadcast().faults().channelError(static_cast<int32_t>(request.number("error"))), kNoObject);
     return {};
 }
 
@@ -50,15 +50,15 @@ JsonObjectWriter changeRating(const ControlRequest& request) {
     require(age == 0 || age >= 4, "\"age\" must be 0, or from 4 to 18");
     const std::string region = request.string("region", device().configuration().country);
     require(region.size() == 3, "\"region\" must be an ISO code of three letters");
-    require(broadcast().onRatingChange.isSet(), "no listener is registered for parental ratings");
+    require(broadcast().callbacks().onRatingChange.isSet(), "no listener is registered for parental ratings");
     // EN 300 468, parental rating descriptor: the rating is the age minus 3.
-    require(broadcast().injectRating(region, static_cast<uint8_t>(age == 0 ? 0 : age - 3)), kNoObject);
+    require(broadcast().faults().rating(region, static_cast<uint8_t>(age == 0 ? 0 : age - 3)), kNoObject);
     return {};
 }
 
 JsonObjectWriter sendRatingError(const ControlRequest& request) {
-    require(broadcast().onRatingError.isSet(), "no listener is registered for parental rating errors");
-    require(broadcast().injectRatingError(request.string("content-id"), request.string("drm-system")),
+    require(broadcast().callbacks().onRatingError.isSet(), "no listener is registered for parental rating errors");
+    require(broadcast().faults().ratingError(request.string("content-id"), request.string("drm-system")),
             kNoObject);
     return {};
 }
@@ -75,12 +75,12 @@ Bytes bytesOfHex(const std::string& digits) {
 }
 
 JsonObjectWriter sendStreamEvent(const ControlRequest& request) {
-    Broadcast::InjectedEvent event;
+    FaultInjection::Event event;
     if (request.has("id")) {
         event.id = static_cast<uint16_t>(request.number("id"));
     }
     if (request.has("tag")) {
-        event.tag = static_cast<uint8_t>(request.number("tag"));
+        event.componentTag = static_cast<uint8_t>(request.number("tag"));
     }
     if (request.has("name")) {
         event.name = request.string("name");
@@ -89,7 +89,7 @@ JsonObjectWriter sendStreamEvent(const ControlRequest& request) {
     const std::string data = request.string("data");
     event.data = request.has("hex") ? bytesOfHex(request.string("hex")) : Bytes(data.begin(), data.end());
     event.status = request.string("status", event.status);
-    const size_t listeners = broadcast().injectStreamEvent(event);
+    const size_t listeners = broadcast().faults().streamEvent(event);
     require(listeners > 0, "no listener is registered for such a stream event");
     JsonObjectWriter response;
     response.number("listeners", static_cast<int64_t>(listeners));
@@ -97,7 +97,7 @@ JsonObjectWriter sendStreamEvent(const ControlRequest& request) {
 }
 
 JsonObjectWriter setFullScreen(const ControlRequest& request) {
-    require(broadcast().injectFullScreen(request.boolean("on")), kNoObject);
+    require(broadcast().faults().fullScreen(request.boolean("on")), kNoObject);
     return {};
 }
 

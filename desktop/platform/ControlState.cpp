@@ -62,7 +62,7 @@ JsonArrayWriter objectsJson(const Broadcast::State& state) {
         object.number("handle", each.handle)
             .string("playState", nameOf(each.playState))
             .number("playStateNumber", each.playState)
-            .boolean("ownsTuner", each.holdsTuner)
+            .boolean("ownsTuner", each.ownsTuner)
             .number("channel", each.channel)
             .object("area", areaJson(each.view.x, each.view.y, each.view.width, each.view.height))
             .boolean("fullScreen", each.view.fullScreen);
@@ -74,8 +74,8 @@ JsonArrayWriter objectsJson(const Broadcast::State& state) {
 JsonArrayWriter componentsJson(const Broadcast::State& state) {
     static const char* const kTypes[] = {"video", "audio", "subtitle"};
     JsonArrayWriter components;
-    for (const Broadcast::State::Available& each : state.components) {
-        const Component& component = each.component;
+    for (const BroadcastComponents::Available& each : state.components) {
+        const BroadcastComponent& component = each.component;
         JsonObjectWriter object;
         object.number("handle", each.handle)
             .string("type", kTypes[component.type])
@@ -96,13 +96,13 @@ JsonArrayWriter componentsJson(const Broadcast::State& state) {
 // The PIDs that are presented: of the audio, the one that leaves the pipeline, which follows the active
 // component a little later.
 void setActivePids(JsonObjectWriter& json, const Broadcast::State& state) {
-    if (const auto pid = broadcast().heardAudio()) {
+    if (const auto pid = broadcast().activeAudioPid()) {
         json.number("activeAudioPid", *pid);
     } else {
         json.null("activeAudioPid");
     }
     json.null("activeSubtitlePid");
-    for (const Broadcast::State::Available& each : state.components) {
+    for (const BroadcastComponents::Available& each : state.components) {
         if (each.isActive && each.component.type == TELIX_JS_AVCOMPTYPE_SUBTITLE) {
             json.number("activeSubtitlePid", each.component.pid);
         }
@@ -177,7 +177,7 @@ JsonArrayWriter keysJson() {
 }
 
 JsonObjectWriter registrationsJson(const Broadcast::State& state) {
-    Broadcast& source = broadcast();
+    const BroadcastCallbacks& source = broadcast().callbacks();
     JsonObjectWriter registrations;
     registrations.boolean("channelChange", source.onChannelChange.isSet())
         .boolean("channelError", source.onChannelError.isSet())
@@ -189,11 +189,11 @@ JsonObjectWriter registrationsJson(const Broadcast::State& state) {
         .boolean("lowMemory", device().onLowMemory.isSet())
         .boolean("drmMessageResult", device().onDrmMessageResult.isSet());
     JsonArrayWriter streamEvents;
-    for (const Broadcast::State::Watch& each : state.watches) {
+    for (const StreamEvents::Subscription& each : state.subscriptions) {
         JsonObjectWriter subscription;
         subscription.number("object", each.object)
             .number("id", each.eventId)
-            .number("tag", each.tag)
+            .number("tag", each.componentTag)
             .string("name", each.name);
         streamEvents.add(std::move(subscription));
     }
@@ -221,7 +221,7 @@ JsonObjectWriter listChannels(const ControlRequest& request) {
     size_t number = 0;
     for (const TELIX_JS_CM_HANDLE handle : broadcast().channels().list()) {
         JsonObjectWriter channel = channelJson(++number, *broadcast().channels().find(handle));
-        channel.boolean("current", handle == broadcast().currentChannel());
+        channel.boolean("current", handle == broadcast().arbiter().currentChannel());
         channels.add(std::move(channel));
     }
     JsonObjectWriter response;

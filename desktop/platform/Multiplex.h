@@ -1,46 +1,50 @@
-// The test multiplex: three services with moving pictures, two languages and subtitles, made once by ffmpeg
-// in the user's cache folder, and the tables that are sent with it.
-#ifndef TELIX_DESKTOP_MULTIPLEX_H
-#define TELIX_DESKTOP_MULTIPLEX_H
-
-#include "desktop/platform/HeadEnd.h"
+// The test multiplex: three services with moving pictures, two languages and subtitles.
+//   Multiplex.cpp       its services and programmes
+//   MultiplexFile.cpp   its file, made once by ffmpeg in the user's cache folder
+//   MultiplexTables.cpp the tables that playout injects
+#ifndef TELIX_DESKTOP_PLATFORM_MULTIPLEX_H
+#define TELIX_DESKTOP_PLATFORM_MULTIPLEX_H
 
 #include <memory>
 #include <string>
 #include <vector>
 
+#include "desktop/platform/TableInjector.h"
+
 namespace desktop {
 
 struct TestService {
     uint16_t serviceId;
-    uint16_t mapPid;
+    uint16_t pmtPid;
     const char* name;
-    std::vector<ElementaryStream> streams; // the first one is the video, with the clock
-    const char* picture;                   // as ffmpeg describes its source
-    std::vector<const char*> programmes;   // titles, one after the other
-    std::vector<uint8_t> ratings;          // of the programmes, as in EitRating
+    std::vector<ElementaryStream> streams; // the first one is the video, with the PCR
+    const char* picture;                   // a source of ffmpeg's lavfi
+    std::vector<const char*> programmes;   // titles, in broadcast order
+    std::vector<uint8_t> ratings;          // of the programmes, as EitRating::value; 0: none
 };
 
-constexpr uint16_t testOriginalNetworkId = 0xFF01; // from those that are free for private use
-constexpr uint16_t testTransportStreamId = 1;
-constexpr uint8_t testEventTag = 0x1F; // component tag of the stream events of each service
-constexpr uint16_t testEventId = 1;
+constexpr uint16_t kTestOriginalNetworkId = kFirstPrivateNetworkId;
+constexpr uint16_t kTestTransportStreamId = 1;
+constexpr uint8_t kTestEventTag = 0x1F; // component tag of the stream events of each service
+constexpr uint16_t kTestEventId = 1;
 
 const std::vector<TestService>& testServices();
 
-// The delivery system descriptor of the test multiplex. It holds no zero: it travels as a text.
+// The delivery system descriptor of the test multiplex. It has no zero byte, because pages get it as a
+// string.
 const Bytes& testDeliveryDescriptor();
 
-// The present programme of a service at a time in seconds since 1970, and the ones before and behind it.
-EitEvent testProgramme(const TestService& service, int64_t time, uint32_t programmeSeconds, int distance);
+// The programme of a service at `utcSeconds` since 1970, or so many programmes after (or before) it. Each
+// lasts `programmeSeconds`.
+EitEvent testProgramme(const TestService& service, int64_t utcSeconds, uint32_t programmeSeconds, int offset);
 
-// The file with the elementary streams, made if it is not there yet, which takes seconds; progress and faults
-// go to standard error. Empty, with the reason in `error`, if it cannot be made. Needs GStreamer. Any thread,
-// one at a time.
+// The file with the elementary streams. Makes it if it does not exist, which takes seconds and prints
+// progress and errors of ffmpeg to standard error. Empty, with the reason in `error`, if that fails.
+// GStreamer must be initialised. Any thread, one at a time.
 std::string makeTestMultiplex(std::string& error);
 
-// The tables of the test multiplex. `streamEventSeconds` 0 means none.
-std::unique_ptr<Carousel> makeTestCarousel(uint32_t programmeSeconds, uint32_t streamEventSeconds);
+// The tables of the test multiplex. A period of stream events of 0 seconds means none.
+std::unique_ptr<TableInjector> makeTestTableInjector(uint32_t programmeSeconds, uint32_t streamEventSeconds);
 
 } // namespace desktop
 

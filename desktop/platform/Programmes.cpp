@@ -7,7 +7,7 @@ namespace desktop {
 
 namespace {
 
-constexpr size_t mostProgrammes = 256;
+constexpr size_t kMaxProgrammes = 256;
 
 } // namespace
 
@@ -33,7 +33,7 @@ TELIX_JS_SI_HANDLE Programmes::add(TELIX_JS_CM_HANDLE channel, const EitEvent& e
     programme.duration = event.duration;
     programme.channelId = std::to_string(channel);
     m_programmes.push_back(std::move(programme));
-    if (m_programmes.size() > mostProgrammes) {
+    if (m_programmes.size() > kMaxProgrammes) {
         m_programmes.pop_front();
     }
     return m_lastHandle;
@@ -51,14 +51,14 @@ std::optional<Programme> Programmes::find(TELIX_JS_SI_HANDLE handle) const {
     return programme ? std::optional(*programme) : std::nullopt;
 }
 
-TELIX_JS_SI_PARENTALRATING_HANDLE Programmes::addRating(const std::string& region, uint8_t broadcast) {
+TELIX_JS_SI_PARENTALRATING_HANDLE Programmes::addRating(const std::string& region, uint8_t rating) {
     std::lock_guard<std::mutex> lock(m_mutex);
     for (size_t index = 0; index < m_ratings.size(); ++index) {
-        if (m_ratings[index].region == region && m_ratings[index].broadcast == broadcast) {
+        if (m_ratings[index].region == region && m_ratings[index].rating == rating) {
             return static_cast<TELIX_JS_SI_PARENTALRATING_HANDLE>(index + 1);
         }
     }
-    m_ratings.push_back({region, broadcast});
+    m_ratings.push_back({region, rating});
     return static_cast<TELIX_JS_SI_PARENTALRATING_HANDLE>(m_ratings.size());
 }
 

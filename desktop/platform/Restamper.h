@@ -1,7 +1,7 @@
-// Makes the repetitions of a transport stream file one stream without a seam: clock references, time stamps
-// and continuity counters run on.
-#ifndef TELIX_DESKTOP_RESTAMPER_H
-#define TELIX_DESKTOP_RESTAMPER_H
+// Joins the repetitions of a transport stream file without a seam: PCR, PTS, DTS and continuity counters
+// continue where the preceding repetition ended.
+#ifndef TELIX_DESKTOP_PLATFORM_RESTAMPER_H
+#define TELIX_DESKTOP_PLATFORM_RESTAMPER_H
 
 #include <cstdint>
 #include <map>
@@ -9,23 +9,19 @@
 
 namespace desktop {
 
-// Time is counted in ticks of the stream's clock of 27 MHz and wraps as the stream's does.
-constexpr int64_t clockRate = 27000000;
-constexpr int64_t clockPeriod = (int64_t{1} << 33) * 300;
+// The PCR of a packet, in ticks of 27 MHz; nothing if it has none.
+std::optional<int64_t> pcrOf(const uint8_t* packet);
 
-// The clock reference that a packet carries.
-std::optional<int64_t> clockReferenceOf(const uint8_t* packet);
-
-// The presentation time stamp of a packet in which an elementary stream's packet begins, in ticks of 90 kHz.
-std::optional<int64_t> presentationTimeOf(const uint8_t* packet);
+// The PTS of a packet in which a PES packet begins, in ticks of 90 kHz; nothing if it has none.
+std::optional<int64_t> ptsOf(const uint8_t* packet);
 
 class Restamper {
 public:
-    // The file starts anew, and its times are moved by `ticks` more, which are rounded to those of time
-    // stamps.
+    // The file starts again. All times in it are shifted by `ticks` of 27 MHz more, rounded down to ticks of
+    // 90 kHz, so that PCR and PTS shift alike.
     void repeat(int64_t ticks);
 
-    // Changes one packet of the file.
+    // Changes one packet of the file in place.
     void restamp(uint8_t* packet);
 
     int64_t shift() const { return m_shift; }
@@ -34,11 +30,15 @@ private:
     struct Counter {
         uint8_t offset = 0;
         uint8_t last = 0;
-        bool isFresh = false; // no packet since the file started anew
+        bool isRestarted = false; // no packet of the PID since the file started again
     };
 
+    void restampContinuity(uint8_t* packet);
+    void restampPcr(uint8_t* packet) const;
+    void restampPes(uint8_t* packet) const;
+
     int64_t m_shift = 0;
-    std::map<uint16_t, Counter> m_counters;
+    std::map<uint16_t, Counter> m_counters; // by PID
 };
 
 } // namespace desktop

@@ -1,19 +1,24 @@
 // Reassembly and parsing of sections.
 #include "desktop/platform/Sections.h"
 
-#include <algorithm>
 #include <glib.h>
+
+#include <algorithm>
 #include <memory>
 
 namespace desktop {
 
 namespace {
 
-constexpr size_t longestSection = 4096;
-constexpr size_t longHeader = 8;
-constexpr size_t sumSize = 4;
+// Least sizes of what the loops of the tables repeat.
+constexpr size_t kPatEntrySize = 4;
+constexpr size_t kPmtStreamSize = 5;
+constexpr size_t kSdtServiceSize = 5;
+constexpr size_t kEitEventSize = 12;
+constexpr size_t kRatingSize = 4;
+constexpr size_t kTimeSize = 5;
 
-// Reads numbers one behind the other; past the end everything is 0 and `good` turns false.
+// Reads numbers one after the other; beyond the end every number is 0 and good() is false.
 class Reader {
 public:
     Reader(const uint8_t* bytes, size_t length) : m_at(bytes), m_left(length) {}
@@ -45,13 +50,13 @@ public:
         m_left -= length;
         return part;
     }
-    Reader takeLoop() { return take(read16() & 0x0FFF); }
-    std::string takeText() {
+    Reader takeLoop() { return take(read16() & kLengthMask); }
+    std::string takeString() {
         const Reader part = take(read8());
-        return decodeText(part.m_at, part.m_left);
+        return decodeString(part.m_at, part.m_left);
     }
     std::string takeCode() {
-        const Reader part = take(3);
+        const Reader part = take(kCodeSize);
         return {reinterpret_cast<const char*>(part.m_at), part.m_left};
     }
     Bytes rest() const { return {m_at, m_at + m_left}; }
@@ -64,22 +69,23 @@ private:
     bool m_good = true;
 };
 
-// The body of a section of the long form and what stands before it.
-struct Long {
-    uint8_t table;
-    uint16_t extension;
+// The header fields and the body of a section of the long form.
+struct LongSection {
+    uint16_t tableIdExtension;
     uint8_t version;
     uint8_t number;
     Reader body;
 };
 
-std::optional<Long> openLong(const Bytes& section, uint8_t table) {
-    if (section.size() < longHeader + sumSize || section[0] != table || (section[5] & 0x01) == 0) {
+std::optional<LongSection> openSection(const Bytes& section, uint8_t tableId) {
+    if (section.size() < kLongSectionHeaderSize + kCrcSize || section[0] != tableId ||
+        (section[5] & kCurrentNextIndicator) == 0) {
         return std::nullopt;
     }
-    return Long{section[0], static_cast<uint16_t>(section[3] << 8 | section[4]),
-                static_cast<uint8_t>(section[5] >> 1 & 0x1F), section[6],
-                Reader(section.data() + longHeader, section.size() - longHeader - sumSize)};
+    return LongSection{
+        static_cast<uint16_t>(section[3] << 8 | section[4]),
+        static_cast<uint8_t>(section[5] >> 1 & (kVersionCount - 1)), section[6],
+        Reader(section.data() + kLongSectionHeaderSize, section.size() - kLongSectionHeaderSize - kCrcSize)};
 }
 
 unsigned int fromBcd(unsigned int value) {
@@ -93,23 +99,33 @@ uint32_t readDuration(Reader& reader) {
 }
 
 int64_t readTime(Reader& reader) {
-    constexpr int64_t dayOf1970 = 40587;
+    constexpr int64_t kSecondsPerDay = 86400;
     const int64_t day = reader.read16();
-    return (day - dayOf1970) * 86400 + readDuration(reader);
+    return (day - kModifiedJulianDateOf1970) * kSecondsPerDay + readDuration(reader);
 }
 
-size_t lengthOf(const Bytes& section) {
-    return 3 + (static_cast<size_t>(section[1] & 0x0F) << 8 | section[2]);
+// Header included.
+size_t sizeOf(const Bytes& section) {
+    return kSectionHeaderSize + ((static_cast<size_t>(section[1]) << 8 | section[2]) & kLengthMask);
+}
+
+// Where the payload of a packet begins; the packet's end if it has none.
+size_t payloadOffset(const uint8_t* packet) {
+    if ((packet[3] & kPayloadFlag) == 0) {
+        return kPacketSize;
+    }
+    const bool hasAdaptationField = (packet[3] & kAdaptationFieldFlag) != 0;
+    return kPacketHeaderSize + (hasAdaptationField ? 1 + size_t{packet[4]} : 0);
 }
 
 } // namespace
 
 std::optional<size_t> findPackets(const uint8_t* bytes, size_t length) {
-    constexpr size_t packetsCompared = 5;
-    for (size_t start = 0; start < packetSize; ++start) {
+    constexpr size_t kPacketsCompared = 5;
+    for (size_t start = 0; start < kPacketSize; ++start) {
         size_t seen = 0;
-        while (start + (seen + 1) * packetSize <= length && bytes[start + seen * packetSize] == packetStart) {
-            if (++seen == packetsCompared) {
+        while (start + (seen + 1) * kPacketSize <= length && bytes[start + seen * kPacketSize] == kSyncByte) {
+            if (++seen == kPacketsCompared) {
                 return start;
             }
         }
@@ -118,78 +134,80 @@ std::optional<size_t> findPackets(const uint8_t* bytes, size_t length) {
 }
 
 void SectionFilter::push(const uint8_t* packet) {
-    const bool damaged = packet[0] != packetStart || (packet[1] & 0x80) != 0 || (packet[3] & 0xC0) != 0;
-    if (damaged) {
+    const bool isDamaged = packet[0] != kSyncByte || (packet[1] & kTransportErrorIndicator) != 0 ||
+                           (packet[3] & kTransportScramblingControlMask) != 0;
+    if (isDamaged) {
         m_isCollecting = false;
         m_continuity = -1;
         return;
     }
-    if ((packet[3] & 0x10) == 0) {
-        return; // no payload
+    if ((packet[3] & kPayloadFlag) == 0) {
+        return;
     }
-    const int continuity = packet[3] & 0x0F;
+    const int continuity = packet[3] & kContinuityCounterMask;
     if (continuity == m_continuity) {
-        return; // sent twice
+        return; // a duplicate packet
     }
-    if (m_continuity >= 0 && continuity != ((m_continuity + 1) & 0x0F)) {
+    if (m_continuity >= 0 && continuity != ((m_continuity + 1) & kContinuityCounterMask)) {
         m_isCollecting = false;
     }
     m_continuity = continuity;
 
-    size_t begin = 4;
-    if ((packet[3] & 0x20) != 0) {
-        begin += 1 + static_cast<size_t>(packet[4]);
-    }
-    if (begin >= packetSize) {
+    const size_t begin = payloadOffset(packet);
+    if (begin >= kPacketSize) {
         return;
     }
-    if ((packet[1] & 0x40) == 0) {
-        if (m_isCollecting) {
-            append(packet + begin, packetSize - begin);
-        }
-        return;
+    if ((packet[1] & kPayloadUnitStartIndicator) != 0) {
+        pushStart(packet, begin);
+    } else if (m_isCollecting) {
+        append(packet + begin, kPacketSize - begin);
     }
+}
+
+// A packet in which a section begins: its payload begins with pointer_field.
+void SectionFilter::pushStart(const uint8_t* packet, size_t begin) {
     const size_t pointer = packet[begin++];
     const size_t start = begin + pointer;
-    if (start > packetSize) {
+    if (start > kPacketSize) {
         m_isCollecting = false;
         return;
     }
     if (m_isCollecting) {
-        append(packet + begin, pointer); // the end of the one before
+        append(packet + begin, pointer); // the end of the preceding section
     }
     m_section.clear();
     m_isCollecting = true;
-    append(packet + start, packetSize - start);
+    append(packet + start, kPacketSize - start);
 }
 
 void SectionFilter::append(const uint8_t* bytes, size_t length) {
     m_section.insert(m_section.end(), bytes, bytes + length);
-    deliverWhole();
+    dispatchWhole();
 }
 
-void SectionFilter::deliverWhole() {
+void SectionFilter::dispatchWhole() {
     while (m_isCollecting && !m_section.empty()) {
-        if (m_section[0] == 0xFF) { // stuffing up to the end of the packet
+        if (m_section[0] == kStuffingByte) { // up to the end of the packet
             m_isCollecting = false;
             break;
         }
-        if (m_section.size() < 3) {
+        if (m_section.size() < kSectionHeaderSize) {
             return;
         }
-        const size_t length = lengthOf(m_section);
-        if (length > longestSection) {
+        const size_t size = sizeOf(m_section);
+        if (size > kMaxPrivateSectionSize) {
             m_isCollecting = false;
             break;
         }
-        if (m_section.size() < length) {
+        if (m_section.size() < size) {
             return;
         }
-        const auto end = m_section.begin() + static_cast<std::ptrdiff_t>(length);
+        const auto end = m_section.begin() + static_cast<std::ptrdiff_t>(size);
         const Bytes section(m_section.begin(), end);
         m_section.erase(m_section.begin(), end);
-        const bool hasSum = (section[1] & 0x80) != 0;
-        if (!hasSum || (length >= longHeader + sumSize && crc32(section.data(), length) == 0)) {
+        const bool hasCrc = (section[1] & kSectionSyntaxIndicator) != 0;
+        const bool isIntact = size >= kLongSectionHeaderSize + kCrcSize && crc32(section.data(), size) == 0;
+        if (!hasCrc || isIntact) {
             m_handler(section);
         }
     }
@@ -210,34 +228,34 @@ void SectionDemultiplexer::push(const uint8_t* packet) {
 }
 
 std::optional<Pat> parsePat(const Bytes& section) {
-    auto open = openLong(section, 0x00);
+    auto open = openSection(section, kTableIdPat);
     if (!open) {
         return std::nullopt;
     }
     Pat pat;
-    pat.transportStreamId = open->extension;
+    pat.transportStreamId = open->tableIdExtension;
     pat.version = open->version;
-    while (open->body.left() >= 4) {
-        const unsigned int service = open->body.read16();
-        pat.programmes.emplace_back(service, open->body.read16() & 0x1FFF);
+    while (open->body.left() >= kPatEntrySize) {
+        const unsigned int program = open->body.read16();
+        pat.programs.emplace_back(program, open->body.read16() & kPidMask);
     }
     return pat;
 }
 
 std::optional<Pmt> parsePmt(const Bytes& section) {
-    auto open = openLong(section, 0x02);
+    auto open = openSection(section, kTableIdPmt);
     if (!open) {
         return std::nullopt;
     }
     Pmt pmt;
-    pmt.serviceId = open->extension;
+    pmt.serviceId = open->tableIdExtension;
     pmt.version = open->version;
-    pmt.pcrPid = open->body.read16() & 0x1FFF;
+    pmt.pcrPid = open->body.read16() & kPidMask;
     pmt.descriptors = open->body.takeLoop().rest();
-    while (open->body.left() >= 5) {
+    while (open->body.left() >= kPmtStreamSize) {
         ElementaryStream stream;
         stream.type = static_cast<uint8_t>(open->body.read8());
-        stream.pid = open->body.read16() & 0x1FFF;
+        stream.pid = open->body.read16() & kPidMask;
         stream.descriptors = open->body.takeLoop().rest();
         pmt.streams.push_back(stream);
     }
@@ -245,49 +263,50 @@ std::optional<Pmt> parsePmt(const Bytes& section) {
 }
 
 std::optional<Nit> parseNit(const Bytes& section) {
-    auto open = openLong(section, 0x40);
+    auto open = openSection(section, kTableIdNitActual);
     if (!open) {
         return std::nullopt;
     }
     Nit nit;
-    nit.networkId = open->extension;
+    nit.networkId = open->tableIdExtension;
     forEachDescriptor(open->body.takeLoop().rest(), [&](uint8_t tag, const uint8_t* body, size_t length) {
-        if (tag == 0x40) {
-            nit.name = decodeText(body, length);
+        if (tag == kTagNetworkName) {
+            nit.name = decodeString(body, length);
         }
     });
     Reader streams = open->body.takeLoop();
     nit.transportStreamId = static_cast<uint16_t>(streams.read16());
     nit.originalNetworkId = static_cast<uint16_t>(streams.read16());
     forEachDescriptor(streams.takeLoop().rest(), [&](uint8_t tag, const uint8_t* body, size_t length) {
-        const bool isDelivery = tag == 0x43 || tag == 0x44 || tag == 0x5A; // satellite, cable, terrestrial
+        const bool isDelivery = tag == kTagSatelliteDeliverySystem || tag == kTagCableDeliverySystem ||
+                                tag == kTagTerrestrialDeliverySystem;
         if (isDelivery && nit.deliveryDescriptor.empty()) {
-            nit.deliveryDescriptor.assign(body - 2, body + length);
+            nit.deliveryDescriptor.assign(body - kDescriptorHeaderSize, body + length);
         }
     });
     return open->body.good() && streams.good() ? std::optional(nit) : std::nullopt;
 }
 
 std::optional<Sdt> parseSdt(const Bytes& section) {
-    auto open = openLong(section, 0x42);
+    auto open = openSection(section, kTableIdSdtActual);
     if (!open) {
         return std::nullopt;
     }
     Sdt sdt;
-    sdt.transportStreamId = open->extension;
+    sdt.transportStreamId = open->tableIdExtension;
     sdt.version = open->version;
     sdt.originalNetworkId = static_cast<uint16_t>(open->body.read16());
     open->body.read8();
-    while (open->body.left() >= 5) {
+    while (open->body.left() >= kSdtServiceSize) {
         SdtService service;
         service.serviceId = static_cast<uint16_t>(open->body.read16());
         open->body.read8();
         forEachDescriptor(open->body.takeLoop().rest(), [&](uint8_t tag, const uint8_t* body, size_t length) {
-            if (tag == 0x48) {
+            if (tag == kTagService) {
                 Reader words(body, length);
                 service.type = static_cast<uint8_t>(words.read8());
-                service.provider = words.takeText();
-                service.name = words.takeText();
+                service.provider = words.takeString();
+                service.name = words.takeString();
             }
         });
         sdt.services.push_back(service);
@@ -295,61 +314,71 @@ std::optional<Sdt> parseSdt(const Bytes& section) {
     return open->body.good() ? std::optional(sdt) : std::nullopt;
 }
 
+namespace {
+
+// Of several short event descriptors the first one, that of the first language, counts.
+void readEventDescriptors(const Bytes& descriptors, EitEvent& event) {
+    bool hasShortEvent = false;
+    forEachDescriptor(descriptors, [&](uint8_t tag, const uint8_t* body, size_t length) {
+        Reader words(body, length);
+        if (tag == kTagShortEvent && !hasShortEvent) {
+            hasShortEvent = true;
+            event.language = words.takeCode();
+            event.name = words.takeString();
+            event.text = words.takeString();
+        } else if (tag == kTagParentalRating) {
+            while (words.left() >= kRatingSize) {
+                const std::string country = words.takeCode();
+                event.ratings.push_back({country, static_cast<uint8_t>(words.read8())});
+            }
+        }
+    });
+}
+
+} // namespace
+
 std::optional<Eit> parseEit(const Bytes& section) {
-    auto open = openLong(section, 0x4E);
+    auto open = openSection(section, kTableIdEitActualPresentFollowing);
     if (!open) {
         return std::nullopt;
     }
     Eit eit;
-    eit.serviceId = open->extension;
+    eit.serviceId = open->tableIdExtension;
     eit.version = open->version;
-    eit.number = open->number;
+    eit.sectionNumber = open->number;
     eit.transportStreamId = static_cast<uint16_t>(open->body.read16());
     eit.originalNetworkId = static_cast<uint16_t>(open->body.read16());
-    open->body.read16();
-    while (open->body.left() >= 12) {
+    open->body.read16(); // segment_last_section_number, last_table_id
+    while (open->body.left() >= kEitEventSize) {
         EitEvent event;
         event.id = static_cast<uint16_t>(open->body.read16());
         event.start = readTime(open->body);
         event.duration = readDuration(open->body);
-        bool hasWords = false;
-        forEachDescriptor(open->body.takeLoop().rest(), [&](uint8_t tag, const uint8_t* body, size_t length) {
-            Reader words(body, length);
-            if (tag == 0x4D && !hasWords) { // the first language
-                hasWords = true;
-                event.language = words.takeCode();
-                event.name = words.takeText();
-                event.text = words.takeText();
-            } else if (tag == 0x55) {
-                while (words.left() >= 4) {
-                    const std::string country = words.takeCode();
-                    event.ratings.push_back({country, static_cast<uint8_t>(words.read8())});
-                }
-            }
-        });
+        readEventDescriptors(open->body.takeLoop().rest(), event);
         eit.events.push_back(event);
     }
     return open->body.good() ? std::optional(eit) : std::nullopt;
 }
 
 std::optional<int64_t> parseTime(const Bytes& section) {
-    const bool isTime = section.size() >= 8 && (section[0] == 0x70 || section[0] == 0x73);
+    const bool isTime = section.size() >= kSectionHeaderSize + kTimeSize &&
+                        (section[0] == kTableIdTdt || section[0] == kTableIdTot);
     if (!isTime) {
         return std::nullopt;
     }
-    Reader reader(section.data() + 3, section.size() - 3);
+    Reader reader(section.data() + kSectionHeaderSize, section.size() - kSectionHeaderSize);
     return readTime(reader);
 }
 
 std::vector<StreamEvent> parseStreamEvents(const Bytes& section) {
     std::vector<StreamEvent> events;
-    if (const auto open = openLong(section, 0x3D)) {
+    if (const auto open = openSection(section, kTableIdDsmccStreamDescriptors)) {
         forEachDescriptor(open->body.rest(), [&](uint8_t tag, const uint8_t* body, size_t length) {
-            if (tag == 0x1A && length >= 10) {
+            if (tag == kTagStreamEvent && length >= kStreamEventFixedBodySize) {
                 StreamEvent event;
                 event.id = static_cast<uint16_t>(body[0] << 8 | body[1]);
                 event.version = open->version;
-                event.data.assign(body + 10, body + length);
+                event.data.assign(body + kStreamEventFixedBodySize, body + length);
                 events.push_back(event);
             }
         });
@@ -357,44 +386,60 @@ std::vector<StreamEvent> parseStreamEvents(const Bytes& section) {
     return events;
 }
 
-std::string decodeText(const uint8_t* bytes, size_t length) {
+namespace {
+
+// The name that iconv knows for the character table of a string, whose selecting bytes are skipped.
+std::string takeCharacterTable(const uint8_t*& bytes, size_t& length) {
     std::string charset = "ISO_6937";
-    if (length > 0 && bytes[0] < 0x20) {
-        const uint8_t selector = *bytes++;
-        --length;
-        if (selector == 0x15) {
-            charset = "UTF-8";
-        } else if (selector == 0x11) {
-            charset = "UTF-16BE";
-        } else if (selector == 0x10 && length >= 2) {
-            charset = "ISO-8859-" + std::to_string(bytes[1]);
-            bytes += 2;
-            length -= 2;
-        } else if (selector <= 0x0B) {
-            charset = "ISO-8859-" + std::to_string(selector + 4);
-        }
+    if (length == 0 || bytes[0] >= kFirstCharacterCode) {
+        return charset;
     }
-    std::string text(reinterpret_cast<const char*>(bytes), length);
-    const bool singleBytes = charset != "UTF-8" && charset != "UTF-16BE";
-    if (singleBytes) { // emphasis and line breaks are codes of their own
-        text.erase(std::remove_if(text.begin(), text.end(),
-                                  [](char each) {
-                                      const auto code = static_cast<uint8_t>(each);
-                                      return code < 0x20 || (code >= 0x80 && code < 0xA0);
-                                  }),
-                   text.end());
+    const uint8_t selector = *bytes++;
+    --length;
+    if (selector == kCharacterTableUtf8) {
+        charset = "UTF-8";
+    } else if (selector == kCharacterTableUcs2) {
+        charset = "UTF-16BE";
+    } else if (selector == kCharacterTableIso8859ByNumber && length >= 2) {
+        charset = "ISO-8859-" + std::to_string(bytes[1]);
+        bytes += 2;
+        length -= 2;
+    } else if (selector <= kCharacterTableLastIso8859) {
+        charset = "ISO-8859-" + std::to_string(selector + kCharacterTableIso8859Offset);
     }
-    struct Free {
-        void operator()(char* block) const { g_free(block); }
+    return charset;
+}
+
+// Emphasis and line breaks have control codes of one byte.
+void removeControlCodes(std::string& string) {
+    const auto isControl = [](char each) {
+        const auto code = static_cast<uint8_t>(each);
+        return code < kFirstCharacterCode || (code >= kFirstControlCode && code < kControlCodesEnd);
     };
-    using Text = std::unique_ptr<char, Free>;
-    Text converted;
+    string.erase(std::remove_if(string.begin(), string.end(), isControl), string.end());
+}
+
+struct Free {
+    void operator()(char* block) const { g_free(block); }
+};
+
+} // namespace
+
+std::string decodeString(const uint8_t* bytes, size_t length) {
+    const std::string charset = takeCharacterTable(bytes, length);
+    std::string string(reinterpret_cast<const char*>(bytes), length);
+    std::unique_ptr<char, Free> converted;
     if (charset == "UTF-8") {
-        converted.reset(g_utf8_make_valid(text.data(), static_cast<gssize>(text.size())));
+        converted.reset(g_utf8_make_valid(string.data(), static_cast<gssize>(string.size())));
         return converted.get();
     }
+    if (charset != "UTF-16BE") {
+        removeControlCodes(string);
+    }
+    // An unknown or wrong character table must not lose the string: ISO/IEC 8859-1 has a character for each
+    // byte.
     for (const char* each : {charset.c_str(), "ISO-8859-1"}) {
-        converted.reset(g_convert(text.data(), static_cast<gssize>(text.size()), "UTF-8", each, nullptr,
+        converted.reset(g_convert(string.data(), static_cast<gssize>(string.size()), "UTF-8", each, nullptr,
                                   nullptr, nullptr));
         if (converted) {
             return converted.get(); // up to the first zero
@@ -406,13 +451,13 @@ std::string decodeText(const uint8_t* bytes, size_t length) {
 void forEachDescriptor(const Bytes& descriptors,
                        const std::function<void(uint8_t tag, const uint8_t* body, size_t length)>& visit) {
     size_t at = 0;
-    while (at + 2 <= descriptors.size()) {
+    while (at + kDescriptorHeaderSize <= descriptors.size()) {
         const size_t length = descriptors[at + 1];
-        if (at + 2 + length > descriptors.size()) {
+        if (at + kDescriptorHeaderSize + length > descriptors.size()) {
             return;
         }
-        visit(descriptors[at], descriptors.data() + at + 2, length);
-        at += 2 + length;
+        visit(descriptors[at], descriptors.data() + at + kDescriptorHeaderSize, length);
+        at += kDescriptorHeaderSize + length;
     }
 }
 

@@ -1,16 +1,19 @@
-// Reading tables back from packets: reassembly of sections, their sums, and parsing. Whatever a stream holds,
-// damage included, is taken without harm: what does not fit is left out.
-#ifndef TELIX_DESKTOP_SECTIONS_H
-#define TELIX_DESKTOP_SECTIONS_H
-
-#include "desktop/platform/TsTables.h"
+// Reading tables from packets: reassembly of sections, check of their CRC, and parsing. Streams may be
+// damaged or hostile: every length is checked, and what does not fit is skipped.
+#ifndef TELIX_DESKTOP_PLATFORM_SECTIONS_H
+#define TELIX_DESKTOP_PLATFORM_SECTIONS_H
 
 #include <functional>
 #include <map>
+#include <optional>
+#include <string>
+#include <vector>
+
+#include "desktop/platform/TsTables.h"
 
 namespace desktop {
 
-// Where the first of some packets stands that follow each other; nothing if there are none.
+// The offset of the first of several packets in a row; nothing if there are none.
 std::optional<size_t> findPackets(const uint8_t* bytes, size_t length);
 
 // Reassembles the sections of one PID.
@@ -18,16 +21,17 @@ class SectionFilter {
 public:
     using Handler = std::function<void(const Bytes& section)>;
 
-    // `handler` gets each whole section whose sum is good (tables without one as they are), on the thread of
-    // push.
+    // `handler` gets each whole section with a correct CRC, and those of tables without a CRC, on the thread
+    // that calls push().
     explicit SectionFilter(Handler handler) : m_handler(std::move(handler)) {}
 
     // Takes one packet of the PID.
     void push(const uint8_t* packet);
 
 private:
+    void pushStart(const uint8_t* packet, size_t begin);
     void append(const uint8_t* bytes, size_t length);
-    void deliverWhole();
+    void dispatchWhole();
 
     Handler m_handler;
     Bytes m_section;
@@ -46,7 +50,7 @@ public:
     void remove(uint16_t pid) { m_filters.erase(pid); }
     bool has(uint16_t pid) const { return m_filters.count(pid) != 0; }
 
-    // Takes one packet of any PID.  The handler may add PIDs, and must not remove any.
+    // Takes one packet of any PID. The handler may add PIDs, and must not remove any.
     void push(const uint8_t* packet);
 
 private:
@@ -54,20 +58,20 @@ private:
     std::map<uint16_t, SectionFilter> m_filters;
 };
 
-// The tables of sections; nothing for a section of another table, of one that is not in force yet, or for
-// nonsense.
+// The table in a section. Nothing if the section belongs to another table, is not applicable yet
+// (current_next_indicator) or is malformed.
 std::optional<Pat> parsePat(const Bytes& section);
 std::optional<Pmt> parsePmt(const Bytes& section);
-std::optional<Nit> parseNit(const Bytes& section); // of the first transport stream in it
-std::optional<Sdt> parseSdt(const Bytes& section); // of the actual transport stream
-std::optional<Eit> parseEit(const Bytes& section); // present and following of the actual transport stream
-std::optional<int64_t> parseTime(const Bytes& section);
+std::optional<Nit> parseNit(const Bytes& section);      // actual network; its first transport stream
+std::optional<Sdt> parseSdt(const Bytes& section);      // actual transport stream
+std::optional<Eit> parseEit(const Bytes& section);      // actual transport stream, present/following
+std::optional<int64_t> parseTime(const Bytes& section); // TDT or TOT: seconds since 1970, UTC
 std::vector<StreamEvent> parseStreamEvents(const Bytes& section);
 
-// A text of a table as UTF-8, without its control codes.
-std::string decodeText(const uint8_t* bytes, size_t length);
+// A string of a table as UTF-8, without its control codes.
+std::string decodeString(const uint8_t* bytes, size_t length);
 
-// Walks over descriptors.
+// Calls `visit` for each descriptor that is whole.
 void forEachDescriptor(const Bytes& descriptors,
                        const std::function<void(uint8_t tag, const uint8_t* body, size_t length)>& visit);
 

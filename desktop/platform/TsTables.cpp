@@ -4,19 +4,24 @@
 #include <algorithm>
 #include <array>
 
+#include "desktop/platform/Utf8.h"
+
 namespace desktop {
 
 namespace {
 
-constexpr uint8_t utf8Mark = 0x15;
-constexpr size_t longestDescriptor = 255;
+// Our own limits, in bytes: a descriptor with all its strings must fit into its length.
+constexpr size_t kMaxNameSize = 100;
+constexpr size_t kMaxTextSize = 150;
+
+constexpr unsigned int kSubtitlePage = 1; // composition and ancillary page of all subtitles
 
 std::array<uint32_t, 256> makeCrcTable() {
     std::array<uint32_t, 256> table{};
     for (uint32_t index = 0; index < table.size(); ++index) {
         uint32_t sum = index << 24;
         for (int bit = 0; bit < 8; ++bit) {
-            sum = (sum & 0x80000000U) != 0 ? sum << 1 ^ 0x04C11DB7U : sum << 1;
+            sum = (sum & 0x80000000U) != 0 ? sum << 1 ^ kCrcPolynomial : sum << 1;
         }
         table[index] = sum;
     }
@@ -41,35 +46,24 @@ void putBytes(Bytes& bytes, const Bytes& more) {
     bytes.insert(bytes.end(), more.begin(), more.end());
 }
 
-// A length of 12 bits below four set bits, then the bytes themselves.
+// A loop with its length before it.
 void putLoop(Bytes& bytes, const Bytes& loop) {
-    put16(bytes, 0xF000 | static_cast<unsigned int>(loop.size()));
+    put16(bytes, kReservedBeforeLength | static_cast<unsigned int>(loop.size()));
     putBytes(bytes, loop);
 }
 
-// At most `most` bytes, cut between characters.
-std::string cut(const std::string& text, size_t most) {
-    if (text.size() <= most) {
-        return text;
-    }
-    while (most > 0 && (static_cast<uint8_t>(text[most]) & 0xC0) == 0x80) {
-        --most;
-    }
-    return text.substr(0, most);
-}
-
-// A text with its length before it, marked as UTF-8.
-void putText(Bytes& bytes, const std::string& text, size_t most) {
-    const std::string fitting = cut(text, most - 1);
+// A string with its length before it, marked as UTF-8.
+void putString(Bytes& bytes, const std::string& string, size_t maxSize) {
+    const std::string fitting = truncateUtf8(string, maxSize - 1);
     put8(bytes, static_cast<unsigned int>(fitting.empty() ? 0 : fitting.size() + 1));
     if (!fitting.empty()) {
-        put8(bytes, utf8Mark);
+        put8(bytes, kCharacterTableUtf8);
         bytes.insert(bytes.end(), fitting.begin(), fitting.end());
     }
 }
 
 void putCode(Bytes& bytes, const std::string& code) {
-    for (size_t index = 0; index < 3; ++index) {
+    for (size_t index = 0; index < kCodeSize; ++index) {
         put8(bytes, index < code.size() ? static_cast<uint8_t>(code[index]) : ' ');
     }
 }
@@ -77,47 +71,77 @@ void putCode(Bytes& bytes, const std::string& code) {
 Bytes descriptor(uint8_t tag, const Bytes& body) {
     Bytes bytes;
     put8(bytes, tag);
-    put8(bytes, static_cast<unsigned int>(std::min(body.size(), longestDescriptor)));
+    put8(bytes, static_cast<unsigned int>(std::min(body.size(), kMaxDescriptorBodySize)));
     bytes.insert(bytes.end(), body.begin(), body.begin() + static_cast<std::ptrdiff_t>(bytes.back()));
     return bytes;
 }
 
-unsigned int bcd(unsigned int value) {
+unsigned int toBcd(unsigned int value) {
     return value / 10 % 10 << 4 | value % 10;
 }
 
 void putDuration(Bytes& bytes, uint32_t seconds) {
-    put8(bytes, bcd(seconds / 3600));
-    put8(bytes, bcd(seconds / 60 % 60));
-    put8(bytes, bcd(seconds % 60));
+    put8(bytes, toBcd(seconds / 3600));
+    put8(bytes, toBcd(seconds / 60 % 60));
+    put8(bytes, toBcd(seconds % 60));
 }
 
 void putTime(Bytes& bytes, int64_t seconds) {
-    constexpr int64_t dayOf1970 = 40587; // in days of the modified Julian date
-    put16(bytes, static_cast<unsigned int>(seconds / 86400 + dayOf1970));
-    putDuration(bytes, static_cast<uint32_t>(seconds % 86400));
+    constexpr int64_t kSecondsPerDay = 86400;
+    put16(bytes, static_cast<unsigned int>(seconds / kSecondsPerDay + kModifiedJulianDateOf1970));
+    putDuration(bytes, static_cast<uint32_t>(seconds % kSecondsPerDay));
 }
 
-// A section of the long form around `body`, with length and sum.
-Bytes section(uint8_t table, uint16_t extension, uint8_t version, uint8_t number, uint8_t last,
-              bool isPrivate, const Bytes& body) {
+// What stands in the header of a section of the long form.
+struct SectionHeader {
+    uint8_t tableId;
+    uint16_t tableIdExtension;
+    uint8_t version;
+    uint8_t number = 0;
+    uint8_t lastNumber = 0;
+};
+
+// Whose table it is, which shows in a bit of the header.
+enum class Family { Mpeg, Dvb };
+
+// A section of the long form around `body`, with length and CRC.
+Bytes packSection(const SectionHeader& header, Family family, const Bytes& body) {
+    const size_t length = kLongSectionHeaderSize - kSectionHeaderSize + body.size() + kCrcSize;
     Bytes bytes;
-    put8(bytes, table);
-    put16(bytes, (isPrivate ? 0xF000U : 0xB000U) | static_cast<unsigned int>(body.size() + 9));
-    put16(bytes, extension);
-    put8(bytes, 0xC1U | (version & 0x1FU) << 1);
-    put8(bytes, number);
-    put8(bytes, last);
+    put8(bytes, header.tableId);
+    put16(bytes,
+          (family == Family::Dvb ? kDvbSectionFlags : kMpegSectionFlags) | static_cast<unsigned int>(length));
+    put16(bytes, header.tableIdExtension);
+    put8(bytes, kReservedBeforeVersion | kCurrentNextIndicator | (header.version % kVersionCount) << 1U);
+    put8(bytes, header.number);
+    put8(bytes, header.lastNumber);
     putBytes(bytes, body);
     put32(bytes, crc32(bytes.data(), bytes.size()));
     return bytes;
+}
+
+Bytes eventDescriptors(const EitEvent& event) {
+    Bytes shortEvent;
+    putCode(shortEvent, event.language);
+    putString(shortEvent, event.name, kMaxNameSize);
+    putString(shortEvent, event.text, kMaxTextSize);
+    Bytes descriptors = descriptor(kTagShortEvent, shortEvent);
+    if (!event.ratings.empty()) {
+        Bytes ratings;
+        for (const EitRating& rating : event.ratings) {
+            putCode(ratings, rating.country);
+            put8(ratings, rating.value);
+        }
+        putBytes(descriptors, descriptor(kTagParentalRating, ratings));
+    }
+    return descriptors;
 }
 
 } // namespace
 
 uint32_t crc32(const uint8_t* bytes, size_t length) {
     static const std::array<uint32_t, 256> table = makeCrcTable();
-    uint32_t sum = 0xFFFFFFFFU;
+    uint32_t sum = kCrcStart;
     for (size_t index = 0; index < length; ++index) {
         sum = sum << 8 ^ table[(sum >> 24 ^ bytes[index]) & 0xFF];
     }
@@ -126,139 +150,135 @@ uint32_t crc32(const uint8_t* bytes, size_t length) {
 
 Bytes pack(const Pat& pat) {
     Bytes body;
-    for (const auto& [service, pid] : pat.programmes) {
-        put16(body, service);
-        put16(body, 0xE000U | pid);
+    for (const auto& [program, pid] : pat.programs) {
+        put16(body, program);
+        put16(body, kReservedBeforePid | pid);
     }
-    return section(0x00, pat.transportStreamId, pat.version, 0, 0, false, body);
+    return packSection({kTableIdPat, pat.transportStreamId, pat.version}, Family::Mpeg, body);
 }
 
 Bytes pack(const Pmt& pmt) {
     Bytes body;
-    put16(body, 0xE000U | pmt.pcrPid);
+    put16(body, kReservedBeforePid | pmt.pcrPid);
     putLoop(body, pmt.descriptors);
     for (const ElementaryStream& stream : pmt.streams) {
         put8(body, stream.type);
-        put16(body, 0xE000U | stream.pid);
+        put16(body, kReservedBeforePid | stream.pid);
         putLoop(body, stream.descriptors);
     }
-    return section(0x02, pmt.serviceId, pmt.version, 0, 0, false, body);
+    return packSection({kTableIdPmt, pmt.serviceId, pmt.version}, Family::Mpeg, body);
 }
 
 Bytes pack(const Nit& nit) {
-    Bytes name;
-    name.insert(name.end(), nit.name.begin(), nit.name.end());
-    Bytes stream;
-    put16(stream, nit.transportStreamId);
-    put16(stream, nit.originalNetworkId);
-    putLoop(stream, nit.deliveryDescriptor);
+    const Bytes name(nit.name.begin(), nit.name.end());
+    Bytes transportStream;
+    put16(transportStream, nit.transportStreamId);
+    put16(transportStream, nit.originalNetworkId);
+    putLoop(transportStream, nit.deliveryDescriptor);
     Bytes body;
-    putLoop(body, descriptor(0x40, name));
-    putLoop(body, stream);
-    return section(0x40, nit.networkId, 0, 0, 0, true, body);
+    putLoop(body, descriptor(kTagNetworkName, name));
+    putLoop(body, transportStream);
+    return packSection({kTableIdNitActual, nit.networkId, 0}, Family::Dvb, body);
 }
 
 Bytes pack(const Sdt& sdt) {
+    constexpr unsigned int kRunningAndFreeOfCharge = kRunningStatusRunning << 13U;
     Bytes body;
     put16(body, sdt.originalNetworkId);
-    put8(body, 0xFF);
+    put8(body, kReservedByte);
     for (const SdtService& service : sdt.services) {
         Bytes words;
         put8(words, service.type);
-        putText(words, service.provider, 100);
-        putText(words, service.name, 100);
+        putString(words, service.provider, kMaxNameSize);
+        putString(words, service.name, kMaxNameSize);
+        const Bytes descriptors = descriptor(kTagService, words);
         put16(body, service.serviceId);
-        put8(body, 0xFD); // has present and following programmes
-        Bytes loop = descriptor(0x48, words);
-        put16(body, 0x8000U | static_cast<unsigned int>(loop.size())); // running, free of charge
-        putBytes(body, loop);
+        put8(body, kReservedBeforeEitFlags | kSdtEitPresentFollowingFlag);
+        put16(body, kRunningAndFreeOfCharge | static_cast<unsigned int>(descriptors.size()));
+        putBytes(body, descriptors);
     }
-    return section(0x42, sdt.transportStreamId, sdt.version, 0, 0, true, body);
+    return packSection({kTableIdSdtActual, sdt.transportStreamId, sdt.version}, Family::Dvb, body);
 }
 
 Bytes pack(const Eit& eit) {
     Bytes body;
     put16(body, eit.transportStreamId);
     put16(body, eit.originalNetworkId);
-    put8(body, 1);    // last section of the segment
-    put8(body, 0x4E); // last table
+    put8(body, kEitSectionFollowing); // segment_last_section_number
+    put8(body, kTableIdEitActualPresentFollowing);
+    const unsigned int status =
+        eit.sectionNumber == kEitSectionPresent ? kRunningStatusRunning : kRunningStatusNotRunning;
     for (const EitEvent& event : eit.events) {
-        Bytes words;
-        putCode(words, event.language);
-        putText(words, event.name, 100);
-        putText(words, event.text, 150);
-        Bytes loop = descriptor(0x4D, words);
-        if (!event.ratings.empty()) {
-            Bytes ratings;
-            for (const EitRating& rating : event.ratings) {
-                putCode(ratings, rating.country);
-                put8(ratings, rating.value);
-            }
-            putBytes(loop, descriptor(0x55, ratings));
-        }
+        const Bytes descriptors = eventDescriptors(event);
         put16(body, event.id);
         putTime(body, event.start);
         putDuration(body, event.duration);
-        const unsigned int running = eit.number == 0 ? 4 : 1;
-        put16(body, running << 13 | static_cast<unsigned int>(loop.size()));
-        putBytes(body, loop);
+        put16(body, status << 13U | static_cast<unsigned int>(descriptors.size()));
+        putBytes(body, descriptors);
     }
-    return section(0x4E, eit.serviceId, eit.version, eit.number, 1, true, body);
+    return packSection({kTableIdEitActualPresentFollowing, eit.serviceId, eit.version, eit.sectionNumber,
+                        kEitSectionFollowing},
+                       Family::Dvb, body);
 }
 
 Bytes pack(const StreamEvent& event) {
-    Bytes words;
-    put16(words, event.id);
-    put32(words, 0xFFFFFFFE); // no time: now
-    put32(words, 0);
-    words.insert(words.end(), event.data.begin(), event.data.end());
-    return section(0x3D, event.id & 0x3FFF, event.version, 0, 0, false, descriptor(0x1A, words));
+    Bytes body;
+    put16(body, event.id);
+    put32(body, kEventNptHighWithReservedBits);
+    put32(body, 0);
+    putBytes(body, event.data);
+    return packSection(
+        {kTableIdDsmccStreamDescriptors, static_cast<uint16_t>(event.id & kStreamEventIdMask), event.version},
+        Family::Mpeg, descriptor(kTagStreamEvent, body));
 }
 
-Bytes packTime(int64_t seconds) {
-    Bytes bytes{0x70, 0x70, 0x05};
-    putTime(bytes, seconds);
+Bytes packTdt(int64_t utcSeconds) {
+    constexpr unsigned int kTimeSize = 5;
+    Bytes bytes;
+    put8(bytes, kTableIdTdt);
+    put16(bytes, kDvbShortSectionFlags | kTimeSize);
+    putTime(bytes, utcSeconds);
     return bytes;
 }
 
-Bytes describeLanguage(const std::string& language, uint8_t audioType) {
-    Bytes words;
-    putCode(words, language);
-    put8(words, audioType);
-    return descriptor(0x0A, words);
+Bytes iso639LanguageDescriptor(const std::string& language, uint8_t audioType) {
+    Bytes body;
+    putCode(body, language);
+    put8(body, audioType);
+    return descriptor(kTagIso639Language, body);
 }
 
-Bytes describeSubtitles(const std::string& language, uint8_t subtitleType) {
-    Bytes words;
-    putCode(words, language);
-    put8(words, subtitleType);
-    put16(words, 1); // composition page
-    put16(words, 1); // ancillary page
-    return descriptor(0x59, words);
+Bytes subtitlingDescriptor(const std::string& language, uint8_t subtitlingType) {
+    Bytes body;
+    putCode(body, language);
+    put8(body, subtitlingType);
+    put16(body, kSubtitlePage);
+    put16(body, kSubtitlePage);
+    return descriptor(kTagSubtitling, body);
 }
 
-Bytes describeComponentTag(uint8_t tag) {
-    return descriptor(0x52, {tag});
+Bytes streamIdentifierDescriptor(uint8_t componentTag) {
+    return descriptor(kTagStreamIdentifier, {componentTag});
 }
 
 Bytes packetsOf(const Bytes& section, uint16_t pid, uint8_t& continuity) {
     Bytes packets;
     size_t sent = 0;
     do {
-        const bool begins = sent == 0;
-        const size_t end = packets.size() + packetSize;
-        put8(packets, packetStart);
-        put16(packets, (begins ? 0x4000U : 0U) | pid);
-        put8(packets, 0x10U | (continuity & 0x0FU));
-        continuity = static_cast<uint8_t>((continuity + 1) & 0x0F);
-        if (begins) {
-            put8(packets, 0); // the section begins at once
+        const bool isFirst = sent == 0;
+        const size_t end = packets.size() + kPacketSize;
+        put8(packets, kSyncByte);
+        put16(packets, (isFirst ? kPayloadUnitStartIndicator << 8U : 0U) | pid);
+        put8(packets, kPayloadFlag | (continuity & kContinuityCounterMask));
+        continuity = static_cast<uint8_t>((continuity + 1) & kContinuityCounterMask);
+        if (isFirst) {
+            put8(packets, 0); // pointer_field: the section begins at once
         }
         const size_t amount = std::min(end - packets.size(), section.size() - sent);
         packets.insert(packets.end(), section.begin() + static_cast<std::ptrdiff_t>(sent),
                        section.begin() + static_cast<std::ptrdiff_t>(sent + amount));
         sent += amount;
-        packets.resize(end, 0xFF);
+        packets.resize(end, kStuffingByte);
     } while (sent < section.size());
     return packets;
 }

@@ -1,6 +1,7 @@
-// The tables of a transport stream as plain records, packed into sections and packets.
-#ifndef TELIX_DESKTOP_TSTABLES_H
-#define TELIX_DESKTOP_TSTABLES_H
+// The tables of a transport stream as plain records, and packing them into sections and packets. Tables and
+// descriptors are those of ISO/IEC 13818-1 and EN 300 468, stream events those of TS 102 809.
+#ifndef TELIX_DESKTOP_PLATFORM_TSTABLES_H
+#define TELIX_DESKTOP_PLATFORM_TSTABLES_H
 
 #include <cstddef>
 #include <cstdint>
@@ -9,41 +10,27 @@
 #include <utility>
 #include <vector>
 
+#include "desktop/platform/DvbConstants.h"
+
 namespace desktop {
 
 using Bytes = std::vector<uint8_t>;
 
-constexpr size_t packetSize = 188;
-constexpr uint8_t packetStart = 0x47;
-
-// Packet identifiers of tables that stand at a fixed place.
-constexpr uint16_t patPid = 0x00;
-constexpr uint16_t nitPid = 0x10;
-constexpr uint16_t sdtPid = 0x11;
-constexpr uint16_t eitPid = 0x12;
-constexpr uint16_t tdtPid = 0x14;
-constexpr uint16_t nullPid = 0x1FFF;
-
-// Kinds of elementary stream in a programme map.
-constexpr uint8_t streamTypePrivate = 0x06;
-constexpr uint8_t streamTypeStreamEvents = 0x0C;
-
 inline uint16_t pidOf(const uint8_t* packet) {
-    return static_cast<uint16_t>((packet[1] & 0x1F) << 8 | packet[2]);
+    return static_cast<uint16_t>((packet[1] << 8 | packet[2]) & kPidMask);
 }
 
-// The sum at the end of a section; 0 over a whole section that is undamaged.
+// The CRC at the end of a section; 0 over a whole section that is undamaged.
 uint32_t crc32(const uint8_t* bytes, size_t length);
 
 struct Pat {
     uint16_t transportStreamId = 0;
     uint8_t version = 0;
-    std::vector<std::pair<uint16_t, uint16_t>>
-        programmes; // service id, PID of its map; service 0 is the network
+    std::vector<std::pair<uint16_t, uint16_t>> programs; // program number (the service id), PID of its PMT
 };
 
 struct ElementaryStream {
-    uint8_t type = 0;
+    uint8_t type = 0; // stream_type
     uint16_t pid = 0;
     Bytes descriptors;
 };
@@ -51,7 +38,7 @@ struct ElementaryStream {
 struct Pmt {
     uint16_t serviceId = 0;
     uint8_t version = 0;
-    uint16_t pcrPid = nullPid;
+    uint16_t pcrPid = kPidNullPacket;
     Bytes descriptors;
     std::vector<ElementaryStream> streams;
 };
@@ -61,12 +48,12 @@ struct Nit {
     std::string name;
     uint16_t transportStreamId = 0;
     uint16_t originalNetworkId = 0;
-    Bytes deliveryDescriptor; // whole, with tag and length; empty where there is none
+    Bytes deliveryDescriptor; // whole, with tag and length; empty if there is none
 };
 
 struct SdtService {
     uint16_t serviceId = 0;
-    uint8_t type = 1; // 1 television, 2 radio, others
+    uint8_t type = kServiceTypeDigitalTelevision; // service_type
     std::string provider;
     std::string name;
 };
@@ -80,7 +67,7 @@ struct Sdt {
 
 struct EitRating {
     std::string country; // three letters
-    uint8_t value = 0;   // 1 to 15: from the age of three years more on; 0 and 16 up: the broadcaster's own
+    uint8_t value = 0;   // as broadcast: see kParentalRatingFirstAge
 };
 
 struct EitEvent {
@@ -93,14 +80,13 @@ struct EitEvent {
     std::vector<EitRating> ratings;
 };
 
-// One section of the present and following programmes of a service: number 0 the present one, 1 the
-// following.
+// One section of the EIT present/following of a service.
 struct Eit {
     uint16_t serviceId = 0;
     uint16_t transportStreamId = 0;
     uint16_t originalNetworkId = 0;
     uint8_t version = 0;
-    uint8_t number = 0;
+    uint8_t sectionNumber = kEitSectionPresent;
     std::vector<EitEvent> events;
 };
 
@@ -111,25 +97,21 @@ struct StreamEvent {
     Bytes data;          // at most 245 bytes
 };
 
-// Sections, complete with their sum.
+// Whole sections, with their CRC.
 Bytes pack(const Pat& pat);
 Bytes pack(const Pmt& pmt);
 Bytes pack(const Nit& nit);
 Bytes pack(const Sdt& sdt);
 Bytes pack(const Eit& eit);
 Bytes pack(const StreamEvent& event);
-Bytes packTime(int64_t seconds); // the time table, without a sum as ever
+Bytes packTdt(int64_t utcSeconds); // since 1970; a TDT has no CRC
 
-// Descriptors, complete with tag and length.
-// `audioType` is 0 for ordinary audio, audioTypeDescription for a description of the picture.
-constexpr uint8_t audioTypeHearingImpaired = 2;
-constexpr uint8_t audioTypeDescription = 3;
-Bytes describeLanguage(const std::string& language, uint8_t audioType);
-// `subtitleType` is 0x10 for ordinary subtitles, 0x20 for those for the hard of hearing.
-Bytes describeSubtitles(const std::string& language, uint8_t subtitleType);
-Bytes describeComponentTag(uint8_t tag);
+// Whole descriptors, with tag and length. `language` is an ISO 639-2 code.
+Bytes iso639LanguageDescriptor(const std::string& language, uint8_t audioType);
+Bytes subtitlingDescriptor(const std::string& language, uint8_t subtitlingType);
+Bytes streamIdentifierDescriptor(uint8_t componentTag);
 
-// The packets that carry a section; `continuity` is the counter of the PID and runs on.
+// The packets that carry a section; `continuity` is the continuity counter of the PID, which is advanced.
 Bytes packetsOf(const Bytes& section, uint16_t pid, uint8_t& continuity);
 
 } // namespace desktop

@@ -1,12 +1,13 @@
 // The pipeline of a tune.
 #include "desktop/platform/Tuner.h"
 
-#include "desktop/platform/AudioSink.h"
-#include "desktop/platform/Platform.h"
+#include <gst/app/gstappsrc.h>
 
 #include <cstring>
-#include <gst/app/gstappsrc.h>
 #include <memory>
+
+#include "desktop/platform/AudioSink.h"
+#include "desktop/platform/Platform.h"
 
 namespace desktop {
 
@@ -17,17 +18,20 @@ struct Decoder {
     const char* elements;
 };
 
-const Decoder videoDecoders[] = {
+const Decoder kVideoDecoders[] = {
     {"video/mpeg,mpegversion={1,2}", "mpegvideoparse ! avdec_mpeg2video"},
     {"video/x-h264", "h264parse ! avdec_h264"},
     {"video/x-h265", "h265parse ! avdec_h265"},
 };
-const Decoder audioDecoders[] = {
+const Decoder kAudioDecoders[] = {
     {"audio/mpeg,mpegversion=1", "mpegaudioparse ! mpg123audiodec"},
     {"audio/mpeg,mpegversion={2,4}", "aacparse ! avdec_aac"},
     {"audio/x-ac3", "ac3parse ! avdec_ac3"},
     {"audio/x-eac3", "ac3parse ! avdec_eac3"},
 };
+
+// Up to three seconds wait for the decoder, however many bytes and buffers that is.
+const char* const kDecoderQueue = "queue max-size-time=3000000000 max-size-bytes=0 max-size-buffers=0 ! ";
 
 template <size_t count>
 const char* decoderFor(const GstCaps* caps, const Decoder (&decoders)[count]) {
@@ -42,16 +46,16 @@ const char* decoderFor(const GstCaps* caps, const Decoder (&decoders)[count]) {
     return nullptr;
 }
 
-// Pads are named after kind, generation and PID, as in audio_0_0111.
+// tsdemux names pads after type, generation and PID, as in audio_0_0111.
 uint16_t pidOfPad(GstPad* pad) {
-    const char* mark = std::strrchr(GST_PAD_NAME(pad), '_');
-    return static_cast<uint16_t>(mark ? std::strtoul(mark + 1, nullptr, 16) : 0);
+    const char* separator = std::strrchr(GST_PAD_NAME(pad), '_');
+    return static_cast<uint16_t>(separator ? std::strtoul(separator + 1, nullptr, 16) : 0);
 }
 
-// What the probe behind an audio decoder tells.
+// What the probe after an audio decoder reports to.
 struct AudioProbe {
-    std::function<void()> heard;
-    std::function<void(uint16_t pid, uint32_t channels)> format;
+    std::function<void()> onFirstAudio;
+    std::function<void(uint16_t pid, uint32_t channels)> onAudioFormat;
     uint16_t pid;
 };
 
@@ -59,7 +63,7 @@ GstPadProbeReturn probeAudio(GstPad* pad, GstPadProbeInfo* info, gpointer data) 
     (void)pad;
     const auto* probe = static_cast<AudioProbe*>(data);
     if ((GST_PAD_PROBE_INFO_TYPE(info) & GST_PAD_PROBE_TYPE_BUFFER) != 0) {
-        probe->heard();
+        probe->onFirstAudio();
         return GST_PAD_PROBE_REMOVE;
     }
     GstEvent* event = GST_PAD_PROBE_INFO_EVENT(info);
@@ -68,7 +72,7 @@ GstPadProbeReturn probeAudio(GstPad* pad, GstPadProbeInfo* info, gpointer data) 
         gst_event_parse_caps(event, &caps);
         gint channels = 0;
         if (gst_structure_get_int(gst_caps_get_structure(caps, 0), "channels", &channels)) {
-            probe->format(probe->pid, static_cast<uint32_t>(channels));
+            probe->onAudioFormat(probe->pid, static_cast<uint32_t>(channels));
         }
     }
     return GST_PAD_PROBE_OK;
@@ -81,47 +85,13 @@ Tuner::Tuner(uint16_t serviceId, Listener listener)
 
 bool Tuner::start(Picture& picture, Picture::Token token, std::string& error) {
     m_pipeline = gst_pipeline_new("tuner");
-    m_source = gst_element_factory_make("appsrc", nullptr);
-    GstElement* demultiplexer = gst_element_factory_make("tsdemux", nullptr);
-    m_overlay = gst_element_factory_make("dvbsuboverlay", nullptr);
-    m_gate = gst_element_factory_make("valve", nullptr);
-    m_audioSelector = gst_element_factory_make("input-selector", nullptr);
-    m_subtitleSelector = gst_element_factory_make("input-selector", nullptr);
-    m_volume = gst_element_factory_make("volume", nullptr);
-    GstElement* convert = gst_element_factory_make("audioconvert", nullptr);
-    GstElement* resample = gst_element_factory_make("audioresample", nullptr);
-    GstElement* audioSink = makeAudioSink();
-    GstElement* pictureSink = picture.makeSink(token);
-    bool isComplete = true;
-    for (GstElement* element : {m_source, demultiplexer, m_overlay, m_gate, m_audioSelector,
-                                m_subtitleSelector, m_volume, convert, resample, audioSink, pictureSink}) {
-        if (element) {
-            gst_bin_add(GST_BIN(m_pipeline), element); // the pipeline's from now on
-        }
-        isComplete = isComplete && element;
-    }
-    if (!isComplete) {
-        error = "elements of GStreamer are missing";
+    if (!addElements(picture, token)) {
+        error = "a GStreamer element is missing";
         return false;
     }
-
-    GstCaps* caps = gst_caps_from_string("video/mpegts,systemstream=(boolean)true,packetsize=(int)188");
-    g_object_set(m_source, "caps", caps, "format", GST_FORMAT_TIME, "is-live", TRUE, "do-timestamp", TRUE,
-                 "max-bytes", guint64{8} << 20, nullptr);
-    gst_caps_unref(caps);
-    gst_util_set_object_arg(G_OBJECT(m_source), "leaky-type", "downstream");
-    g_object_set(demultiplexer, "program-number", static_cast<gint>(m_serviceId), "latency", 50, nullptr);
-    g_object_set(m_overlay, "enable", FALSE, nullptr);
-    for (GstElement* selector : {m_audioSelector, m_subtitleSelector}) {
-        g_object_set(selector, "sync-streams", FALSE, nullptr); // streams must not wait for each other
-    }
-    gst_element_link(m_source, demultiplexer);
-    gst_element_link_many(m_gate, pictureSink, nullptr);
-    gst_element_link_pads(m_overlay, "src", m_gate, "sink");
-    gst_element_link_pads(m_subtitleSelector, "src", m_overlay, "text_sink");
-    gst_element_link_many(m_audioSelector, m_volume, convert, resample, audioSink, nullptr);
-    g_signal_connect(demultiplexer, "pad-added", G_CALLBACK(onPadAdded), this);
-
+    configureElements();
+    linkElements();
+    g_signal_connect(m_demultiplexer, "pad-added", G_CALLBACK(onPadAdded), this);
     GstBus* bus = gst_element_get_bus(m_pipeline);
     m_watch = gst_bus_add_watch(bus, onMessage, this);
     gst_object_unref(bus);
@@ -130,6 +100,51 @@ bool Tuner::start(Picture& picture, Picture::Token token, std::string& error) {
         return false;
     }
     return true;
+}
+
+bool Tuner::addElements(Picture& picture, Picture::Token token) {
+    m_source = gst_element_factory_make("appsrc", nullptr);
+    m_demultiplexer = gst_element_factory_make("tsdemux", nullptr);
+    m_overlay = gst_element_factory_make("dvbsuboverlay", nullptr);
+    m_videoValve = gst_element_factory_make("valve", nullptr);
+    m_videoSink = picture.makeSink(token);
+    m_audioSelector = gst_element_factory_make("input-selector", nullptr);
+    m_subtitleSelector = gst_element_factory_make("input-selector", nullptr);
+    m_volume = gst_element_factory_make("volume", nullptr);
+    m_convert = gst_element_factory_make("audioconvert", nullptr);
+    m_resample = gst_element_factory_make("audioresample", nullptr);
+    m_audioSink = makeAudioSink();
+    bool isComplete = true;
+    for (GstElement* element :
+         {m_source, m_demultiplexer, m_overlay, m_videoValve, m_videoSink, m_audioSelector,
+          m_subtitleSelector, m_volume, m_convert, m_resample, m_audioSink}) {
+        if (element) {
+            gst_bin_add(GST_BIN(m_pipeline), element); // the pipeline owns it
+        }
+        isComplete = isComplete && element;
+    }
+    return isComplete;
+}
+
+void Tuner::configureElements() {
+    GstCaps* caps = gst_caps_from_string("video/mpegts,systemstream=(boolean)true,packetsize=(int)188");
+    g_object_set(m_source, "caps", caps, "format", GST_FORMAT_TIME, "is-live", TRUE, "do-timestamp", TRUE,
+                 "max-bytes", guint64{8} << 20, nullptr);
+    gst_caps_unref(caps);
+    gst_util_set_object_arg(G_OBJECT(m_source), "leaky-type", "downstream");
+    g_object_set(m_demultiplexer, "program-number", static_cast<gint>(m_serviceId), "latency", 50, nullptr);
+    g_object_set(m_overlay, "enable", FALSE, nullptr);
+    for (GstElement* selector : {m_audioSelector, m_subtitleSelector}) {
+        g_object_set(selector, "sync-streams", FALSE, nullptr); // streams must not wait for each other
+    }
+}
+
+void Tuner::linkElements() {
+    gst_element_link(m_source, m_demultiplexer);
+    gst_element_link_many(m_videoValve, m_videoSink, nullptr);
+    gst_element_link_pads(m_overlay, "src", m_videoValve, "sink");
+    gst_element_link_pads(m_subtitleSelector, "src", m_overlay, "text_sink");
+    gst_element_link_many(m_audioSelector, m_volume, m_convert, m_resample, m_audioSink, nullptr);
 }
 
 Tuner::~Tuner() {
@@ -169,7 +184,7 @@ gboolean Tuner::onMessage(GstBus* bus, GstMessage* message, gpointer tuner) {
         gst_message_parse_error(message, &error, nullptr);
         const std::string reason = error->message;
         g_error_free(error);
-        static_cast<Tuner*>(tuner)->m_listener.failed(reason);
+        static_cast<Tuner*>(tuner)->m_listener.onError(reason);
     }
     return TRUE;
 }
@@ -184,27 +199,27 @@ void Tuner::addStream(GstPad* pad) {
     if (!caps) {
         caps = gst_pad_query_caps(pad, nullptr);
     }
-    const char* video = decoderFor(caps, videoDecoders);
-    const char* audio = decoderFor(caps, audioDecoders);
+    const char* video = decoderFor(caps, kVideoDecoders);
+    const char* audio = decoderFor(caps, kAudioDecoders);
     const bool isSubtitle =
         gst_structure_has_name(gst_caps_get_structure(caps, 0), "subpicture/x-dvb") != FALSE;
     gst_caps_unref(caps);
     const uint16_t pid = pidOfPad(pad);
-    bool isTaken = false;
+    bool isLinked = false;
     if (video && !m_hasVideo) {
-        isTaken = m_hasVideo = addVideo(pad, video);
+        isLinked = m_hasVideo = addVideo(pad, video);
     } else if (audio) {
-        isTaken = addAudio(pad, audio, pid);
+        isLinked = addAudio(pad, audio, pid);
     } else if (isSubtitle) {
-        isTaken = addSubtitle(pad, pid);
+        isLinked = addSubtitle(pad, pid);
     }
-    if (!isTaken) {
+    if (!isLinked) {
         ignore(pad);
     }
     applySelection();
 }
 
-// The part of a pipeline behind a pad; null if an element is missing.
+// The part of the pipeline after a pad; null if an element is missing.
 GstElement* Tuner::addBin(const std::string& description) {
     GError* error = nullptr;
     GstElement* bin = gst_parse_bin_from_description(description.c_str(), TRUE, &error);
@@ -238,12 +253,11 @@ bool linkPad(GstPad* pad, GstElement* bin) {
 } // namespace
 
 bool Tuner::addVideo(GstPad* pad, const std::string& decoder) {
-    GstElement* bin = addBin("queue max-size-time=3000000000 max-size-bytes=0 max-size-buffers=0 ! " +
-                             decoder + " ! videoconvert");
+    GstElement* bin = addBin(std::string(kDecoderQueue) + decoder + " ! videoconvert");
     return bin && gst_element_link_pads(bin, "src", m_overlay, "video_sink") && linkPad(pad, bin);
 }
 
-// A new input of a selector, linked to the bin; a reference.
+// A new sink pad of a selector, linked to the bin. The caller owns the reference.
 GstPad* Tuner::addToSelector(GstElement* selector, GstElement* bin) {
     GstPad* input = gst_element_request_pad_simple(selector, "sink_%u");
     GstPad* output = gst_element_get_static_pad(bin, "src");
@@ -253,15 +267,14 @@ GstPad* Tuner::addToSelector(GstElement* selector, GstElement* bin) {
 }
 
 bool Tuner::addAudio(GstPad* pad, const std::string& decoder, uint16_t pid) {
-    GstElement* bin = addBin("queue max-size-time=3000000000 max-size-bytes=0 max-size-buffers=0 ! " +
-                             decoder + " ! audioconvert");
+    GstElement* bin = addBin(std::string(kDecoderQueue) + decoder + " ! audioconvert");
     if (!bin) {
         return false;
     }
     GstPad* output = gst_element_get_static_pad(bin, "src");
     gst_pad_add_probe(
         output, static_cast<GstPadProbeType>(GST_PAD_PROBE_TYPE_BUFFER | GST_PAD_PROBE_TYPE_EVENT_DOWNSTREAM),
-        probeAudio, new AudioProbe{m_listener.heard, m_listener.audioFormat, pid},
+        probeAudio, new AudioProbe{m_listener.onFirstAudio, m_listener.onAudioFormat, pid},
         [](gpointer data) { delete static_cast<AudioProbe*>(data); });
     gst_object_unref(output);
     {
@@ -309,22 +322,22 @@ void Tuner::selectSubtitle(std::optional<uint16_t> pid) {
     applySelection();
 }
 
-std::optional<uint16_t> Tuner::heardAudio() const {
+std::optional<uint16_t> Tuner::activeAudioPid() const {
     std::lock_guard<std::mutex> lock(m_mutex);
     gboolean isMute = FALSE;
     GstPad* active = nullptr;
     g_object_get(m_volume, "mute", &isMute, nullptr);
     g_object_get(m_audioSelector, "active-pad", &active, nullptr);
-    std::optional<uint16_t> heard;
-    for (const auto& [pid, pad] : m_audioPads) {
+    std::optional<uint16_t> pid;
+    for (const auto& [padPid, pad] : m_audioPads) {
         if (pad == active && !isMute) {
-            heard = pid;
+            pid = padPid;
         }
     }
     if (active) {
         gst_object_unref(active);
     }
-    return heard;
+    return pid;
 }
 
 void Tuner::applySelection() {
@@ -342,7 +355,7 @@ void Tuner::applySelection() {
         g_object_set(m_subtitleSelector, "active-pad", subtitle->second, nullptr);
     }
     g_object_set(m_overlay, "enable", subtitle != m_subtitlePads.end() ? TRUE : FALSE, nullptr);
-    g_object_set(m_gate, "drop", m_videoOn ? FALSE : TRUE, nullptr);
+    g_object_set(m_videoValve, "drop", m_videoOn ? FALSE : TRUE, nullptr);
 }
 
 } // namespace desktop

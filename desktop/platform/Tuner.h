@@ -1,9 +1,6 @@
-// Presents one service: a pipeline from packets to picture and sound, made anew for each tune.
-#ifndef TELIX_DESKTOP_TUNER_H
-#define TELIX_DESKTOP_TUNER_H
-
-#include "desktop/platform/Picture.h"
-#include "desktop/platform/TsTables.h"
+// Presents one service: a pipeline from packets to picture and sound. Each tune has one of its own.
+#ifndef TELIX_DESKTOP_PLATFORM_TUNER_H
+#define TELIX_DESKTOP_PLATFORM_TUNER_H
 
 #include <functional>
 #include <map>
@@ -11,40 +8,48 @@
 #include <optional>
 #include <string>
 
+#include "desktop/platform/Picture.h"
+#include "desktop/platform/TsTables.h"
+
 namespace desktop {
 
 // Platform thread, unless said otherwise.
 class Tuner {
 public:
     struct Listener {
-        std::function<void(const std::string& reason)> failed; // platform thread; several times at worst
-        std::function<void()> heard; // the first sound is decoded; GStreamer's thread
-        std::function<void(uint16_t pid, uint32_t channels)> audioFormat; // GStreamer's thread
+        std::function<void(const std::string& reason)> onError; // platform thread; may come several times
+        std::function<void()> onFirstAudio; // of each stream, once it is decoded; GStreamer's thread
+        std::function<void(uint16_t pid, uint32_t channels)> onAudioFormat; // GStreamer's thread
     };
 
     Tuner(uint16_t serviceId, Listener listener);
+    // The listener is not called any more when this returns.
     ~Tuner();
     Tuner(const Tuner&) = delete;
     Tuner& operator=(const Tuner&) = delete;
 
-    // Starts to present as `token`. False with the reason if that is impossible.
+    // Starts to present as `token`. False with the reason in `error` if that is impossible. Once.
     bool start(Picture& picture, Picture::Token token, std::string& error);
 
-    // Takes packets of the service and its tables. Any thread, also while the tuner ends and later.
+    // A function that takes the packets of the service and its tables. It may be called on any thread, also
+    // during the tuner's teardown and later. After start().
     std::function<void(const Bytes& packets)> feed() const;
 
-    // What is presented; it may be chosen before the stream shows up. None is silence, no picture, no
-    // subtitles.
+    // What is presented; a stream may be selected before the demultiplexer finds it. Nothing is silence, no
+    // video, no subtitles.
     void selectVideo(bool on);
     void selectAudio(std::optional<uint16_t> pid);
     void selectSubtitle(std::optional<uint16_t> pid);
 
-    // The PID of the audio that is heard, as the pipeline has it.
-    std::optional<uint16_t> heardAudio() const;
+    // The PID of the audio that the pipeline lets through; nothing if it is muted.
+    std::optional<uint16_t> activeAudioPid() const;
 
 private:
     static void onPadAdded(GstElement* demultiplexer, GstPad* pad, gpointer tuner);
     static gboolean onMessage(GstBus* bus, GstMessage* message, gpointer tuner);
+    bool addElements(Picture& picture, Picture::Token token);
+    void configureElements();
+    void linkElements();
     void addStream(GstPad* pad);
     bool addVideo(GstPad* pad, const std::string& decoder);
     bool addAudio(GstPad* pad, const std::string& decoder, uint16_t pid);
@@ -57,20 +62,27 @@ private:
     uint16_t m_serviceId;
     Listener m_listener;
     GstElement* m_pipeline = nullptr;
-    GstElement* m_source = nullptr; // these belong to the pipeline
-    GstElement* m_overlay = nullptr;
-    GstElement* m_gate = nullptr;
-    GstElement* m_volume = nullptr;
+    // Owned by the pipeline, which is not changed after start() but for the streams' bins.
+    GstElement* m_source = nullptr;
+    GstElement* m_demultiplexer = nullptr;
+    GstElement* m_overlay = nullptr; // draws the subtitles
+    GstElement* m_videoValve = nullptr;
+    GstElement* m_videoSink = nullptr;
     GstElement* m_audioSelector = nullptr;
+    GstElement* m_volume = nullptr;
+    GstElement* m_convert = nullptr;
+    GstElement* m_resample = nullptr;
+    GstElement* m_audioSink = nullptr;
     GstElement* m_subtitleSelector = nullptr;
     guint m_watch = 0;
 
-    mutable std::mutex m_mutex; // for what follows: streams show up on GStreamer's threads
-    bool m_hasVideo = false;
+    bool m_hasVideo = false; // used by the demultiplexer's thread alone
+
+    mutable std::mutex m_mutex; // guards what follows: streams appear on GStreamer's threads
     bool m_videoOn = true;
     std::optional<uint16_t> m_audio;
     std::optional<uint16_t> m_subtitle;
-    std::map<uint16_t, GstPad*> m_audioPads; // of the selectors, with a reference each
+    std::map<uint16_t, GstPad*> m_audioPads; // sink pads of the selectors by PID, one reference each
     std::map<uint16_t, GstPad*> m_subtitlePads;
 };
 

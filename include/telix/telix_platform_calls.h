@@ -324,12 +324,12 @@ TELIX_CALL(TELIX_JS_VB_Stop, (TELIX_JS_VB_HANDLE object), (object))
 TELIX_CALL(TELIX_JS_VB_BindToCurrChannel, (TELIX_JS_VB_HANDLE object), (object))
 
 /* Tune requests; they return without waiting, and TELIX_JS_VB_CHANNEL_CHANGE_CB or
- * TELIX_JS_VB_CHANNEL_ERROR_CB follows. The channel 0 means none. `flag` is the second argument of the
+ * TELIX_JS_VB_CHANNEL_ERROR_CB follows. The channel 0 means none. `trickPlay` is the second argument of the
  * page's call of setChannel (trick play), 0 if the page leaves it out. PrevChannel and NextChannel return
  * the channel that is selected at the time of the call, before tuning: the page's current channel object
  * changes to it immediately. Refused: the page gets no error. */
-TELIX_CALL(TELIX_JS_VB_SetChannel, (TELIX_JS_VB_HANDLE object, TELIX_JS_CM_HANDLE channel, ___UINT8 flag),
-           (object, channel, flag))
+TELIX_CALL(TELIX_JS_VB_SetChannel, (TELIX_JS_VB_HANDLE object, TELIX_JS_CM_HANDLE channel, ___UINT8 trickPlay),
+           (object, channel, trickPlay))
 TELIX_CALL(TELIX_JS_VB_PrevChannel, (TELIX_JS_VB_HANDLE object, TELIX_JS_CM_HANDLE* channel),
            (object, channel))
 TELIX_CALL(TELIX_JS_VB_NextChannel, (TELIX_JS_VB_HANDLE object, TELIX_JS_CM_HANDLE* channel),

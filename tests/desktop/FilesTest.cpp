@@ -169,9 +169,9 @@ TEST_F(FilesTest, ShowsAServiceOfAFileWithoutAGapWhereItBeginsAnew) {
 }
 
 TEST_F(FilesTest, TellsWhyAFileOrServiceIsNotShownAndGoesOn) {
-    EXPECT_EQ(tune(m_channels[1]), errorNoSignal);
-    EXPECT_EQ(tune(m_channels[2]), errorNoSignal);
-    EXPECT_EQ(tune(m_channels[3]), errorUnknownChannel);
+    EXPECT_EQ(tune(m_channels[1]), kErrorNoSignal);
+    EXPECT_EQ(tune(m_channels[2]), kErrorNoSignal);
+    EXPECT_EQ(tune(m_channels[3]), kErrorUnknownChannel);
     EXPECT_EQ(tune(m_channels[0]), TELIX_ERR_STATE_NONE);
 }
 

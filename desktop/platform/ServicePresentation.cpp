@@ -1,0 +1,221 @@
+// The steps of a tune.
+#include "desktop/platform/ServicePresentation.h"
+
+#include <cstdio>
+#include <mutex>
+#include <utility>
+
+namespace desktop {
+
+namespace {
+
+constexpr auto kTuneTimeout = std::chrono::milliseconds(6000);
+
+} // namespace
+
+ServicePresentation::ServicePresentation(const Channels& channels, TunerArbiter& arbiter,
+                                         BroadcastComponents& components, Clock& clock, Listener listener)
+    : m_platform(Platform::instance()), m_channels(channels), m_arbiter(arbiter), m_components(components),
+      m_clock(clock), m_listener(std::move(listener)), m_source(clock, [this] {
+          if (m_pendingTune.id != 0) {
+              present(m_pendingTune);
+          }
+      }) {}
+
+// Not in the constructor, because the platform thread may use this object as soon as the file is there.
+void ServicePresentation::start() {
+    if (m_channels.usesTestMultiplex()) {
+        m_source.makeTestMultiplexFile();
+    }
+}
+
+void ServicePresentation::tune(const Tune& tune) {
+    stop();
+    m_pendingTune = tune;
+    m_arbiter.reportConnecting(tune);
+    present(tune);
+}
+
+void ServicePresentation::stop() {
+    abortPendingTune();
+    stopTuner();
+}
+
+void ServicePresentation::abortPendingTune() {
+    if (m_pendingTune.id != 0) {
+        m_arbiter.reportAborted(std::exchange(m_pendingTune, {}));
+    }
+}
+
+// ---- From the channel to the running pipeline
+
+void ServicePresentation::present(const Tune& tune) {
+    if (!m_arbiter.isLatest(tune)) {
+        return; // the later request aborts this one in its turn
+    }
+    const Channel channel = m_channels.find(tune.channel).value_or(Channel());
+    if (channel.origin == Channel::Origin::None) {
+        fail(tune.id, kErrorUnknownChannel, "unknown channel");
+        return;
+    }
+    std::string error;
+    switch (m_source.open(channel, error)) {
+    case BroadcastSource::Result::Pending:
+        return;
+    case BroadcastSource::Result::Failed:
+        fail(tune.id, kErrorNoSignal, error);
+        return;
+    case BroadcastSource::Result::Open:
+        startTuner(tune, static_cast<uint16_t>(channel.sid));
+        return;
+    }
+}
+
+void ServicePresentation::startTuner(const Tune& tune, uint16_t serviceId) {
+    const auto post = [this](auto function) { m_platform.post(std::move(function)); };
+    Tuner::Listener listener;
+    listener.onError = [this, id = tune.id, post](const std::string& reason) {
+        post([this, id, reason] { fail(id, kErrorNoSignal, reason); });
+    };
+    listener.onFirstAudio = [this, id = tune.id, post] { post([this, id] { onFirstAudio(id); }); };
+    listener.onAudioFormat = [this, channel = tune.channel, post](uint16_t pid, uint32_t audioChannels) {
+        post(
+            [this, channel, pid, audioChannels] { m_components.onAudioFormat(channel, pid, audioChannels); });
+    };
+    m_tuner = std::make_unique<Tuner>(serviceId, listener);
+    m_activeTuneId = tune.id;
+
+    const Picture::View view = m_arbiter.viewOf(tune.object).value_or(Picture::View());
+    const Picture::Token token = m_platform.picture().acquire(
+        view, [this, object = tune.object] { onTunerPreempted(object); },
+        [this, id = tune.id, post] { post([this, id] { onPrerolled(id); }); });
+    {
+        std::lock_guard<std::mutex> lock(m_platform.mutex());
+        m_pictureToken = token;
+    }
+    std::string error;
+    if (!m_tuner->start(m_platform.picture(), token, error)) {
+        fail(tune.id, kErrorNoSignal, error);
+        return;
+    }
+    selectService(tune, serviceId);
+    m_clock.callAfter(kTuneTimeout, [this, id = tune.id] { onTimeout(id); });
+}
+
+void ServicePresentation::selectService(const Tune& tune, uint16_t serviceId) {
+    const auto postIfActive = [this, id = tune.id](std::function<void()> function) {
+        m_platform.post([this, id, function = std::move(function)] {
+            if (m_activeTuneId == id) {
+                function();
+            }
+        });
+    };
+    Receiver::Service service;
+    service.serviceId = serviceId;
+    service.feed = m_tuner->feed();
+    service.onPmt = [this, tune, postIfActive](const Pmt& pmt) {
+        postIfActive([this, tune, pmt] { onPmt(tune, pmt); });
+    };
+    service.onMissing = [this, id = tune.id] {
+        m_platform.post([this, id] { fail(id, kErrorUnknownChannel, "the multiplex has no such service"); });
+    };
+    service.onEit = [this, tune, postIfActive](const Eit& eit) {
+        postIfActive([this, tune, eit] { m_listener.onEit(tune.channel, eit); });
+    };
+    service.onStreamEvent = [this, postIfActive](uint8_t componentTag, const StreamEvent& event) {
+        postIfActive([this, componentTag, event] { m_listener.onStreamEvent(componentTag, event); });
+    };
+    m_source.receiver().select(service);
+}
+
+// ---- What happens to it
+
+void ServicePresentation::onPmt(const Tune& tune, const Pmt& pmt) {
+    m_components.onPmt(tune.channel, pmt);
+    applySelection();
+}
+
+// Radio has no frame that would show that it is presented.
+void ServicePresentation::onFirstAudio(uint64_t tuneId) {
+    if (!m_components.hasVideo()) {
+        onPrerolled(tuneId);
+    }
+}
+
+void ServicePresentation::onPrerolled(uint64_t tuneId) {
+    if (m_pendingTune.id != tuneId) {
+        return;
+    }
+    const Tune presented = std::exchange(m_pendingTune, {});
+    m_components.updateAspectRatio();
+    m_arbiter.reportPresenting(presented);
+}
+
+void ServicePresentation::onTimeout(uint64_t tuneId) {
+    if (m_pendingTune.id == tuneId) {
+        fail(tuneId, kErrorNoSignal, "no picture and no sound within the timeout");
+    }
+}
+
+// Either the tune fails, or what it presents breaks down later.
+void ServicePresentation::fail(uint64_t tuneId, TELIX_ERR_STATE_ENUM_T error, const std::string& reason) {
+    const bool isPending = m_pendingTune.id != 0;
+    if (tuneId != (isPending ? m_pendingTune.id : m_activeTuneId) || tuneId == 0) {
+        return;
+    }
+    std::fprintf(stderr, "libtelix: channel: %s\n", reason.c_str());
+    const TELIX_JS_VB_HANDLE owner = m_arbiter.owner();
+    const Tune failed = std::exchange(m_pendingTune, {});
+    stopTuner();
+    if (isPending) {
+        m_arbiter.reportFailed(failed, error);
+    } else {
+        m_arbiter.reportBroken(owner, error);
+    }
+}
+
+// Called by the picture, inside of the player's request for it.
+void ServicePresentation::onTunerPreempted(TELIX_JS_VB_HANDLE object) {
+    abortPendingTune();
+    {
+        std::lock_guard<std::mutex> lock(m_platform.mutex());
+        m_pictureToken = 0;
+        m_arbiter.preemptLocked(object);
+    }
+    stopTuner();
+    m_arbiter.reportPreempted(object);
+}
+
+void ServicePresentation::stopTuner() {
+    m_source.receiver().deselect();
+    m_tuner.reset();
+    m_activeTuneId = 0;
+    m_listener.onEnd();
+    Picture::Token token = 0;
+    {
+        std::lock_guard<std::mutex> lock(m_platform.mutex());
+        token = std::exchange(m_pictureToken, Picture::Token{0});
+        m_components.clearLocked();
+        m_listener.onEndLocked();
+    }
+    m_platform.picture().release(token);
+}
+
+void ServicePresentation::applySelection() {
+    if (!m_tuner) {
+        return;
+    }
+    const BroadcastComponents::ActivePids pids = m_components.activePids();
+    m_tuner->selectVideo(pids.video.has_value());
+    m_tuner->selectAudio(pids.audio);
+    m_tuner->selectSubtitle(pids.subtitle);
+    if (!pids.video && m_pendingTune.id == 0) {
+        m_platform.picture().blank(m_pictureToken); // no lock: this thread alone changes it
+    }
+}
+
+std::optional<uint16_t> ServicePresentation::activeAudioPid() const {
+    return m_tuner ? m_tuner->activeAudioPid() : std::nullopt;
+}
+
+} // namespace desktop

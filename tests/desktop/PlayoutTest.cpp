@@ -1,0 +1,276 @@
+// Playout by a clock that the test advances: pacing, repetition, injected tables; and what a tune does with a
+// stream that never shows anything.
+#include <glib.h>
+#include <gtest/gtest.h>
+#include <unistd.h>
+
+#include <cstdlib>
+#include <future>
+#include <map>
+#include <mutex>
+
+#include "desktop/platform/Broadcast.h"
+#include "desktop/platform/Multiplex.h"
+#include "desktop/platform/Playout.h"
+#include "desktop/platform/Restamper.h"
+#include "desktop/platform/Sections.h"
+#include "tests/desktop/ManualClock.h"
+#include "tests/desktop/Received.h"
+
+using namespace desktop;
+using std::chrono::milliseconds;
+
+namespace {
+
+constexpr int64_t kUtcStart = 1795253700;
+constexpr uint16_t kPcrPid = 0x110;
+constexpr int64_t kTicksPerMillisecond = kSystemClockFrequency / 1000;
+
+// A packet without payload.
+Bytes makePcrPacket(int64_t pcr) {
+    const int64_t base = pcr / kSystemClockTicksPerBaseTick;
+    Bytes packet(kPacketSize, kStuffingByte);
+    const uint8_t header[] = {kSyncByte,
+                              static_cast<uint8_t>(kPcrPid >> 8),
+                              static_cast<uint8_t>(kPcrPid),
+                              kAdaptationFieldFlag,
+                              static_cast<uint8_t>(kPacketSize - kPacketHeaderSize - 1),
+                              kPcrFlag,
+                              static_cast<uint8_t>(base >> 25),
+                              static_cast<uint8_t>(base >> 17),
+                              static_cast<uint8_t>(base >> 9),
+                              static_cast<uint8_t>(base >> 1),
+                              static_cast<uint8_t>((base & 1) << 7),
+                              0};
+    std::copy(std::begin(header), std::end(header), packet.begin());
+    return packet;
+}
+
+// A stream of `count` packets with a PCR in each, `interval` after each other.
+Bytes makeStream(int count, milliseconds interval) {
+    Bytes stream;
+    for (int index = 0; index < count; ++index) {
+        const Bytes packet = makePcrPacket(index * interval.count() * kTicksPerMillisecond);
+        stream.insert(stream.end(), packet.begin(), packet.end());
+    }
+    return stream;
+}
+
+// A file that is removed at the end of the test.
+class StreamFile {
+public:
+    explicit StreamFile(const Bytes& stream) {
+        GError* error = nullptr;
+        const int file = g_file_open_tmp("telix-stream-XXXXXX.ts", &m_name, &error);
+        EXPECT_GE(file, 0) << (error ? error->message : "");
+        EXPECT_EQ(write(file, stream.data(), stream.size()), static_cast<ssize_t>(stream.size()));
+        close(file);
+    }
+    ~StreamFile() {
+        unlink(m_name);
+        g_free(m_name);
+    }
+    StreamFile(const StreamFile&) = delete;
+    StreamFile& operator=(const StreamFile&) = delete;
+
+    std::string name() const { return m_name; }
+
+private:
+    char* m_name = nullptr;
+};
+
+class PlayoutTest : public testing::Test {
+protected:
+    // Advances step by step, as time does.
+    void advance(milliseconds duration) {
+        for (milliseconds passed{0}; passed < duration; passed += milliseconds(10)) {
+            m_clock.advance(milliseconds(10));
+            ASSERT_TRUE(m_clock.settle());
+        }
+    }
+
+    // The PCRs that were sent so far, in milliseconds.
+    std::vector<int64_t> sentPcrs() {
+        std::lock_guard<std::mutex> lock(m_mutex);
+        std::vector<int64_t> pcrs;
+        for (size_t at = 0; at < m_packets.size(); at += kPacketSize) {
+            const auto pcr = pcrOf(m_packets.data() + at);
+            if (pcr && pidOf(m_packets.data() + at) == kPcrPid) {
+                pcrs.push_back(*pcr / kTicksPerMillisecond);
+            }
+        }
+        return pcrs;
+    }
+
+    // How often each table was sent so far.
+    std::map<uint8_t, size_t> sentTables(const std::set<uint16_t>& pids) {
+        std::lock_guard<std::mutex> lock(m_mutex);
+        std::map<uint8_t, size_t> counts;
+        SectionDemultiplexer demultiplexer([&](uint16_t, const Bytes& section) { ++counts[section[0]]; });
+        for (const uint16_t pid : pids) {
+            demultiplexer.add(pid);
+        }
+        for (size_t at = 0; at < m_packets.size(); at += kPacketSize) {
+            demultiplexer.push(m_packets.data() + at);
+        }
+        return counts;
+    }
+
+    ManualClock m_clock{kUtcStart};
+    std::mutex m_mutex;
+    Bytes m_packets; // guarded by the mutex
+    Playout m_playout{m_clock, [this](const uint8_t* packets, size_t size) {
+                          std::lock_guard<std::mutex> lock(m_mutex);
+                          m_packets.insert(m_packets.end(), packets, packets + size);
+                      }};
+};
+
+TEST_F(PlayoutTest, SendsEachPacketWhenItIsDue) {
+    const StreamFile file(makeStream(50, milliseconds(40)));
+    std::string error;
+    ASSERT_TRUE(m_playout.play(file.name(), nullptr, error)) << error;
+    ASSERT_TRUE(m_clock.settle());
+    EXPECT_EQ(sentPcrs(), std::vector<int64_t>{0});
+    advance(milliseconds(30));
+    EXPECT_EQ(sentPcrs(), std::vector<int64_t>{0});
+    advance(milliseconds(10));
+    EXPECT_EQ(sentPcrs(), (std::vector<int64_t>{0, 40}));
+    advance(milliseconds(400));
+    EXPECT_EQ(sentPcrs().size(), 12U);
+    EXPECT_EQ(sentPcrs().back(), 440);
+}
+
+TEST_F(PlayoutTest, StartsAgainAtTheEndWithPcrsThatRunOn) {
+    const StreamFile file(makeStream(10, milliseconds(40)));
+    std::string error;
+    ASSERT_TRUE(m_playout.play(file.name(), nullptr, error)) << error;
+    ASSERT_TRUE(m_clock.settle());
+    advance(milliseconds(1200));
+    const std::vector<int64_t> pcrs = sentPcrs();
+    ASSERT_GE(pcrs.size(), 30U); // three times the file
+    for (size_t index = 1; index < 30; ++index) {
+        EXPECT_EQ(pcrs[index], static_cast<int64_t>(index) * 40);
+    }
+}
+
+TEST_F(PlayoutTest, InjectsTablesAtTheirIntervals) {
+    const StreamFile file(makeStream(50, milliseconds(40)));
+    std::string error;
+    ASSERT_TRUE(m_playout.play(file.name(), makeTestTableInjector(300, 0), error)) << error;
+    ASSERT_TRUE(m_clock.settle());
+    const std::set<uint16_t> pids{kPidPat, kPidNit, kPidSdt, kPidEit, kPidTdt};
+    const size_t services = testServices().size();
+    auto tables = sentTables(pids);
+    EXPECT_EQ(tables[kTableIdPat], 1U);
+    EXPECT_EQ(tables[kTableIdSdtActual], 1U);
+    EXPECT_EQ(tables[kTableIdEitActualPresentFollowing], 2 * services);
+    advance(milliseconds(990));
+    tables = sentTables(pids);
+    EXPECT_GE(tables[kTableIdPat], 8U); // ten less what the packets' own times cost
+    EXPECT_LE(tables[kTableIdPat], 10U);
+    EXPECT_EQ(tables[kTableIdSdtActual], 1U);
+    EXPECT_EQ(tables[kTableIdNitActual], 1U);
+    EXPECT_EQ(tables[kTableIdTdt], 1U);
+    EXPECT_EQ(tables[kTableIdEitActualPresentFollowing], 4 * services);
+    advance(milliseconds(50));
+    EXPECT_EQ(sentTables(pids)[kTableIdSdtActual], 2U);
+}
+
+TEST_F(PlayoutTest, SendsNothingAfterItHasStopped) {
+    const StreamFile file(makeStream(50, milliseconds(40)));
+    std::string error;
+    ASSERT_TRUE(m_playout.play(file.name(), nullptr, error)) << error;
+    ASSERT_TRUE(m_clock.settle());
+    m_playout.stop();
+    const size_t before = sentPcrs().size();
+    m_clock.advance(milliseconds(500));
+    EXPECT_EQ(sentPcrs().size(), before);
+}
+
+TEST_F(PlayoutTest, TakesAFileWhoseClockStandsStillWithoutHarm) {
+    const StreamFile file(makeStream(10, milliseconds(0)));
+    std::string error;
+    ASSERT_TRUE(m_playout.play(file.name(), nullptr, error)) << error;
+    ASSERT_TRUE(m_clock.settle());
+    advance(milliseconds(100));
+    EXPECT_LE(sentPcrs().size(), 200U);
+    m_playout.stop();
+}
+
+TEST_F(PlayoutTest, RefusesWhatIsNoTransportStream) {
+    std::string error;
+    EXPECT_FALSE(m_playout.play("/nonexistent/file.ts", nullptr, error));
+    EXPECT_NE(error, "");
+    const StreamFile garbage(Bytes(5000, 0x55));
+    EXPECT_FALSE(m_playout.play(garbage.name(), nullptr, error));
+    EXPECT_EQ(error, garbage.name() + ": not a transport stream");
+    uint8_t continuity = 0;
+    Bytes tables;
+    for (int index = 0; index < 10; ++index) {
+        const Bytes packets = packetsOf(pack(Pat()), kPidPat, continuity);
+        tables.insert(tables.end(), packets.begin(), packets.end());
+    }
+    const StreamFile withoutPcr(tables);
+    EXPECT_FALSE(m_playout.play(withoutPcr.name(), nullptr, error));
+    EXPECT_EQ(error, withoutPcr.name() + ": no PCR");
+}
+
+// The channel list is read once in a process, so this test needs a process of its own.
+Received<TELIX_ERR_STATE_ENUM_T> errors;
+
+TELIX_RETCODE_ENUM_T onError(TELIX_JS_VB_HANDLE, TELIX_JS_CM_HANDLE, TELIX_ERR_STATE_ENUM_T error) {
+    return errors.add(error);
+}
+
+TEST(TuneTimeoutTest, EndsATuneThatShowsNothingAfterSixSeconds) {
+    constexpr uint16_t kPmtPid = 0x100;
+    constexpr uint16_t kServiceId = 7;
+    Pat pat;
+    pat.programs = {{kServiceId, kPmtPid}};
+    Pmt pmt;
+    pmt.serviceId = kServiceId;
+    pmt.pcrPid = kPcrPid;
+    pmt.streams = {{kStreamTypeMpeg2Video, kPcrPid, {}}};
+    uint8_t patContinuity = 0;
+    uint8_t pmtContinuity = 0;
+    Bytes stream;
+    for (const Bytes& part :
+         {packetsOf(pack(pat), kPidPat, patContinuity), packetsOf(pack(pmt), kPmtPid, pmtContinuity),
+          makeStream(50, milliseconds(40))}) {
+        stream.insert(stream.end(), part.begin(), part.end());
+    }
+    const StreamFile file(stream);
+    setenv("TELIX_CHANNELS", file.name().c_str(), 1);
+    static auto* const clock = new BroadcastClock(kUtcStart); // broadcast uses it until the process ends
+    Broadcast::useClock(*clock);
+
+    TELIX_JS_VB_HANDLE object = 0;
+    ASSERT_EQ(TELIX_JS_VB_GetHandle(&object), 0);
+    TELIX_JS_VB_RegisterOnChannelChangeError(onError);
+    ASSERT_EQ(TELIX_JS_VB_BindToCurrChannel(object), 0);
+    // From the PMT on, the pipeline waits for video.
+    TELIX_JS_AVCOMPHANDLE* components = nullptr;
+    uint32_t count = 0;
+    ASSERT_TRUE(waitUntil([&] {
+        return TELIX_JS_VB_GetComponents(object, TELIX_JS_AVCOMPTYPE_VIDEO, &components, &count) == 0 &&
+               count == 1;
+    }));
+    clock->advance(milliseconds(5999));
+    std::promise<void> isFlushed;
+    Platform::instance().post([&] { isFlushed.set_value(); });
+    isFlushed.get_future().wait();
+    EXPECT_TRUE(errors.all().empty());
+    TELIX_PLAYSTATE_ENUM_T state = 0;
+    EXPECT_EQ(TELIX_JS_VB_GetPlayBackState(object, &state), 0);
+    EXPECT_EQ(state, TELIX_PLAYSTATE_CONNECTING);
+    clock->advance(milliseconds(1));
+    EXPECT_TRUE(waitUntil([] { return !errors.all().empty(); }));
+    EXPECT_EQ(errors.all(), std::vector<TELIX_ERR_STATE_ENUM_T>{kErrorNoSignal});
+    EXPECT_TRUE(waitUntil([&] {
+        return TELIX_JS_VB_GetPlayBackState(object, &state) == 0 && state == TELIX_PLAYSTATE_UNREALIZED;
+    }));
+    TELIX_JS_VB_Release(object);
+    TELIX_JS_VB_UnRegisterOnChannelChangeError(onError);
+}
+
+} // namespace
