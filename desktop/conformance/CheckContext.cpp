@@ -60,7 +60,7 @@ std::string checkedString(const std::string& name,
         return "";
     }
     const bool isRepeated = call(&second) == 0;
-    const std::string string = first ? first : "";
+    std::string string = first ? first : "";
     const bool isDistinct = !isRepeated || !first || first != second;
     if (isDistinct) { // or the second free would crash before the failure is reported
         std::free(first);

@@ -38,7 +38,7 @@ std::string sendMessage(const CheckContext& context) {
     if (returnCode != 0 || !id) {
         throw CheckSkipped{"the library refuses DRM messages"};
     }
-    const std::string copy = id;
+    std::string copy = id;
     std::free(id);
     expect(!copy.empty() && isUtf8(copy.c_str()), "the id is empty or not valid UTF-8");
     return copy;

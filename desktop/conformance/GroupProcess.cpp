@@ -127,7 +127,7 @@ std::string runGroup(const CheckGroup& group, const CheckOptions& options, Summa
     std::fflush(nullptr); // or the child would write buffered output again
     const pid_t child = fork();
     if (child < 0) {
-        const std::string reason = std::string("fork: ") + std::strerror(errno);
+        std::string reason = std::string("fork: ") + std::strerror(errno);
         close(ends[0]);
         close(ends[1]);
         return reason;

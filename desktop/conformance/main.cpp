@@ -72,7 +72,7 @@ std::string pathOf(std::string file) {
         throw UsageError(file + ": No such file");
     }
     char* absolute = g_canonicalize_filename(file.c_str(), nullptr);
-    const std::string path = absolute;
+    std::string path = absolute;
     g_free(absolute);
     return path;
 }

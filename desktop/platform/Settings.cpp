@@ -132,7 +132,7 @@ std::string readSchemeThreshold(SettingTarget& target, const std::string& value)
 
 std::string readDrmResult(SettingTarget& target, const std::string& value) {
     uint32_t result = 0;
-    const std::string reason = readNumber(value, 0, G_MAXINT32, result);
+    std::string reason = readNumber(value, 0, G_MAXINT32, result);
     target.configuration.drmSystems.back().result = static_cast<int32_t>(result);
     return reason;
 }
