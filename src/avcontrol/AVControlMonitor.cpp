@@ -171,11 +171,12 @@ bool AVControl::Monitor::isToGoOn() {
 
 // The end of a monitor that hasn't been cancelled.
 void AVControl::Monitor::leave() {
-    bool isFree = false;
     if (const Access control{*m_link}) {
-        isFree = control->giveUpMonitor(pthread_self());
+        if (control->giveUpMonitor(pthread_self())) {
+            return;
+        }
     }
-    while (!isFree) {
+    for (;;) {
         ::pause(); // until the cancellation arrives
     }
 }

@@ -426,7 +426,7 @@ int handleVideoBroadcastEvent(void* eventData) {
     VideoBroadcast* instance = isListed ? event->vbInstance.get() : nullptr;
     const std::string id = instance ? instance->getId() : std::string();
     // quirk 76: an element without an id gets neither DOM events nor calls of its handlers.
-    if (id.empty()) {
+    if (!instance || id.empty()) {
         PLUGIN_LOG(
             VIDEOBCAST,
             "Invalid VB Instance received or Id attribute is not present with object. isValidInst: %d\n",

@@ -1,5 +1,6 @@
 // The buffering monitor, poll by poll.
 #include <atomic>
+#include <chrono>
 
 #include "src/avcontrol/AVControl.h"
 #include "tests/unit/avcontrol/AVControlTest.h"
@@ -581,7 +582,7 @@ TEST_F(AVControlMonitor, ManyObjectsComeAndGoWhileTheirMonitorsRun) {
         const unsigned before = polls;
         object.call("play", 1);
         send(TELIX_AV_CB_MSG_PLAYSTART);
-        browser.pumpUntil([&] { return polls > before; });
+        browser.pumpUntil([&] { return polls > before; }, std::chrono::seconds(50));
         if (i % 2) {
             object.call("stop");
         }

@@ -1,4 +1,5 @@
 // The DRM agent: messages to the platform, and the results from the platform's threads to the page.
+#include <chrono>
 #include <cstdlib>
 #include <cstring>
 #include <limits>
@@ -17,6 +18,7 @@ using ::testing::Not;
 namespace {
 
 const char* const kType = "application/oipfdrmagent";
+constexpr std::chrono::seconds kBound(50); // for what comes at once unless it never comes
 
 class DRMAgentTest : public BorderTest {
 protected:
@@ -652,7 +654,7 @@ TEST_F(DRMAgentTest, ResultsOfSeveralThreadsAtOnceAllArriveEachThreadsInOrderEve
     log.clear();
     // The browser's thread delivers while the others report.
     std::thread platformThreads([&] { onPlatformThreads(reporters); });
-    browser.pumpUntil([&] { return second.count() == size_t{threads} * results; });
+    browser.pumpUntil([&] { return second.count() == size_t{threads} * results; }, kBound);
     platformThreads.join();
     EXPECT_EQ(ended, threads);
     EXPECT_EQ(first.count(), 0U);
@@ -693,12 +695,14 @@ TEST_F(DRMAgentTest, AgentsMayComeAndGoWhileThreadsReport) {
         ended = true;
     });
     int round = 0;
-    browser.pumpUntil([&] {
-        if (++round % 5 == 0) {
-            browser.embed(kType, {{"id", "agent" + std::to_string(round)}}).destroy();
-        }
-        return ended.load();
-    });
+    browser.pumpUntil(
+        [&] {
+            if (++round % 5 == 0) {
+                browser.embed(kType, {{"id", "agent" + std::to_string(round)}}).destroy();
+            }
+            return ended.load();
+        },
+        kBound);
     platformThreads.join();
     const EmbeddedObject last = browser.embed(kType, {{"id", "last"}});
     browser.pump();
