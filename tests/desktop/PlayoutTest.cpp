@@ -264,7 +264,7 @@ TEST(TuneTimeoutTest, EndsATuneThatShowsNothingAfterSixSeconds) {
     EXPECT_EQ(TELIX_JS_VB_GetPlayBackState(object, &state), 0);
     EXPECT_EQ(state, TELIX_PLAYSTATE_CONNECTING);
     clock->advance(milliseconds(1));
-    EXPECT_TRUE(waitUntil([] { return !errors.all().empty(); }));
+    ASSERT_TRUE(waitUntil([] { return !errors.all().empty(); }));
     EXPECT_EQ(errors.all(), std::vector<TELIX_ERR_STATE_ENUM_T>{kErrorNoSignal});
     EXPECT_TRUE(waitUntil([&] {
         return TELIX_JS_VB_GetPlayBackState(object, &state) == 0 && state == TELIX_PLAYSTATE_UNREALIZED;
