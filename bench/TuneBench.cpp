@@ -1,4 +1,4 @@
-// How long a channel change of the desk's television takes: from the request to the first new frame of the
+// How long a channel change of the desktop television takes: from the request to the first new frame of the
 // test multiplex; compared with a pipeline that decodes the same service from the start of its file, where
 // the first frame is a keyframe and nothing is sent in real time.
 #include <benchmark/benchmark.h>

@@ -817,7 +817,7 @@ void ScriptedBrowser::closePage() {
     }
     m_rules.clear();
     m_listeners.clear();
-    // One by one: the end of an object takes further references along.
+    // One by one: an object that ends drops further references.
     const auto isOfScript = [this](const ObjectRef* reference) {
         return reference != &m_window && reference != &m_document;
     };
