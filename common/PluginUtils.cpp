@@ -325,7 +325,7 @@ std::string streamEventScript(const std::string& name, const std::string& data, 
 
 std::string parseStreamEventXMLScript(const std::string& url, const std::string& eventName,
                                       const std::string& id, bool isAdd) {
-    const std::string script =
+    std::string script =
         fillIn(kStreamEventRequestScript,
                {url, eventName, id, isAdd ? "addStreamEventListener" : "removeStreamEventListener"});
     PLUGIN_LOG(COMMON, "Script: %s \n", script.c_str());
@@ -333,13 +333,13 @@ std::string parseStreamEventXMLScript(const std::string& url, const std::string&
 }
 
 std::string getPlayCountVal(const std::string& id) {
-    const std::string script = fillIn(kPlayCountScript, {id});
+    std::string script = fillIn(kPlayCountScript, {id});
     PLUGIN_LOG(COMMON, "Script:--  %s ----\n", script.c_str());
     return script;
 }
 
 std::string getEncodedURL(const std::string& url) {
-    const std::string script = fillIn(kEncodedUrlScript, {url});
+    std::string script = fillIn(kEncodedUrlScript, {url});
     PLUGIN_LOG(COMMON, "Script:--  %s ----\n", script.c_str());
     return script;
 }

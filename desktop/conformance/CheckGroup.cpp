@@ -4,9 +4,9 @@ namespace desktop {
 
 namespace {
 
-template <std::vector<Check> (*checks)()>
+template <std::vector<Check> (*Checks)()>
 void runAll(const CheckContext& context) {
-    for (const Check& check : checks()) {
+    for (const Check& check : Checks()) {
         context.run(check);
     }
 }

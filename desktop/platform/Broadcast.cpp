@@ -9,23 +9,23 @@ namespace desktop {
 
 namespace {
 
-std::atomic<Clock*> g_clock{nullptr}; // what useClock() was given
-std::atomic<bool> g_hasInstance{false};
+std::atomic<Clock*> injectedClock{nullptr}; // what useClock() was given
+std::atomic<bool> hasInstance{false};
 
 } // namespace
 
 Broadcast& Broadcast::instance() {
-    static auto* const broadcast = [] {
-        g_hasInstance = true;
-        Clock* clock = g_clock;
+    static auto* broadcast = [] {
+        hasInstance = true;
+        Clock* clock = injectedClock;
         return new Broadcast(clock ? *clock : Clock::real()); // kept until the process ends
     }();
     return *broadcast;
 }
 
 void Broadcast::useClock(Clock& clock) {
-    assert(!g_hasInstance && "the clock comes before the first use of broadcast");
-    g_clock = &clock;
+    assert(!hasInstance && "the clock comes before the first use of broadcast");
+    injectedClock = &clock;
 }
 
 Broadcast::Broadcast(Clock& clock)

@@ -35,8 +35,8 @@ const Encoding kPrivateStreamDescriptors[] = {
     {kTagEnhancedAc3, TELIX_JS_AVCOMPTYPE_AUDIO, "E_AC3"},
 };
 
-template <size_t count>
-const Encoding* findEncoding(const Encoding (&encodings)[count], uint8_t code) {
+template <size_t Count>
+const Encoding* findEncoding(const Encoding (&encodings)[Count], uint8_t code) {
     for (const Encoding& encoding : encodings) {
         if (encoding.code == code) {
             return &encoding;

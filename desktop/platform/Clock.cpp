@@ -32,7 +32,7 @@ public:
 } // namespace
 
 Clock& Clock::real() {
-    static auto* const clock = new RealClock; // never destroyed: threads use it until the process ends
+    static auto* clock = new RealClock; // never destroyed: threads use it until the process ends
     return *clock;
 }
 

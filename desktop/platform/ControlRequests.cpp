@@ -57,7 +57,8 @@ JsonObjectWriter changeRating(const ControlRequest& request) {
 }
 
 JsonObjectWriter sendRatingError(const ControlRequest& request) {
-    require(broadcast().callbacks().onRatingError.isSet(), "no listener is registered for parental rating errors");
+    require(broadcast().callbacks().onRatingError.isSet(),
+            "no listener is registered for parental rating errors");
     require(broadcast().faults().ratingError(request.string("content-id"), request.string("drm-system")),
             kNoObject);
     return {};

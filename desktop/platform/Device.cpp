@@ -14,7 +14,7 @@ std::string drmMessageId(uint64_t number) {
 } // namespace
 
 Device& Device::instance() {
-    static auto* const device = new Device; // never deleted: callbacks may be running at the exit
+    static auto* device = new Device; // never deleted: callbacks may be running at the exit
     return *device;
 }
 

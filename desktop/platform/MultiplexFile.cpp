@@ -266,7 +266,7 @@ bool makeIn(const std::string& work, const std::string& file, std::string& error
 
 std::string makeTestMultiplex(std::string& error) {
     const std::string folder = cacheFolder();
-    const std::string file = folder + "/" + kFileName;
+    std::string file = folder + "/" + kFileName;
     if (g_file_test(file.c_str(), G_FILE_TEST_IS_REGULAR)) {
         return file;
     }

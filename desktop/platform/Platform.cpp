@@ -25,7 +25,7 @@ struct RepeatedFunction {
 } // namespace
 
 Platform& Platform::instance() {
-    static auto* const platform = new Platform; // lives until the process ends
+    static auto* platform = new Platform; // lives until the process ends
     return *platform;
 }
 

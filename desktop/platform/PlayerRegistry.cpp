@@ -9,7 +9,7 @@
 namespace desktop {
 
 PlayerRegistry& PlayerRegistry::instance() {
-    static auto* const registry = new PlayerRegistry; // lives until the process ends
+    static auto* registry = new PlayerRegistry; // lives until the process ends
     return *registry;
 }
 

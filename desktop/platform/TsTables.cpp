@@ -140,10 +140,10 @@ Bytes eventDescriptors(const EitEvent& event) {
 } // namespace
 
 uint32_t crc32(const uint8_t* bytes, size_t length) {
-    static const std::array<uint32_t, 256> table = makeCrcTable();
+    static const std::array<uint32_t, 256> kTable = makeCrcTable();
     uint32_t sum = kCrcStart;
     for (size_t index = 0; index < length; ++index) {
-        sum = sum << 8 ^ table[(sum >> 24 ^ bytes[index]) & 0xFF];
+        sum = sum << 8 ^ kTable[(sum >> 24 ^ bytes[index]) & 0xFF];
     }
     return sum;
 }

@@ -33,8 +33,8 @@ const Decoder kAudioDecoders[] = {
 // Up to three seconds wait for the decoder, however many bytes and buffers that is.
 const char* const kDecoderQueue = "queue max-size-time=3000000000 max-size-bytes=0 max-size-buffers=0 ! ";
 
-template <size_t count>
-const char* decoderFor(const GstCaps* caps, const Decoder (&decoders)[count]) {
+template <size_t Count>
+const char* decoderFor(const GstCaps* caps, const Decoder (&decoders)[Count]) {
     for (const Decoder& decoder : decoders) {
         GstCaps* accepted = gst_caps_from_string(decoder.caps);
         const bool isMatch = gst_caps_can_intersect(caps, accepted) != FALSE;

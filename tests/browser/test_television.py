@@ -219,14 +219,14 @@ class Broadcast(DesktopTelevision):
     def test_subtitles_are_on_the_screen_while_they_are_selected(self):
         self.tune('Telix Three')
         self.wait_for_pattern('Telix Three')
-        self.assertEqual((self.value('active(2)'), self.state()['shownSubtitle']), ([], None))
+        self.assertEqual((self.value('active(2)'), self.state()['activeSubtitlePid']), ([], None))
         self.assert_no_subtitles()
         self.value('tv.selectComponent(component(2, "deu"))')
         self.wait_for_state('activeSubtitlePid', GERMAN_SUBTITLES)
         self.assertEqual(self.value('active(2)'), ['deu'])
         wait_for(lambda: self.white_pixels() > 100, 'no subtitles')
         self.value('tv.unselectComponent(component(2, "deu"))')
-        self.wait_for_state('shownSubtitle', None)
+        self.wait_for_state('activeSubtitlePid', None)
         wait_for(lambda: self.white_pixels() == 0, 'subtitles')
         self.assert_no_subtitles()
 

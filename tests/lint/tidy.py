@@ -11,9 +11,11 @@ import functools
 import hashlib
 import json
 import os
+import re
 import shlex
 import subprocess
 import sys
+import tempfile
 
 
 def read_dependencies(build):
@@ -47,6 +49,8 @@ def key_of(commands, dependencies, tool_digest):
             return None
         key.update(command.encode())
         for path in files:  # the source is the first
+            if path.endswith('.gch'):
+                continue  # clang-tidy reads the headers themselves
             key.update(path.encode() + b'\0' + digest_of(path))
     return key.hexdigest()
 
@@ -62,17 +66,25 @@ def parse_arguments():
     return parser.parse_known_args()  # unknown options are for clang-tidy
 
 
-def commands_of_sources(build, folders):
-    """All commands that compile each source of the folders, by the source's name."""
+def read_commands(build):
+    """The entries of compile_commands.json without precompiled headers: those of g++ are not clang's, and a source has to
+    include what it uses."""
     with open(os.path.join(build, 'compile_commands.json'), encoding='utf-8') as file:
         entries = json.load(file)
+    for entry in entries:
+        entry['command'] = re.sub(r' -Winvalid-pch -include \S+/cmake_pch\.hxx', '', entry['command'])
+    return entries
+
+
+def commands_of_sources(entries, folders):
+    """All commands that compile each source of the folders, by the source's name."""
     prefixes = tuple(os.path.join(folder, '') for folder in folders)
     sources = collections.defaultdict(list)
     for entry in entries:
         if entry['file'].startswith(prefixes):
             sources[entry['file']].append(entry['command'])
     if not sources:
-        sys.exit(f'tidy.py: {build}: no sources of these folders')
+        sys.exit(f'tidy.py: {" ".join(folders)}: no sources')
     return sources
 
 
@@ -103,8 +115,9 @@ class PassedSources:
 
 def main():
     arguments, options = parse_arguments()
-    sources = commands_of_sources(arguments.build, arguments.folders)
-    command = [arguments.clang_tidy, '-quiet', f'-p={arguments.build}', *options]
+    entries = read_commands(arguments.build)
+    sources = commands_of_sources(entries, arguments.folders)
+    command = [arguments.clang_tidy, '-quiet', *options]
     tool_digest = digest_of_tool(command, arguments.checks)
     dependencies = read_dependencies(arguments.build)
     keys = {source: key_of(commands, dependencies, tool_digest) for source, commands in sources.items()}
@@ -112,13 +125,15 @@ def main():
     unchecked = [source for source, key in keys.items() if key not in passed]
 
     def check(source):
-        result = subprocess.run([*command, source], capture_output=True, text=True)
+        result = subprocess.run([*command, f'-p={database}', source], capture_output=True, text=True)
         if result.returncode == 0 and keys[source]:
             passed.add(keys[source])
         return source, result
 
     failed = 0
-    with concurrent.futures.ThreadPoolExecutor(arguments.jobs) as pool:
+    with tempfile.TemporaryDirectory() as database, concurrent.futures.ThreadPoolExecutor(arguments.jobs) as pool:
+        with open(os.path.join(database, 'compile_commands.json'), 'w', encoding='utf-8') as file:
+            json.dump(entries, file)
         for source, result in pool.map(check, unchecked):
             if result.returncode != 0:
                 failed += 1
