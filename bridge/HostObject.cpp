@@ -14,6 +14,9 @@ namespace bridge {
 
 namespace {
 
+// How the program of a javascript: URL is named in messages of the console.
+constexpr char kScriptUrlName[] = "javascript:";
+
 struct HostObject : NPObject {
     Page* page;
 };
@@ -95,6 +98,13 @@ NPVariant end(Page& page, const Parameters&) {
     return voidVariant();
 }
 
+// run(source): the value of a program.
+NPVariant run(Page& page, const Parameters& parameters) {
+    NPVariant result = voidVariant();
+    page.engine().evaluate(page.engine().globalObject(), parameters.text(0), kScriptUrlName, &result);
+    return result;
+}
+
 // response(stream, URL, type, headers, length, modified)
 NPVariant response(Page& page, const Parameters& parameters) {
     page.streams().onResponse(parameters.natural(0),
@@ -121,8 +131,9 @@ struct Method {
 };
 
 constexpr Method kMethods[] = {
-    {"attach", attach},   {"create", create}, {"object", object},     {"place", place}, {"open", open},
-    {"destroy", destroy}, {"end", end},       {"response", response}, {"data", data},   {"done", done},
+    {"attach", attach}, {"create", create},   {"object", object}, {"place", place},
+    {"open", open},     {"destroy", destroy}, {"end", end},       {"response", response},
+    {"data", data},     {"done", done},       {"run", run},
 };
 
 const Method* findMethod(NPIdentifier name) {
