@@ -22,6 +22,7 @@ constexpr int kSuccess = 0;
 constexpr int kNeverCame = 1;
 constexpr int kUnusable = 2;
 constexpr guint kPollInterval = 20; // milliseconds
+constexpr guint kLastTurns = 10;
 
 // As in the television's window: what lies beneath the page shows through, and pages have no say in that.
 constexpr char kStyle[] = "object, embed { opacity: 0 !important; } html { background: transparent; }";
@@ -68,8 +69,24 @@ void end(Run& run, int status) {
     if (!run.isEnding) {
         run.isEnding = true;
         run.status = status;
-        gtk_main_quit();
+        // The page ends before the program, as in a browser whose window is closed.
+        webkit_web_view_load_uri(run.view, "about:blank");
     }
+}
+
+// Plug-ins end some of their objects on later turns of the web process's main loop; each answer is one.
+void onTurn(GObject* view, GAsyncResult* result, gpointer turnsLeft) {
+    GError* error = nullptr;
+    JSCValue* const value = webkit_web_view_evaluate_javascript_finish(WEBKIT_WEB_VIEW(view), result, &error);
+    g_clear_object(const_cast<JSCValue**>(&value));
+    const guint left = GPOINTER_TO_UINT(turnsLeft);
+    if (error || left == 0) {
+        g_clear_error(&error);
+        gtk_main_quit();
+        return;
+    }
+    webkit_web_view_evaluate_javascript(WEBKIT_WEB_VIEW(view), "0", -1, nullptr, nullptr, nullptr, onTurn,
+                                        GUINT_TO_POINTER(left - 1));
 }
 
 void onSnapshot(GObject* view, GAsyncResult* result, gpointer data) {
@@ -163,7 +180,10 @@ gboolean poll(gpointer data) {
 
 void onLoadChanged(WebKitWebView*, WebKitLoadEvent event, Run* run) {
     static bool isStarted = false;
-    if (event == WEBKIT_LOAD_FINISHED && !isStarted) {
+    if (event == WEBKIT_LOAD_FINISHED && run->isEnding) {
+        webkit_web_view_evaluate_javascript(run->view, "0", -1, nullptr, nullptr, nullptr, onTurn,
+                                            GUINT_TO_POINTER(kLastTurns));
+    } else if (event == WEBKIT_LOAD_FINISHED && !isStarted) {
         isStarted = true;
         if (run->options.waitFor) {
             poll(run);
@@ -176,7 +196,9 @@ void onLoadChanged(WebKitWebView*, WebKitLoadEvent event, Run* run) {
 gboolean onLoadFailed(WebKitWebView*, WebKitLoadEvent, char* uri, GError* error, Run* run) {
     if (!g_error_matches(error, WEBKIT_NETWORK_ERROR, WEBKIT_NETWORK_ERROR_CANCELLED)) {
         complain(std::string(uri) + ": " + error->message);
-        end(*run, kUnusable);
+        run->status = kUnusable;
+        run->isEnding = true;
+        gtk_main_quit();
     }
     return TRUE;
 }
@@ -310,6 +332,7 @@ int main(int argc, char** argv) {
     }
     gtk_main();
     // What the plug-in prints comes before the value.
+    g_signal_handlers_disconnect_by_data(run.view, &run);
     webkit_web_view_terminate_web_process(run.view);
     if (!run.value.empty()) {
         std::printf("%s\n", run.value.c_str());
