@@ -38,6 +38,7 @@ public:
         return static_cast<int>(
             std::clamp(number(index), static_cast<double>(INT32_MIN) / 2, INT32_MAX / 2.0));
     }
+    NPVariant value(uint32_t index) const { return index < m_count ? m_args[index] : voidVariant(); }
     NPObject* object(uint32_t index) const { return index < m_count ? objectOf(m_args[index]) : nullptr; }
 
 private:
@@ -64,6 +65,24 @@ NPVariant create(Page& page, const Parameters& parameters) {
 NPVariant object(Page& page, const Parameters& parameters) {
     const auto instance = page.instance(parameters.natural(0));
     return objectVariant(instance ? instance->scriptableObject() : nullptr);
+}
+
+// write(object, name, value): whether the plug-in's object has that name, and has got the value.
+NPVariant write(Page&, const Parameters& parameters) {
+    NPObject* const object = parameters.object(0);
+    if (!object || ScriptObject::from(object)) {
+        return boolVariant(false);
+    }
+    const NPIdentifier name = identifierOfScriptName(parameters.text(1));
+    switch (PluginObject::of(object).write(name, parameters.value(2))) {
+    case PluginObject::Write::Done:
+        return boolVariant(true);
+    case PluginObject::Write::Failed:
+        setPendingException(PluginObject::takeError().c_str());
+        return voidVariant();
+    default:
+        return boolVariant(false);
+    }
 }
 
 // place(instance, x, y, width, height, clip left, clip top, clip right, clip bottom)
@@ -133,7 +152,7 @@ struct Method {
 constexpr Method kMethods[] = {
     {"attach", attach}, {"create", create},   {"object", object}, {"place", place},
     {"open", open},     {"destroy", destroy}, {"end", end},       {"response", response},
-    {"data", data},     {"done", done},       {"run", run},
+    {"data", data},     {"done", done},       {"run", run},       {"write", write},
 };
 
 const Method* findMethod(NPIdentifier name) {

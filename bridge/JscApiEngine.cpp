@@ -166,7 +166,8 @@ JscApiEngine::JscApiEngine(JSGlobalContextRef context, Client& client)
     m_fromWeak = functionFrom(context, "((call, deref) => reference => call(deref, reference, []))"
                                        "(Reflect.apply, WeakRef.prototype.deref)");
     m_reportError = functionFrom(context, "typeof reportError === 'function' ? reportError : undefined");
-    for (const JSObjectRef held : {m_makeWeak, m_fromWeak, m_reportError}) {
+    m_logError = functionFrom(context, "typeof console === 'object' ? console.error : undefined");
+    for (const JSObjectRef held : {m_makeWeak, m_fromWeak, m_reportError, m_logError}) {
         if (held) {
             JSValueProtect(context, held);
         }
@@ -186,7 +187,7 @@ void JscApiEngine::close() {
         JSValueUnprotect(m_context, function);
     }
     m_methods.clear();
-    for (JSObjectRef* held : {&m_makeWeak, &m_fromWeak, &m_reportError}) {
+    for (JSObjectRef* held : {&m_makeWeak, &m_fromWeak, &m_reportError, &m_logError}) {
         if (*held) {
             JSValueUnprotect(m_context, std::exchange(*held, nullptr));
         }
@@ -299,22 +300,17 @@ std::unordered_map<JSObjectRef, JscApiEngine::Method>& JscApiEngine::methods() {
     return *instance;
 }
 
-void JscApiEngine::report(JSValueRef exception) {
-    if (m_reportError) {
-        JSObjectCallAsFunction(m_context, m_reportError, nullptr, 1, &exception, nullptr);
-    }
-}
-
-// Ends an operation: false and a report when script has thrown or closed the page meanwhile.
-bool JscApiEngine::takeResult(JSValueRef value, JSValueRef exception, NPVariant* result) {
+// Ends an operation: false when script has thrown, which is told to the function `report`, or has closed the
+// page meanwhile.
+bool JscApiEngine::takeResult(JSValueRef value, JSValueRef exception, JSObjectRef report, NPVariant* result) {
     *result = voidVariant();
     if (!m_context) {
         return false;
     }
+    if (exception && report) {
+        JSObjectCallAsFunction(m_context, report, nullptr, 1, &exception, nullptr);
+    }
     if (exception || !value) {
-        if (exception) {
-            report(exception);
-        }
         return false;
     }
     *result = toVariant(value);
@@ -386,13 +382,13 @@ bool JscApiEngine::invoke(ScriptHandle object, NPIdentifier method, const NPVari
     JSValueRef exception = nullptr;
     const JSValueRef function = JSObjectGetProperty(kept.get(), objectOf(object), nameOf(method), &exception);
     if (exception || !m_context || !function || !JSValueIsObject(kept.get(), function)) {
-        return takeResult(nullptr, exception, result);
+        return takeResult(nullptr, exception, m_reportError, result);
     }
     Values values(kept.get(), args, count, [this](const NPVariant& variant) { return toValue(variant); });
     const JSValueRef value =
         JSObjectCallAsFunction(kept.get(), JSValueToObject(kept.get(), function, nullptr), objectOf(object),
                                values.count(), values.data(), &exception);
-    return takeResult(value, exception, result);
+    return takeResult(value, exception, m_reportError, result);
 }
 
 bool JscApiEngine::invokeDefault(ScriptHandle function, const NPVariant* args, uint32_t count,
@@ -406,7 +402,7 @@ bool JscApiEngine::invokeDefault(ScriptHandle function, const NPVariant* args, u
     Values values(kept.get(), args, count, [this](const NPVariant& variant) { return toValue(variant); });
     const JSValueRef value = JSObjectCallAsFunction(kept.get(), objectOf(function), nullptr, values.count(),
                                                     values.data(), &exception);
-    return takeResult(value, exception, result);
+    return takeResult(value, exception, m_reportError, result);
 }
 
 bool JscApiEngine::construct(ScriptHandle constructor, const NPVariant* args, uint32_t count,
@@ -420,7 +416,7 @@ bool JscApiEngine::construct(ScriptHandle constructor, const NPVariant* args, ui
     Values values(kept.get(), args, count, [this](const NPVariant& variant) { return toValue(variant); });
     const JSValueRef value = JSObjectCallAsConstructor(kept.get(), objectOf(constructor), values.count(),
                                                        values.data(), &exception);
-    return takeResult(value, exception, result);
+    return takeResult(value, exception, m_reportError, result);
 }
 
 bool JscApiEngine::evaluate(ScriptHandle scope, const std::string& source, const char* name,
@@ -435,7 +431,7 @@ bool JscApiEngine::evaluate(ScriptHandle scope, const std::string& source, const
     JSValueRef exception = nullptr;
     const JSValueRef value =
         JSEvaluateScript(kept.get(), text.get(), objectOf(scope), sourceName.get(), 1, &exception);
-    return takeResult(value, exception, result);
+    return takeResult(value, exception, m_logError, result);
 }
 
 bool JscApiEngine::hasProperty(ScriptHandle object, NPIdentifier name) {
@@ -460,7 +456,7 @@ bool JscApiEngine::getProperty(ScriptHandle object, NPIdentifier name, NPVariant
     const KeptContext kept(m_context);
     JSValueRef exception = nullptr;
     const JSValueRef value = JSObjectGetProperty(kept.get(), objectOf(object), nameOf(name), &exception);
-    return takeResult(value, exception, result);
+    return takeResult(value, exception, m_reportError, result);
 }
 
 bool JscApiEngine::setProperty(ScriptHandle object, NPIdentifier name, const NPVariant& value) {
@@ -471,9 +467,8 @@ bool JscApiEngine::setProperty(ScriptHandle object, NPIdentifier name, const NPV
     JSValueRef exception = nullptr;
     JSObjectSetProperty(kept.get(), objectOf(object), nameOf(name), toValue(value), kJSPropertyAttributeNone,
                         &exception);
-    if (exception && m_context) {
-        report(exception);
-    }
+    NPVariant none;
+    takeResult(nullptr, exception, m_reportError, &none);
     return !exception;
 }
 

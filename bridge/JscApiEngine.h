@@ -70,12 +70,12 @@ private:
     JSObjectRef scriptObjectFor(NPObject* object);
     JSObjectRef makeScriptObject(PluginObject& object);
     JSObjectRef methodFunction(NPIdentifier name);
-    bool takeResult(JSValueRef value, JSValueRef exception, NPVariant* result);
-    void report(JSValueRef exception);
+    bool takeResult(JSValueRef value, JSValueRef exception, JSObjectRef report, NPVariant* result);
 
     JSGlobalContextRef m_context; // null when closed
     Client& m_client;
     JSObjectRef m_reportError = nullptr; // the page's, as it was before page script
+    JSObjectRef m_logError = nullptr;    // console.error, likewise
     JSObjectRef m_makeWeak = nullptr;    // object => new WeakRef(object)
     JSObjectRef m_fromWeak = nullptr;    // reference => reference.deref()
     std::unordered_map<NPIdentifier, JSObjectRef> m_methods;

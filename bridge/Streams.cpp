@@ -24,9 +24,9 @@ constexpr unsigned kRetryInterval = 10;
 } // namespace
 
 struct Streams::Stream {
-    // Requested: nothing has come. Open: the plug-in has accepted it. Ended: the plug-in knows of its end, or
-    // never knew of the stream.
-    enum class State { Requested, Open, Ended };
+    // Requested: nothing has come. Offered: NPP_NewStream is running. Open: the plug-in has accepted the stream,
+    // and is told of its end. Ended: nothing follows.
+    enum class State { Requested, Offered, Open, Ended };
 
     uint32_t number;
     std::shared_ptr<Instance> instance;
@@ -116,7 +116,7 @@ void Streams::onResponse(uint32_t number, const StreamResponse& response) {
     stream->np.lastmodified = response.modified;
     stream->np.notifyData = stream->request.notifyData;
     stream->np.headers = stream->response.headers.c_str();
-    stream->state = Stream::State::Open;
+    stream->state = Stream::State::Offered;
     NPError error = NPERR_NO_ERROR;
     {
         const CallDepth depth;
@@ -124,13 +124,15 @@ void Streams::onResponse(uint32_t number, const StreamResponse& response) {
         error = stream->calls().newstream(stream->instance->npp(), mimeType.data(), &stream->np, false,
                                           &stream->mode);
     }
-    if (stream->state != Stream::State::Open) { // the plug-in has ended it
+    if (stream->state != Stream::State::Offered) { // the plug-in has ended it
         return;
     }
     if (error != NPERR_NO_ERROR) {
-        stream->state = Stream::State::Requested; // the plug-in does not hear of a stream that it has refused
         finish(stream, NPRES_USER_BREAK);
-    } else if (stream->mode == NP_SEEK) {
+        return;
+    }
+    stream->state = Stream::State::Open;
+    if (stream->mode == NP_SEEK) {
         finish(stream, NPRES_NETWORK_ERR); // no range of a response can be read at will here
     } else {
         deliver(stream);

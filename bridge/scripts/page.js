@@ -9,7 +9,8 @@
 // How an element gets its object. Between HTMLObjectElement.prototype and HTMLElement.prototype stands a proxy that sees the
 // first access to an element that has no instance, and makes the instance then. From then on the element's own
 // prototype is the plug-in's script object, whose prototype is HTMLObjectElement.prototype, so that the plug-in's
-// names come first and no proxy is asked for them. Elements that no script touches are found by a mutation observer.
+// names come first when they are read, without a proxy in between. Writes pass by the setters of prototypes that are
+// not proxies, so the proxy hands them to the plug-in. Elements that no script touches are found by a mutation observer.
 (function (host, pluginName, pluginDescription, pluginFile) {
     'use strict';
 
@@ -40,6 +41,7 @@
 
     const hostCreate = hostCall('create');
     const hostObject = hostCall('object');
+    const hostWrite = hostCall('write');
     const hostPlace = hostCall('place');
     const hostOpen = hostCall('open');
     const hostDestroy = hostCall('destroy');
@@ -379,6 +381,12 @@
         return false;
     }
 
+    // Writes a name of the plug-in's. False when the element has no such name of it.
+    function write(receiver, name, value) {
+        const record = mapGet(recordOf, receiver);
+        return record !== undefined && record.object !== null && hostWrite(record.object, name, value);
+    }
+
     // An element that script prepares: once it is in the document, even `name in element` makes its instance first. A proxy
     // of its own knows the element, which the `has` trap of the proxy for all is not told.
     function watch(element) {
@@ -410,8 +418,13 @@
                 return typeof name === 'string' && touch(receiver) ? get(receiver, name) : get(parent, name, receiver);
             },
             set: function (target, name, value, receiver) {
-                return typeof name === 'string' && touch(receiver) ? set(receiver, name, value)
-                                                                  : set(parent, name, value, receiver);
+                if (typeof name === 'string') {
+                    touch(receiver);
+                    if (write(receiver, name, value)) {
+                        return true;
+                    }
+                }
+                return set(parent, name, value, receiver);
             },
             // Elements made by a parser of script's, such as innerHTML, in their first task: the one that is asked
             // is among those.
@@ -439,16 +452,14 @@
                 continue;
             }
             const read = property.get;
-            const write = property.set;
-            defineProperty(prototype, name, assign(property, {
+            defineProperty(prototype, name, assign({}, property, {
                 get: function () {
                     return touch(this) ? get(this, name) : apply(read, this, []);
                 },
-                set: write && function (value) {
-                    if (touch(this)) {
-                        set(this, name, value);
-                    } else {
-                        apply(write, this, [value]);
+                set: function (value) {
+                    touch(this);
+                    if (!write(this, name, value) && property.set) {
+                        apply(property.set, this, [value]);
                     }
                 }
             }));
