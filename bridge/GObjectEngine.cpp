@@ -28,9 +28,6 @@ constexpr double kEndedObject = -1;
 constexpr unsigned kNumberIndex = 0;
 constexpr unsigned kNameIndex = 1;
 
-// What is being brought back into script to be reported.
-JSCException* s_rethrown = nullptr;
-
 template <typename Type>
 GObjectRef<Type> retained(Type* object) {
     return GObjectRef<Type>(object ? static_cast<Type*>(g_object_ref(object)) : nullptr);
@@ -203,7 +200,6 @@ void GObjectEngine::runScript() {
         {"remove", onRemove},
         {"names", onNames},
         {"call", onCall},
-        {"rethrow", onRethrow},
         {"callDefault", onCallDefault},
         {"callConstructor", onConstruct},
     };
@@ -222,11 +218,11 @@ void GObjectEngine::runScript() {
         propertyOf(script.get(), "makePage").get(),
         {m_registry->functions(), natives.get(), propertyOf(script.get(), "evaluateWith").get()});
     const auto function = [&](const char* name) { return propertyOf(functions.get(), name); };
-    m_functions = {function("failed"),    function("makeObject"),    function("makeMethod"),
-                   function("invoke"),    function("invokeDefault"), function("construct"),
-                   function("get"),       function("set"),           function("has"),
-                   function("hasMethod"), function("remove"),        function("enumerate"),
-                   function("evaluate"),  function("report")};
+    m_functions = {
+        function("failed"),        function("makeObject"), function("makeMethod"), function("invoke"),
+        function("invokeDefault"), function("construct"),  function("get"),        function("set"),
+        function("has"),           function("hasMethod"),  function("remove"),     function("enumerate"),
+        function("evaluate"),      function("log")};
 }
 
 void GObjectEngine::close() {
@@ -439,12 +435,12 @@ bool GObjectEngine::evaluate(ScriptHandle scope, const std::string& source, cons
     const std::string valid = utf8From(utf16From(source));
     ValueRef value(jsc_context_evaluate_with_source_uri(context.get(), valid.data(),
                                                         static_cast<gssize>(valid.size()), name, 1));
-    const bool hasThrown = reportException();
+    const bool hasThrown = logException();
     return m_context && !hasThrown && takeResult(std::move(value), result);
 }
 
 // Whether script has thrown.
-bool GObjectEngine::reportException() {
+bool GObjectEngine::logException() {
     if (!m_context) {
         return true;
     }
@@ -453,9 +449,9 @@ bool GObjectEngine::reportException() {
         return false;
     }
     jsc_context_clear_exception(m_context.get());
-    JSCException* const outer = std::exchange(s_rethrown, exception.get());
-    call(m_functions.report, {});
-    s_rethrown = outer;
+    char* const description = jsc_exception_to_string(exception.get());
+    call(m_functions.log, {textValue(description ? description : "").get()});
+    g_free(description);
     return true;
 }
 
@@ -617,13 +613,6 @@ JSCValue* GObjectEngine::onConstruct(GPtrArray* values, gpointer) {
                       [](PluginObject& object, const Arguments& arguments, NPVariant* result) {
                           return object.construct(arguments, result);
                       });
-}
-
-JSCValue* GObjectEngine::onRethrow(GPtrArray*, gpointer) {
-    if (s_rethrown) {
-        jsc_context_throw_exception(jsc_context_get_current(), s_rethrown);
-    }
-    return nullptr;
 }
 
 } // namespace bridge

@@ -70,7 +70,7 @@ private:
         ValueRef remove;
         ValueRef enumerate;
         ValueRef evaluate;
-        ValueRef report;
+        ValueRef log;
     };
 
     // The natives, which the traps call.
@@ -83,7 +83,6 @@ private:
     static JSCValue* onCall(GPtrArray* values, gpointer);
     static JSCValue* onCallDefault(GPtrArray* values, gpointer);
     static JSCValue* onConstruct(GPtrArray* values, gpointer);
-    static JSCValue* onRethrow(GPtrArray* values, gpointer);
     template <typename Call>
     static JSCValue* callPlugin(GPtrArray* values, unsigned first, Call call);
     static std::unordered_map<uint64_t, Wrapper*>& wrappers();
@@ -106,7 +105,7 @@ private:
     bool run(const ValueRef& function, std::vector<JSCValue*> values, const NPVariant* args, uint32_t count,
              NPVariant* result);
     bool takeResult(ValueRef value, NPVariant* result);
-    bool reportException();
+    bool logException();
 
     GObjectRef<JSCContext> m_context; // null when closed
     Client& m_client;

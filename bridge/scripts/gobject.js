@@ -63,8 +63,10 @@
         const { bind } = Function.prototype;
         const { toStringTag } = Symbol;
         const { numberOf, setNumber, wellFormed } = registry;
-        const { missing, read, write, hasName, remove, names, call, callDefault, callConstructor, rethrow } = plugin;
+        const { missing, read, write, hasName, remove, names, call, callDefault, callConstructor } = plugin;
         const reportError = typeof globalThis.reportError === 'function' ? globalThis.reportError : function () {};
+        const theConsole = typeof console === 'object' ? console : null;
+        const logError = theConsole ? theConsole.error : function () {};
         const failed = { __proto__: null };
         const longestPrototypeChain = 32;
 
@@ -241,21 +243,17 @@
                 }
                 return list;
             },
+            // With another `this` than the window. What a program of the plug-in's throws is no event of the page's.
             evaluate: function (scope, source) {
                 try {
                     return apply(evaluateWith, scope, [source]);
                 } catch (error) {
-                    reportError(error);
+                    apply(logError, theConsole, [error]);
                     return failed;
                 }
             },
-            // Reports what the engine has caught, which only `rethrow` brings back into script as it was.
-            report: function () {
-                try {
-                    rethrow();
-                } catch (error) {
-                    reportError(error);
-                }
+            log: function (text) {
+                apply(logError, theConsole, [text]);
             }
         };
     },

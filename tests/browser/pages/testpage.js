@@ -10,6 +10,9 @@
 // when the page is loaded. The outcome is then in window.testResult: {passed: number, failed: [text, ...]}.
 var testLimit = 10000;
 var checksMade = 0;
+// Whether the page runs in the engine that loads NPAPI plug-ins by itself: where that is at fault, a test expects what
+// the current engines do only of those.
+var isOldEngine = typeof WeakRef === 'undefined';
 
 // Fails the test unless `condition` is true.
 function check(condition, text) {
