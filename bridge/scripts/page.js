@@ -106,6 +106,7 @@
     const mapSet = uncurry(WeakMap.prototype.set);
     const mapDelete = uncurry(WeakMap.prototype.delete);
     const { round, max, min } = Math;
+    const toStringTag = Symbol.toStringTag;
 
     const elementNode = 1;
     const xhtml = 'http://www.w3.org/1999/xhtml';
@@ -223,6 +224,7 @@
         const { element, object } = record;
         record.base = mapGet(watchedBase, element) || getPrototypeOf(element);
         setPrototypeOf(object, record.base);
+        defineProperty(object, toStringTag, { value: get(element, toStringTag), configurable: true });
         // Names that the page has given to the element before would hide the plug-in's.
         const own = ownKeys(element);
         for (let i = 0; i < own.length; i++) {
