@@ -142,6 +142,8 @@ std::unique_ptr<Plugin> loadPlugin(GVariant* data) {
 extern "C" __attribute__((visibility("default"))) void
 webkit_web_extension_initialize_with_user_data(WebKitWebExtension*, const GVariant* userData) {
     auto* const data = const_cast<GVariant*>(userData);
+    // The process ends without flushing what the plug-in has printed.
+    std::setvbuf(stdout, nullptr, _IOLBF, 0);
     auto plugin = bridge::loadPlugin(data);
     if (!plugin) {
         return;

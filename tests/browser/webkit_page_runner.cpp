@@ -9,10 +9,12 @@
 // process ended; with 2 for a bad option or a page that cannot be loaded.
 #include <unistd.h>
 
+#include <csignal>
 #include <cstdio>
 #include <cstdlib>
 #include <string>
 
+#include <glib-unix.h>
 #include <gtk/gtk.h>
 #include <webkit2/webkit2.h>
 
@@ -21,6 +23,7 @@ namespace {
 constexpr int kSuccess = 0;
 constexpr int kNeverCame = 1;
 constexpr int kUnusable = 2;
+constexpr int kSignalled = 128;
 constexpr guint kPollInterval = 20; // milliseconds
 constexpr guint kLastTurns = 10;
 
@@ -218,6 +221,11 @@ gboolean onTimeout(gpointer data) {
     return G_SOURCE_REMOVE;
 }
 
+gboolean onTerminationSignal(gpointer run) {
+    end(*static_cast<Run*>(run), kSignalled + SIGTERM);
+    return G_SOURCE_CONTINUE;
+}
+
 void onInitializeExtensions(WebKitWebContext* context, Run* run) {
     webkit_web_context_set_web_extensions_directory(context, run->options.extensions);
     GVariantDict data;
@@ -327,6 +335,7 @@ int main(int argc, char** argv) {
     }
     makeView(run);
     webkit_web_view_load_uri(run.view, urlOf(run.options.pages[0]).c_str());
+    g_unix_signal_add(SIGTERM, onTerminationSignal, &run);
     if (run.options.timeout > 0) {
         g_timeout_add(static_cast<guint>(run.options.timeout * 1000), onTimeout, &run);
     }
