@@ -13,6 +13,7 @@
 #include <webkit2/webkit-web-extension.h>
 #endif
 
+#include "bridge/GObjectEngine.h"
 #include "bridge/Page.h"
 #include "bridge/Plugin.h"
 #if !TELIX_BRIDGE_WPE
@@ -86,7 +87,8 @@ std::unique_ptr<ScriptEngine> Extension::makeEngine(WebKitFrame* frame, WebKitSc
         return std::make_unique<JscApiEngine>(context, client);
     }
 #endif
-    return nullptr;
+    const GObjectRef<JSCContext> context(webkit_frame_get_js_context_for_script_world(frame, world));
+    return std::make_unique<GObjectEngine>(context.get(), client);
 }
 
 void Extension::onWindowObjectCleared(WebKitFrame* frame, WebKitScriptWorld* world) {

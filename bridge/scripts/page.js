@@ -718,7 +718,7 @@
     const headerOf = uncurry(Headers.prototype.get);
     const forEachHeader = uncurry(Headers.prototype.forEach);
     const getReader = uncurry(ReadableStream.prototype.getReader);
-    const readPiece = uncurry(ReadableStreamDefaultReader.prototype.read);
+    const readPiece = uncurry(getPrototypeOf(getReader(new ReadableStream())).read);
     const Bytes = Uint8Array;
     const byteLength = getter(getPrototypeOf(Uint8Array.prototype), 'length');
     const subarray = uncurry(Uint8Array.prototype.subarray);
