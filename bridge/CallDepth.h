@@ -16,6 +16,15 @@ public:
 
     static bool isPluginOnStack() { return s_depth > 0; }
 
+    // Lives during a call that looks like one into the plug-in and is one of the bridge's own objects.
+    class Own {
+    public:
+        Own() { s_depth--; }
+        Own(const Own&) = delete;
+        Own& operator=(const Own&) = delete;
+        ~Own() { s_depth++; }
+    };
+
 private:
     static inline int s_depth = 0;
 };

@@ -4,6 +4,7 @@
 #include <algorithm>
 #include <vector>
 
+#include "bridge/CallDepth.h"
 #include "bridge/Identifiers.h"
 #include "bridge/Objects.h"
 #include "bridge/Page.h"
@@ -111,9 +112,9 @@ NPVariant destroy(Page& page, const Parameters& parameters) {
     return voidVariant();
 }
 
-// end(): the document goes, and may come back.
+// end(): the document goes for good.
 NPVariant end(Page& page, const Parameters&) {
-    page.endInstances();
+    page.end();
     return voidVariant();
 }
 
@@ -173,6 +174,7 @@ NPClass kHostClass = {
         if (!method) {
             return false;
         }
+        const CallDepth::Own own;
         *result = method->run(*static_cast<HostObject*>(object)->page, Parameters(args, count));
         return true;
     },

@@ -501,7 +501,7 @@ JSClassRef JscApiEngine::wrapperClass(bool isFunction) {
         definition.deleteProperty = onDelete;
         definition.getPropertyNames = onNames;
         definition.callAsFunction = callable ? onCall : nullptr;
-        definition.callAsConstructor = onConstruct;
+        definition.callAsConstructor = callable ? onConstruct : nullptr;
         definition.finalize = onFinalize;
         return JSClassCreate(&definition);
     };

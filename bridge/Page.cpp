@@ -59,12 +59,11 @@ bool Page::start() {
 }
 
 NPObject* Page::window() {
-    const ScriptHandle handle = m_engine->globalObject();
-    return handle ? retainedObjectFor(handle) : nullptr;
+    return retainedObjectFor(m_engine->globalObject());
 }
 
 NPObject* Page::retainedObjectFor(ScriptHandle object) {
-    return m_engine->globalObject() ? m_scriptObjects->retained(object) : nullptr;
+    return m_hasEnded ? nullptr : m_scriptObjects->retained(object);
 }
 
 uint32_t Page::createInstance(NPObject* element, const std::string& mimeType,
@@ -126,6 +125,7 @@ void Page::end() {
         return;
     }
     endInstances();
+    m_scriptObjects->end();
     runWithoutPlugin([page = shared_from_this()] { page->close(); });
 }
 

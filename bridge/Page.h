@@ -53,7 +53,6 @@ public:
     std::shared_ptr<Instance> instance(uint32_t number) const;
     // Now, or from the main loop when the plug-in is on the stack.
     void endInstance(uint32_t number);
-    void endInstances();
     // The script's functions by name; replaces what was there.
     void attachScript(NPObject* functions);
 
@@ -64,6 +63,7 @@ public:
 private:
     explicit Page(Plugin& plugin) : m_plugin(plugin), m_streams(*this) {}
 
+    void endInstances();
     void close();
 
     Plugin& m_plugin;

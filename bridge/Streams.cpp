@@ -24,8 +24,8 @@ constexpr unsigned kRetryInterval = 10;
 } // namespace
 
 struct Streams::Stream {
-    // Requested: nothing has come. Offered: NPP_NewStream is running. Open: the plug-in has accepted the stream,
-    // and is told of its end. Ended: nothing follows.
+    // Requested: nothing has come. Offered: NPP_NewStream is running. Open: the plug-in has accepted the
+    // stream, and is told of its end. Ended: nothing follows.
     enum class State { Requested, Offered, Open, Ended };
 
     uint32_t number;

@@ -195,7 +195,7 @@
         if (mapGet(recordOf, element) || !isEligible(element)) {
             return false;
         }
-        const record = { element, number: 0, object: null, base: null, place: '' };
+        const record = { __proto__: null, element, number: 0, object: null, base: null, place: '' };
         // Before all else, so that what the plug-in and the page do meanwhile does not come here again.
         mapSet(recordOf, element, record);
         const values = [element, typeOf(element)];
@@ -224,7 +224,7 @@
         const { element, object } = record;
         record.base = mapGet(watchedBase, element) || getPrototypeOf(element);
         setPrototypeOf(object, record.base);
-        defineProperty(object, toStringTag, { value: get(element, toStringTag), configurable: true });
+        defineProperty(object, toStringTag, { __proto__: null, value: get(element, toStringTag), configurable: true });
         // Names that the page has given to the element before would hide the plug-in's.
         const own = ownKeys(element);
         for (let i = 0; i < own.length; i++) {
@@ -246,8 +246,13 @@
     function detach(record) {
         const { element, object } = record;
         mapDelete(recordOf, element);
-        if (object && getPrototypeOf(element) === object) {
-            setPrototypeOf(element, record.base);
+        // Nearly always the element itself: another document may have put an object of its own before this one.
+        let holder = object && element;
+        while (holder && getPrototypeOf(holder) !== object) {
+            holder = getPrototypeOf(holder);
+        }
+        if (holder) {
+            setPrototypeOf(holder, record.base);
         }
         hostDestroy(record.number);
     }
@@ -348,13 +353,18 @@
     }
 
     const observer = new MutationObserver(onMutations);
-    const observed = { childList: true, subtree: true, attributes: true, attributeFilter: ['type', 'data', 'src'] };
+    const observed = { __proto__: null, childList: true, subtree: true, attributes: true, attributeFilter: ['type', 'data', 'src'] };
     observe(observer, theDocument, observed);
     const attachShadow = Element.prototype.attachShadow;
     Element.prototype.attachShadow = new Proxy(attachShadow, {
+        __proto__: null,
         apply: function (target, self, values) {
             const root = apply(target, self, values);
-            observe(observer, root, observed);
+            try {
+                observe(observer, root, observed);
+            } catch (error) {
+                // Array iterators, as in adoptStyle(): instances here come with the first access, and go.
+            }
             return root;
         }
     });
@@ -397,6 +407,7 @@
         }
         const base = getPrototypeOf(element);
         const proxy = new Proxy(create(base), {
+            __proto__: null,
             get: function (target, name, receiver) {
                 return receiver === element && attach(element) ? get(element, name) : get(base, name, receiver);
             },
@@ -416,6 +427,7 @@
     function guardClass(prototype) {
         const parent = getPrototypeOf(prototype);
         setPrototypeOf(prototype, new Proxy(create(parent), {
+            __proto__: null,
             get: function (target, name, receiver) {
                 return typeof name === 'string' && touch(receiver) ? get(receiver, name) : get(parent, name, receiver);
             },
@@ -510,7 +522,11 @@
             apply(replaceSync, style, [styleText()]);
         }
         list[list.length] = style;
-        apply(styleSheets.set, theDocument, [list]);
+        try {
+            apply(styleSheets.set, theDocument, [list]);
+        } catch (error) {
+            // The engine reads the list with what the page has made of array iterators; elements go without the style.
+        }
     }
 
     // Where the document lies in the window: of documents in frames as far as their origin lets this one see.
@@ -592,13 +608,13 @@
     function leave() {
         isAway = true;
         detachIf(function () { return true; });
-        hostEnd();
     }
 
     // The page's own listeners of this event find the plug-in: this one is the last, because it is added when the end has
     // begun.
     function onUnload() {
         leave();
+        hostEnd();
     }
 
     function onPageHide(event) {
@@ -818,11 +834,11 @@
     // without, then only whether it is there.
     function modesFor(url, method) {
         if (urlOrigin(url) === pageOrigin) {
-            return [{ credentials: 'same-origin' }];
+            return [{ __proto__: null, credentials: 'same-origin' }];
         }
-        const modes = [{ credentials: 'include' }, { credentials: 'omit' }];
+        const modes = [{ __proto__: null, credentials: 'include' }, { __proto__: null, credentials: 'omit' }];
         if (method === 'GET') {
-            modes[2] = { mode: 'no-cors', credentials: 'include' };
+            modes[2] = { __proto__: null, mode: 'no-cors', credentials: 'include' };
         }
         return modes;
     }
@@ -837,7 +853,7 @@
             return;
         }
         request.controller = new Controller();
-        const all = assign({ signal: abortSignal(request.controller) }, options, modes[index]);
+        const all = assign({ __proto__: null, signal: abortSignal(request.controller) }, options, modes[index]);
         then(fetchUrl(request.url, all), function (response) {
             onResponse(number, response);
         }, function () {
@@ -919,7 +935,7 @@
         } else if (protocol === 'file:') {
             loadFile(number, request.url);
         } else {
-            const options = { method: method };
+            const options = { __proto__: null, method: method };
             if (method === 'POST') {
                 options.headers = headersFrom(headers);
                 options.body = bytesOf(body);
@@ -930,7 +946,7 @@
 
     host.attach({
         request: function (number, url, target, method, headers, body) {
-            requests[number] = { url: absolute(url), controller: null, reader: null, text: '' };
+            requests[number] = { __proto__: null, url: absolute(url), controller: null, reader: null, text: '' };
             // Not within the plug-in's call.
             setTimer(start, 0, number, target, method, headers, body);
         },
