@@ -72,11 +72,16 @@ ValueRef propertyOf(JSCValue* object, const char* name) {
     return ValueRef(jsc_value_object_get_property(object, name));
 }
 
+// Null when the function throws, as one of ours does only where script has used up the stack.
 ValueRef callFunction(JSCValue* function, const std::vector<JSCValue*>& values) {
     ValueRef result(jsc_value_function_callv(function, static_cast<guint>(values.size()),
                                              const_cast<JSCValue**>(values.data())));
-    jsc_context_clear_exception(jsc_value_get_context(function));
-    return result;
+    JSCContext* const context = jsc_value_get_context(function);
+    if (!jsc_context_get_exception(context)) {
+        return result;
+    }
+    jsc_context_clear_exception(context);
+    return nullptr;
 }
 
 } // namespace
@@ -107,10 +112,11 @@ public:
     // The number of a proxy, kNoObject for another object.
     double numberOf(JSCValue* object) const {
         const ValueRef number = callFunction(m_numberOf.get(), {object});
-        return jsc_value_is_number(number.get()) ? jsc_value_to_double(number.get()) : kNoObject;
+        return number && jsc_value_is_number(number.get()) ? jsc_value_to_double(number.get()) : kNoObject;
     }
     std::string wellFormed(JSCValue* string) const {
-        return utf8Of(callFunction(m_wellFormed.get(), {string}).get());
+        const ValueRef text = callFunction(m_wellFormed.get(), {string});
+        return text ? utf8Of(text.get()) : std::string();
     }
 
 private:
@@ -365,7 +371,7 @@ std::unordered_map<uint64_t, GObjectEngine::Wrapper*>& GObjectEngine::wrappers()
 
 // The operations of the plug-in on script objects.
 
-// Null when closed, or when script has closed the page meanwhile.
+// Null when it throws, when closed, and when script has closed the page meanwhile.
 ValueRef GObjectEngine::call(const ValueRef& function, const std::vector<JSCValue*>& values) {
     if (!m_context) {
         return nullptr;

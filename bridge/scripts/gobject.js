@@ -58,7 +58,7 @@
         'use strict';
 
         const { apply, construct, defineProperty, deleteProperty, get, getOwnPropertyDescriptor, getPrototypeOf, has,
-            ownKeys, set } = Reflect;
+            ownKeys, set, setPrototypeOf } = Reflect;
         const { create } = Object;
         const { bind } = Function.prototype;
         const { toStringTag } = Symbol;
@@ -77,6 +77,17 @@
                 list[list.length] = rest[i];
             }
             return list;
+        }
+
+        // A property's description without what the page may have added to Object.prototype: `get` would be taken from there.
+        function bare(description) {
+            if (description !== undefined) {
+                setPrototypeOf(description, null);
+            }
+            return description;
+        }
+        function ownDescriptor(object, name) {
+            return bare(getOwnPropertyDescriptor(object, name));
         }
 
         // Only what is not the plug-in's reaches the target, which holds the names of the page.
@@ -110,11 +121,12 @@
                         return { __proto__: null, value, writable: true, enumerable: true, configurable: true };
                     }
                 }
-                return getOwnPropertyDescriptor(target, name);
+                return ownDescriptor(target, name);
             },
             defineProperty: function (target, name, property) {
-                return typeof name === 'string' && getOwnPropertyDescriptor(property, 'value') !== undefined &&
-                    write(this.number, wellFormed(name), property.value) || defineProperty(target, name, property);
+                const value = typeof name === 'string' ? ownDescriptor(property, 'value') : undefined;
+                return value !== undefined && write(this.number, wellFormed(name), value.value) ||
+                    defineProperty(target, name, bare(property));
             },
             ownKeys: function (target) {
                 const known = create(null);
