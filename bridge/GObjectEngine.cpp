@@ -103,7 +103,9 @@ public:
 
     explicit Registry(JSCVirtualMachine* machine) : m_context(jsc_context_new_with_virtual_machine(machine)) {
         const ValueRef script(jsc_context_evaluate(m_context.get(), kGObjectScript, -1));
-        m_functions = callFunction(propertyOf(script.get(), "makeRegistry").get(), {});
+        const ValueRef collected(jsc_value_new_function_variadic(
+            m_context.get(), "collected", G_CALLBACK(onCollected), nullptr, nullptr, G_TYPE_NONE));
+        m_functions = callFunction(propertyOf(script.get(), "makeRegistry").get(), {collected.get()});
         m_numberOf = propertyOf(m_functions.get(), "numberOf");
         m_wellFormed = propertyOf(m_functions.get(), "wellFormed");
     }
@@ -131,19 +133,12 @@ public:
     Wrapper(GObjectEngine& engine, PluginObject& object) : m_engine(engine), m_object(object) {
         wrappers()[serial()] = this;
     }
-    ~Wrapper() override {
-        wrappers().erase(serial());
-        if (m_weak) {
-            g_signal_handlers_disconnect_by_data(m_weak.get(), m_collected.get());
-        }
-    }
+    ~Wrapper() override { wrappers().erase(serial()); }
 
     // The proxy, once.
     void setProxy(const ValueRef& proxy) {
         m_strong = retained(proxy.get());
         m_weak.reset(jsc_weak_value_new(proxy.get()));
-        *m_collected = {m_object.object(), serial()};
-        g_signal_connect(m_weak.get(), "cleared", G_CALLBACK(onCleared), m_collected.get());
     }
 
     bool makeStrong() override {
@@ -161,20 +156,10 @@ public:
     PluginObject& object() const { return m_object; }
 
 private:
-    struct Collected {
-        NPObject* object;
-        uint64_t serial;
-    };
-
-    static void onCleared(JSCWeakValue*, const Collected* collected) {
-        PluginObject::scriptObjectCollected(collected->object, collected->serial);
-    }
-
     GObjectEngine& m_engine;
     PluginObject& m_object;
     ValueRef m_strong; // null while weak
     GObjectRef<JSCWeakValue> m_weak;
-    std::unique_ptr<Collected> m_collected = std::make_unique<Collected>();
 };
 
 // What a native is called for. A copy: the call may end the wrapper.
@@ -497,6 +482,16 @@ bool GObjectEngine::enumerate(ScriptHandle object, std::vector<NPIdentifier>& na
         names.push_back(identifierOfScriptName(utf8Of(name.get())));
     }
     return true;
+}
+
+// Script has let go of a proxy. The `cleared` signal of a weak value comes when the engine's memory is swept,
+// which may be never; this comes after the collection.
+void GObjectEngine::onCollected(GPtrArray* values, gpointer) {
+    const auto wrapper =
+        wrappers().find(static_cast<uint64_t>(jsc_value_to_double(valueAt(values, kNumberIndex))));
+    if (wrapper != wrappers().end()) {
+        PluginObject::scriptObjectCollected(wrapper->second->object().object(), wrapper->first);
+    }
 }
 
 // The natives. Their context is that of the running function; what they return may be of another.

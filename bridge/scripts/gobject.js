@@ -4,8 +4,9 @@
 // The file is run in the registry, a context without a page, and in each page. What it uses of the engine it takes then,
 // because the page may replace everything later.
 ({
-    // What all pages of a process share: the numbers of the proxies. A number is that of the engine's ScriptWrapper.
-    makeRegistry: function () {
+    // What all pages of a process share: the numbers of the proxies. A number is that of the engine's ScriptWrapper;
+    // `collected` is called with it when its proxy is garbage.
+    makeRegistry: function (collected) {
         'use strict';
 
         const { apply } = Reflect;
@@ -15,6 +16,8 @@
         const mapGet = WeakMap.prototype.get;
         const mapSet = WeakMap.prototype.set;
         const numbers = new WeakMap();
+        const garbage = new FinalizationRegistry(collected);
+        const { register } = FinalizationRegistry.prototype;
         const loneSurrogate = /[\uD800-\uDFFF]/u; // by characters, of which a pair is one
         const replacement = '\uFFFD';
 
@@ -32,6 +35,7 @@
             },
             setNumber: function (proxy, number) {
                 apply(mapSet, numbers, [proxy, number]);
+                apply(register, garbage, [proxy, number]);
             },
             // The text with lone surrogates replaced: the API cuts texts off there.
             wellFormed: function (text) {
