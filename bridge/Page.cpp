@@ -140,18 +140,25 @@ void Page::close() {
     m_engine->close();
 }
 
+namespace {
+
+// After how many milliseconds a main loop within a call of the plug-in tries again.
+constexpr unsigned kRetryInterval = 10;
+
+gboolean runOrRetry(gpointer data) {
+    std::unique_ptr<std::function<void()>> function(static_cast<std::function<void()>*>(data));
+    if (CallDepth::isPluginOnStack()) {
+        g_timeout_add(kRetryInterval, runOrRetry, function.release());
+    } else {
+        (*function)();
+    }
+    return G_SOURCE_REMOVE;
+}
+
+} // namespace
+
 void runWithoutPlugin(std::function<void()> function) {
-    g_idle_add_full(
-        G_PRIORITY_DEFAULT,
-        [](gpointer data) -> gboolean {
-            if (CallDepth::isPluginOnStack()) { // in a main loop inside of a call
-                return G_SOURCE_CONTINUE;
-            }
-            (*static_cast<std::function<void()>*>(data))();
-            return G_SOURCE_REMOVE;
-        },
-        new std::function<void()>(std::move(function)),
-        [](gpointer data) { delete static_cast<std::function<void()>*>(data); });
+    g_idle_add_full(G_PRIORITY_DEFAULT, runOrRetry, new std::function<void()>(std::move(function)), nullptr);
 }
 
 } // namespace bridge

@@ -1,0 +1,143 @@
+// A JavaScript context without a browser, with a page of the bridge and the test plug-in in it.
+#include "tests/bridge/ScriptHost.h"
+
+#include <chrono>
+
+#include <glib.h>
+#include <jsc/jsc.h>
+
+#include "bridge/GObjectEngine.h"
+#include "bridge/Identifiers.h"
+#include "bridge/JscApiEngine.h"
+
+extern "C" {
+NPError NP_Initialize(NPNetscapeFuncs* browser, NPPluginFuncs* plugin);
+NPError NP_Shutdown();
+const char* NP_GetMIMEDescription();
+NPError NP_GetValue(void* future, NPPVariable variable, void* value);
+// Of the engine, for its own tests: collects at once, and everything.
+JS_EXPORT void JSSynchronousGarbageCollectForDebugging(JSContextRef context);
+}
+
+namespace {
+
+constexpr auto kPatience = std::chrono::seconds(20);
+
+std::string quoted(const std::string& text) {
+    std::string literal = "`";
+    for (const char character : text) {
+        literal += character == '`' || character == '\\' || character == '$' ? "\\" : "";
+        literal += character;
+    }
+    return literal + '`';
+}
+
+} // namespace
+
+std::string nameOf(const testing::TestParamInfo<EngineKind>& kind) {
+    return kind.param == EngineKind::CApi ? "CApi" : "GObject";
+}
+
+// One of the two is null.
+struct ScriptHost::Context {
+    JSGlobalContextRef cApi = nullptr;
+    JSCContext* gobject = nullptr;
+};
+
+ScriptHost::ScriptHost() : m_context(std::make_unique<Context>()) {
+    std::string error;
+    plugin =
+        bridge::Plugin::initialize({NP_Initialize, NP_Shutdown, NP_GetMIMEDescription, NP_GetValue}, error);
+    if (GetParam() == EngineKind::CApi) {
+        m_context->cApi = JSGlobalContextCreate(nullptr);
+    } else {
+        m_context->gobject = jsc_context_new();
+    }
+    page = bridge::Page::create(
+        *plugin, [this](bridge::ScriptEngine::Client& client) -> std::unique_ptr<bridge::ScriptEngine> {
+            if (m_context->cApi) {
+                return std::make_unique<bridge::JscApiEngine>(m_context->cApi, client);
+            }
+            return std::make_unique<bridge::GObjectEngine>(m_context->gobject, client);
+        });
+}
+
+ScriptHost::~ScriptHost() {
+    if (page) {
+        endPage();
+    }
+    runMainLoop();
+    plugin = nullptr;
+    if (m_context->cApi) {
+        JSGlobalContextRelease(m_context->cApi);
+    } else {
+        g_object_unref(m_context->gobject);
+    }
+}
+
+void ScriptHost::endPage() {
+    page->end();
+    runMainLoop();
+    page = nullptr;
+    runMainLoop();
+}
+
+void ScriptHost::runMainLoop() {
+    while (g_main_context_iteration(nullptr, false)) {
+    }
+}
+
+bool ScriptHost::runUntil(const std::function<bool()>& condition) {
+    const auto end = std::chrono::steady_clock::now() + kPatience;
+    while (!condition()) {
+        if (std::chrono::steady_clock::now() > end) {
+            return false;
+        }
+        g_usleep(1000);
+        runMainLoop();
+    }
+    return true;
+}
+
+std::string ScriptHost::script(const std::string& source) {
+    const std::string program = "(function () { try { return String((0, eval)(" + quoted(source) +
+                                ")); } catch (error) { return 'threw ' + (error.message === undefined ? "
+                                "error : error.message); } }())";
+    bridge::OwnedVariant result;
+    page->engine().evaluate(page->engine().globalObject(), program, "test", &result);
+    return std::string(bridge::textOf(result.get()));
+}
+
+uint32_t ScriptHost::addInstance(const std::string& variable,
+                                 const std::vector<bridge::Instance::Parameter>& parameters) {
+    bridge::OwnedVariant element;
+    page->engine().evaluate(page->engine().globalObject(), "({ isElement: true })", "test", &element);
+    const uint32_t number =
+        page->createInstance(bridge::objectOf(element.get()), "application/x-telix-test", parameters);
+    if (const auto instance = page->instance(number)) {
+        const bridge::OwnedVariant object(bridge::objectVariant(instance->scriptableObject()));
+        const bridge::OwnedVariant window(bridge::objectVariant(page->window()));
+        browser.setproperty(instance->npp(), bridge::objectOf(window.get()),
+                            browser.getstringidentifier(variable.c_str()), &object.get());
+    }
+    return number;
+}
+
+bool ScriptHost::collectUntil(const std::function<bool()>& condition) {
+    // What the stack happens to hold is not collected, so that a part of the objects may need another stack.
+    return runUntil([&] {
+        if (m_context->cApi) {
+            JSSynchronousGarbageCollectForDebugging(m_context->cApi);
+        } else {
+            script("for (var i = 0; i < 50; i++) { new Float64Array(1 << 17); } 0");
+        }
+        runMainLoop();
+        return condition();
+    });
+}
+
+bridge::OwnedVariant ScriptHost::evaluated(const std::string& source) {
+    NPVariant value = bridge::voidVariant();
+    page->engine().evaluate(page->engine().globalObject(), source, "test", &value);
+    return bridge::OwnedVariant(value);
+}
