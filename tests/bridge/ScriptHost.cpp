@@ -129,7 +129,9 @@ bool ScriptHost::collectUntil(const std::function<bool()>& condition) {
         if (m_context->cApi) {
             JSSynchronousGarbageCollectForDebugging(m_context->cApi);
         } else {
-            script("for (var i = 0; i < 50; i++) { new Float64Array(1 << 17); } 0");
+            // The engine collects all generations when what it keeps has grown.
+            script("if (!globalThis.kept || kept.length > 40) { globalThis.kept = []; }"
+                   "kept.push(Array.from({ length: 100000 }, function () { return {}; })); 0");
         }
         runMainLoop();
         return condition();
