@@ -15,7 +15,7 @@ class LowMemory(unittest.TestCase):
             with television.start('--plugin', os.environ['TELIX_PLUGIN'], PAGE,
                                   environment={'LOG_MODULE': '2'}) as process:
                 errors = []
-                while not {'handlers set', 'notice dealt with'} <= {line.split(': ')[-1] for line in errors}:
+                while not {'handlers set', 'callback handled'} <= {line.split(': ')[-1] for line in errors}:
                     line = process.stderr.readline()
                     self.assertNotEqual(line, '', errors)
                     errors.append(line.rstrip('\n'))
