@@ -72,11 +72,16 @@ ValueRef propertyOf(JSCValue* object, const char* name) {
     return ValueRef(jsc_value_object_get_property(object, name));
 }
 
+// Null when the function throws, as one of ours does only where script has used up the stack.
 ValueRef callFunction(JSCValue* function, const std::vector<JSCValue*>& values) {
     ValueRef result(jsc_value_function_callv(function, static_cast<guint>(values.size()),
                                              const_cast<JSCValue**>(values.data())));
-    jsc_context_clear_exception(jsc_value_get_context(function));
-    return result;
+    JSCContext* const context = jsc_value_get_context(function);
+    if (!jsc_context_get_exception(context)) {
+        return result;
+    }
+    jsc_context_clear_exception(context);
+    return nullptr;
 }
 
 } // namespace
@@ -98,7 +103,9 @@ public:
 
     explicit Registry(JSCVirtualMachine* machine) : m_context(jsc_context_new_with_virtual_machine(machine)) {
         const ValueRef script(jsc_context_evaluate(m_context.get(), kGObjectScript, -1));
-        m_functions = callFunction(propertyOf(script.get(), "makeRegistry").get(), {});
+        const ValueRef collected(jsc_value_new_function_variadic(
+            m_context.get(), "collected", G_CALLBACK(onCollected), nullptr, nullptr, G_TYPE_NONE));
+        m_functions = callFunction(propertyOf(script.get(), "makeRegistry").get(), {collected.get()});
         m_numberOf = propertyOf(m_functions.get(), "numberOf");
         m_wellFormed = propertyOf(m_functions.get(), "wellFormed");
     }
@@ -107,10 +114,11 @@ public:
     // The number of a proxy, kNoObject for another object.
     double numberOf(JSCValue* object) const {
         const ValueRef number = callFunction(m_numberOf.get(), {object});
-        return jsc_value_is_number(number.get()) ? jsc_value_to_double(number.get()) : kNoObject;
+        return number && jsc_value_is_number(number.get()) ? jsc_value_to_double(number.get()) : kNoObject;
     }
     std::string wellFormed(JSCValue* string) const {
-        return utf8Of(callFunction(m_wellFormed.get(), {string}).get());
+        const ValueRef text = callFunction(m_wellFormed.get(), {string});
+        return text ? utf8Of(text.get()) : std::string();
     }
 
 private:
@@ -125,19 +133,12 @@ public:
     Wrapper(GObjectEngine& engine, PluginObject& object) : m_engine(engine), m_object(object) {
         wrappers()[serial()] = this;
     }
-    ~Wrapper() override {
-        wrappers().erase(serial());
-        if (m_weak) {
-            g_signal_handlers_disconnect_by_data(m_weak.get(), m_collected.get());
-        }
-    }
+    ~Wrapper() override { wrappers().erase(serial()); }
 
     // The proxy, once.
     void setProxy(const ValueRef& proxy) {
         m_strong = retained(proxy.get());
         m_weak.reset(jsc_weak_value_new(proxy.get()));
-        *m_collected = {m_object.object(), serial()};
-        g_signal_connect(m_weak.get(), "cleared", G_CALLBACK(onCleared), m_collected.get());
     }
 
     bool makeStrong() override {
@@ -155,20 +156,10 @@ public:
     PluginObject& object() const { return m_object; }
 
 private:
-    struct Collected {
-        NPObject* object;
-        uint64_t serial;
-    };
-
-    static void onCleared(JSCWeakValue*, const Collected* collected) {
-        PluginObject::scriptObjectCollected(collected->object, collected->serial);
-    }
-
     GObjectEngine& m_engine;
     PluginObject& m_object;
     ValueRef m_strong; // null while weak
     GObjectRef<JSCWeakValue> m_weak;
-    std::unique_ptr<Collected> m_collected = std::make_unique<Collected>();
 };
 
 // What a native is called for. A copy: the call may end the wrapper.
@@ -365,7 +356,7 @@ std::unordered_map<uint64_t, GObjectEngine::Wrapper*>& GObjectEngine::wrappers()
 
 // The operations of the plug-in on script objects.
 
-// Null when closed, or when script has closed the page meanwhile.
+// Null when it throws, when closed, and when script has closed the page meanwhile.
 ValueRef GObjectEngine::call(const ValueRef& function, const std::vector<JSCValue*>& values) {
     if (!m_context) {
         return nullptr;
@@ -491,6 +482,16 @@ bool GObjectEngine::enumerate(ScriptHandle object, std::vector<NPIdentifier>& na
         names.push_back(identifierOfScriptName(utf8Of(name.get())));
     }
     return true;
+}
+
+// Script has let go of a proxy. The `cleared` signal of a weak value comes when the engine's memory is swept,
+// which may be never; this comes after the collection.
+void GObjectEngine::onCollected(GPtrArray* values, gpointer) {
+    const auto wrapper =
+        wrappers().find(static_cast<uint64_t>(jsc_value_to_double(valueAt(values, kNumberIndex))));
+    if (wrapper != wrappers().end()) {
+        PluginObject::scriptObjectCollected(wrapper->second->object().object(), wrapper->first);
+    }
 }
 
 // The natives. Their context is that of the running function; what they return may be of another.

@@ -74,6 +74,7 @@ private:
     };
 
     // The natives, which the traps call.
+    static void onCollected(GPtrArray* values, gpointer);
     static Target targetOf(GPtrArray* values);
     static JSCValue* onRead(GPtrArray* values, gpointer);
     static JSCValue* onWrite(GPtrArray* values, gpointer);

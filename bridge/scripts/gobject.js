@@ -4,8 +4,9 @@
 // The file is run in the registry, a context without a page, and in each page. What it uses of the engine it takes then,
 // because the page may replace everything later.
 ({
-    // What all pages of a process share: the numbers of the proxies. A number is that of the engine's ScriptWrapper.
-    makeRegistry: function () {
+    // What all pages of a process share: the numbers of the proxies. A number is that of the engine's ScriptWrapper;
+    // `collected` is called with it when its proxy is garbage.
+    makeRegistry: function (collected) {
         'use strict';
 
         const { apply } = Reflect;
@@ -15,6 +16,8 @@
         const mapGet = WeakMap.prototype.get;
         const mapSet = WeakMap.prototype.set;
         const numbers = new WeakMap();
+        const garbage = new FinalizationRegistry(collected);
+        const { register } = FinalizationRegistry.prototype;
         const loneSurrogate = /[\uD800-\uDFFF]/u; // by characters, of which a pair is one
         const replacement = '\uFFFD';
 
@@ -32,6 +35,7 @@
             },
             setNumber: function (proxy, number) {
                 apply(mapSet, numbers, [proxy, number]);
+                apply(register, garbage, [proxy, number]);
             },
             // The text with lone surrogates replaced: the API cuts texts off there.
             wellFormed: function (text) {
@@ -58,7 +62,7 @@
         'use strict';
 
         const { apply, construct, defineProperty, deleteProperty, get, getOwnPropertyDescriptor, getPrototypeOf, has,
-            ownKeys, set } = Reflect;
+            ownKeys, set, setPrototypeOf } = Reflect;
         const { create } = Object;
         const { bind } = Function.prototype;
         const { toStringTag } = Symbol;
@@ -77,6 +81,17 @@
                 list[list.length] = rest[i];
             }
             return list;
+        }
+
+        // A property's description without what the page may have added to Object.prototype: `get` would be taken from there.
+        function bare(description) {
+            if (description !== undefined) {
+                setPrototypeOf(description, null);
+            }
+            return description;
+        }
+        function ownDescriptor(object, name) {
+            return bare(getOwnPropertyDescriptor(object, name));
         }
 
         // Only what is not the plug-in's reaches the target, which holds the names of the page.
@@ -110,11 +125,12 @@
                         return { __proto__: null, value, writable: true, enumerable: true, configurable: true };
                     }
                 }
-                return getOwnPropertyDescriptor(target, name);
+                return ownDescriptor(target, name);
             },
             defineProperty: function (target, name, property) {
-                return typeof name === 'string' && getOwnPropertyDescriptor(property, 'value') !== undefined &&
-                    write(this.number, wellFormed(name), property.value) || defineProperty(target, name, property);
+                const value = typeof name === 'string' ? ownDescriptor(property, 'value') : undefined;
+                return value !== undefined && write(this.number, wellFormed(name), value.value) ||
+                    defineProperty(target, name, bare(property));
             },
             ownKeys: function (target) {
                 const known = create(null);

@@ -146,6 +146,11 @@ struct Call {
     NPP npp() const { return self(object).npp; }
 };
 
+// How many arguments follow the first ones.
+uint32_t rest(const Call& call, uint32_t first) {
+    return call.count > first ? call.count - first : 0;
+}
+
 using Method = bool (*)(const Call& call, NPVariant& result);
 
 // A call on the page's main thread later, of a function that script has given.
@@ -203,7 +208,7 @@ const MethodRow kMethods[] = {
      }},
     {"last",
      [](const Call& call, NPVariant& result) {
-         result = copy(call.args[call.count - 1]);
+         result = copy(call.args[call.count > 0 ? call.count - 1 : 0]);
          return true;
      }},
     {"sub",
@@ -238,16 +243,16 @@ const MethodRow kMethods[] = {
     {"call",
      [](const Call& call, NPVariant& result) {
          return objectOf(call.args[0]) && s_browser->invokeDefault(call.npp(), objectOf(call.args[0]),
-                                                                   call.args + 1, call.count - 1, &result);
+                                                                   call.args + 1, rest(call, 1), &result);
      }},
     {"callMethod",
      [](const Call& call, NPVariant& result) {
          return s_browser->invoke(call.npp(), objectOf(call.args[0]), id(textOf(call.args[1])), call.args + 2,
-                                  call.count - 2, &result);
+                                  rest(call, 2), &result);
      }},
     {"construct",
      [](const Call& call, NPVariant& result) {
-         return s_browser->construct(call.npp(), objectOf(call.args[0]), call.args + 1, call.count - 1,
+         return s_browser->construct(call.npp(), objectOf(call.args[0]), call.args + 1, rest(call, 1),
                                      &result);
      }},
     // Whether it was done, as the plug-in sees it.
@@ -255,7 +260,7 @@ const MethodRow kMethods[] = {
      [](const Call& call, NPVariant& result) {
          NPVariant value = {};
          const bool isDone = s_browser->invokeDefault(call.npp(), objectOf(call.args[0]), call.args + 1,
-                                                      call.count - 1, &value);
+                                                      rest(call, 1), &value);
          result = text(std::string(isDone ? "done " : "failed ") + kindOf(value));
          s_browser->releasevariantvalue(&value);
          return true;
