@@ -133,12 +133,28 @@ public:
     Wrapper(GObjectEngine& engine, PluginObject& object) : m_engine(engine), m_object(object) {
         wrappers()[serial()] = this;
     }
-    ~Wrapper() override { wrappers().erase(serial()); }
+    ~Wrapper() override {
+        wrappers().erase(serial());
+        if (m_weak) {
+            g_signal_handlers_disconnect_by_data(m_weak.get(), this);
+        }
+    }
 
     // The proxy, once.
     void setProxy(const ValueRef& proxy) {
         m_strong = retained(proxy.get());
         m_weak.reset(jsc_weak_value_new(proxy.get()));
+        g_signal_connect(m_weak.get(), "cleared",
+                         G_CALLBACK(+[](JSCWeakValue*, Wrapper* self) { self->reportCollected(); }), this);
+    }
+
+    // The proxy is garbage. The signal of the weak value comes when the engine sweeps its memory, which may
+    // be never; the report of the registry's script comes soon after the collection, but only where the
+    // engine has a main loop for it.
+    void reportCollected() {
+        if (!std::exchange(m_isReported, true)) {
+            PluginObject::scriptObjectCollected(m_object.object(), serial());
+        }
     }
 
     bool makeStrong() override {
@@ -160,6 +176,7 @@ private:
     PluginObject& m_object;
     ValueRef m_strong; // null while weak
     GObjectRef<JSCWeakValue> m_weak;
+    bool m_isReported = false;
 };
 
 // What a native is called for. A copy: the call may end the wrapper.
@@ -484,13 +501,12 @@ bool GObjectEngine::enumerate(ScriptHandle object, std::vector<NPIdentifier>& na
     return true;
 }
 
-// Script has let go of a proxy. The `cleared` signal of a weak value comes when the engine's memory is swept,
-// which may be never; this comes after the collection.
+// The registry's report that a proxy is garbage.
 void GObjectEngine::onCollected(GPtrArray* values, gpointer) {
     const auto wrapper =
         wrappers().find(static_cast<uint64_t>(jsc_value_to_double(valueAt(values, kNumberIndex))));
     if (wrapper != wrappers().end()) {
-        PluginObject::scriptObjectCollected(wrapper->second->object().object(), wrapper->first);
+        wrapper->second->reportCollected();
     }
 }
 

@@ -21,6 +21,10 @@ std::unordered_map<NPP, Instance*>& instances() {
     return *all;
 }
 
+// Milliseconds between two runs of a timer, at least; as with timers of script, the page is to get on beside
+// it.
+constexpr uint32_t kShortestInterval = 4;
+
 uint16_t edge(int coordinate) {
     return static_cast<uint16_t>(std::clamp(coordinate, 0, static_cast<int>(UINT16_MAX)));
 }
@@ -148,7 +152,8 @@ uint32_t Instance::scheduleTimer(uint32_t milliseconds, bool repeats, void (*fun
         return 0;
     }
     auto* const timer = new Timer{weak_from_this(), function, 0, repeats};
-    timer->id = g_timeout_add_full(G_PRIORITY_DEFAULT, milliseconds, onTimer, timer,
+    const uint32_t interval = repeats ? std::max(milliseconds, kShortestInterval) : milliseconds;
+    timer->id = g_timeout_add_full(G_PRIORITY_DEFAULT, interval, onTimer, timer,
                                    [](gpointer data) { delete static_cast<Timer*>(data); });
     m_timers.insert(timer->id);
     return timer->id;

@@ -69,7 +69,8 @@ public:
     // What NPN_SetValue accepts: the plug-in paints nothing of its own here, in a window or without.
     NPError setValue(NPPVariable variable);
 
-    // The timers of NPN_ScheduleTimer; 0 when there is none. They end with the instance.
+    // The timers of NPN_ScheduleTimer; 0 when there is none. They end with the instance. A repeating one has
+    // a shortest interval.
     uint32_t scheduleTimer(uint32_t milliseconds, bool repeats, void (*function)(NPP, uint32_t));
     void unscheduleTimer(uint32_t timer);
 

@@ -60,9 +60,9 @@ public:
     bool call(NPIdentifier method, const Arguments& arguments, NPVariant* result);
     bool callDefault(const Arguments& arguments, NPVariant* result);
     bool construct(const Arguments& arguments, NPVariant* result);
-    // Whether script may call the object itself and use it with `new`: it has no names, so that it is nothing but a
-    // function. An object with names is no function to `typeof`, although its class may have the entries for both, as
-    // all classes of some plug-ins do.
+    // Whether script may call the object itself and use it with `new`: it has no names, so that it is nothing
+    // but a function. An object with names is no function to `typeof`, although its class may have the
+    // entries for both, as all classes of some plug-ins do.
     bool isFunction() const;
     // The text of the last failure.
     static std::string takeError();

@@ -106,6 +106,8 @@
     const mapSet = uncurry(WeakMap.prototype.set);
     const mapDelete = uncurry(WeakMap.prototype.delete);
     const { round, max, min } = Math;
+    const objectPrototype = HTMLObjectElement.prototype;
+    const embedPrototype = HTMLEmbedElement.prototype;
     const toStringTag = Symbol.toStringTag;
 
     const elementNode = 1;
@@ -406,6 +408,10 @@
             return;
         }
         const base = getPrototypeOf(element);
+        // Only before a class as it is: the engine finds no cycle of prototypes behind a proxy.
+        if (base !== objectPrototype && base !== embedPrototype) {
+            return;
+        }
         const proxy = new Proxy(create(base), {
             __proto__: null,
             get: function (target, name, receiver) {
@@ -480,8 +486,8 @@
         }
     }
 
-    guardClass(HTMLObjectElement.prototype);
-    guardClass(HTMLEmbedElement.prototype);
+    guardClass(objectPrototype);
+    guardClass(embedPrototype);
 
     // --- Place in the window
 
