@@ -20,8 +20,8 @@
 
 namespace desktop {
 
-// Name of the user message from the web process to its web view with the descriptors of a ring: the memory,
-// then the eventfd. Without parameters.
+// Name of the user message from the web process to the web context with the descriptors of a ring: the
+// memory, then the eventfd. Without parameters.
 constexpr char kFramesMessage[] = "telix-frames";
 
 constexpr uint32_t kSlotCount = 3;

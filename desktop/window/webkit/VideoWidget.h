@@ -24,10 +24,13 @@ public:
     // The widget, for the parent's container. It may outlive this object and is black then.
     GtkWidget* widget() const;
 
-    // Shows the frames of this view's web process from now on; they arrive when the extension
-    // libtelix-tv-extension.so is in the process. Answers only its own messages of "user-message-received".
-    // The last frame of a web process that ends is dropped at once. Does not keep the view.
-    void showFramesOf(WebKitWebView* view);
+    // Shows the frames of this context's web process from now on; they arrive when the extension
+    // libtelix-tv-extension.so is in the process. Answers only its own message of "user-message-received". A
+    // new web process replaces the previous one. Keeps the context.
+    void showFramesOf(WebKitWebContext* context);
+
+    // Shows black until a web process sends frames again: for one that has ended, which cannot say so.
+    void dropFrames();
 
     // Whether a frame is shown.
     bool hasFrame() const;
