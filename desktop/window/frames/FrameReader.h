@@ -34,9 +34,12 @@ public:
     const telix_desktop_frame& frame() const { return m_frame; }
 
 private:
+    void show(const FrameDescription& description);
+
     std::shared_ptr<FrameRingMemory> m_memory;
+    int m_wakeupDescriptor = -1;
     int m_pollDescriptor = -1;
-    uint32_t m_own = 2; // the description that is the reader's
+    uint32_t m_own = FrameRingHeader::kFirstOfReader; // the description that is the reader's
     telix_desktop_frame m_frame{};
 };
 

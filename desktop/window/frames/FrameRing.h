@@ -25,8 +25,9 @@ namespace desktop {
 constexpr char kFramesMessage[] = "telix-frames";
 
 constexpr uint32_t kSlotCount = 3;
+constexpr uint32_t kBytesPerPixel = 4;
 constexpr uint32_t kMaximumFrameSide = 8192; // pixels
-constexpr size_t kMaximumSlotSize = size_t{4} * 4096 * 4096;
+constexpr size_t kMaximumSlotSize = size_t{kBytesPerPixel} * 4096 * 4096;
 
 // What telix_desktop_frame says, without pointers.
 struct FrameDescription {
@@ -48,6 +49,10 @@ struct FrameDescription {
 struct FrameRingHeader {
     static constexpr uint32_t kMagic = 0x74784652;
     static constexpr uint32_t kNew = 0x80; // in `newest`: not yet taken by the reader
+    // Who owns which description of an empty ring.
+    static constexpr uint32_t kFirstOfWriter = 0;
+    static constexpr uint32_t kFirstNewest = 1;
+    static constexpr uint32_t kFirstOfReader = 2;
 
     uint32_t magic;
     std::atomic<uint32_t> newest; // number of the description that nobody owns

@@ -34,13 +34,12 @@ public:
     int wakeupDescriptor() const { return m_wakeupDescriptor; }
 
 private:
-    uint32_t freeSlot() const;
-    void copyPixels(const telix_desktop_frame& frame, uint32_t slot);
+    void copyPixels(const telix_desktop_frame& frame);
 
     std::shared_ptr<FrameRingMemory> m_memory;
     int m_memoryDescriptor = -1;
     int m_wakeupDescriptor;
-    uint32_t m_own = 0;                       // the description that is the writer's
+    uint32_t m_own = FrameRingHeader::kFirstOfWriter; // the description that is the writer's
     uint32_t m_slots[kSlotCount] = {0, 1, 2}; // of each description; the shared ones are not read back
     bool m_hasPixels = false;
     uint32_t m_pixelSlot = 0; // of the last pixels

@@ -6,6 +6,10 @@
 
 namespace desktop {
 
+// The page's size in pixels, whatever the size of the window.
+constexpr int kPageWidth = 1280;
+constexpr int kPageHeight = 720;
+
 struct PixelRect {
     int x = 0;
     int y = 0;
