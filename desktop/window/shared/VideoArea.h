@@ -3,25 +3,9 @@
 #define TELIX_DESKTOP_WINDOW_SHARED_VIDEOAREA_H
 
 #include "desktop/platform/telix_picture.h"
+#include "desktop/window/shared/PageGeometry.h"
 
 namespace desktop {
-
-// The page's size in pixels, whatever the size of the window.
-constexpr int kPageWidth = 1280;
-constexpr int kPageHeight = 720;
-
-struct PixelRect {
-    int x = 0;
-    int y = 0;
-    int width = 0;
-    int height = 0;
-
-    bool isEmpty() const { return width <= 0 || height <= 0; }
-    bool operator==(const PixelRect& other) const {
-        return x == other.x && y == other.y && width == other.width && height == other.height;
-    }
-    bool operator!=(const PixelRect& other) const { return !(*this == other); }
-};
 
 // The pixels that the frame takes in a widget of that size, which shows the whole page of 1280 by 720: in the
 // page's area for it or the whole page, centred, as large as its aspect ratio allows. May reach beyond the

@@ -8,8 +8,8 @@
 #include <mutex>
 #include <thread>
 
-#include "desktop/browser/FrameSource.h"
 #include "desktop/window/frames/FrameWriter.h"
+#include "desktop/window/shared/FrameSource.h"
 
 namespace desktop {
 
