@@ -87,6 +87,7 @@
     const innerWidth = getter(theWindow, 'innerWidth');
     const innerHeight = getter(theWindow, 'innerHeight');
     const addEventListener = uncurry(EventTarget.prototype.addEventListener);
+    const removeEventListener = uncurry(EventTarget.prototype.removeEventListener);
     const isPersisted = getter(PageTransitionEvent.prototype, 'persisted');
     const setTimer = setTimeout.bind(theWindow);
     const requestFrame = requestAnimationFrame.bind(theWindow);
@@ -205,7 +206,7 @@
         for (let i = 0; i < parameters.length; i++) {
             values[values.length] = parameters[i];
         }
-        adoptStyle();
+        applyStyle();
         record.number = apply(hostCreate, undefined, values);
         if (record.number === 0) {
             return false;
@@ -365,7 +366,7 @@
             try {
                 observe(observer, root, observed);
             } catch (error) {
-                // Array iterators, as in adoptStyle(): instances here come with the first access, and go.
+                // Array iterators, as in adoptStyleSheet(): instances here come with the first access, and go.
             }
             return root;
         }
@@ -493,7 +494,6 @@
 
     // Fallback content is not shown, and an element without a size has the default one of plug-ins. Everything that the
     // page says of its elements comes before a layer.
-    let style = null;
     function styleText() {
         let selectors = '';
         for (let i = 0; i < typeList.length; i++) {
@@ -506,32 +506,61 @@
         return '@layer telix-webkit-bridge{' +
             rule('', 'display:inline-block;content-visibility:hidden') +
             rule(':where(:not([width]))', 'width:300px') +
-            rule(':where(:not([height]))', 'height:150px') + '}';
+            rule(':where(:not([height]))', 'height:150px') +
+            '@supports not (content-visibility:hidden){' +
+            rule('', 'overflow:hidden;color:transparent!important') +
+            rule('>:where(*)', 'display:none!important') + '}}';
     }
+
+    // Gives the document a style sheet of script's own. False when the engine has none.
     const styleSheets = getOwnPropertyDescriptor(Document.prototype, 'adoptedStyleSheets');
     const StyleSheet = theWindow.CSSStyleSheet;
     const replaceSync = StyleSheet.prototype.replaceSync;
-    function adoptStyle() {
+    let styleSheet = null;
+    function adoptStyleSheet() {
         if (!styleSheets || !replaceSync) {
-            return;
+            return false;
         }
         const sheets = apply(styleSheets.get, theDocument, []);
         const list = [];
         for (let i = 0; i < sheets.length; i++) {
-            if (sheets[i] === style) {
-                return;
+            if (sheets[i] === styleSheet) {
+                return true;
             }
             list[list.length] = sheets[i];
         }
-        if (!style) {
-            style = new StyleSheet();
-            apply(replaceSync, style, [styleText()]);
+        if (!styleSheet) {
+            styleSheet = new StyleSheet();
+            apply(replaceSync, styleSheet, [styleText()]);
         }
-        list[list.length] = style;
+        list[list.length] = styleSheet;
         try {
             apply(styleSheets.set, theDocument, [list]);
         } catch (error) {
             // The engine reads the list with what the page has made of array iterators; elements go without the style.
+        }
+        return true;
+    }
+
+    const createElement = uncurry(Document.prototype.createElementNS);
+    const appendChild = uncurry(Node.prototype.appendChild);
+    const setTextContent = getOwnPropertyDescriptor(Node.prototype, 'textContent').set;
+    let styleElement = null;
+    function addStyleElement() {
+        const parent = documentElement(theDocument);
+        if (!parent || (styleElement && isHere(styleElement))) {
+            return;
+        }
+        if (!styleElement) {
+            styleElement = createElement(theDocument, xhtml, 'style');
+            apply(setTextContent, styleElement, [styleText()]);
+        }
+        appendChild(parent, styleElement);
+    }
+
+    function applyStyle() {
+        if (!adoptStyleSheet()) {
+            addStyleElement();
         }
     }
 
@@ -595,7 +624,7 @@
             isWatchingPlaces = true;
             requestFrame(function () {
                 isWatchingPlaces = false;
-                adoptStyle();
+                applyStyle();
                 const current = records;
                 for (let i = 0; i < current.length; i++) {
                     if (isHere(current[i].element)) {
@@ -623,11 +652,16 @@
         hostEnd();
     }
 
+    function listenToUnload() {
+        removeEventListener(theWindow, 'unload', onUnload);
+        addEventListener(theWindow, 'unload', onUnload);
+    }
+
     function onPageHide(event) {
         if (isPersisted(event)) {
             leave();
         } else {
-            addEventListener(theWindow, 'unload', onUnload);
+            listenToUnload();
         }
     }
 
@@ -642,6 +676,8 @@
     function listen() {
         addEventListener(theWindow, 'pagehide', onPageHide, true);
         addEventListener(theWindow, 'pageshow', onPageShow, true);
+        // WPE WebKit 2.38 hides a frame that is removed without pagehide if file URLs may read everything.
+        addEventListener(theDocument, 'visibilitychange', listenToUnload, true);
         addEventListener(theDocument, 'readystatechange', settle, true);
     }
     listen();
