@@ -121,6 +121,8 @@ int runBrowser(const CommandLine& commandLine) {
 
 int main(int argc, char* argv[]) {
     std::setlocale(LC_ALL, "");
+    // The settings of the desktop are not the television's, and their service leaves a folder.
+    g_setenv("GSETTINGS_BACKEND", "memory", TRUE);
     g_set_prgname("telix-tv");
     desktop::CommandLine commandLine;
     // --help and usage errors need no display.
