@@ -15,17 +15,8 @@ const QSize kPageSize(kPageWidth, kPageHeight);
 
 // The rectangle of the page in a window of that size: centred, as large as its aspect ratio allows.
 inline QRect pageRectIn(const QSize& window) {
-    const PageRect area = pageRectIn(window.width(), window.height());
+    const PixelRect area = pageRectIn(window.width(), window.height());
     return {area.x, area.y, area.width, area.height};
-}
-
-// A rectangle of the page in coordinates of a widget of size `view`, rounded to pixels.
-inline QRect toView(const QRectF& area, const QSize& view) {
-    const qreal x = qreal(view.width()) / kPageSize.width();
-    const qreal y = qreal(view.height()) / kPageSize.height();
-    const QPoint first(qRound(area.left() * x), qRound(area.top() * y));
-    const QPoint end(qRound(area.right() * x), qRound(area.bottom() * y));
-    return {first, QSize(end.x() - first.x(), end.y() - first.y())};
 }
 
 // The pixels of a widget of size `view` that show any part of a rectangle of the page, and one more on each

@@ -7,7 +7,7 @@
 #include <QImage>
 #include <QPainter>
 
-#include "desktop/window/npapi/PageGeometry.h"
+#include "desktop/window/shared/VideoArea.h"
 
 namespace desktop {
 
@@ -16,16 +16,6 @@ namespace {
 QEvent::Type wakeupEvent() {
     static const auto kType = static_cast<QEvent::Type>(QEvent::registerEventType());
     return kType;
-}
-
-// The rectangle of the frame in `area`: centred, as large as its aspect ratio allows.
-QRectF letterboxed(const QRectF& area, const telix_desktop_frame& frame) {
-    const bool hasAspect = frame.aspectWidth > 0 && frame.aspectHeight > 0;
-    const QSizeF aspect(hasAspect ? frame.aspectWidth : frame.width,
-                        hasAspect ? frame.aspectHeight : frame.height);
-    QRectF result(QPointF(), aspect.scaled(area.size(), Qt::KeepAspectRatio));
-    result.moveCenter(area.center());
-    return result;
 }
 
 } // namespace
@@ -73,14 +63,8 @@ void VideoPlane::showNewestFrame() {
 
 // Where the frame is painted; empty if nothing is shown.
 QRect VideoPlane::target() const {
-    const telix_desktop_frame& frame = m_source.frame();
-    const QRectF page(QPointF(), kPageSize);
-    const QRectF area =
-        frame.fullScreen ? page : QRectF(frame.areaX, frame.areaY, frame.areaWidth, frame.areaHeight);
-    if (!hasFrame() || frame.width == 0 || frame.height == 0 || area.isEmpty()) {
-        return {};
-    }
-    return toView(letterboxed(area, frame), size());
+    const PixelRect area = videoArea(m_source.frame(), width(), height());
+    return {area.x, area.y, area.width, area.height};
 }
 
 void VideoPlane::paintEvent(QPaintEvent*) {

@@ -88,4 +88,10 @@ void FrameSource::refresh() {
     m_acquire(&m_frame);
 }
 
+void FrameSource::drop() {
+    if (m_setWakeup) {
+        m_release(&m_frame);
+    }
+}
+
 } // namespace desktop

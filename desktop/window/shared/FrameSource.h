@@ -6,7 +6,7 @@
 
 namespace desktop {
 
-// All functions are for the window's thread.
+// All functions are for one thread.
 class FrameSource {
 public:
     // `wakeup` is called with `data` on any thread when a frame or its placement is new, see telix_picture.h.
@@ -23,7 +23,9 @@ public:
 
     // Replaces the current frame by the newest one.
     void refresh();
-    // The frame of the last refresh(), valid until the next one. Not visible if there is no library.
+    // Releases the current frame, whose buffer is free for the decoder again.
+    void drop();
+    // The frame of the last refresh(), valid until the next one or drop(). Not visible if there is no library.
     const telix_desktop_frame& frame() const { return m_frame; }
 
 private:

@@ -10,15 +10,21 @@ namespace desktop {
 constexpr int kPageWidth = 1280;
 constexpr int kPageHeight = 720;
 
-struct PageRect {
-    int x;
-    int y;
-    int width;
-    int height;
+struct PixelRect {
+    int x = 0;
+    int y = 0;
+    int width = 0;
+    int height = 0;
+
+    bool isEmpty() const { return width <= 0 || height <= 0; }
+    bool operator==(const PixelRect& other) const {
+        return x == other.x && y == other.y && width == other.width && height == other.height;
+    }
+    bool operator!=(const PixelRect& other) const { return !(*this == other); }
 };
 
 // The rectangle of the page in a window of that size: centred, as large as its aspect ratio allows.
-inline PageRect pageRectIn(int windowWidth, int windowHeight) {
+inline PixelRect pageRectIn(int windowWidth, int windowHeight) {
     const bool isWide = int64_t{windowWidth} * kPageHeight > int64_t{windowHeight} * kPageWidth;
     const int fullWidth = static_cast<int>(int64_t{windowHeight} * kPageWidth / kPageHeight);
     const int fullHeight = static_cast<int>(int64_t{windowWidth} * kPageHeight / kPageWidth);

@@ -29,6 +29,7 @@ public:
 
     // Returns a new view with a floating reference. `related`: a view whose web process the new one shares,
     // or null. One process for all applications of a window: the platform library is in it.
+    WebKitWebContext* context() const { return m_context; }
     WebKitWebView* newView(WebKitWebView* related) const;
 
 private:

@@ -61,7 +61,7 @@ void checkLoad(const std::string& url, const std::string& userAgent, GCancellabl
 
 TvWindow::TvWindow(const Engine& engine, PageChannel& channel, const CommandLine& commandLine)
     : m_engine(engine), m_channel(channel), m_userAgent(commandLine.userAgent),
-      m_window(gtk_window_new(GTK_WINDOW_TOPLEVEL)), m_overlay(gtk_overlay_new()), m_video(newBlackArea()),
+      m_window(gtk_window_new(GTK_WINDOW_TOPLEVEL)), m_overlay(gtk_overlay_new()),
       m_calls(g_cancellable_new()) {
     m_channel.setHandler(
         [this](uint64_t page, const std::string& function, const std::string& argument,
@@ -69,7 +69,8 @@ TvWindow::TvWindow(const Engine& engine, PageChannel& channel, const CommandLine
     gtk_window_set_title(GTK_WINDOW(m_window), kTitle);
     gtk_container_add(GTK_CONTAINER(m_window), m_overlay);
     gtk_container_add(GTK_CONTAINER(m_overlay), newBlackArea());
-    gtk_overlay_add_overlay(GTK_OVERLAY(m_overlay), m_video);
+    m_video.showFramesOf(engine.context());
+    gtk_overlay_add_overlay(GTK_OVERLAY(m_overlay), m_video.widget());
     g_signal_connect(
         m_overlay, "get-child-position",
         G_CALLBACK(+[](GtkOverlay*, GtkWidget*, GdkRectangle* area, gpointer window) -> gboolean {
@@ -124,7 +125,7 @@ void TvWindow::show(const CommandLine& commandLine) {
 
 // Sets `area` to the place of the page in the window.
 void TvWindow::place(GtkAllocation& area) const {
-    const PageRect page =
+    const PixelRect page =
         pageRectIn(gtk_widget_get_allocated_width(m_overlay), gtk_widget_get_allocated_height(m_overlay));
     area = {page.x, page.y, page.width, page.height};
 }
@@ -202,6 +203,7 @@ void TvWindow::onLoadFailed(Application& application, const std::string& url, co
 }
 
 void TvWindow::onCrashed(Application& application, WebKitWebProcessTerminationReason reason) {
+    m_video.dropFrames();
     // Each application reports it.
     if (m_stack.top() == &application && m_reports.crashed) {
         m_reports.crashed(reason);
@@ -289,7 +291,7 @@ void TvWindow::evaluate(const std::string& expression, std::function<void(Evalua
 }
 
 bool TvWindow::hasPicture() const {
-    return false;
+    return m_video.hasFrame();
 }
 
 // The page's part comes from the page itself, because what has been drawn in the window may be older than
@@ -313,8 +315,9 @@ bool TvWindow::paintScreenshot(const std::string& file, cairo_surface_t* page) c
     const int height = gtk_widget_get_allocated_height(m_overlay);
     cairo_surface_t* image = cairo_image_surface_create(CAIRO_FORMAT_RGB24, width, height);
     cairo_t* context = cairo_create(image);
-    const PageRect area = pageRectIn(width, height);
+    const PixelRect area = pageRectIn(width, height);
     cairo_translate(context, area.x, area.y);
+    m_video.paint(context, area.width, area.height);
     if (page) {
         cairo_scale(context, static_cast<double>(area.width) / kPageWidth,
                     static_cast<double>(area.height) / kPageHeight);

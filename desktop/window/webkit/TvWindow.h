@@ -13,6 +13,7 @@
 #include "desktop/window/shared/ScriptedWindow.h"
 #include "desktop/window/webkit/Application.h"
 #include "desktop/window/webkit/PageChannel.h"
+#include "desktop/window/webkit/VideoWidget.h"
 
 namespace desktop {
 
@@ -76,7 +77,7 @@ private:
     Reports m_reports;
     GtkWidget* m_window;
     GtkWidget* m_overlay;
-    GtkWidget* m_video;
+    VideoWidget m_video;
     // All applications, also those that are ending.
     std::vector<std::unique_ptr<Application>> m_applications;
     ApplicationStack<Application> m_stack;

@@ -3,6 +3,7 @@
 #include <unistd.h>
 #include <webkit2/webkit-web-extension.h>
 
+#include "desktop/window/webkit/extension/FrameSender.h"
 #include "desktop/window/webkit/extension/PageFunctions.h"
 
 namespace desktop {
@@ -30,9 +31,10 @@ void redirect(int descriptor, int inherited) {
 } // namespace desktop
 
 extern "C" __attribute__((visibility("default"))) void
-webkit_web_extension_initialize_with_user_data(WebKitWebExtension*, const GVariant* userData) {
+webkit_web_extension_initialize_with_user_data(WebKitWebExtension* extension, const GVariant* userData) {
     auto* const data = const_cast<GVariant*>(userData);
     desktop::redirect(STDOUT_FILENO, desktop::descriptorFrom(data, "output"));
     desktop::redirect(STDERR_FILENO, desktop::descriptorFrom(data, "errors"));
     desktop::addPageFunctions(desktop::descriptorFrom(data, "channel"));
+    desktop::sendFrames(extension);
 }
