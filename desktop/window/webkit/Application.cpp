@@ -13,6 +13,7 @@ namespace desktop {
 
 namespace {
 
+constexpr char kHbbtvType[] = "application/vnd.hbbtv.xhtml+xml";
 constexpr char kEmptyPage[] = "about:blank";
 // A plug-in ends some of its objects on later turns of the web process's main loop.
 constexpr int kTurnsOfTeardown = 10;
@@ -76,6 +77,19 @@ ScriptedWindow::Evaluation evaluationOf(JSCValue* value, const GError* error) {
     return evaluation;
 }
 
+// Takes a response with an HbbTV document, whose content type the engine does not know, as a document of XML,
+// to which scripts/hbbtvdocument.js adds what XHTML has. Returns whether it is one.
+bool useHbbtvDocument(WebKitPolicyDecision& decision) {
+    WebKitURIResponse* response =
+        webkit_response_policy_decision_get_response(WEBKIT_RESPONSE_POLICY_DECISION(&decision));
+    const char* type = webkit_uri_response_get_mime_type(response);
+    if (!type || g_ascii_strcasecmp(type, kHbbtvType) != 0) {
+        return false;
+    }
+    webkit_policy_decision_use(&decision);
+    return true;
+}
+
 GdkDevice* keyboard() {
     return gdk_seat_get_keyboard(gdk_display_get_default_seat(gdk_display_get_default()));
 }
@@ -127,6 +141,12 @@ void Application::connectSignals() {
             self->m_listener.onCrashed(*self, reason);
         }),
         this);
+    g_signal_connect(m_view, "decide-policy",
+                     G_CALLBACK(+[](WebKitWebView*, WebKitPolicyDecision* decision,
+                                    WebKitPolicyDecisionType type) -> gboolean {
+                         return type == WEBKIT_POLICY_DECISION_TYPE_RESPONSE && useHbbtvDocument(*decision);
+                     }),
+                     nullptr);
     // A television has no menus.
     g_signal_connect(
         m_view, "context-menu",

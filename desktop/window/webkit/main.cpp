@@ -11,6 +11,7 @@
 #include "desktop/window/shared/Diagnostics.h"
 #include "desktop/window/shared/LoadCheck.h"
 #include "desktop/window/shared/PluginFile.h"
+#include "desktop/window/webkit/ChildProcesses.h"
 #include "desktop/window/webkit/Engine.h"
 #include "desktop/window/webkit/PageChannel.h"
 #include "desktop/window/webkit/Profile.h"
@@ -106,6 +107,7 @@ int runBrowser(const CommandLine& commandLine) {
     }
     std::optional<std::string> evaluated;
     const int exitStatus = runWindow(commandLine, plugin, profile, evaluated);
+    endChildProcesses();
     // The last line of the output, after what the plug-in logs in its teardown.
     if (evaluated) {
         std::puts(evaluated->c_str());
@@ -119,6 +121,8 @@ int runBrowser(const CommandLine& commandLine) {
 
 int main(int argc, char* argv[]) {
     std::setlocale(LC_ALL, "");
+    // The settings of the desktop are not the television's, and their service leaves a folder.
+    g_setenv("GSETTINGS_BACKEND", "memory", TRUE);
     g_set_prgname("telix-tv");
     desktop::CommandLine commandLine;
     // --help and usage errors need no display.

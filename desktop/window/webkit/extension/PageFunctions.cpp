@@ -1,5 +1,5 @@
 // What the window adds to the window object of every page: the functions that create, destroy, show and hide
-// applications, and the key codes of the remote control.
+// applications, the key codes of the remote control, and support for HbbTV documents.
 #include "desktop/window/webkit/extension/PageFunctions.h"
 
 #include <sys/socket.h>
@@ -89,7 +89,9 @@ void onWindowObjectCleared(WebKitScriptWorld* world, WebKitWebPage* page, WebKit
                                            new Caller(caller), deleteCaller, G_TYPE_NONE, 0));
     }
     jsc_context_set_value(context, kHostObject, host);
-    g_autoptr(JSCValue) result = jsc_context_evaluate(context, pageFunctionsScript().c_str(), -1);
+    for (const auto& script : {pageFunctionsScript(), pageScriptCall("hbbtvdocument", {})}) {
+        g_autoptr(JSCValue) result = jsc_context_evaluate(context, script.c_str(), -1);
+    }
 }
 
 } // namespace

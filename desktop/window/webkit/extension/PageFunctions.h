@@ -1,5 +1,5 @@
 // What the window adds to the window object of every page: the functions that create, destroy, show and hide
-// applications, and the key codes of the remote control.
+// applications, the key codes of the remote control, and support for HbbTV documents.
 #ifndef TELIX_DESKTOP_WINDOW_WEBKIT_EXTENSION_PAGEFUNCTIONS_H
 #define TELIX_DESKTOP_WINDOW_WEBKIT_EXTENSION_PAGEFUNCTIONS_H
 
