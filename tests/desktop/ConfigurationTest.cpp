@@ -136,6 +136,7 @@ TEST_F(ConfigurationTest, HasTheDefaultsOfTheTableWithoutAFile) {
     EXPECT_EQ(defaults.ratingThreshold, 16U);
     EXPECT_TRUE(defaults.ratingSchemes.empty());
     EXPECT_TRUE(defaults.drmSystems.empty());
+    EXPECT_EQ(defaults.signalTimeout, 6U);
     EXPECT_EQ(defaults.freeMemory, 64U * 1024 * 1024);
     EXPECT_EQ(defaults.keys, 0x3FFU);
     EXPECT_EQ(defaults.keySet, 0x1FU);
