@@ -288,6 +288,11 @@ def stale_files(files, folder):
     return stale + [f'{name}: made from nothing' for name in sorted(made - files.keys())]
 
 
+def fail(reason):
+    print(f'make_reference.py: {reason}', file=sys.stderr)
+    sys.exit(2)
+
+
 def main():
     parser = argparse.ArgumentParser(description=__doc__, formatter_class=argparse.RawDescriptionHelpFormatter)
     parser.add_argument('tables', metavar='PROGRAM', help='telix_script_tables in the build folder')
@@ -297,9 +302,13 @@ def main():
     parser.add_argument('--examples', metavar='FILE', help='also write the examples to FILE, as one script')
     arguments = parser.parse_args()
 
-    tables = subprocess.run([arguments.tables], stdout=subprocess.PIPE, check=True).stdout
-    with open(arguments.names, 'rb') as file:
-        reference = Reference(tomllib.load(file)['page'], json.loads(tables), read_quirks(QUIRKS))
+    try:
+        tables = json.loads(subprocess.run([arguments.tables], stdout=subprocess.PIPE, check=True).stdout)
+        with open(arguments.names, 'rb') as file:
+            pages = tomllib.load(file)['page']
+    except (OSError, subprocess.SubprocessError, ValueError) as error:
+        fail(f'{arguments.tables}, {arguments.names}: {error}')
+    reference = Reference(pages, tables, read_quirks(QUIRKS))
     faults = reference.faults
     if not faults:
         files = {**reference.markdown(), 'telix.d.ts': reference.declarations()}
