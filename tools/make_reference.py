@@ -43,13 +43,21 @@ element is looked up.
 
 * A call with arguments of wrong types throws. A write of a wrong type leaves the value as it was.
 * A handler property takes a function or `null` (quirk 4).
-* A value that the set does not know is `null`, 0 or false, as the tables say; a string is never empty (quirk 3).
-* Numbers are integers of 32 bits unless a fraction makes sense. An argument beyond the range takes the nearest bound (quirk 5).
+* A value that the set does not know is `null`, 0 or false, as the tables say; `null` is also what an empty string reads as
+  (quirks 3 and 35).
+* Numbers are integers of 32 bits unless a fraction makes sense. An argument beyond the range takes the nearest bound
+  (quirk 5).
 * Collections have `length`, `item(index)` and the notation `list[index]`.
 * Numbers after the word quirk are those of [compatibility.md](../compatibility.md), which names what differs from the
   standards.
-* The members listed as missing are those of OIPF DAE 1.1 and HbbTV 1.1.1 that pages ask for most often; optional parts of the
-  standards, such as recording and time shift, are left out of the lists.
+
+## What is missing
+
+Each object names the members of OIPF DAE 1.1 and HbbTV 1.1.1 that it lacks, optional parts of the standards such as recording
+and time shift left out. There is no `oipfObjectFactory`: pages embed the elements. There are no objects of the types
+`application/oipfCodManager`, `application/oipfDownloadManager`, `application/oipfGatewayInfo`, `application/oipfIMS`,
+`application/oipfMDTF`, `application/oipfRecordingScheduler`, `application/oipfRemoteManagement`,
+`application/oipfSearchManager` and `application/oipfStatusView`.
 """
 
 STREAM_EVENT = """/** The event of a subscription to a stream event. */
@@ -120,6 +128,7 @@ class Reference:
                 self.check_object(each, self.tables[each['class']])
         for page in self.pages:
             self.check_quirks(page['title'], page['about'])
+        self.check_quirks('README.md', ABOUT)
 
     def check_object(self, described, table):
         members = {member['name']: member for member in table['members']}

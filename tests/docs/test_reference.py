@@ -94,7 +94,8 @@ class Faults(unittest.TestCase):
 
     def test_another_type_of_a_written_value(self):
         # Only its writer states a type.
-        self.expect_fault("data = ['string | null'", "data = ['number'", 'AVControl.data: written as string, described as number')
+        self.expect_fault("data = ['string | null'", "data = ['number'",
+                          'AVControl.data: written as string, described as number')
 
     def test_other_arguments(self):
         self.expect_fault('(milliseconds: number): boolean', '(milliseconds: string): boolean',
