@@ -238,9 +238,9 @@ declare namespace telix {
         readonly fullScreen: boolean;
         /** The play state has changed; called without arguments (quirk 48). */
         onPlayStateChange: (() => void) | null;
-        /** Number of clips of the playlist (quirk 70). */
+        /** Number of clips of the playlist, 0 without a playlist (quirk 70). */
         readonly nrTracks: number;
-        /** Index of the clip of the playlist that plays; a write plays another clip. */
+        /** Index from 1 of the clip of the playlist that plays, 0 without a playlist; a write plays another clip. */
         currentTrackIndex: number;
         /** Stored only: it has no effect (quirk 60). */
         persist: boolean;
