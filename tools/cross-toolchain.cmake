@@ -25,8 +25,9 @@ set(CMAKE_SYSROOT ${TELIX_SYSROOT})
 set(CMAKE_LIBRARY_ARCHITECTURE ${telix_multiarch})
 set(CMAKE_C_COMPILER ${telix_prefix}-gcc)
 set(CMAKE_CXX_COMPILER ${telix_prefix}-g++)
-# No C++ type crosses the border of the plug-in: notes on how compilers once passed them help nobody.
-set(CMAKE_CXX_FLAGS_INIT -Wno-psabi)
+# Strings as in the C++ run time before g++ 5, which sets have. No C++ type crosses the border of the plug-in, so notes on how
+# compilers once passed them help nobody.
+set(CMAKE_CXX_FLAGS_INIT "-D_GLIBCXX_USE_CXX11_ABI=0 -Wno-psabi")
 set(CMAKE_FIND_ROOT_PATH_MODE_PROGRAM NEVER)
 set(CMAKE_FIND_ROOT_PATH_MODE_LIBRARY ONLY)
 set(CMAKE_FIND_ROOT_PATH_MODE_INCLUDE ONLY)
