@@ -61,7 +61,7 @@ apt-get -q -c "$work/apt.conf" update >"$work/log" 2>&1 || true
 apt-get -q -c "$work/apt.conf" install -y --no-install-recommends --download-only "${packages[@]}" >>"$work/log" 2>&1 ||
     fail "$architecture: cannot fetch packages: $(grep -m 1 '^[EW]: ' "$work/log" || tail -n 1 "$work/log")"
 for package in "$work"/cache/archives/*.deb; do
-    dpkg-deb -x "$package" "$work/root" || fail "${package##*/}: cannot unpack"
+    dpkg-deb -x "$package" "$work/root" 2>/dev/null || fail "${package##*/}: cannot unpack"
 done
 
 # Absolute links would lead out of the sysroot.
