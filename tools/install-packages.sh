@@ -1,6 +1,6 @@
 #!/usr/bin/env bash
 # Installs the packages that are missing for the given purposes: of Debian, and programs from the npm registry.
-# Usage: tools/install-packages.sh run|test ...
+# Usage: tools/install-packages.sh run|test|machines ...
 set -euo pipefail
 
 packages=(build-essential cmake ninja-build pkg-config libglib2.0-dev)
@@ -16,11 +16,15 @@ for purpose in "$@"; do
     test)
         packages+=(libgtest-dev libgmock-dev libbenchmark-dev libexpat1-dev clang-14 libclang-rt-14-dev
             clang-format-14 clang-tidy-14 libjavascriptcoregtk-4.1-dev libwebkit2gtk-4.1-dev libwpewebkit-1.1-dev
-            cog python3 binutils util-linux man-db)
+            cog python3 binutils util-linux dpkg-dev man-db)
         programs+=(tsc=typescript@5.4.5)
         ;;
+    machines)
+        packages+=(g++-arm-linux-gnueabihf g++-aarch64-linux-gnu g++-i686-linux-gnu g++-mipsel-linux-gnu
+            qemu-user-static googletest python3)
+        ;;
     *)
-        echo "$0: $purpose: unknown purpose, expected run or test" >&2
+        echo "$0: $purpose: unknown purpose, expected run, test or machines" >&2
         exit 2
         ;;
     esac
