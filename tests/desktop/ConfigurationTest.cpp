@@ -4,6 +4,7 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 #include <set>
+#include <sys/stat.h>
 #include <unistd.h>
 
 #include "desktop/platform/Configuration.h"
@@ -122,6 +123,42 @@ TEST_F(ConfigurationTest, ChecksTheDocumentOfTheCapabilities) {
     EXPECT_EQ(error->line, 2U);
     EXPECT_NE(error->reason.find(document), std::string::npos) << error->reason;
     std::remove(document.c_str());
+}
+
+// A device would be read without end, a pipe would block.
+TEST_F(ConfigurationTest, ReadsRegularFilesOfABoundedSizeOnly) {
+    const std::string fifo = m_file + ".fifo";
+    ASSERT_EQ(mkfifo(fifo.c_str(), 0600), 0);
+    for (const std::string& file : {std::string("/dev/zero"), fifo, std::string("/")}) {
+        const auto error = Configuration::load(file, m_configuration);
+        ASSERT_TRUE(error) << file;
+        EXPECT_EQ(error->message(), file + ": Not a regular file");
+        const auto inSetting = load("[set]\ncapabilities=" + file + "\n");
+        ASSERT_TRUE(inSetting) << file;
+        EXPECT_EQ(inSetting->message(), m_file + ":2: capabilities: " + file + ": Not a regular file");
+    }
+    unlink(fifo.c_str());
+
+    const std::string document = m_file + ".xml";
+    std::ofstream(document) << "<profilelist>" << std::string(1 << 20, ' ') << "</profilelist>";
+    const auto error = load("[set]\ncapabilities=" + document + "\n");
+    unlink(document.c_str());
+    ASSERT_TRUE(error);
+    EXPECT_EQ(error->reason, "capabilities: " + document + ": Larger than 1048576 bytes");
+    const auto tooLarge = load("[viewer]\ncountry=FRA\n" + std::string(1 << 20, '#'));
+    ASSERT_TRUE(tooLarge);
+    EXPECT_EQ(tooLarge->message(), m_file + ": Larger than 1048576 bytes");
+    EXPECT_EQ(m_configuration.country, "DEU");
+}
+
+TEST_F(ConfigurationTest, FindsTheLineOfASyntaxErrorInALargeFile) {
+    std::string contents = "[viewer]\n";
+    for (int line = 0; line < 50000; ++line) {
+        contents += "# note\n";
+    }
+    const auto error = load(contents + "nonsense\n" + contents);
+    ASSERT_TRUE(error);
+    EXPECT_EQ(error->line, 50002U);
 }
 
 TEST_F(ConfigurationTest, HasTheDefaultsOfTheTableWithoutAFile) {
