@@ -15,7 +15,7 @@ for purpose in "$@"; do
     test)
         packages+=(libgtest-dev libgmock-dev libbenchmark-dev libexpat1-dev clang-14 libclang-rt-14-dev
             clang-format-14 clang-tidy-14 libjavascriptcoregtk-4.1-dev libwebkit2gtk-4.1-dev libwpewebkit-1.1-dev
-            cog python3 binutils util-linux)
+            cog python3 binutils util-linux openssl)
         ;;
     *)
         echo "$0: $purpose: unknown purpose, expected run or test" >&2
