@@ -16,7 +16,7 @@ for purpose in "$@"; do
     test)
         packages+=(libgtest-dev libgmock-dev libbenchmark-dev libexpat1-dev clang-14 libclang-rt-14-dev
             clang-format-14 clang-tidy-14 libjavascriptcoregtk-4.1-dev libwebkit2gtk-4.1-dev libwpewebkit-1.1-dev
-            cog python3 binutils util-linux dpkg-dev man-db)
+            cog python3 binutils util-linux dpkg-dev man-db openssl)
         programs+=(tsc=typescript@5.4.5)
         ;;
     machines)

@@ -68,8 +68,8 @@ unsigned int lineOf(const std::string& contents, const std::string& section, con
     return found;
 }
 
-// The first line that GKeyFile rejects: it accepts the lines before it, and rejects every beginning of the file
-// that contains it.
+// The first line that GKeyFile rejects: it accepts the lines before it, and rejects every beginning of the
+// file that contains it.
 unsigned int lineOfSyntaxError(const std::string& contents) {
     std::vector<size_t> ends; // of the lines
     for (const std::string& line : linesOf(contents)) {
