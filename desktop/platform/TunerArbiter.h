@@ -37,6 +37,7 @@ public:
     struct Listener {
         std::function<void(const Tune& tune)> onTune; // the owner asks for a channel
         std::function<void()> onRelease;              // the owner gives the tuner up
+        std::function<void(TELIX_JS_CM_HANDLE channel)> onChannel; // the current one changes without an owner
     };
 
     struct Object {

@@ -259,6 +259,59 @@ TEST_F(BroadcastTest, GoesFromConnectingToPresentingAndStopped) {
     tune(m_channels[1]); // a released object is good for another tune
 }
 
+// How late picture and sound are presented.
+ServicePresentation::Lateness latenessOf(Broadcast& broadcast) {
+    std::promise<ServicePresentation::Lateness> lateness;
+    Platform::instance().post([&] { lateness.set_value(broadcast.lateness()); });
+    return lateness.get_future().get();
+}
+
+TEST_F(BroadcastTest, ShowsAnotherChannelFromWhatItHasReceivedBefore) {
+    tune(m_channels[0]);
+    // Some pictures after a keyframe must be there, because a decoder keeps the first one back.
+    size_t most = 0;
+    ASSERT_TRUE(waitUntil([&] {
+        most = std::max(most, Broadcast::instance().state().keptPackets);
+        return takeShot().serial > 60; // several keyframes
+    }));
+    ASSERT_TRUE(waitUntil([&] {
+        const size_t kept = Broadcast::instance().state().keptPackets;
+        testClock().freeze(kept > most * 6 / 10 && kept < most * 9 / 10);
+        return testClock().isFrozen();
+    }));
+    for (const TELIX_JS_CM_HANDLE channel : {m_channels[1], m_channels[2], m_channels[0]}) {
+        tune(channel); // not a single packet arrives meanwhile
+        EXPECT_TRUE(takeShot().visible);
+    }
+    testClock().freeze(false);
+    const uint64_t serial = takeShot().serial;
+    EXPECT_TRUE(waitUntil([&] { return takeShot().serial > serial + 20; }));
+}
+
+TEST_F(BroadcastTest, CatchesUpWithTheBroadcastAfterAChange) {
+    tune(m_channels[0]);
+    ASSERT_TRUE(waitUntil([] { return Broadcast::instance().state().keptPackets > 0; }));
+    for (const TELIX_JS_CM_HANDLE channel : {m_channels[1], m_channels[2]}) {
+        tune(channel);
+        EXPECT_TRUE(waitUntil([] {
+            const auto lateness = latenessOf(Broadcast::instance());
+            return lateness.video && lateness.audio && *lateness.video < SinkTiming::kTolerance &&
+                   *lateness.audio < SinkTiming::kTolerance;
+        }));
+    }
+}
+
+TEST_F(BroadcastTest, KeepsNothingWhileInstantChangesAreOff) {
+    tune(m_channels[0]);
+    ASSERT_TRUE(waitUntil([] { return Broadcast::instance().state().keptPackets > 0; }));
+    Broadcast::instance().setInstantZap(false);
+    EXPECT_FALSE(Broadcast::instance().state().instantZap);
+    EXPECT_EQ(Broadcast::instance().state().keptPackets, 0U);
+    tune(m_channels[1]);
+    EXPECT_EQ(Broadcast::instance().state().keptPackets, 0U);
+    Broadcast::instance().setInstantZap(true);
+}
+
 TEST_F(BroadcastTest, TellsThatAChannelIsUnknown) {
     ASSERT_EQ(TELIX_JS_VB_SetChannelByTriplet(m_object, kTestOriginalNetworkId, kTestTransportStreamId, 999),
               0);
