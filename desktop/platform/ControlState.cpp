@@ -93,7 +93,7 @@ JsonArrayWriter componentsJson(const Broadcast::State& state) {
     return components;
 }
 
-// In milliseconds; null before anything is presented.
+// In milliseconds, negative for what waits for its time; null before anything is presented.
 void setLateness(JsonObjectWriter& json) {
     const ServicePresentation::Lateness lateness = broadcast().lateness();
     for (const auto& [name, value] :

@@ -60,7 +60,7 @@ public:
     // The PID of the audio that the pipeline lets through.
     std::optional<uint16_t> activeAudioPid() const;
 
-    // How late picture and sound are; nothing before they are presented.
+    // How late picture and sound are (negative: they wait for their time); nothing before they are presented.
     struct Lateness {
         std::optional<std::chrono::milliseconds> video;
         std::optional<std::chrono::milliseconds> audio;

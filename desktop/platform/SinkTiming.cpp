@@ -3,15 +3,9 @@
 
 #include <gst/base/gstbasesink.h>
 
-#include <algorithm>
-
 namespace desktop {
 
 namespace {
-
-GstClockTime nanoseconds(std::chrono::nanoseconds duration) {
-    return static_cast<GstClockTime>(duration.count());
-}
 
 GstClockTime runningTimeOf(GstPad* pad, const GstBuffer* buffer) {
     GstEvent* event = gst_pad_get_sticky_event(pad, GST_EVENT_SEGMENT, 0);
@@ -43,7 +37,7 @@ GstPadProbeReturn SinkTiming::onBuffer(GstPad* pad, GstPadProbeInfo* info, gpoin
         return GST_PAD_PROBE_OK;
     }
     const GstClockTime due = runningTime + gst_base_sink_get_latency(GST_BASE_SINK(self->m_sink));
-    return self->onLateness(std::max<GstClockTimeDiff>(GST_CLOCK_DIFF(due, now), 0), runningTime);
+    return self->onLateness(GST_CLOCK_DIFF(due, now), runningTime);
 }
 
 GstPadProbeReturn SinkTiming::onLateness(GstClockTimeDiff lateness, GstClockTime runningTime) {
@@ -51,8 +45,9 @@ GstPadProbeReturn SinkTiming::onLateness(GstClockTimeDiff lateness, GstClockTime
         if (!GST_CLOCK_TIME_IS_VALID(m_firstDropped)) {
             m_firstDropped = runningTime;
         }
-        const bool isLate = static_cast<GstClockTime>(lateness) > nanoseconds(kTolerance);
-        if (isLate && runningTime < m_firstDropped + nanoseconds(kMaxDropped)) {
+        const bool isLate = std::chrono::nanoseconds(lateness) > kTolerance;
+        const std::chrono::nanoseconds dropped(GST_CLOCK_DIFF(m_firstDropped, runningTime));
+        if (isLate && dropped < kMaxDropped) {
             return GST_PAD_PROBE_DROP;
         }
         m_isStarted = true;
