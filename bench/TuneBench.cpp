@@ -1,7 +1,7 @@
 // How long a channel change of the desktop television takes: from the request to the first new frame of the
-// test multiplex, with what has been received before and without it; compared with a pipeline that decodes the
-// same service from the start of its file, where the first frame is a keyframe and nothing is sent in real
-// time. Exits with 1 if the goals of instant changes are missed.
+// test multiplex, with what has been received before and without it; compared with a pipeline that decodes
+// the same service from the start of its file, where the first frame is a keyframe and nothing is sent in
+// real time. Exits with 1 if the goals of instant changes are missed.
 #include <benchmark/benchmark.h>
 #include <gst/gst.h>
 
@@ -180,8 +180,8 @@ bool meetsGoals() {
     const std::vector<double> times(g_instantTimes.begin() + 1, g_instantTimes.end());
     const double median = percentile(times, 0.5);
     const double high = percentile(times, 0.95);
-    std::printf("instant changes: median %.3f s (goal %.2f s), 95th percentile %.3f s (goal %.2f s)\n", median,
-                kMedianGoal, high, kPercentileGoal);
+    std::printf("instant changes: median %.3f s (goal %.2f s), 95th percentile %.3f s (goal %.2f s)\n",
+                median, kMedianGoal, high, kPercentileGoal);
     return median <= kMedianGoal && high <= kPercentileGoal;
 }
 

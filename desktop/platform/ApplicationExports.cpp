@@ -169,9 +169,9 @@ int telix_desktop_signal_application(const char* url, uint32_t channel) {
     if (channel > list.size()) {
         return 0;
     }
-    const TELIX_JS_CM_HANDLE handle =
-        channel == 0 ? broadcast.arbiter().currentChannel() : list[channel - 1];
-    const bool isSignalled = handle != 0 && broadcast.applications().signal(
-                                                handle, url ? url : "", desktop::kControlCodeAutostart, false);
+    const TELIX_JS_CM_HANDLE handle = channel == 0 ? broadcast.arbiter().currentChannel() : list[channel - 1];
+    const bool isSignalled =
+        handle != 0 &&
+        broadcast.applications().signal(handle, url ? url : "", desktop::kControlCodeAutostart, false);
     return isSignalled ? 1 : 0;
 }

@@ -168,7 +168,8 @@ void setUrl(Descriptors& read, const Transports& transports) {
 
 // As valid UTF-8 without control characters.
 std::string printable(const std::string& string) {
-    std::string valid = OwnedString(g_utf8_make_valid(string.data(), static_cast<gssize>(string.size()))).get();
+    std::string valid =
+        OwnedString(g_utf8_make_valid(string.data(), static_cast<gssize>(string.size()))).get();
     valid.erase(std::remove_if(valid.begin(), valid.end(), [](char each) { return g_ascii_iscntrl(each); }),
                 valid.end());
     return valid;
@@ -206,7 +207,8 @@ std::string controlCodeName(uint8_t value) {
 
 std::string toString(const ApplicationId& id) {
     char string[16];
-    std::snprintf(string, sizeof(string), "%x.%x", id.organisation, static_cast<unsigned int>(id.application));
+    std::snprintf(string, sizeof(string), "%x.%x", id.organisation,
+                  static_cast<unsigned int>(id.application));
     return string;
 }
 

@@ -77,8 +77,8 @@ void addApplication(SignalledApplication application, const std::string& fault, 
 // Collects the AIT of HbbTV applications on one PID: its sections, and the changes of its version.
 class ApplicationTable {
 public:
-    // Takes one section with a correct CRC. True if list() is new: all sections of a version are there, or one
-    // comes again before the others, which are damaged then.
+    // Takes one section with a correct CRC. True if list() is new: all sections of a version are there, or
+    // one comes again before the others, which are damaged then.
     bool add(const Bytes& section);
 
     const ApplicationList& list() const { return m_list; }
@@ -87,10 +87,10 @@ private:
     bool onDamage();
     bool makeList();
 
-    int m_version = -1;                   // of the sections; -1: none
-    std::map<uint8_t, Bytes> m_sections;  // by section number
-    bool m_isDamaged = false;             // a section is malformed
-    bool m_isListed = false;              // the list is that of this version
+    int m_version = -1;                  // of the sections; -1: none
+    std::map<uint8_t, Bytes> m_sections; // by section number
+    bool m_isDamaged = false;            // a section is malformed
+    bool m_isListed = false;             // the list is that of this version
     ApplicationList m_list;
 };
 

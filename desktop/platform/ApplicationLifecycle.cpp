@@ -24,9 +24,8 @@ std::optional<size_t> autostartOf(const std::vector<SignalledApplication>& signa
 
 // An application that is signalled twice may run if one of the entries allows it.
 bool mayGoOn(const ApplicationId& id, const std::vector<SignalledApplication>& signalled) {
-    return std::any_of(signalled.begin(), signalled.end(), [&](const SignalledApplication& each) {
-        return each.id == id && each.isStartable();
-    });
+    return std::any_of(signalled.begin(), signalled.end(),
+                       [&](const SignalledApplication& each) { return each.id == id && each.isStartable(); });
 }
 
 // Broadcast-independent applications are not subject to the signalling.

@@ -12,9 +12,8 @@
 //   Programmes          programmes and ratings by handle
 //   ApplicationSignalling  applications of the current channel, for the window
 // Below them lie BroadcastSource (Playout with a TableInjector, Restamper, Receiver), Multiplex (the test
-// multiplex), Sections and TsTables (reading and writing of tables, DvbConstants), ApplicationInformation (the
-// AIT) and Tuner (the pipeline).
-// Time comes from a Clock.
+// multiplex), Sections and TsTables (reading and writing of tables, DvbConstants), ApplicationInformation
+// (the AIT) and Tuner (the pipeline). Time comes from a Clock.
 //
 // Threads and locks: the plug-in calls on any thread, and these calls read or change plain data under
 // Platform::mutex() and post the rest. Tunes, reports and all callbacks of the plug-in happen on the platform

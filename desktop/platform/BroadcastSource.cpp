@@ -9,8 +9,7 @@
 namespace desktop {
 
 BroadcastSource::BroadcastSource(Clock& clock, std::function<void()> onTestMultiplex)
-    : m_platform(Platform::instance()), m_onTestMultiplex(std::move(onTestMultiplex)),
-      m_receiver(clock),
+    : m_platform(Platform::instance()), m_onTestMultiplex(std::move(onTestMultiplex)), m_receiver(clock),
       m_playout(clock, [this](const uint8_t* packets, size_t size) { m_receiver.push(packets, size); }) {}
 
 void BroadcastSource::makeTestMultiplexFile() {

@@ -81,8 +81,8 @@ struct Configuration {
     uint32_t extraHdVideoDecodes;
     bool instantZap;   // changes of the channel begin with kept packets
     uint32_t zapDelay; // milliseconds before a tune begins
-    uint32_t keys;   // bits of the key groups that the remote control has
-    uint32_t keySet; // bits of those that pages receive until one sets a key set
+    uint32_t keys;     // bits of the key groups that the remote control has
+    uint32_t keySet;   // bits of those that pages receive until one sets a key set
 };
 
 } // namespace desktop

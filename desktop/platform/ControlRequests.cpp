@@ -57,9 +57,9 @@ JsonObjectWriter signalApplication(const ControlRequest& request) {
     const TELIX_JS_CM_HANDLE channel =
         number == 0 ? broadcast().arbiter().currentChannel() : list[number - 1];
     require(channel != 0, "there are no channels");
-    require(broadcast().applications().signal(channel, request.string("url"),
-                                              controlCodeOf(request.string("control-code", "autostart")),
-                                              request.has("service-bound") && request.boolean("service-bound")),
+    require(broadcast().applications().signal(
+                channel, request.string("url"), controlCodeOf(request.string("control-code", "autostart")),
+                request.has("service-bound") && request.boolean("service-bound")),
             "\"url\" is not an absolute URL");
     return {};
 }

@@ -130,8 +130,8 @@ constexpr uint8_t kStreamTypeHevcVideo = 0x24;
 constexpr uint8_t kStreamTypeAc3 = 0x81;
 constexpr uint8_t kStreamTypeEnhancedAc3 = 0x87;
 
-// ---- Beginnings of pictures that decode alone, after a start code: ISO/IEC 13818-2, 6.2.1; ISO/IEC 14496-10,
-// 7.4.1; ISO/IEC 23008-2, 7.4.2.2
+// ---- Beginnings of pictures that decode alone, after a start code: ISO/IEC 13818-2, 6.2.1; ISO/IEC
+// 14496-10, 7.4.1; ISO/IEC 23008-2, 7.4.2.2
 
 constexpr uint8_t kMpegSequenceHeaderCode = 0xB3;
 constexpr uint8_t kAvcNalIdrSlice = 5;

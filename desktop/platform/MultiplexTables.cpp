@@ -165,12 +165,11 @@ private:
         made.organisationId = kTestOrganisationId;
         made.applicationId = application.applicationId;
         made.controlCode = application.controlCode;
-        for (const Bytes& descriptor :
-             {applicationDescriptor(kHbbTvProfile, application.isServiceBound, application.priority,
-                                    kTransportLabel),
-              applicationNameDescriptor("eng", application.name),
-              simpleApplicationLocationDescriptor(application.path),
-              simpleApplicationBoundaryDescriptor({m_applicationsUrl})}) {
+        for (const Bytes& descriptor : {applicationDescriptor(kHbbTvProfile, application.isServiceBound,
+                                                              application.priority, kTransportLabel),
+                                        applicationNameDescriptor("eng", application.name),
+                                        simpleApplicationLocationDescriptor(application.path),
+                                        simpleApplicationBoundaryDescriptor({m_applicationsUrl})}) {
             made.descriptors.insert(made.descriptors.end(), descriptor.begin(), descriptor.end());
         }
         return made;

@@ -24,9 +24,9 @@ public:
         uint16_t serviceId = 0;
         // PAT, PMT and streams of this service alone, and how long ago they arrived.
         std::function<void(const Bytes& packets, Clock::Duration age)> feed;
-        std::function<void(const Pmt& pmt)> onPmt;      // once, before the first packets
-        std::function<void()> onMissing;                // once: the PAT does not list the service
-        std::function<void(const Eit& eit)> onEit;      // a section that differs from the one before
+        std::function<void(const Pmt& pmt)> onPmt; // once, before the first packets
+        std::function<void()> onMissing;           // once: the PAT does not list the service
+        std::function<void(const Eit& eit)> onEit; // a section that differs from the one before
         std::function<void(uint8_t componentTag, const StreamEvent& event)> onStreamEvent; // each repetition
     };
 

@@ -35,10 +35,10 @@ std::optional<LongSection> openSection(const Bytes& section, uint8_t tableId) {
         (section[5] & kCurrentNextIndicator) == 0) {
         return std::nullopt;
     }
-    return LongSection{
-        static_cast<uint16_t>(section[3] << 8 | section[4]),
-        static_cast<uint8_t>(section[5] >> 1 & (kVersionCount - 1)), section[6], section[7],
-        ByteReader(section.data() + kLongSectionHeaderSize, section.size() - kLongSectionHeaderSize - kCrcSize)};
+    return LongSection{static_cast<uint16_t>(section[3] << 8 | section[4]),
+                       static_cast<uint8_t>(section[5] >> 1 & (kVersionCount - 1)), section[6], section[7],
+                       ByteReader(section.data() + kLongSectionHeaderSize,
+                                  section.size() - kLongSectionHeaderSize - kCrcSize)};
 }
 
 unsigned int fromBcd(unsigned int value) {

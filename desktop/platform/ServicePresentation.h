@@ -96,10 +96,10 @@ private:
     BroadcastSource m_source;
 
     std::unique_ptr<Tuner> m_tuner;
-    Tune m_pendingTune;                // without an outcome yet
+    Tune m_pendingTune;                       // without an outcome yet
     TELIX_JS_CM_HANDLE m_awaitedChannel = 0;  // to be received when the test multiplex is there; 0: none
     TELIX_JS_CM_HANDLE m_followedChannel = 0; // whose applications are followed; 0: none
-    uint64_t m_activeTuneId = 0;       // the tune to which the tuner belongs; 0: there is none
+    uint64_t m_activeTuneId = 0;              // the tune to which the tuner belongs; 0: there is none
     Picture::Token m_pictureToken = 0; // changed on the platform thread alone, guarded by Platform::mutex()
 };
 

@@ -31,8 +31,8 @@ public:
     // `sink` is a GstBaseSink in a pipeline. Once, before it gets buffers.
     void observe(GstElement* sink);
 
-    // Of the last buffer that was presented; negative if it had to wait for its time. Nothing before the first
-    // one.
+    // Of the last buffer that was presented; negative if it had to wait for its time. Nothing before the
+    // first one.
     std::optional<std::chrono::milliseconds> lateness() const;
 
 private:

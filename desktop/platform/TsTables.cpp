@@ -287,7 +287,8 @@ Bytes streamIdentifierDescriptor(uint8_t componentTag) {
 
 Bytes applicationSignallingDescriptor(uint16_t applicationType, uint8_t version) {
     Bytes body;
-    put16(body, static_cast<unsigned int>(kTestApplicationFlag | applicationType)); // the first bit is reserved
+    put16(body,
+          static_cast<unsigned int>(kTestApplicationFlag | applicationType)); // the first bit is reserved
     put8(body, kReservedBeforeAitVersion | version % kVersionCount);
     return descriptor(kTagApplicationSignalling, body);
 }

@@ -163,7 +163,8 @@ std::string readLocation(const xmlNode* element, SignalledApplication& applicati
 
 std::string readApplication(const xmlNode* element, SignalledApplication& application) {
     application.name = childText(element, "appName");
-    const std::string usage = childText(firstChild(element, "applicationUsageDescriptor"), "ApplicationUsage");
+    const std::string usage =
+        childText(firstChild(element, "applicationUsageDescriptor"), "ApplicationUsage");
     application.usage = usage == kDigitalTextUsage ? kUsageDigitalText : kUsageNone;
     forEachChild(firstChild(element, "applicationBoundary"), "BoundaryExtension",
                  [&](const xmlNode* boundary) { application.boundaries.push_back(textOf(boundary)); });

@@ -26,13 +26,13 @@ extern "C" {
 typedef struct telix_desktop_application {
     uint32_t organisationId;
     uint16_t applicationId;
-    uint8_t controlCode;  /* TS 102 809, 5.2.4: 1 AUTOSTART, 2 PRESENT, 4 KILL, 7 DISABLED */
-    uint8_t serviceBound; /* 1: ends when another service is selected */
-    uint8_t visibility;   /* TS 102 809, 5.3.5.3 */
-    uint8_t priority;     /* the highest one starts */
-    uint8_t usage;        /* TS 102 809, 5.3.5.5: 0 none given, 1 digital text */
-    const char* name;     /* may be empty */
-    const char* url;      /* absolute; may be empty unless AUTOSTART or PRESENT */
+    uint8_t controlCode;           /* TS 102 809, 5.2.4: 1 AUTOSTART, 2 PRESENT, 4 KILL, 7 DISABLED */
+    uint8_t serviceBound;          /* 1: ends when another service is selected */
+    uint8_t visibility;            /* TS 102 809, 5.3.5.3 */
+    uint8_t priority;              /* the highest one starts */
+    uint8_t usage;                 /* TS 102 809, 5.3.5.5: 0 none given, 1 digital text */
+    const char* name;              /* may be empty */
+    const char* url;               /* absolute; may be empty unless AUTOSTART or PRESENT */
     const char* const* boundaries; /* beginnings of further URLs that belong to the application */
     size_t boundaryCount;
 } telix_desktop_application;
@@ -77,7 +77,7 @@ typedef struct telix_desktop_running_application {
 } telix_desktop_running_application;
 
 typedef struct telix_desktop_application_decision {
-    uint8_t endsRunning; /* 1: the running application ends, before another one starts */
+    uint8_t endsRunning;                      /* 1: the running application ends, before another one starts */
     const telix_desktop_application* started; /* in the snapshot; null: none starts */
 } telix_desktop_application_decision;
 

@@ -107,17 +107,22 @@ TEST(ApplicationTableTest, ReadsEverythingThatAnApplicationSignals) {
 TEST(ApplicationTableTest, ReadsTheBytesOfTheStandard) {
     const std::string base = "http://e.x/";
     const std::string path = "i.html";
-    Bytes common{0x02, static_cast<uint8_t>(5 + base.size()), 0x00, 0x03, 0x01,
-                 static_cast<uint8_t>(base.size())};
+    Bytes common{0x02, static_cast<uint8_t>(5 + base.size()), 0x00, 0x03,
+                 0x01, static_cast<uint8_t>(base.size())};
     common.insert(common.end(), base.begin(), base.end());
     common.push_back(0); // no extension
-    Bytes own{0x00, 0x09, 0x05, 0x00, 0x00, 0x01, 0x01, 0x01, 0xFF, 0x07, 0x01, // application
+    Bytes own{0x00, 0x09,
+              0x05, 0x00,
+              0x00, 0x01,
+              0x01, 0x01,
+              0xFF, 0x07,
+              0x01, // application
               0x15, static_cast<uint8_t>(path.size())};
     own.insert(own.end(), path.begin(), path.end());
     Bytes section{0x74, 0xF0, 0x00, 0x00, 0x10, 0xC3, 0x00, 0x00, 0xF0, static_cast<uint8_t>(common.size())};
     section.insert(section.end(), common.begin(), common.end());
-    const Bytes loop{0xF0, static_cast<uint8_t>(9 + own.size()), 0, 0, 0, 0x11, 0, 0x22, 0x01, 0xF0,
-                     static_cast<uint8_t>(own.size())};
+    const Bytes loop{0xF0, static_cast<uint8_t>(9 + own.size()), 0, 0, 0, 0x11, 0, 0x22, 0x01,
+                     0xF0, static_cast<uint8_t>(own.size())};
     section.insert(section.end(), loop.begin(), loop.end());
     section.insert(section.end(), own.begin(), own.end());
     section.resize(section.size() + kCrcSize);
@@ -203,7 +208,8 @@ TEST(ApplicationTableTest, WaitsForAllSectionsOfAVersionAndReportsTheNextOneAgai
 TEST(ApplicationTableTest, IgnoresADamagedSectionAndTakesTheOthers) {
     ApplicationTable table;
     const Bytes first = makeSection(1, {makeApplication(1, 1)}, 0, 1);
-    const Bytes damaged = changed(makeSection(1, {makeApplication(2, 1)}, 1, 1), 11, 0xFF); // the loop's length
+    const Bytes damaged =
+        changed(makeSection(1, {makeApplication(2, 1)}, 1, 1), 11, 0xFF); // the loop's length
     EXPECT_FALSE(table.add(first));
     EXPECT_FALSE(table.add(damaged));
     EXPECT_TRUE(table.add(first)); // all there is

@@ -41,9 +41,8 @@ const std::vector<SignalledApplication> kThree = {entry(kFirst, kControlCodeAuto
 TEST(ApplicationLifecycleTest, StartsTheAutostartApplicationWithTheHighestPriority) {
     EXPECT_EQ(outcome(LifecycleEvent::SignallingChanged, kThree, std::nullopt), "start 1.2");
     EXPECT_EQ(outcome(LifecycleEvent::SignallingChanged, {}, std::nullopt), "nothing");
-    EXPECT_EQ(
-        outcome(LifecycleEvent::SignallingChanged, {entry(kFirst, kControlCodePresent)}, std::nullopt),
-        "nothing");
+    EXPECT_EQ(outcome(LifecycleEvent::SignallingChanged, {entry(kFirst, kControlCodePresent)}, std::nullopt),
+              "nothing");
     EXPECT_EQ(outcome(LifecycleEvent::SignallingChanged,
                       {entry(kThird, kControlCodeAutostart), entry(kFirst, kControlCodeAutostart)},
                       std::nullopt),
@@ -61,13 +60,12 @@ TEST(ApplicationLifecycleTest, EndsAnApplicationThatIsKilledDisabledOrSignalledN
         EXPECT_EQ(outcome(LifecycleEvent::SignallingChanged,
                           {entry(kFirst, code), entry(kSecond, kControlCodeAutostart)}, running(kFirst)),
                   "end, start 1.2");
-        EXPECT_EQ(outcome(LifecycleEvent::SignallingChanged, {entry(kFirst, code)}, std::nullopt),
-                  "nothing");
+        EXPECT_EQ(outcome(LifecycleEvent::SignallingChanged, {entry(kFirst, code)}, std::nullopt), "nothing");
     }
     EXPECT_EQ(outcome(LifecycleEvent::SignallingChanged, {}, running(kFirst)), "end");
-    EXPECT_EQ(outcome(LifecycleEvent::SignallingChanged, {entry(kSecond, kControlCodeAutostart)},
-                      running(kFirst)),
-              "end, start 1.2");
+    EXPECT_EQ(
+        outcome(LifecycleEvent::SignallingChanged, {entry(kSecond, kControlCodeAutostart)}, running(kFirst)),
+        "end, start 1.2");
 }
 
 TEST(ApplicationLifecycleTest, EndsAServiceBoundApplicationWithItsServiceAndKeepsOthersUntilTheAit) {

@@ -148,7 +148,7 @@ TEST_F(ApplicationSignallingTest, AddsAPageThatIsSignalledToItsChannelAlone) {
     zap(1);
     ASSERT_TRUE(waitForUrls({kDemonstration, kMedia, page}));
     const Applications first;
-    EXPECT_EQ(first.record().applications[2].applicationId, id); // so that it goes on
+    EXPECT_EQ(first.record().applications[2].applicationId, id);         // so that it goes on
     EXPECT_EQ(first.decide(TELIX_DESKTOP_SIGNALLING_CHANGED, ""), page); // before those of the broadcast
     EXPECT_EQ(first.decide(TELIX_DESKTOP_SIGNALLING_CHANGED, page), "");
     const uint64_t serial = first.record().serial;

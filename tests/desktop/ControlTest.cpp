@@ -213,7 +213,8 @@ TEST_F(ControlTest, ListsTheApplicationsOfTheChannelAndSignalsAnother) {
         applications = client.send(list);
         return find(applications, "$.applications[*].url") == urls;
     };
-    const std::string own = R"("http://127.0.0.1/apps/demo/index.html","http://127.0.0.1/apps/media/index.html")";
+    const std::string own =
+        R"("http://127.0.0.1/apps/demo/index.html","http://127.0.0.1/apps/media/index.html")";
     ASSERT_TRUE(waitUntil([&] { return hasUrls(own); })) << applications;
     EXPECT_EQ(find(applications, "$.state"), "\"known\"");
     EXPECT_EQ(find(applications, "$.channel.number"), "1");

@@ -21,9 +21,10 @@ class LatePipeline {
 public:
     explicit LatePipeline(SinkTiming::LateStart lateStart) : m_timing(lateStart) {
         Platform::instance(); // initialises GStreamer
-        m_pipeline = gst_parse_launch("appsrc name=source is-live=true format=time caps=audio/x-raw ! fakesink "
-                                      "name=sink sync=true signal-handoffs=true",
-                                      nullptr);
+        m_pipeline =
+            gst_parse_launch("appsrc name=source is-live=true format=time caps=audio/x-raw ! fakesink "
+                             "name=sink sync=true signal-handoffs=true",
+                             nullptr);
         GstElement* sink = gst_bin_get_by_name(GST_BIN(m_pipeline), "sink");
         m_timing.observe(sink);
         const auto onHandoff = +[](GstElement*, GstBuffer* buffer, GstPad*, gpointer self) {

@@ -124,8 +124,9 @@ TEST(XmlAitTest, RefusesWhatIsNoSuchDocumentWithTheReason) {
     EXPECT_THAT(errorOf(std::string(kMaxXmlAitSize + 1, ' ')), HasSubstr("larger than"));
     EXPECT_THAT(errorOf("<!DOCTYPE x [<!ENTITY a \"b\">]><ServiceDiscovery>&a;</ServiceDiscovery>"),
                 HasSubstr("document type"));
-    EXPECT_THAT(errorOf("<?xml version=\"1.0\" encoding=\"UTF-8\"?><ServiceDiscovery>\xFF</ServiceDiscovery>"),
-                HasSubstr("line 1: "));
+    EXPECT_THAT(
+        errorOf("<?xml version=\"1.0\" encoding=\"UTF-8\"?><ServiceDiscovery>\xFF</ServiceDiscovery>"),
+        HasSubstr("line 1: "));
 }
 
 TEST(XmlAitTest, TakesEveryBeginningOfADocumentWithoutHarm) {
