@@ -11,7 +11,7 @@ for purpose in "$@"; do
         packages+=(qtbase5-dev libqt5webkit5-dev fonts-dejavu-core xvfb xauth libgstreamer1.0-dev
             libgstreamer-plugins-base1.0-dev gstreamer1.0-plugins-base gstreamer1.0-plugins-good
             gstreamer1.0-plugins-bad gstreamer1.0-plugins-ugly gstreamer1.0-libav gstreamer1.0-x gstreamer1.0-alsa
-            ffmpeg libjson-glib-dev libcurl4-gnutls-dev python3)
+            ffmpeg libjson-glib-dev libcurl4-gnutls-dev libxml2-dev python3)
         ;;
     test)
         packages+=(libgtest-dev libgmock-dev libbenchmark-dev libexpat1-dev clang-14 libclang-rt-14-dev
