@@ -1,6 +1,6 @@
 #!/usr/bin/env bash
 # Installs the Debian packages that are missing for the given purposes.
-# Usage: tools/install-packages.sh run|test|machines ...
+# Usage: tools/install-packages.sh run|test|machines|packages ...
 set -euo pipefail
 
 packages=(build-essential cmake ninja-build pkg-config libglib2.0-dev)
@@ -21,8 +21,11 @@ for purpose in "$@"; do
         packages+=(g++-arm-linux-gnueabihf g++-aarch64-linux-gnu g++-i686-linux-gnu g++-mipsel-linux-gnu
             qemu-user-static googletest python3)
         ;;
+    packages)
+        packages+=(debhelper dpkg-dev lintian mmdebstrap python3 util-linux git)
+        ;;
     *)
-        echo "$0: $purpose: unknown purpose, expected run, test or machines" >&2
+        echo "$0: $purpose: unknown purpose, expected run, test, machines or packages" >&2
         exit 2
         ;;
     esac
