@@ -139,7 +139,7 @@ class Packages(unittest.TestCase):
         for tool in ('telix-tv', 'telixctl'):
             self.assertIn(version, root.run('xvfb-run', '-a', tool, '--version'))
         root.run('telix-conformance', '--help')
-        for file in ('/usr/include/telix/telix_platform.h', '/usr/share/doc/libtelix-dev/channel-change.md.gz'):
+        for file in ('/usr/include/telix/telix_platform.h', '/usr/share/doc/nptelixjs/docs/channel-change.md.gz'):
             self.assertTrue(os.path.exists(root.path + file), file)
 
 
