@@ -72,6 +72,7 @@ struct Configuration {
     uint32_t ratingThreshold;                // of the scheme "dvb-si": years of age
     std::vector<RatingScheme> ratingSchemes; // in the order of the file
     std::vector<DrmSystem> drmSystems;
+    uint32_t signalTimeout;       // seconds
     uint32_t freeMemory;          // bytes
     std::string capabilitiesFile; // absolute path; empty: the generated document
     uint32_t extraSdVideoDecodes;

@@ -1,17 +1,12 @@
 // The steps of a tune.
 #include "desktop/platform/ServicePresentation.h"
 
+#include <chrono>
 #include <cstdio>
 #include <mutex>
 #include <utility>
 
 namespace desktop {
-
-namespace {
-
-constexpr auto kTuneTimeout = std::chrono::milliseconds(6000);
-
-} // namespace
 
 ServicePresentation::ServicePresentation(const Channels& channels, TunerArbiter& arbiter,
                                          BroadcastComponents& components, Clock& clock, Listener listener)
@@ -99,7 +94,8 @@ void ServicePresentation::startTuner(const Tune& tune, uint16_t serviceId) {
         return;
     }
     selectService(tune, serviceId);
-    m_clock.callAfter(kTuneTimeout, [this, id = tune.id] { onTimeout(id); });
+    const std::chrono::seconds timeout(m_platform.configuration().signalTimeout);
+    m_clock.callAfter(timeout, [this, id = tune.id] { onTimeout(id); });
 }
 
 void ServicePresentation::selectService(const Tune& tune, uint16_t serviceId) {

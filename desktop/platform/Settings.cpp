@@ -206,6 +206,8 @@ const std::vector<Setting>& settings() {
         {kDrmSection, "result", custom(range(0, G_MAXINT32), readDrmResult), "0",
          "Result code of every message to this DRM system; 0 is success"},
         {kDrmSection, "message", custom("string", readDrmMessage), "", "Result message of every message"},
+        {"set", "signal-timeout", number(&C::signalTimeout, 1, 3600), "6",
+         "Seconds that a channel has to show its picture or sound; after that it has no signal"},
         {"set", "free-memory", number(&C::freeMemory, 0, G_MAXUINT32), "67108864",
          "Free memory that pages read, in bytes"},
         {"set", "keys", keys(&C::keys), "red;green;yellow;blue;navigation;vcr;scroll;info;numeric;alpha",

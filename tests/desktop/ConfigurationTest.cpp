@@ -4,6 +4,7 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 #include <set>
+#include <sys/stat.h>
 #include <unistd.h>
 
 #include "desktop/platform/Configuration.h"
@@ -124,6 +125,42 @@ TEST_F(ConfigurationTest, ChecksTheDocumentOfTheCapabilities) {
     std::remove(document.c_str());
 }
 
+// A device would be read without end, a pipe would block.
+TEST_F(ConfigurationTest, ReadsRegularFilesOfABoundedSizeOnly) {
+    const std::string fifo = m_file + ".fifo";
+    ASSERT_EQ(mkfifo(fifo.c_str(), 0600), 0);
+    for (const std::string& file : {std::string("/dev/zero"), fifo, std::string("/")}) {
+        const auto error = Configuration::load(file, m_configuration);
+        ASSERT_TRUE(error) << file;
+        EXPECT_EQ(error->message(), file + ": Not a regular file");
+        const auto inSetting = load("[set]\ncapabilities=" + file + "\n");
+        ASSERT_TRUE(inSetting) << file;
+        EXPECT_EQ(inSetting->message(), m_file + ":2: capabilities: " + file + ": Not a regular file");
+    }
+    unlink(fifo.c_str());
+
+    const std::string document = m_file + ".xml";
+    std::ofstream(document) << "<profilelist>" << std::string(1 << 20, ' ') << "</profilelist>";
+    const auto error = load("[set]\ncapabilities=" + document + "\n");
+    unlink(document.c_str());
+    ASSERT_TRUE(error);
+    EXPECT_EQ(error->reason, "capabilities: " + document + ": Larger than 1048576 bytes");
+    const auto tooLarge = load("[viewer]\ncountry=FRA\n" + std::string(1 << 20, '#'));
+    ASSERT_TRUE(tooLarge);
+    EXPECT_EQ(tooLarge->message(), m_file + ": Larger than 1048576 bytes");
+    EXPECT_EQ(m_configuration.country, "DEU");
+}
+
+TEST_F(ConfigurationTest, FindsTheLineOfASyntaxErrorInALargeFile) {
+    std::string contents = "[viewer]\n";
+    for (int line = 0; line < 50000; ++line) {
+        contents += "# note\n";
+    }
+    const auto error = load(contents + "nonsense\n" + contents);
+    ASSERT_TRUE(error);
+    EXPECT_EQ(error->line, 50002U);
+}
+
 TEST_F(ConfigurationTest, HasTheDefaultsOfTheTableWithoutAFile) {
     const Configuration defaults;
     ASSERT_EQ(defaults.sources.size(), 1U);
@@ -136,6 +173,7 @@ TEST_F(ConfigurationTest, HasTheDefaultsOfTheTableWithoutAFile) {
     EXPECT_EQ(defaults.ratingThreshold, 16U);
     EXPECT_TRUE(defaults.ratingSchemes.empty());
     EXPECT_TRUE(defaults.drmSystems.empty());
+    EXPECT_EQ(defaults.signalTimeout, 6U);
     EXPECT_EQ(defaults.freeMemory, 64U * 1024 * 1024);
     EXPECT_EQ(defaults.keys, 0x3FFU);
     EXPECT_EQ(defaults.keySet, 0x1FU);
