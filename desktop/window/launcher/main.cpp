@@ -1,0 +1,67 @@
+// telix-tv: starts the window of the desktop television on the engine that --engine selects.
+#include <glib.h>
+#include <unistd.h>
+
+#include <cerrno>
+#include <clocale>
+#include <cstring>
+
+#include "desktop/window/shared/CommandLine.h"
+#include "desktop/window/shared/Diagnostics.h"
+
+namespace desktop {
+
+namespace {
+
+// The default first. Each has a program of its own beside this one.
+const char* const kEngines[] = {"webkit", "npapi"};
+
+// The folder of this program.
+std::string ownFolder() {
+    g_autofree char* program = g_file_read_link("/proc/self/exe", nullptr);
+    g_autofree char* folder = g_path_get_dirname(program ? program : ".");
+    return folder;
+}
+
+std::string programOf(const std::string& engine) {
+    return ownFolder() + "/telix-tv-" + engine;
+}
+
+bool isBuilt(const std::string& engine) {
+    return access(programOf(engine).c_str(), X_OK) == 0;
+}
+
+// The engine to start; empty, after a message, if there is none.
+std::string selectEngine(const std::string& wanted) {
+    for (const std::string engine : kEngines) {
+        if ((wanted.empty() || wanted == engine) && isBuilt(engine)) {
+            return engine;
+        }
+    }
+    for (const std::string engine : kEngines) {
+        if (wanted == engine) {
+            printError("--engine: the engine \"" + wanted + "\" is not built");
+            return {};
+        }
+    }
+    printError(wanted.empty() ? "no engine is built"
+                              : "--engine: unknown engine \"" + wanted + "\", expected webkit or npapi");
+    return {};
+}
+
+} // namespace
+
+} // namespace desktop
+
+int main(int argc, char* argv[]) {
+    std::setlocale(LC_ALL, "");
+    const auto wanted = desktop::engineOption({argv, argv + argc});
+    const std::string engine = desktop::selectEngine(wanted);
+    if (engine.empty()) {
+        return desktop::kExitBadInput;
+    }
+    const std::string program = desktop::programOf(engine);
+    execv(program.c_str(), argv);
+    desktop::printError("cannot start " + program + ": " + std::strerror(errno));
+    return desktop::kExitBadInput;
+}

@@ -1,0 +1,67 @@
+// The widget of one application: paints its page and gives it keys and mouse events.
+#ifndef TELIX_DESKTOP_WINDOW_NPAPI_APPLICATIONVIEW_H
+#define TELIX_DESKTOP_WINDOW_NPAPI_APPLICATIONVIEW_H
+
+#include <QWebView>
+
+namespace desktop {
+
+class ApplicationPage;
+struct RemoteKey;
+
+// The page is laid out for 1280x720 pixels whatever the size of the widget, and painted scaled: scripts and
+// plug-ins see the same geometry in every window.
+class ApplicationView : public QWebView {
+    Q_OBJECT
+
+public:
+    // `userAgent`: the User-Agent header of requests, and navigator.userAgent.
+    ApplicationView(const QString& userAgent, QWidget* parent);
+    ~ApplicationView() override;
+
+    ApplicationPage& applicationPage() const { return *m_page; }
+    // Whether a document is loaded and no other is being loaded.
+    bool isLoaded() const { return m_loaded; }
+    // Whether there is a document, even if the next one is being loaded or could not be loaded.
+    bool hasDocument() const { return m_hasDocument; }
+    // Whether the application is the visible one of the stack.
+    void setOnTop(bool isOnTop);
+    // A hidden application paints nothing. It keeps running and receiving keys, so that it can show itself
+    // again on a key press.
+    void setShown(bool shown);
+    // Sends the press and the release of a key, as the keyboard would.
+    void press(const RemoteKey& key);
+
+signals:
+    // A document could not be loaded; the previous one stays.
+    void loadFailed(const QString& reason);
+
+protected:
+    void paintEvent(QPaintEvent* event) override;
+    void resizeEvent(QResizeEvent* event) override;
+    void mousePressEvent(QMouseEvent* event) override;
+    void mouseReleaseEvent(QMouseEvent* event) override;
+    void mouseMoveEvent(QMouseEvent* event) override;
+    void mouseDoubleClickEvent(QMouseEvent* event) override;
+    void wheelEvent(QWheelEvent* event) override;
+    void contextMenuEvent(QContextMenuEvent* event) override;
+    void showEvent(QShowEvent* event) override;
+    void hideEvent(QHideEvent* event) override;
+    void keyPressEvent(QKeyEvent* event) override;
+    void keyReleaseEvent(QKeyEvent* event) override;
+
+private:
+    void onLoadFinished(bool ok);
+    void updateVisibilityState();
+    QMouseEvent inPageCoordinates(const QMouseEvent& event) const;
+    void dispatchKeyEvent(const char* type, const RemoteKey& key, bool isRepeat);
+
+    ApplicationPage* m_page;
+    bool m_loaded = false;
+    bool m_hasDocument = false;
+    bool m_shown = true;
+};
+
+} // namespace desktop
+
+#endif

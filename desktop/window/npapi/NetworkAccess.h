@@ -1,0 +1,24 @@
+// The network access of pages: the engine's, with support for the content type of HbbTV documents.
+#ifndef TELIX_DESKTOP_WINDOW_NPAPI_NETWORKACCESS_H
+#define TELIX_DESKTOP_WINDOW_NPAPI_NETWORKACCESS_H
+
+#include <QNetworkAccessManager>
+
+namespace desktop {
+
+// The engine does not support `application/vnd.hbbtv.xhtml+xml`. Documents of that type, and local files
+// named *.hbbtv, reach it as `application/xhtml+xml`; everything else is unchanged.
+class NetworkAccess : public QNetworkAccessManager {
+    Q_OBJECT
+
+public:
+    using QNetworkAccessManager::QNetworkAccessManager;
+
+protected:
+    QNetworkReply* createRequest(Operation operation, const QNetworkRequest& request,
+                                 QIODevice* outgoingData) override;
+};
+
+} // namespace desktop
+
+#endif

@@ -1,0 +1,144 @@
+// The window of the desktop television on QtWebKit.
+#include <glib-unix.h>
+
+#include <QAbstractEventDispatcher>
+#include <QApplication>
+#include <QScreen>
+#include <QWebSettings>
+#include <QtWebKit/qtwebkitversion.h>
+#include <QtWebKit/qwebkitglobal.h>
+
+#include <clocale>
+#include <csignal>
+#include <cstdio>
+
+#include "desktop/window/npapi/PluginFolder.h"
+#include "desktop/window/npapi/StyleSheet.h"
+#include "desktop/window/npapi/TvWindow.h"
+#include "desktop/window/shared/Automation.h"
+#include "desktop/window/shared/CommandLine.h"
+#include "desktop/window/shared/Diagnostics.h"
+#include "desktop/window/shared/LoadCheck.h"
+#include "desktop/window/shared/PluginFile.h"
+
+namespace desktop {
+
+namespace {
+
+EngineInformation engineInformation() {
+    return {std::string("QtWebKit " QTWEBKIT_VERSION_STR ", Qt ") + qVersion(),
+            QStringLiteral("Mozilla/5.0 (X11; Linux) AppleWebKit/%1 (KHTML, like Gecko) Safari/%1")
+                .arg(qWebKitVersion())
+                .toStdString()};
+}
+
+void configureEngine(const PluginFile& plugin, const PluginFolder& folder, bool inspect) {
+    QWebSettings* settings = QWebSettings::globalSettings();
+    QWebSettings::setPluginSearchPaths({folder.path()});
+    settings->setAttribute(QWebSettings::PluginsEnabled, true);
+    settings->setAttribute(QWebSettings::DeveloperExtrasEnabled, inspect);
+    settings->setUserStyleSheetUrl(styleSheetUrl(QString::fromStdString(plugin.styleSheet())));
+}
+
+// Exits the event loop, so that destructors remove temporary files.
+gboolean onTermination(gpointer signalNumber) {
+    QCoreApplication::exit(kExitSignalled + GPOINTER_TO_INT(signalNumber));
+    return G_SOURCE_CONTINUE;
+}
+
+// Runs the window until it exits, and destroys it with all pages. `evaluated` receives the value of --eval.
+int runWindow(const CommandLine& commandLine, std::optional<std::string>& evaluated) {
+    TvWindow window(QString::fromStdString(commandLine.userAgent));
+    Automation automation(window, commandLine, QCoreApplication::exit);
+    QObject::connect(&window, &TvWindow::loadFailed, [&](const QUrl& url, const QString& reason) {
+        automation.onLoadFailed(url.toDisplayString().toStdString(), reason.toStdString());
+    });
+    QObject::connect(qGuiApp, &QGuiApplication::lastWindowClosed, [&] { automation.onWindowClosed(); });
+    if (commandLine.fullscreen) {
+        // Without a window manager nothing else sets the size.
+        window.setGeometry(QGuiApplication::primaryScreen()->geometry());
+        window.showFullScreen();
+    } else {
+        window.resize(commandLine.width, commandLine.height);
+        window.show();
+    }
+    window.openApplication(QUrl(QString::fromStdString(commandLine.page)));
+    if (commandLine.inspect) {
+        window.inspect();
+    }
+    const int exitStatus = QCoreApplication::exec();
+    evaluated = automation.evaluated();
+    return exitStatus;
+}
+
+// Whether the event loop and the page can be used; prints the error if not.
+bool isUsable(const CommandLine& commandLine) {
+    if (!QAbstractEventDispatcher::instance()->inherits("QEventDispatcherGlib")) {
+        printError(
+            "Qt does not use the GLib main loop, which delivers the events of the plug-in; is QT_NO_GLIB "
+            "set?");
+        return false;
+    }
+    const std::string error = loadError(commandLine.page, commandLine.userAgent);
+    if (!error.empty()) {
+        printError("cannot load " + commandLine.page + ": " + error);
+        return false;
+    }
+    return true;
+}
+
+int runBrowser(const CommandLine& commandLine, char** argv) {
+    if (qEnvironmentVariableIsEmpty("DISPLAY")) {
+        printError("no display: DISPLAY is not set");
+        return kExitBadInput;
+    }
+    const PluginFile plugin(commandLine.plugin);
+    if (!plugin.failure().empty()) {
+        printError("cannot load plug-in " + commandLine.plugin + ": " + plugin.failure());
+        return kExitBadInput;
+    }
+    const PluginFolder folder(plugin);
+    if (!folder.failure().isEmpty()) {
+        printError(folder.failure().toStdString());
+        return kExitBadInput;
+    }
+    // The engine supports plug-ins on X11 only.
+    if (!qEnvironmentVariableIsSet("QT_QPA_PLATFORM")) {
+        qputenv("QT_QPA_PLATFORM", "xcb");
+    }
+    int qtArgumentCount = 1; // Qt must not interpret the options of telix-tv
+    QApplication application(qtArgumentCount, argv);
+    QApplication::setQuitOnLastWindowClosed(false); // Automation exits with its own status
+    if (!isUsable(commandLine)) {
+        return kExitBadInput;
+    }
+    for (const int signalNumber : {SIGINT, SIGTERM, SIGHUP}) {
+        g_unix_signal_add(signalNumber, onTermination, GINT_TO_POINTER(signalNumber));
+    }
+    configureEngine(plugin, folder, commandLine.inspect);
+
+    std::optional<std::string> evaluated;
+    const int exitStatus = runWindow(commandLine, evaluated);
+    // Runs callbacks that the plug-in has deferred to the event loop.
+    QCoreApplication::processEvents();
+    // The last line of the output, after what the plug-in logs in its teardown.
+    if (evaluated) {
+        std::puts(evaluated->c_str());
+    }
+    return exitStatus;
+}
+
+} // namespace
+
+} // namespace desktop
+
+int main(int argc, char* argv[]) {
+    std::setlocale(LC_ALL, "");
+    desktop::CommandLine commandLine;
+    // --help and usage errors need no display.
+    if (const auto exitStatus =
+            desktop::readCommandLine({argv, argv + argc}, desktop::engineInformation(), commandLine)) {
+        return *exitStatus;
+    }
+    return desktop::runBrowser(commandLine, argv);
+}

@@ -1,0 +1,317 @@
+// The options of telix-tv.
+#include "desktop/window/shared/CommandLine.h"
+
+#include <gio/gio.h>
+
+#include <algorithm>
+#include <cmath>
+#include <cstdio>
+#include <regex>
+
+#include "desktop/window/shared/Diagnostics.h"
+
+namespace desktop {
+
+namespace {
+
+const char kDescription[] =
+    R"(Automation performs these steps in this order, each only if its option is given:
+  1. load the page;
+  2. press --keys, one after the other, each when the page that the previous one opened is loaded;
+  3. evaluate --wait-for repeatedly until it is true;
+  4. --wait-for-picture: wait until the video plane shows broadcast or media;
+  5. evaluate --eval and print its value as the last line on standard output;
+  6. write --screenshot, also after a timeout;
+  7. exit, if --wait-for, --wait-for-picture, --eval or --screenshot is given.
+Expressions and keys go to the topmost application, the visible one, when it is loaded. An expression that throws
+counts as false. --timeout applies to all steps together.
+
+Exit status: 0 if all steps are done; 1 after a timeout or if --eval throws; 2 for a bad option and for a page or a
+plug-in that cannot be loaded; 3 if the process of the page ends by itself, with the engine webkit.
+
+Keyboard: arrow keys, Enter (OK), Backspace or Escape (Back), F1 to F4 (red, green, yellow, blue), F5 to F10 or the
+media keys (play, pause, stop, rewind, fast forward, info), and the digits.)";
+
+constexpr int kMaxSide = 16384;
+constexpr double kMaxTimeoutSeconds = 24 * 60 * 60;
+constexpr char kDefaultSize[] = "1280x720";
+constexpr char kDefaultTimeout[] = "30";
+
+// HbbTV token of TS 102 796: capabilities (none), vendor, model, software version, hardware version, a
+// reserved field.
+constexpr char kHbbtvToken[] = " HbbTV/1.1.1 (;Telix;telix-tv;" TELIX_VERSION ";;)";
+
+std::string keyNames() {
+    std::string names;
+    for (const auto& key : remoteKeys()) {
+        names += (names.empty() ? "" : ", ") + std::string(key.name);
+    }
+    return names;
+}
+
+// Values as given: of the encoding of file names, null if the option is not given.
+struct Values {
+    ~Values() {
+        for (char* value :
+             {engine, size, plugin, keys, waitFor, timeout, eval, screenshot, userAgent, inspectorServer}) {
+            g_free(value);
+        }
+        g_strfreev(pages);
+    }
+
+    char* engine = nullptr;
+    char* size = nullptr;
+    gboolean fullscreen = false;
+    char* plugin = nullptr;
+    char* keys = nullptr;
+    char* waitFor = nullptr;
+    gboolean waitForPicture = false;
+    char* timeout = nullptr;
+    char* eval = nullptr;
+    char* screenshot = nullptr;
+    char* userAgent = nullptr;
+    gboolean inspect = false;
+    char* inspectorServer = nullptr;
+    gboolean help = false;
+    gboolean version = false;
+    char** pages = nullptr;
+};
+
+// The descriptions that are made at run time, and the parser.
+class Parser {
+public:
+    Parser(Values& values, const std::string& userAgent)
+        : m_keys("Press keys of the remote control: " + keyNames() + "."),
+          m_userAgent("The user agent string, default " + userAgent + ".") {
+        m_context = g_option_context_new("URL-or-FILE");
+        g_option_context_set_help_enabled(m_context, FALSE);
+        g_option_context_set_summary(
+            m_context,
+            "The window of the desktop television: shows a page of an HbbTV application with the plug-in.");
+        g_option_context_set_description(m_context, kDescription);
+        addEntries(values);
+    }
+    ~Parser() { g_option_context_free(m_context); }
+    Parser(const Parser&) = delete;
+    Parser& operator=(const Parser&) = delete;
+
+    // The usage error; empty if there is none.
+    std::string parse(const std::vector<std::string>& arguments) {
+        // The parser takes the vector apart.
+        g_autoptr(GPtrArray) list = g_ptr_array_new();
+        for (const auto& argument : arguments) {
+            g_ptr_array_add(list, g_strdup(argument.c_str()));
+        }
+        g_ptr_array_add(list, nullptr);
+        char** vector = reinterpret_cast<char**>(g_ptr_array_steal(list, nullptr));
+        g_autoptr(GError) error = nullptr;
+        g_option_context_parse_strv(m_context, &vector, &error);
+        g_strfreev(vector);
+        return error ? error->message : "";
+    }
+
+    std::string help() const {
+        g_autofree char* text = g_option_context_get_help(m_context, TRUE, nullptr);
+        return text;
+    }
+
+private:
+    void addEntries(Values& values) {
+        // File names are taken as they are; GLib would convert other strings from the locale's encoding.
+        constexpr auto kText = G_OPTION_ARG_FILENAME;
+        constexpr auto kFlag = G_OPTION_ARG_NONE;
+        const GOptionEntry entries[] = {
+            {"engine", 0, 0, kText, &values.engine, "The browser engine: webkit (default) or npapi.", "NAME"},
+            {"size", 0, 0, kText, &values.size,
+             "Size of the window in pixels, default 1280x720. The page is scaled to it.", "WxH"},
+            {"fullscreen", 0, 0, kFlag, &values.fullscreen, "Fill the screen.", nullptr},
+            {"plugin", 0, 0, kText, &values.plugin, "The plug-in to load, default " TELIX_DEFAULT_PLUGIN ".",
+             "FILE"},
+            {"keys", 0, 0, kText, &values.keys, m_keys.c_str(), "NAME,NAME..."},
+            {"wait-for", 0, 0, kText, &values.waitFor, "Wait until the expression is true.", "EXPR"},
+            {"wait-for-picture", 0, 0, kFlag, &values.waitForPicture,
+             "Wait until the video plane shows something.", nullptr},
+            {"timeout", 0, 0, kText, &values.timeout, "Timeout of all steps in seconds, default 30.",
+             "SECONDS"},
+            {"eval", 0, 0, kText, &values.eval, "Print the value of the expression as JSON.", "EXPR"},
+            {"screenshot", 0, 0, kText, &values.screenshot, "Write a screenshot of the window.", "FILE.png"},
+            {"user-agent", 0, 0, kText, &values.userAgent, m_userAgent.c_str(), "TEXT"},
+            {"inspect", 0, 0, kFlag, &values.inspect, "Open the web inspector.", nullptr},
+            {"inspector-server", 0, 0, kText, &values.inspectorServer,
+             "Let a remote web inspector connect, with the engine webkit.", "HOST:PORT"},
+            {"help", 'h', 0, kFlag, &values.help, "Print this text.", nullptr},
+            {"version", 0, 0, kFlag, &values.version, "Print the version.", nullptr},
+            {G_OPTION_REMAINING, 0, 0, G_OPTION_ARG_FILENAME_ARRAY, &values.pages, nullptr, nullptr},
+            {nullptr, 0, 0, kFlag, nullptr, nullptr, nullptr}};
+        g_option_context_add_main_entries(m_context, entries, nullptr);
+    }
+
+    std::string m_keys;
+    std::string m_userAgent;
+    GOptionContext* m_context;
+};
+
+// Handles --help and --version, which need nothing else of the command line.
+bool printInformation(const Parser& parser, const Values& values, const EngineInformation& engine) {
+    if (values.help) {
+        std::fputs(parser.help().c_str(), stdout);
+        return true;
+    }
+    if (values.version) {
+        std::printf("telix-tv %s (%s)\n", TELIX_VERSION, engine.versions.c_str());
+        return true;
+    }
+    return false;
+}
+
+// A string with a scheme is a URL, any other a file name.
+std::string urlOf(const std::string& page) {
+    static const std::regex kScheme("^([a-zA-Z][a-zA-Z0-9+.-]*://|data:|about:)");
+    if (std::regex_search(page, kScheme)) {
+        return page;
+    }
+    g_autoptr(GFile) file = g_file_new_for_path(page.c_str());
+    g_autofree char* url = g_file_get_uri(file);
+    return url;
+}
+
+// The following functions return the usage error, an empty string if there is none.
+
+std::string parseSize(const std::string& text, CommandLine& commandLine) {
+    static const std::regex kSize("([1-9][0-9]{0,4})x([1-9][0-9]{0,4})");
+    std::smatch match;
+    if (std::regex_match(text, match, kSize)) {
+        commandLine.width = std::stoi(match[1]);
+        commandLine.height = std::stoi(match[2]);
+        if (commandLine.width <= kMaxSide && commandLine.height <= kMaxSide) {
+            return {};
+        }
+    }
+    return "--size: bad size \"" + text + "\", expected WxH";
+}
+
+std::string parseTimeout(const std::string& text, CommandLine& commandLine) {
+    char* end = nullptr;
+    const double seconds = g_ascii_strtod(text.c_str(), &end);
+    if (text.empty() || *end || !(seconds > 0 && seconds <= kMaxTimeoutSeconds)) {
+        return "--timeout: bad timeout \"" + text + "\", expected seconds";
+    }
+    commandLine.timeoutSeconds = seconds;
+    return {};
+}
+
+std::string parseKeys(const std::string& list, CommandLine& commandLine) {
+    for (std::size_t start = 0; start <= list.size();) {
+        const std::size_t end = std::min(list.find(',', start), list.size());
+        const std::string name = list.substr(start, end - start);
+        const RemoteKey* key = remoteKeyByName(name);
+        if (!key) {
+            return "--keys: unknown key \"" + name + "\"";
+        }
+        commandLine.keys.push_back(key);
+        start = end + 1;
+    }
+    return {};
+}
+
+std::string parseInspectorServer(const std::string& text, CommandLine& commandLine) {
+    g_autoptr(GSocketConnectable) endpoint = g_network_address_parse(text.c_str(), 0, nullptr);
+    if (!endpoint || g_network_address_get_port(G_NETWORK_ADDRESS(endpoint)) == 0) {
+        return "--inspector-server: bad address \"" + text + "\", expected HOST:PORT";
+    }
+    commandLine.inspectorServer = text;
+    return {};
+}
+
+std::string checkStrings(const Values& values) {
+    const struct {
+        const char* name;
+        const char* value;
+    } options[] = {{"--wait-for", values.waitFor},
+                   {"--eval", values.eval},
+                   {"--screenshot", values.screenshot},
+                   {"--plugin", values.plugin},
+                   {"--user-agent", values.userAgent}};
+    for (const auto& option : options) {
+        if (option.value && simplified(option.value).empty()) {
+            return std::string(option.name) + ": empty value";
+        }
+    }
+    for (const auto& option : {options[0], options[1], options[4]}) {
+        if (option.value && !g_utf8_validate(option.value, -1, nullptr)) {
+            return std::string(option.name) + ": not UTF-8";
+        }
+    }
+    // The user agent becomes a line of a request header.
+    for (const char* letter = values.userAgent; letter && *letter; letter = g_utf8_next_char(letter)) {
+        if (g_unichar_iscntrl(g_utf8_get_char(letter))) {
+            return "--user-agent: control character in the user agent";
+        }
+    }
+    return {};
+}
+
+std::string parseValues(const Values& values, CommandLine& commandLine) {
+    if (!values.pages || g_strv_length(values.pages) != 1) {
+        return "expected exactly one page, see --help";
+    }
+    commandLine.page = urlOf(values.pages[0]);
+    std::string error = parseSize(values.size ? values.size : kDefaultSize, commandLine);
+    if (error.empty()) {
+        error = parseTimeout(values.timeout ? values.timeout : kDefaultTimeout, commandLine);
+    }
+    if (error.empty() && values.keys) {
+        error = parseKeys(values.keys, commandLine);
+    }
+    if (error.empty() && values.inspectorServer) {
+        error = parseInspectorServer(values.inspectorServer, commandLine);
+    }
+    return error.empty() ? checkStrings(values) : error;
+}
+
+std::optional<std::string> optional(const char* value) {
+    return value ? std::optional<std::string>(value) : std::nullopt;
+}
+
+// Reports a usage error.
+std::optional<int> reject(const std::string& error) {
+    printError(error);
+    return kExitBadInput;
+}
+
+} // namespace
+
+std::optional<int> readCommandLine(const std::vector<std::string>& arguments, const EngineInformation& engine,
+                                   CommandLine& commandLine) {
+    const std::string defaultUserAgent = engine.userAgent + kHbbtvToken;
+    Values values;
+    Parser parser(values, defaultUserAgent);
+    const std::string parserError = parser.parse(arguments);
+    if (!parserError.empty()) {
+        return reject(parserError);
+    }
+    if (printInformation(parser, values, engine)) {
+        return kExitSuccess;
+    }
+    const std::string error = parseValues(values, commandLine);
+    if (!error.empty()) {
+        return reject(error);
+    }
+    commandLine.fullscreen = values.fullscreen;
+    commandLine.inspect = values.inspect;
+    commandLine.plugin = values.plugin ? values.plugin : TELIX_DEFAULT_PLUGIN;
+    commandLine.userAgent = values.userAgent ? values.userAgent : defaultUserAgent;
+    commandLine.waitForPicture = values.waitForPicture;
+    commandLine.waitFor = optional(values.waitFor);
+    commandLine.eval = optional(values.eval);
+    commandLine.screenshot = optional(values.screenshot);
+    return std::nullopt;
+}
+
+std::string engineOption(const std::vector<std::string>& arguments) {
+    Values values;
+    Parser parser(values, "");
+    return parser.parse(arguments).empty() && values.engine ? values.engine : "";
+}
+
+} // namespace desktop

@@ -1,0 +1,57 @@
+// The options of telix-tv.
+#ifndef TELIX_DESKTOP_WINDOW_SHARED_COMMANDLINE_H
+#define TELIX_DESKTOP_WINDOW_SHARED_COMMANDLINE_H
+
+#include <optional>
+#include <string>
+#include <vector>
+
+#include "desktop/window/shared/RemoteControl.h"
+
+namespace desktop {
+
+// What the options depend on.
+struct EngineInformation {
+    // The engine and its toolkit with their versions, for --version.
+    std::string versions;
+    // The engine's own user agent string.
+    std::string userAgent;
+};
+
+struct CommandLine {
+    // The URL of the page, also if a file name is given.
+    std::string page;
+    int width = 0;
+    int height = 0;
+    bool fullscreen = false;
+    bool inspect = false;
+    // HOST:PORT; empty if the option is not given.
+    std::string inspectorServer;
+    // File name of the plug-in.
+    std::string plugin;
+    std::vector<const RemoteKey*> keys;
+    std::string userAgent;
+    bool waitForPicture = false;
+    std::optional<std::string> waitFor;
+    std::optional<std::string> eval;
+    std::optional<std::string> screenshot;
+    double timeoutSeconds = 0;
+
+    // Whether the program exits when all steps are done.
+    bool quitsWhenDone() const { return waitForPicture || waitFor || eval || screenshot; }
+    // Whether there are steps at all.
+    bool hasSteps() const { return quitsWhenDone() || !keys.empty(); }
+};
+
+// Parses the arguments (the program's name first) into `commandLine`. Returns the exit status if the program
+// shall exit: after --help or --version, which are handled here, and after a usage error, which is printed.
+std::optional<int> readCommandLine(const std::vector<std::string>& arguments, const EngineInformation& engine,
+                                   CommandLine& commandLine);
+
+// The value of --engine; empty if it is not given, or if the arguments cannot be parsed, which
+// readCommandLine() reports.
+std::string engineOption(const std::vector<std::string>& arguments);
+
+} // namespace desktop
+
+#endif

@@ -1,0 +1,45 @@
+// The video frames of the platform library that the plug-in has loaded.
+#ifndef TELIX_DESKTOP_WINDOW_SHARED_FRAMESOURCE_H
+#define TELIX_DESKTOP_WINDOW_SHARED_FRAMESOURCE_H
+
+#include "desktop/platform/telix_picture.h"
+
+namespace desktop {
+
+// All functions are for one thread.
+class FrameSource {
+public:
+    // `wakeup` is called with `data` on any thread when a frame or its placement is new, see telix_picture.h.
+    FrameSource(telix_desktop_wakeup wakeup, void* data);
+    // Afterwards the wake-up callback is not running and is never called again.
+    ~FrameSource();
+    FrameSource(const FrameSource&) = delete;
+    FrameSource& operator=(const FrameSource&) = delete;
+
+    // Searches the loaded libraries for the platform library, unless it is found already, and returns
+    // whether it is found. Returns early if no library has been loaded since the last call. A libtelix.so
+    // without the functions of telix_picture.h is ignored.
+    bool find();
+
+    // Replaces the current frame by the newest one.
+    void refresh();
+    // Releases the current frame, whose buffer is free for the decoder again.
+    void drop();
+    // The frame of the last refresh(), valid until the next one or drop(). Not visible if there is no library.
+    const telix_desktop_frame& frame() const { return m_frame; }
+
+private:
+    bool bind(const char* file);
+
+    telix_desktop_wakeup m_wakeup;
+    void* m_wakeupData;
+    unsigned long long m_knownLoads = 0;
+    telix_desktop_set_wakeup_function m_setWakeup = nullptr;
+    telix_desktop_acquire_frame_function m_acquire = nullptr;
+    telix_desktop_release_frame_function m_release = nullptr;
+    telix_desktop_frame m_frame{};
+};
+
+} // namespace desktop
+
+#endif

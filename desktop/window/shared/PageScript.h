@@ -1,0 +1,34 @@
+// The browser's own scripts: files in scripts/, each with one function expression.
+#ifndef TELIX_DESKTOP_WINDOW_SHARED_PAGESCRIPT_H
+#define TELIX_DESKTOP_WINDOW_SHARED_PAGESCRIPT_H
+
+#include <string>
+#include <vector>
+
+namespace desktop {
+
+// A value in the source of a script.
+class ScriptValue {
+public:
+    // A string. `text` is UTF-8.
+    ScriptValue(const std::string& text);
+    ScriptValue(const char* text) : ScriptValue(std::string(text)) {}
+    ScriptValue(int number) : m_source(std::to_string(number)) {}
+    ScriptValue(bool truth) : m_source(truth ? "true" : "false") {}
+
+    const std::string& source() const { return m_source; }
+
+private:
+    std::string m_source;
+};
+
+// The source of an expression that calls the function of scripts/`name`.js.
+std::string pageScriptCall(const std::string& name, const std::vector<ScriptValue>& arguments);
+
+// The source of an expression that adds the functions and key codes of scripts/pagefunctions.js to a window
+// object.
+std::string pageFunctionsScript();
+
+} // namespace desktop
+
+#endif

@@ -1,0 +1,74 @@
+// The keys of the remote control: their names, their key codes in pages, the keyboard keys mapped to them,
+// and the group of the key set that they belong to.
+#include "desktop/window/shared/RemoteControl.h"
+
+#include <X11/XF86keysym.h>
+#include <X11/keysym.h>
+
+#include <algorithm>
+
+namespace desktop {
+
+namespace {
+
+// XF86XK_Info of newer headers.
+constexpr uint32_t kInfoKeysym = 0x10081166;
+
+} // namespace
+
+const std::vector<RemoteKey>& remoteKeys() {
+    constexpr auto kNavigation = KeyGroupNavigation;
+    // Many keyboards have no media keys, so F5 to F10 are mapped as well. The digits of the keypad have
+    // keysyms of their own.
+    static const std::vector<RemoteKey> kKeys = {
+        {"left", 37, "VK_LEFT", true, kNavigation, {XK_Left, XK_KP_Left}},
+        {"up", 38, "VK_UP", true, kNavigation, {XK_Up, XK_KP_Up}},
+        {"right", 39, "VK_RIGHT", true, kNavigation, {XK_Right, XK_KP_Right}},
+        {"down", 40, "VK_DOWN", true, kNavigation, {XK_Down, XK_KP_Down}},
+        {"ok", 13, "VK_ENTER", true, kNavigation, {XK_Return, XK_KP_Enter}},
+        {"back", 461, "VK_BACK", false, kNavigation, {XK_BackSpace, XK_Escape, XF86XK_Back}},
+        {"red", 403, "VK_RED", false, KeyGroupRed, {XK_F1, XF86XK_Red}},
+        {"green", 404, "VK_GREEN", false, KeyGroupGreen, {XK_F2, XF86XK_Green}},
+        {"yellow", 405, "VK_YELLOW", false, KeyGroupYellow, {XK_F3, XF86XK_Yellow}},
+        {"blue", 406, "VK_BLUE", false, KeyGroupBlue, {XK_F4, XF86XK_Blue}},
+        {"play", 415, "VK_PLAY", false, KeyGroupVcr, {XK_F5, XF86XK_AudioPlay}},
+        {"pause", 19, "VK_PAUSE", false, KeyGroupVcr, {XK_F6, XF86XK_AudioPause, XK_Pause}},
+        {"stop", 413, "VK_STOP", false, KeyGroupVcr, {XK_F7, XF86XK_AudioStop}},
+        {"rewind", 412, "VK_REWIND", false, KeyGroupVcr, {XK_F8, XF86XK_AudioRewind}},
+        {"fast-forward", 417, "VK_FAST_FWD", false, KeyGroupVcr, {XK_F9, XF86XK_AudioForward}},
+        {"info", 457, "VK_INFO", false, KeyGroupInfo, {XK_F10, kInfoKeysym}},
+        {"0", 48, "VK_0", true, KeyGroupNumeric, {XK_0, XK_KP_0}},
+        {"1", 49, "VK_1", true, KeyGroupNumeric, {XK_1, XK_KP_1}},
+        {"2", 50, "VK_2", true, KeyGroupNumeric, {XK_2, XK_KP_2}},
+        {"3", 51, "VK_3", true, KeyGroupNumeric, {XK_3, XK_KP_3}},
+        {"4", 52, "VK_4", true, KeyGroupNumeric, {XK_4, XK_KP_4}},
+        {"5", 53, "VK_5", true, KeyGroupNumeric, {XK_5, XK_KP_5}},
+        {"6", 54, "VK_6", true, KeyGroupNumeric, {XK_6, XK_KP_6}},
+        {"7", 55, "VK_7", true, KeyGroupNumeric, {XK_7, XK_KP_7}},
+        {"8", 56, "VK_8", true, KeyGroupNumeric, {XK_8, XK_KP_8}},
+        {"9", 57, "VK_9", true, KeyGroupNumeric, {XK_9, XK_KP_9}},
+    };
+    return kKeys;
+}
+
+const RemoteKey* remoteKeyByName(const std::string& name) {
+    const auto& keys = remoteKeys();
+    const auto found =
+        std::find_if(keys.begin(), keys.end(), [&](const RemoteKey& key) { return name == key.name; });
+    return found == keys.end() ? nullptr : &*found;
+}
+
+const RemoteKey* remoteKeyByKeyboardKey(uint32_t keysym) {
+    const auto& keys = remoteKeys();
+    const auto found = std::find_if(keys.begin(), keys.end(), [keysym](const RemoteKey& key) {
+        return std::find(key.keyboardKeys.begin(), key.keyboardKeys.end(), keysym) != key.keyboardKeys.end();
+    });
+    return found == keys.end() ? nullptr : &*found;
+}
+
+std::string textOf(const RemoteKey& key) {
+    const bool hasText = key.keyCode == '\r' || (key.keyCode >= '0' && key.keyCode <= '9');
+    return hasText ? std::string(1, static_cast<char>(key.keyCode)) : std::string();
+}
+
+} // namespace desktop

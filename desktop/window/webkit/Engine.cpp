@@ -1,0 +1,122 @@
+// The browser engine of the window: its context, settings and what it adds to every page.
+#include "desktop/window/webkit/Engine.h"
+
+#include "desktop/window/shared/CommandLine.h"
+#include "desktop/window/shared/PluginFile.h"
+#include "desktop/window/webkit/PageChannel.h"
+#include "desktop/window/webkit/Profile.h"
+#include "desktop/window/webkit/WebProcessOutput.h"
+
+namespace desktop {
+
+namespace {
+
+// A television has no scroll bars.
+constexpr char kWindowStyle[] = "::-webkit-scrollbar { display: none !important; }\n";
+
+// Features of the engine that a hidden application cannot do with: its timers run as fast as those of a
+// visible one, because it may show itself again.
+const char* const kDisabledFeatures[] = {"HiddenPageDOMTimerThrottlingEnabled",
+                                         "HiddenPageDOMTimerThrottlingAutoIncreases",
+                                         "PageVisibilityBasedProcessSuppressionEnabled"};
+
+void disableFeatures(WebKitSettings* settings) {
+    g_autoptr(WebKitFeatureList) features = webkit_settings_get_all_features();
+    for (gsize index = 0; index < webkit_feature_list_get_length(features); ++index) {
+        WebKitFeature* feature = webkit_feature_list_get(features, index);
+        for (const char* name : kDisabledFeatures) {
+            if (g_strcmp0(webkit_feature_get_identifier(feature), name) == 0) {
+                webkit_settings_set_feature_enabled(settings, feature, FALSE);
+            }
+        }
+    }
+}
+
+WebKitSettings* newSettings(const CommandLine& commandLine) {
+    const gboolean isInspected = commandLine.inspect || !commandLine.inspectorServer.empty();
+    WebKitSettings* settings = WEBKIT_SETTINGS(g_object_new(
+        WEBKIT_TYPE_SETTINGS, "user-agent", commandLine.userAgent.c_str(), "enable-developer-extras",
+        isInspected,
+        // Otherwise the engine would bring back pages whose plug-in objects have ended.
+        "enable-page-cache", FALSE,
+        // Applications may be files of an author's folder, with scripts and data beside them.
+        "allow-file-access-from-file-urls", TRUE, "allow-universal-access-from-file-urls", TRUE,
+        // Console messages, see WebProcessOutput.
+        "enable-write-console-messages-to-stdout", TRUE,
+        // A set shows what its platform library plays, and pages start sound without a click.
+        "media-playback-requires-user-gesture", FALSE, "enable-smooth-scrolling", FALSE, nullptr));
+    disableFeatures(settings);
+    return settings;
+}
+
+WebKitWebContext* newContext(const Profile& profile) {
+    g_autoptr(WebKitWebsiteDataManager) data = webkit_website_data_manager_new(
+        "base-data-directory", (profile.folder() + "/data").c_str(), "base-cache-directory",
+        (profile.folder() + "/cache").c_str(), nullptr);
+    // Without process swapping the platform library, which is in the web process, outlives a navigation.
+    return WEBKIT_WEB_CONTEXT(g_object_new(WEBKIT_TYPE_WEB_CONTEXT, "website-data-manager", data,
+                                           "process-swap-on-cross-site-navigation-enabled", FALSE, nullptr));
+}
+
+} // namespace
+
+EngineInformation engineInformation() {
+    g_autoptr(WebKitSettings) settings = webkit_settings_new();
+    const auto version = [](unsigned major, unsigned minor, unsigned micro) {
+        return std::to_string(major) + '.' + std::to_string(minor) + '.' + std::to_string(micro);
+    };
+    return {"WebKitGTK " +
+                version(webkit_get_major_version(), webkit_get_minor_version(), webkit_get_micro_version()) +
+                ", GTK " + version(gtk_get_major_version(), gtk_get_minor_version(), gtk_get_micro_version()),
+            webkit_settings_get_user_agent(settings)};
+}
+
+Engine::Engine(const CommandLine& commandLine, const PluginFile& plugin, const Profile& profile,
+               WebProcessOutput& output, PageChannel& channel)
+    : m_plugin(plugin), m_output(output), m_channel(channel), m_context(newContext(profile)),
+      m_settings(newSettings(commandLine)), m_content(webkit_user_content_manager_new()) {
+    g_signal_connect(m_context, "initialize-web-extensions",
+                     G_CALLBACK(+[](WebKitWebContext* context, gpointer engine) {
+                         static_cast<Engine*>(engine)->onInitializeExtensions(context);
+                     }),
+                     this);
+    const std::string style = kWindowStyle + plugin.styleSheet();
+    WebKitUserStyleSheet* sheet = webkit_user_style_sheet_new(
+        style.c_str(), WEBKIT_USER_CONTENT_INJECT_ALL_FRAMES, WEBKIT_USER_STYLE_LEVEL_USER, nullptr, nullptr);
+    webkit_user_content_manager_add_style_sheet(m_content, sheet);
+    webkit_user_style_sheet_unref(sheet);
+}
+
+Engine::~Engine() {
+    g_signal_handlers_disconnect_by_data(m_context, this);
+    g_object_unref(m_content);
+    g_object_unref(m_settings);
+    g_object_unref(m_context);
+}
+
+WebKitWebView* Engine::newView(WebKitWebView* related) const {
+    // A related view has the context of the other.
+    auto* view =
+        WEBKIT_WEB_VIEW(related ? g_object_new(WEBKIT_TYPE_WEB_VIEW, "related-view", related, "settings",
+                                               m_settings, "user-content-manager", m_content, nullptr)
+                                : g_object_new(WEBKIT_TYPE_WEB_VIEW, "web-context", m_context, "settings",
+                                               m_settings, "user-content-manager", m_content, nullptr));
+    // Where a page has no background, the video plane shows through.
+    const GdkRGBA nothing{0, 0, 0, 0};
+    webkit_web_view_set_background_color(view, &nothing);
+    return view;
+}
+
+// Emitted before each start of a web process.
+void Engine::onInitializeExtensions(WebKitWebContext* context) {
+    webkit_web_context_set_web_extensions_directory(context, TELIX_EXTENSIONS);
+    GVariantDict data;
+    g_variant_dict_init(&data, nullptr);
+    g_variant_dict_insert(&data, "plugin", "s", m_plugin.path().c_str());
+    g_variant_dict_insert(&data, "output", "i", m_output.startProcess());
+    g_variant_dict_insert(&data, "errors", "i", m_output.errorDescriptor());
+    g_variant_dict_insert(&data, "channel", "i", m_channel.startProcess());
+    webkit_web_context_set_web_extensions_initialization_user_data(context, g_variant_dict_end(&data));
+}
+
+} // namespace desktop

@@ -1,0 +1,48 @@
+// The browser engine of the window: its context, settings and what it adds to every page.
+#ifndef TELIX_DESKTOP_WINDOW_WEBKIT_ENGINE_H
+#define TELIX_DESKTOP_WINDOW_WEBKIT_ENGINE_H
+
+#include <webkit2/webkit2.h>
+
+#include <string>
+
+namespace desktop {
+
+class PageChannel;
+class PluginFile;
+class Profile;
+class WebProcessOutput;
+struct CommandLine;
+struct EngineInformation;
+
+// The engine's versions and user agent. Needs no display.
+EngineInformation engineInformation();
+
+class Engine {
+public:
+    // The references must outlive the object.
+    Engine(const CommandLine& commandLine, const PluginFile& plugin, const Profile& profile,
+           WebProcessOutput& output, PageChannel& channel);
+    ~Engine();
+    Engine(const Engine&) = delete;
+    Engine& operator=(const Engine&) = delete;
+
+    // Returns a new view with a floating reference. `related`: a view whose web process the new one shares,
+    // or null. One process for all applications of a window: the platform library is in it.
+    WebKitWebContext* context() const { return m_context; }
+    WebKitWebView* newView(WebKitWebView* related) const;
+
+private:
+    void onInitializeExtensions(WebKitWebContext* context);
+
+    const PluginFile& m_plugin;
+    WebProcessOutput& m_output;
+    PageChannel& m_channel;
+    WebKitWebContext* m_context;
+    WebKitSettings* m_settings;
+    WebKitUserContentManager* m_content;
+};
+
+} // namespace desktop
+
+#endif

@@ -1,0 +1,335 @@
+// The WebKit window: the video plane and, above it, a stack of applications.
+#include "desktop/window/webkit/TvWindow.h"
+
+#include <algorithm>
+#include <utility>
+
+#include "desktop/window/shared/CommandLine.h"
+#include "desktop/window/shared/LoadCheck.h"
+#include "desktop/window/shared/PageGeometry.h"
+#include "desktop/window/webkit/Engine.h"
+
+namespace desktop {
+
+namespace {
+
+constexpr char kTitle[] = "telix-tv";
+
+GtkWidget* newBlackArea() {
+    GtkWidget* area = gtk_drawing_area_new();
+    g_signal_connect(area, "draw", G_CALLBACK(+[](GtkWidget*, cairo_t* context, gpointer) -> gboolean {
+                         cairo_set_source_rgb(context, 0, 0, 0);
+                         cairo_paint(context);
+                         return TRUE;
+                     }),
+                     nullptr);
+    return area;
+}
+
+// A check of a page, whose server may take some seconds to respond, on a thread of its own.
+struct LoadCheck {
+    std::string url;
+    std::string userAgent;
+    std::string error;
+    std::function<void(const std::string& error)> done;
+};
+
+void deleteLoadCheck(gpointer check) {
+    delete static_cast<LoadCheck*>(check);
+}
+
+void checkLoad(const std::string& url, const std::string& userAgent, GCancellable* calls,
+               std::function<void(const std::string& error)> done) {
+    g_autoptr(GTask) task = g_task_new(
+        nullptr, calls,
+        [](GObject*, GAsyncResult* result, gpointer) {
+            auto* check = static_cast<LoadCheck*>(g_task_get_task_data(G_TASK(result)));
+            if (g_task_propagate_boolean(G_TASK(result), nullptr)) {
+                check->done(check->error);
+            }
+        },
+        nullptr);
+    g_task_set_task_data(task, new LoadCheck{url, userAgent, {}, std::move(done)}, deleteLoadCheck);
+    g_task_run_in_thread(task, [](GTask* task, gpointer, gpointer data, GCancellable*) {
+        auto* check = static_cast<LoadCheck*>(data);
+        check->error = loadError(check->url, check->userAgent);
+        g_task_return_boolean(task, TRUE);
+    });
+}
+
+} // namespace
+
+TvWindow::TvWindow(const Engine& engine, PageChannel& channel, const CommandLine& commandLine)
+    : m_engine(engine), m_channel(channel), m_userAgent(commandLine.userAgent),
+      m_window(gtk_window_new(GTK_WINDOW_TOPLEVEL)), m_overlay(gtk_overlay_new()),
+      m_calls(g_cancellable_new()) {
+    m_channel.setHandler(
+        [this](uint64_t page, const std::string& function, const std::string& argument,
+               const PageChannel::Reply& reply) { onPageCall(page, function, argument, reply); });
+    gtk_window_set_title(GTK_WINDOW(m_window), kTitle);
+    gtk_container_add(GTK_CONTAINER(m_window), m_overlay);
+    gtk_container_add(GTK_CONTAINER(m_overlay), newBlackArea());
+    m_video.showFramesOf(engine.context());
+    gtk_overlay_add_overlay(GTK_OVERLAY(m_overlay), m_video.widget());
+    g_signal_connect(
+        m_overlay, "get-child-position",
+        G_CALLBACK(+[](GtkOverlay*, GtkWidget*, GdkRectangle* area, gpointer window) -> gboolean {
+            static_cast<TvWindow*>(window)->place(*area);
+            return TRUE;
+        }),
+        this);
+    const auto onKeyEvent = +[](GtkWidget*, GdkEventKey* event, gpointer window) -> gboolean {
+        return static_cast<TvWindow*>(window)->onKey(*event);
+    };
+    g_signal_connect(m_window, "key-press-event", G_CALLBACK(onKeyEvent), this);
+    g_signal_connect(m_window, "key-release-event", G_CALLBACK(onKeyEvent), this);
+    g_signal_connect(m_window, "delete-event",
+                     G_CALLBACK(+[](GtkWidget*, GdkEvent*, gpointer window) -> gboolean {
+                         auto* self = static_cast<TvWindow*>(window);
+                         if (self->m_reports.closed) {
+                             self->m_reports.closed();
+                         }
+                         return TRUE;
+                     }),
+                     this);
+    show(commandLine);
+}
+
+TvWindow::~TvWindow() {
+    g_cancellable_cancel(m_calls);
+    g_object_unref(m_calls);
+    m_channel.setHandler(nullptr);
+    m_stack.clear();
+    m_applications.clear();
+    g_signal_handlers_disconnect_by_data(m_overlay, this);
+    g_signal_handlers_disconnect_by_data(m_window, this);
+    gtk_widget_destroy(m_window);
+}
+
+void TvWindow::show(const CommandLine& commandLine) {
+    if (commandLine.fullscreen) {
+        // Without a window manager nothing else sets the size.
+        GdkRectangle screen;
+        GdkDisplay* display = gtk_widget_get_display(m_window);
+        GdkMonitor* monitor = gdk_display_get_primary_monitor(display);
+        gdk_monitor_get_geometry(monitor ? monitor : gdk_display_get_monitor(display, 0), &screen);
+        gtk_window_set_default_size(GTK_WINDOW(m_window), screen.width, screen.height);
+        gtk_window_fullscreen(GTK_WINDOW(m_window));
+    } else {
+        gtk_window_set_default_size(GTK_WINDOW(m_window), commandLine.width, commandLine.height);
+    }
+    gtk_widget_show_all(m_window);
+    // Without a window manager nothing else gives it the keyboard.
+    gtk_window_present(GTK_WINDOW(m_window));
+}
+
+// Sets `area` to the place of the page in the window.
+void TvWindow::place(GtkAllocation& area) const {
+    const PixelRect page =
+        pageRectIn(gtk_widget_get_allocated_width(m_overlay), gtk_widget_get_allocated_height(m_overlay));
+    area = {page.x, page.y, page.width, page.height};
+}
+
+void TvWindow::openApplication(const std::string& url) {
+    const Application* related = m_applications.empty() ? nullptr : m_applications.back().get();
+    m_applications.push_back(std::make_unique<Application>(m_engine, related, *this));
+    Application& application = *m_applications.back();
+    gtk_overlay_add_overlay(GTK_OVERLAY(m_overlay), application.widget());
+    m_stack.push(application);
+    updateInspector();
+    application.load(url);
+}
+
+Application* TvWindow::applicationOf(uint64_t page) const {
+    const auto& all = m_stack.all();
+    const auto found = std::find_if(all.begin(), all.end(), [page](const Application* application) {
+        return application->pageId() == page;
+    });
+    return found == all.end() ? nullptr : *found;
+}
+
+// A page that is no longer in the stack keeps running until it has ended; its calls do nothing.
+void TvWindow::onPageCall(uint64_t page, const std::string& function, const std::string& argument,
+                          const PageChannel::Reply& reply) {
+    Application* caller = applicationOf(page);
+    if (!caller) {
+        reply(false);
+        return;
+    }
+    if (function == "create") {
+        createApplication(page, argument, reply);
+        return;
+    }
+    if (function == "destroy") {
+        remove(*m_stack.top());
+    } else if (function == "show" || function == "hide") {
+        caller->setShown(function == "show");
+    }
+    reply(true);
+}
+
+void TvWindow::createApplication(uint64_t caller, const std::string& url, const PageChannel::Reply& reply) {
+    checkLoad(url, m_userAgent, m_calls, [this, caller, url, reply](const std::string& error) {
+        const bool isCreated = error.empty() && applicationOf(caller);
+        if (isCreated) {
+            openApplication(url);
+        }
+        reply(isCreated);
+    });
+}
+
+void TvWindow::remove(Application& application) {
+    m_stack.remove(application);
+    updateInspector();
+    application.unload([this, &application] {
+        const auto isIt = [&application](const auto& each) { return each.get() == &application; };
+        // The last one stays, because the web process with the platform library ends with its last page.
+        if (m_applications.size() > 1) {
+            m_applications.erase(std::find_if(m_applications.begin(), m_applications.end(), isIt));
+        }
+    });
+}
+
+void TvWindow::onLoadFailed(Application& application, const std::string& url, const std::string& reason) {
+    if (!m_stack.has(application)) {
+        return;
+    }
+    if (!application.hasDocument()) {
+        remove(application);
+    }
+    if (m_reports.loadFailed) {
+        m_reports.loadFailed(url, reason);
+    }
+}
+
+void TvWindow::onCrashed(Application& application, WebKitWebProcessTerminationReason reason) {
+    m_video.dropFrames();
+    // Each application reports it.
+    if (m_stack.top() == &application && m_reports.crashed) {
+        m_reports.crashed(reason);
+    }
+}
+
+void TvWindow::inspect() {
+    m_isInspected = true;
+    updateInspector();
+}
+
+void TvWindow::updateInspector() {
+    Application* top = m_stack.top();
+    if (!m_isInspected || top == m_inspected) {
+        return;
+    }
+    if (m_inspected) {
+        webkit_web_inspector_close(webkit_web_view_get_inspector(m_inspected->view()));
+    }
+    m_inspected = top;
+    if (top) {
+        WebKitWebInspector* inspector = webkit_web_view_get_inspector(top->view());
+        // In a window of its own.
+        g_signal_connect(inspector, "attach",
+                         G_CALLBACK(+[](WebKitWebInspector*, gpointer) -> gboolean { return TRUE; }),
+                         nullptr);
+        webkit_web_inspector_show(inspector);
+    }
+}
+
+void TvWindow::unload(std::function<void()> done) {
+    m_stack.clear();
+    const auto left = std::make_shared<std::size_t>(m_applications.size());
+    if (*left == 0) {
+        done();
+    }
+    for (const auto& application : m_applications) {
+        application->unload([left, done] {
+            if (--*left == 0) {
+                done();
+            }
+        });
+    }
+}
+
+bool TvWindow::isTopLoaded() const {
+    return m_stack.top() && m_stack.top()->isLoaded();
+}
+
+void TvWindow::press(const RemoteKey& key, std::function<void()> done) {
+    m_stack.top()->sendPress(key, false);
+    m_stack.top()->sendRelease(key);
+    m_stack.top()->waitForKeys(std::move(done));
+}
+
+// Returns whether the event is handled: a key of the remote control goes to the topmost application, all
+// others to the widget with the focus.
+bool TvWindow::onKey(const GdkEventKey& event) {
+    constexpr guint kShortcutModifiers = GDK_CONTROL_MASK | GDK_MOD1_MASK | GDK_SUPER_MASK | GDK_META_MASK;
+    const RemoteKey* key = remoteKeyByKeyboardKey(event.keyval);
+    Application* top = m_stack.top();
+    // An event that an application has sent itself comes here if its page does not handle it.
+    if (!key || !top || event.send_event || (event.state & kShortcutModifiers)) {
+        return false;
+    }
+    if (event.type == GDK_KEY_PRESS) {
+        top->sendPress(*key, m_heldKey == key);
+        m_heldKey = key;
+    } else {
+        m_heldKey = nullptr;
+        top->sendRelease(*key);
+    }
+    return true;
+}
+
+void TvWindow::evaluate(const std::string& expression, std::function<void(Evaluation)> done) {
+    Application* top = m_stack.top();
+    if (!top) {
+        Evaluation evaluation;
+        evaluation.error = "no application";
+        done(evaluation);
+        return;
+    }
+    top->evaluate(expression, std::move(done));
+}
+
+bool TvWindow::hasPicture() const {
+    return m_video.hasFrame();
+}
+
+// The page's part comes from the page itself, because what has been drawn in the window may be older than
+// what a script has done to the page.
+void TvWindow::writeScreenshot(const std::string& file, std::function<void(bool)> done) {
+    Application* top = m_stack.top();
+    if (!top || !top->isVisible()) {
+        done(paintScreenshot(file, nullptr));
+        return;
+    }
+    top->takeSnapshot([this, file, done = std::move(done)](cairo_surface_t* page) {
+        done(paintScreenshot(file, page));
+        if (page) {
+            cairo_surface_destroy(page);
+        }
+    });
+}
+
+bool TvWindow::paintScreenshot(const std::string& file, cairo_surface_t* page) const {
+    const int width = gtk_widget_get_allocated_width(m_overlay);
+    const int height = gtk_widget_get_allocated_height(m_overlay);
+    cairo_surface_t* image = cairo_image_surface_create(CAIRO_FORMAT_RGB24, width, height);
+    cairo_t* context = cairo_create(image);
+    const PixelRect area = pageRectIn(width, height);
+    cairo_translate(context, area.x, area.y);
+    m_video.paint(context, area.width, area.height);
+    if (page) {
+        cairo_scale(context, static_cast<double>(area.width) / kPageWidth,
+                    static_cast<double>(area.height) / kPageHeight);
+        cairo_set_source_surface(context, page, 0, 0);
+        cairo_pattern_set_extend(cairo_get_source(context), CAIRO_EXTEND_PAD);
+        cairo_rectangle(context, 0, 0, kPageWidth, kPageHeight);
+        cairo_fill(context);
+    }
+    cairo_destroy(context);
+    const bool isWritten = cairo_surface_write_to_png(image, file.c_str()) == CAIRO_STATUS_SUCCESS;
+    cairo_surface_destroy(image);
+    return isWritten;
+}
+
+} // namespace desktop

@@ -1,0 +1,82 @@
+// The television's web process extension, beside the bridge: sends the window the video frames of the
+// platform library that the plug-in loads. All of it runs on the main thread of the web process, unless it
+// says otherwise.
+#include <gio/gunixfdlist.h>
+#include <webkit2/webkit-web-extension.h>
+
+#include "desktop/window/frames/FrameRing.h"
+#include "desktop/window/webkit/extension/FramePublisher.h"
+
+namespace desktop {
+
+namespace {
+
+// A message on its way to the main thread.
+struct Message {
+    WebKitWebExtension* extension;
+    WebKitUserMessage* message; // floating
+};
+
+gboolean sendMessage(gpointer data) {
+    const auto* message = static_cast<Message*>(data);
+    webkit_web_extension_send_message_to_context(message->extension, message->message, nullptr, nullptr,
+                                                 nullptr);
+    return G_SOURCE_REMOVE;
+}
+
+// Any thread.
+void sendRing(WebKitWebExtension* extension, int memory, int wakeup) {
+    GUnixFDList* descriptors = g_unix_fd_list_new();
+    GError* error = nullptr;
+    if (g_unix_fd_list_append(descriptors, memory, &error) == -1 ||
+        g_unix_fd_list_append(descriptors, wakeup, &error) == -1) {
+        g_printerr("telix-tv: frames: %s\n", error->message);
+        g_error_free(error);
+    } else {
+        auto* message = new Message{
+            extension, webkit_user_message_new_with_fd_list(kFramesMessage, nullptr, descriptors)};
+        g_idle_add_full(G_PRIORITY_HIGH, sendMessage, message,
+                        [](gpointer data) { delete static_cast<Message*>(data); });
+    }
+    g_object_unref(descriptors);
+}
+
+// Looks for the platform library before the main loop waits: the plug-in loads it during a call of a page on
+// this thread, so the loop runs after it.
+struct SearchSource {
+    GSource source;
+    FramePublisher* publisher;
+};
+
+gboolean prepareSearch(GSource* source, gint* timeout) {
+    *timeout = -1;
+    return reinterpret_cast<SearchSource*>(source)->publisher->start();
+}
+
+gboolean checkSearch(GSource*) {
+    return FALSE;
+}
+
+// The library is found, and stays.
+gboolean dispatchSearch(GSource*, GSourceFunc, gpointer) {
+    return G_SOURCE_REMOVE;
+}
+
+void startSearch(FramePublisher& publisher) {
+    static GSourceFuncs functions{prepareSearch, checkSearch, dispatchSearch, nullptr, nullptr, nullptr};
+    GSource* source = g_source_new(&functions, sizeof(SearchSource));
+    reinterpret_cast<SearchSource*>(source)->publisher = &publisher;
+    g_source_attach(source, nullptr);
+    g_source_unref(source); // the main loop owns it
+}
+
+} // namespace
+
+void sendFrames(WebKitWebExtension* extension) {
+    // For the life of the process, as the platform library is.
+    auto* publisher =
+        new FramePublisher([extension](int memory, int wakeup) { sendRing(extension, memory, wakeup); });
+    startSearch(*publisher);
+}
+
+} // namespace desktop

@@ -1,0 +1,134 @@
+// The window of the desktop television on WebKitGTK.
+#include <glib-unix.h>
+#include <gtk/gtk.h>
+
+#include <clocale>
+#include <csignal>
+#include <cstdio>
+
+#include "desktop/window/shared/Automation.h"
+#include "desktop/window/shared/CommandLine.h"
+#include "desktop/window/shared/Diagnostics.h"
+#include "desktop/window/shared/LoadCheck.h"
+#include "desktop/window/shared/PluginFile.h"
+#include "desktop/window/webkit/ChildProcesses.h"
+#include "desktop/window/webkit/Engine.h"
+#include "desktop/window/webkit/PageChannel.h"
+#include "desktop/window/webkit/Profile.h"
+#include "desktop/window/webkit/TvWindow.h"
+#include "desktop/window/webkit/WebProcessOutput.h"
+
+namespace desktop {
+
+namespace {
+
+// The main loop and the exit status that ends it.
+struct Run {
+    GMainLoop* loop;
+    TvWindow* window;
+    int exitStatus;
+
+    // Ends the pages and then the loop. Later calls do nothing.
+    void end(int status) {
+        if (exitStatus >= 0) {
+            return;
+        }
+        exitStatus = status;
+        window->unload([this] { g_main_loop_quit(loop); });
+    }
+};
+
+template <int signalNumber>
+gboolean onTermination(gpointer run) {
+    static_cast<Run*>(run)->end(kExitSignalled + signalNumber);
+    return G_SOURCE_CONTINUE;
+}
+
+std::string crashReason(WebKitWebProcessTerminationReason reason, const std::string& failure) {
+    switch (reason) {
+    case WEBKIT_WEB_PROCESS_CRASHED:
+        return "the web process has crashed" + (failure.empty() ? "" : ": " + failure);
+    case WEBKIT_WEB_PROCESS_EXCEEDED_MEMORY_LIMIT:
+        return "the web process has exceeded its memory limit";
+    case WEBKIT_WEB_PROCESS_TERMINATED_BY_API:
+        break;
+    }
+    return "the web process has been terminated";
+}
+
+// Runs the window until it exits, and destroys it with all pages. `evaluated` receives the value of --eval.
+int runWindow(const CommandLine& commandLine, const PluginFile& plugin, const Profile& profile,
+              std::optional<std::string>& evaluated) {
+    WebProcessOutput output;
+    PageChannel channel;
+    const Engine engine(commandLine, plugin, profile, output, channel);
+    TvWindow window(engine, channel, commandLine);
+    g_autoptr(GMainLoop) loop = g_main_loop_new(nullptr, FALSE);
+    Run run{loop, &window, -1};
+    Automation automation(window, commandLine, [&](int status) { run.end(status); });
+    window.setReports(
+        {[&] { automation.onWindowClosed(); },
+         [&](const std::string& url, const std::string& reason) { automation.onLoadFailed(url, reason); },
+         [&](WebKitWebProcessTerminationReason reason) {
+             output.drain();
+             automation.onPageCrashed(crashReason(reason, output.failure()));
+         }});
+    g_unix_signal_add(SIGINT, onTermination<SIGINT>, &run);
+    g_unix_signal_add(SIGTERM, onTermination<SIGTERM>, &run);
+    g_unix_signal_add(SIGHUP, onTermination<SIGHUP>, &run);
+    window.openApplication(commandLine.page);
+    if (commandLine.inspect) {
+        window.inspect();
+    }
+    g_main_loop_run(loop);
+    evaluated = automation.evaluated();
+    return run.exitStatus;
+}
+
+int runBrowser(const CommandLine& commandLine) {
+    if (!gtk_init_check(nullptr, nullptr)) {
+        printError("no display: cannot connect to DISPLAY or WAYLAND_DISPLAY");
+        return kExitBadInput;
+    }
+    const PluginFile plugin(commandLine.plugin);
+    if (!plugin.failure().empty()) {
+        printError("cannot load plug-in " + commandLine.plugin + ": " + plugin.failure());
+        return kExitBadInput;
+    }
+    const std::string error = loadError(commandLine.page, commandLine.userAgent);
+    if (!error.empty()) {
+        printError("cannot load " + commandLine.page + ": " + error);
+        return kExitBadInput;
+    }
+    const Profile profile;
+    if (!profile.failure().empty()) {
+        printError(profile.failure());
+        return kExitBadInput;
+    }
+    std::optional<std::string> evaluated;
+    const int exitStatus = runWindow(commandLine, plugin, profile, evaluated);
+    endChildProcesses();
+    // The last line of the output, after what the plug-in logs in its teardown.
+    if (evaluated) {
+        std::puts(evaluated->c_str());
+    }
+    return exitStatus;
+}
+
+} // namespace
+
+} // namespace desktop
+
+int main(int argc, char* argv[]) {
+    std::setlocale(LC_ALL, "");
+    // The settings of the desktop are not the television's, and their service leaves a folder.
+    g_setenv("GSETTINGS_BACKEND", "memory", TRUE);
+    g_set_prgname("telix-tv");
+    desktop::CommandLine commandLine;
+    // --help and usage errors need no display.
+    if (const auto exitStatus =
+            desktop::readCommandLine({argv, argv + argc}, desktop::engineInformation(), commandLine)) {
+        return *exitStatus;
+    }
+    return desktop::runBrowser(commandLine);
+}
