@@ -2,11 +2,12 @@
 # Runs the tests. Installs missing packages and builds what has changed.
 set -euo pipefail
 
-usage='Usage: ./test.sh [--machines]
+usage='Usage: ./test.sh [--machines | --packages]
 
 Without arguments: the unit tests with AddressSanitizer and UndefinedBehaviorSanitizer, all tests of the release build, and some
 of the tests of the plug-in for armhf and i386, under qemu.
-  --machines   all tests of the plug-in for armhf, arm64, i386 and mipsel, under qemu, and no others'
+  --machines   all tests of the plug-in for armhf, arm64, i386 and mipsel, under qemu, and no others
+  --packages   build the Debian packages, install them into a fresh root and start the television there; needs root'
 
 cd "$(dirname "${BASH_SOURCE[0]}")"
 cores=$(nproc)
@@ -38,9 +39,9 @@ case "$*" in
 '')
     tools/install-packages.sh run test machines
     test_this_machine
-    # Threads and callbacks, the objects that have most of both, and the wrappers of the platform calls.
+    # Threads and callbacks, the objects that have most of both, and all calls of the platform.
     for machine in armhf i386; do
-        test_machine "$machine" 'avcontrol;videobroadcast;platform;shell;support'
+        test_machine "$machine" 'avcontrol;videobroadcast;platform;support'
     done
     ;;
 --machines)
@@ -49,9 +50,13 @@ case "$*" in
         test_machine "$machine" '*'
     done
     ;;
+--packages)
+    tools/install-packages.sh run test packages
+    exec tests/packages/test_packages.py
+    ;;
 -h | --help) echo "$usage" ;;
 *)
-    echo "test.sh: $*: unknown argument, expected --machines or nothing" >&2
+    echo "test.sh: $*: unknown argument, expected --machines, --packages or nothing" >&2
     exit 2
     ;;
 esac

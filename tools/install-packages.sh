@@ -1,6 +1,6 @@
 #!/usr/bin/env bash
 # Installs the packages that are missing for the given purposes: of Debian, and programs from the npm registry.
-# Usage: tools/install-packages.sh run|test|machines ...
+# Usage: tools/install-packages.sh run|test|machines|packages ...
 set -euo pipefail
 
 packages=(build-essential cmake ninja-build pkg-config libglib2.0-dev)
@@ -23,8 +23,11 @@ for purpose in "$@"; do
         packages+=(g++-arm-linux-gnueabihf g++-aarch64-linux-gnu g++-i686-linux-gnu g++-mipsel-linux-gnu
             qemu-user-static googletest python3)
         ;;
+    packages)
+        packages+=(debhelper dpkg-dev lintian mmdebstrap python3 util-linux git)
+        ;;
     *)
-        echo "$0: $purpose: unknown purpose, expected run, test or machines" >&2
+        echo "$0: $purpose: unknown purpose, expected run, test, machines or packages" >&2
         exit 2
         ;;
     esac
