@@ -6,15 +6,16 @@
 // engine it takes now, because the page may replace everything later; so it never asks an element by its own
 // properties, and iterates with indexes only.
 //
-// How an element gets its object. Between HTMLObjectElement.prototype and HTMLElement.prototype stands a proxy that sees the
-// first access to an element that has no instance, and makes the instance then. From then on the element's own
-// prototype is the plug-in's script object, whose prototype is HTMLObjectElement.prototype, so that the plug-in's
-// names come first when they are read, without a proxy in between. Writes pass by the setters of prototypes that are
-// not proxies, so the proxy hands them to the plug-in. Elements that no script touches are found by a mutation observer.
+// How an element gets its object. A mutation observer finds the elements that the parser makes before a script can use them.
+// Elements that script puts into the document get a guard first: a proxy before the element's class that makes the
+// instance at the first access. From then on the element's own prototype is the plug-in's script object, with the guard
+// behind it, so that the plug-in's names come first when they are read, without a proxy in between. Writes pass by
+// prototypes that are not proxies, so the guard hands them to the plug-in. A guard belongs to one element, because the
+// engine gives up its fast arrays in a page with a proxy that is a prototype of a prototype.
 (function (host, pluginName, pluginDescription, pluginFile) {
     'use strict';
 
-    const { apply, construct, defineProperty, deleteProperty, get, getOwnPropertyDescriptor, getPrototypeOf, has,
+    const { apply, defineProperty, deleteProperty, get, getOwnPropertyDescriptor, getPrototypeOf, has,
         ownKeys, set, setPrototypeOf } = Reflect;
     const { create, assign } = Object;
     const typeFields = 3;
@@ -67,6 +68,7 @@
     const clientTop = getter(Element.prototype, 'clientTop');
     const getAttribute = uncurry(Element.prototype.getAttribute);
     const querySelectorAll = uncurry(Element.prototype.querySelectorAll);
+    const querySelectorAllOfFragment = uncurry(DocumentFragment.prototype.querySelectorAll);
     const boundingRect = uncurry(Element.prototype.getBoundingClientRect);
     const clientRects = uncurry(Element.prototype.getClientRects);
     const rectsLength = getter(DOMRectList.prototype, 'length');
@@ -87,6 +89,7 @@
     const innerWidth = getter(theWindow, 'innerWidth');
     const innerHeight = getter(theWindow, 'innerHeight');
     const addEventListener = uncurry(EventTarget.prototype.addEventListener);
+    const removeEventListener = uncurry(EventTarget.prototype.removeEventListener);
     const isPersisted = getter(PageTransitionEvent.prototype, 'persisted');
     const setTimer = setTimeout.bind(theWindow);
     const requestFrame = requestAnimationFrame.bind(theWindow);
@@ -111,6 +114,7 @@
     const toStringTag = Symbol.toStringTag;
 
     const elementNode = 1;
+    const fragmentNode = 11;
     const xhtml = 'http://www.w3.org/1999/xhtml';
 
     // The types of the plug-in by name, without a prototype that the page could fill.
@@ -131,8 +135,8 @@
     let records = [];
     // Elements of the plug-in's types that have got no instance yet.
     let pending = [];
-    // Elements that script has touched before they were in a document, with their prototypes of then.
-    const watchedBase = new WeakMap();
+    // The elements that have a guard; true if script, not the parser, puts them into the document.
+    const guarded = new WeakMap();
     let isAway = false; // the document is going, or kept by the engine for the way back
 
     function isEmbedding(node) {
@@ -163,7 +167,7 @@
 
     // Whether the parser may still be adding to the element: nothing follows it in a document that is being parsed.
     function isOpen(element) {
-        if (readyState(theDocument) !== 'loading' || mapGet(watchedBase, element)) {
+        if (readyState(theDocument) !== 'loading' || mapGet(guarded, element)) {
             return false;
         }
         for (let node = element; node; node = parentNode(node)) {
@@ -205,7 +209,7 @@
         for (let i = 0; i < parameters.length; i++) {
             values[values.length] = parameters[i];
         }
-        adoptStyle();
+        applyStyle();
         record.number = apply(hostCreate, undefined, values);
         if (record.number === 0) {
             return false;
@@ -221,10 +225,11 @@
         return record.object !== null;
     }
 
-    // Puts the plug-in's object before the element's class.
+    // Puts the plug-in's object before the element's guard.
     function connect(record) {
         const { element, object } = record;
-        record.base = mapGet(watchedBase, element) || getPrototypeOf(element);
+        guard(element, false);
+        record.base = getPrototypeOf(element);
         setPrototypeOf(object, record.base);
         defineProperty(object, toStringTag, { __proto__: null, value: get(element, toStringTag), configurable: true });
         // Names that the page has given to the element before would hide the plug-in's.
@@ -294,18 +299,17 @@
         }
     }
 
-    function collect(node) {
-        if (nodeType(node) !== elementNode) {
-            return;
+    // Calls the function with the elements in a tree that may be the plug-in's.
+    function forEachEmbedding(root, action) {
+        if (isEmbedding(root)) {
+            action(root);
         }
-        if (isEmbedding(node)) {
-            addPending(node);
-        }
-        if (firstChild(node)) {
-            const found = querySelectorAll(node, 'object, embed');
+        if (firstChild(root)) {
+            const query = nodeType(root) === fragmentNode ? querySelectorAllOfFragment : querySelectorAll;
+            const found = query(root, 'object, embed');
             for (let i = 0; i < nodeCount(found); i++) {
                 if (isEmbedding(nodeAt(found, i))) {
-                    addPending(nodeAt(found, i));
+                    action(nodeAt(found, i));
                 }
             }
         }
@@ -318,6 +322,7 @@
         for (let i = 0; i < elements.length; i++) {
             if (isHere(elements[i]) && isOpen(elements[i])) {
                 pending[pending.length] = elements[i];
+                guard(elements[i], false);
             } else {
                 attach(elements[i]);
             }
@@ -339,7 +344,9 @@
             if (recordType(list[i]) === 'childList') {
                 const added = recordAdded(list[i]);
                 for (let j = 0; j < nodeCount(added); j++) {
-                    collect(nodeAt(added, j));
+                    if (nodeType(nodeAt(added, j)) === elementNode) {
+                        forEachEmbedding(nodeAt(added, j), addPending);
+                    }
                 }
             } else if (isEmbedding(target)) {
                 restart(target);
@@ -357,143 +364,168 @@
     const observer = new MutationObserver(onMutations);
     const observed = { __proto__: null, childList: true, subtree: true, attributes: true, attributeFilter: ['type', 'data', 'src'] };
     observe(observer, theDocument, observed);
-    const attachShadow = Element.prototype.attachShadow;
-    Element.prototype.attachShadow = new Proxy(attachShadow, {
-        __proto__: null,
-        apply: function (target, self, values) {
-            const root = apply(target, self, values);
-            try {
-                observe(observer, root, observed);
-            } catch (error) {
-                // Array iterators, as in adoptStyle(): instances here come with the first access, and go.
-            }
-            return root;
-        }
-    });
 
     // --- The first access by script
 
-    function isElement(value) {
-        try {
-            return isEmbedding(value);
-        } catch (error) {
-            return false; // no node
-        }
-    }
-
-    // Whether an access to that object has made its instance just now.
-    function touch(receiver) {
-        if (mapGet(recordOf, receiver) || !isElement(receiver)) {
-            return false;
-        }
-        if (attach(receiver)) {
-            return true;
-        }
-        if (!isConnected(receiver)) {
-            watch(receiver);
-        }
-        return false;
-    }
-
     // Writes a name of the plug-in's. False when the element has no such name of it.
-    function write(receiver, name, value) {
-        const record = mapGet(recordOf, receiver);
+    function write(element, name, value) {
+        const record = mapGet(recordOf, element);
         return record !== undefined && record.object !== null && hostWrite(record.object, name, value);
     }
 
-    // An element that script prepares: once it is in the document, even `name in element` makes its instance first. A proxy
-    // of its own knows the element, which the `has` trap of the proxy for all is not told.
-    function watch(element) {
-        if (mapGet(watchedBase, element)) {
-            return;
-        }
+    // `isOfScript`: script puts the element into the document.
+    function guard(element, isOfScript) {
         const base = getPrototypeOf(element);
         // Only before a class as it is: the engine finds no cycle of prototypes behind a proxy.
-        if (base !== objectPrototype && base !== embedPrototype) {
+        if (mapGet(guarded, element) !== undefined || (base !== objectPrototype && base !== embedPrototype)) {
             return;
         }
+        const isAccess = function (name, receiver) {
+            return receiver === element && typeof name === 'string';
+        };
         const proxy = new Proxy(create(base), {
             __proto__: null,
             get: function (target, name, receiver) {
-                return receiver === element && attach(element) ? get(element, name) : get(base, name, receiver);
+                return isAccess(name, receiver) && attach(element) ? get(element, name) : get(base, name, receiver);
             },
             set: function (target, name, value, receiver) {
-                return receiver === element && attach(element) ? set(element, name, value)
-                                                              : set(base, name, value, receiver);
+                if (isAccess(name, receiver)) {
+                    attach(element);
+                    if (write(element, name, value)) {
+                        return true;
+                    }
+                }
+                return set(base, name, value, receiver);
             },
             has: function (target, name) {
                 return attach(element) ? has(element, name) : has(base, name);
             }
         });
         if (setPrototypeOf(element, proxy)) {
-            mapSet(watchedBase, element, base);
+            mapSet(guarded, element, isOfScript);
         }
     }
 
-    function guardClass(prototype) {
-        const parent = getPrototypeOf(prototype);
-        setPrototypeOf(prototype, new Proxy(create(parent), {
-            __proto__: null,
-            get: function (target, name, receiver) {
-                return typeof name === 'string' && touch(receiver) ? get(receiver, name) : get(parent, name, receiver);
-            },
-            set: function (target, name, value, receiver) {
-                if (typeof name === 'string') {
-                    touch(receiver);
-                    if (write(receiver, name, value)) {
-                        return true;
-                    }
-                }
-                return set(parent, name, value, receiver);
-            },
-            // Elements made by a parser of script's, such as innerHTML, in their first task: the one that is asked
-            // is among those.
-            has: function (target, name) {
-                const before = records.length;
-                onMutations(takeRecords(observer));
-                for (let i = before; i < records.length; i++) {
-                    if (records[i].object && has(records[i].object, name)) {
-                        return true;
-                    }
-                }
-                return has(parent, name);
+    // Replaces a function of the engine, or of an accessor, by what `wrap` makes of it. It looks the same to the page. The
+    // result undoes that, unless the page has put something else there; null when the engine has no such function.
+    function replace(prototype, name, wrap) {
+        const property = getOwnPropertyDescriptor(prototype, name);
+        if (!property) {
+            return null;
+        }
+        const key = property.set ? 'set' : property.get ? 'get' : 'value';
+        const wrapped = new Proxy(property[key], { __proto__: null, apply: wrap });
+        defineProperty(prototype, name, assign({ __proto__: null }, property, { [key]: wrapped }));
+        return function () {
+            const current = getOwnPropertyDescriptor(prototype, name);
+            if (current && current[key] === wrapped) {
+                defineProperty(prototype, name, property);
             }
-        }));
-        guardAccessors(prototype);
+        };
     }
 
-    // The class's own accessors (data, width, height) make the instance first, too.
-    function guardAccessors(prototype) {
-        const names = ownKeys(prototype);
-        for (let i = 0; i < names.length; i++) {
-            const name = names[i];
-            const property = getOwnPropertyDescriptor(prototype, name);
-            if (typeof name !== 'string' || !property.configurable || !property.get) {
-                continue;
-            }
-            const read = property.get;
-            defineProperty(prototype, name, assign({}, property, {
-                get: function () {
-                    return touch(this) ? get(this, name) : apply(read, this, []);
-                },
-                set: function (value) {
-                    touch(this);
-                    if (!write(this, name, value) && property.set) {
-                        apply(property.set, this, [value]);
-                    }
+    function replaceAll(prototypes, names, wrap) {
+        const undoing = [];
+        for (let i = 0; i < prototypes.length; i++) {
+            for (let j = 0; j < names.length; j++) {
+                const undo = replace(prototypes[i], names[j], wrap);
+                if (undo) {
+                    undoing[undoing.length] = undo;
                 }
-            }));
+            }
+        }
+        return undoing;
+    }
+
+    function guardOfScript(element) {
+        guard(element, true);
+    }
+
+    // A call with nodes that are to go into a document.
+    function callInserting(target, self, values) {
+        for (let i = 0; i < values.length; i++) {
+            try {
+                forEachEmbedding(values[i], guardOfScript);
+            } catch (error) {
+                // no node
+            }
+        }
+        return apply(target, self, values);
+    }
+
+    // A call after which there may be elements that a parser has made.
+    function callParsing(target, self, values) {
+        const result = apply(target, self, values);
+        const list = takeRecords(observer);
+        if (list.length > 0) {
+            onMutations(list);
+        }
+        return result;
+    }
+
+    // A script in what is written runs before the observer.
+    function callWriting(target, self, values) {
+        watchLookups();
+        return callParsing(target, self, values);
+    }
+
+    function callAttachingShadow(target, self, values) {
+        const root = apply(target, self, values);
+        try {
+            observe(observer, root, observed);
+        } catch (error) {
+            // Array iterators, as in adoptStyleSheet(): instances here come with the first access, and go.
+        }
+        return root;
+    }
+
+    const containers = [Document.prototype, DocumentFragment.prototype, Element.prototype];
+    const siblings = [Element.prototype, CharacterData.prototype];
+    replaceAll([Node.prototype], ['appendChild', 'insertBefore', 'replaceChild'], callInserting);
+    replaceAll(containers, ['append', 'prepend', 'replaceChildren'], callInserting);
+    replaceAll(siblings, ['before', 'after', 'replaceWith'], callInserting);
+    replace(Element.prototype, 'insertAdjacentElement', callInserting);
+    replace(Range.prototype, 'insertNode', callInserting);
+    replaceAll([Element.prototype, ShadowRoot.prototype], ['innerHTML', 'outerHTML', 'insertAdjacentHTML', 'setHTMLUnsafe'],
+        callParsing);
+    replaceAll([Document.prototype], ['write', 'writeln'], callWriting);
+    replace(Element.prototype, 'attachShadow', callAttachingShadow);
+
+    // While the observer may come later than a script that follows an element: the ways from the document to an element
+    // look for it first. The XML parser runs scripts without the observer before.
+    let lookups = null;
+    function watchLookups() {
+        if (!lookups && readyState(theDocument) === 'loading') {
+            lookups = [
+                replaceAll([Node.prototype], ['firstChild', 'lastChild', 'nextSibling', 'previousSibling', 'childNodes'],
+                    callParsing),
+                replaceAll(siblings, ['nextElementSibling', 'previousElementSibling'], callParsing),
+                replaceAll(containers, ['querySelector', 'querySelectorAll', 'getElementById', 'getElementsByTagName',
+                    'getElementsByTagNameNS', 'getElementsByClassName', 'getElementsByName', 'children', 'firstElementChild',
+                    'lastElementChild', 'body', 'documentElement', 'embeds', 'evaluate'], callParsing)
+            ];
         }
     }
 
-    guardClass(objectPrototype);
-    guardClass(embedPrototype);
+    function endLookups() {
+        if (lookups && readyState(theDocument) !== 'loading') {
+            for (let i = 0; i < lookups.length; i++) {
+                for (let j = 0; j < lookups[i].length; j++) {
+                    lookups[i][j]();
+                }
+            }
+            lookups = null;
+        }
+    }
+
+    if (theDocument instanceof XMLDocument) {
+        watchLookups();
+    }
 
     // --- Place in the window
 
     // Fallback content is not shown, and an element without a size has the default one of plug-ins. Everything that the
     // page says of its elements comes before a layer.
-    let style = null;
     function styleText() {
         let selectors = '';
         for (let i = 0; i < typeList.length; i++) {
@@ -506,32 +538,61 @@
         return '@layer telix-webkit-bridge{' +
             rule('', 'display:inline-block;content-visibility:hidden') +
             rule(':where(:not([width]))', 'width:300px') +
-            rule(':where(:not([height]))', 'height:150px') + '}';
+            rule(':where(:not([height]))', 'height:150px') +
+            '@supports not (content-visibility:hidden){' +
+            rule('', 'overflow:hidden;color:transparent!important') +
+            rule('>:where(*)', 'display:none!important') + '}}';
     }
+
+    // Gives the document a style sheet of script's own. False when the engine has none.
     const styleSheets = getOwnPropertyDescriptor(Document.prototype, 'adoptedStyleSheets');
     const StyleSheet = theWindow.CSSStyleSheet;
     const replaceSync = StyleSheet.prototype.replaceSync;
-    function adoptStyle() {
+    let styleSheet = null;
+    function adoptStyleSheet() {
         if (!styleSheets || !replaceSync) {
-            return;
+            return false;
         }
         const sheets = apply(styleSheets.get, theDocument, []);
         const list = [];
         for (let i = 0; i < sheets.length; i++) {
-            if (sheets[i] === style) {
-                return;
+            if (sheets[i] === styleSheet) {
+                return true;
             }
             list[list.length] = sheets[i];
         }
-        if (!style) {
-            style = new StyleSheet();
-            apply(replaceSync, style, [styleText()]);
+        if (!styleSheet) {
+            styleSheet = new StyleSheet();
+            apply(replaceSync, styleSheet, [styleText()]);
         }
-        list[list.length] = style;
+        list[list.length] = styleSheet;
         try {
             apply(styleSheets.set, theDocument, [list]);
         } catch (error) {
             // The engine reads the list with what the page has made of array iterators; elements go without the style.
+        }
+        return true;
+    }
+
+    const createElement = uncurry(Document.prototype.createElementNS);
+    const appendChild = uncurry(Node.prototype.appendChild);
+    const setTextContent = getOwnPropertyDescriptor(Node.prototype, 'textContent').set;
+    let styleElement = null;
+    function addStyleElement() {
+        const parent = documentElement(theDocument);
+        if (!parent || (styleElement && isHere(styleElement))) {
+            return;
+        }
+        if (!styleElement) {
+            styleElement = createElement(theDocument, xhtml, 'style');
+            apply(setTextContent, styleElement, [styleText()]);
+        }
+        appendChild(parent, styleElement);
+    }
+
+    function applyStyle() {
+        if (!adoptStyleSheet()) {
+            addStyleElement();
         }
     }
 
@@ -595,7 +656,7 @@
             isWatchingPlaces = true;
             requestFrame(function () {
                 isWatchingPlaces = false;
-                adoptStyle();
+                applyStyle();
                 const current = records;
                 for (let i = 0; i < current.length; i++) {
                     if (isHere(current[i].element)) {
@@ -623,81 +684,110 @@
         hostEnd();
     }
 
+    function listenToUnload() {
+        removeEventListener(theWindow, 'unload', onUnload);
+        addEventListener(theWindow, 'unload', onUnload);
+    }
+
     function onPageHide(event) {
         if (isPersisted(event)) {
             leave();
         } else {
-            addEventListener(theWindow, 'unload', onUnload);
+            listenToUnload();
         }
     }
 
     function onPageShow(event) {
         if (isPersisted(event)) {
             isAway = false;
-            collect(documentElement(theDocument));
+            forEachEmbedding(documentElement(theDocument), addPending);
             settle();
         }
+    }
+
+    function onReadyStateChange() {
+        settle();
+        endLookups();
     }
 
     function listen() {
         addEventListener(theWindow, 'pagehide', onPageHide, true);
         addEventListener(theWindow, 'pageshow', onPageShow, true);
-        addEventListener(theDocument, 'readystatechange', settle, true);
+        // WPE WebKit 2.38 hides a frame that is removed without pagehide if file URLs may read everything.
+        addEventListener(theDocument, 'visibilitychange', listenToUnload, true);
+        addEventListener(theDocument, 'readystatechange', onReadyStateChange, true);
     }
     listen();
 
     // --- navigator.plugins and navigator.mimeTypes
 
+    const { MimeType: MimeTypeClass, MimeTypeArray: MimeTypeArrayClass, Plugin: PluginClass,
+        PluginArray: PluginArrayClass } = theWindow;
+
+    function define(object, name, value, enumerable) {
+        defineProperty(object, name, { __proto__: null, value, enumerable, configurable: true });
+    }
+
     // An array-like object of that class with the items by index and, hidden, by name.
-    function listOf(prototype, items, nameOf) {
-        const list = create(prototype);
-        const hidden = { writable: false, enumerable: false, configurable: true };
-        const add = function (name, value) {
-            defineProperty(list, name, assign({ value: value }, hidden));
-        };
+    function listOf(itsClass, items, nameOf) {
+        const list = create(itsClass.prototype);
         for (let i = 0; i < items.length; i++) {
-            defineProperty(list, i, { value: items[i], writable: false, enumerable: true, configurable: true });
-            add(nameOf(items[i]), items[i]);
+            define(list, i, items[i], true);
+            define(list, nameOf(items[i]), items[i], false);
         }
-        add('length', items.length);
-        add('item', function (index) { return items[index >>> 0] || null; });
-        add('namedItem', function (name) {
+        define(list, 'length', items.length, false);
+        define(list, 'item', function (index) { return items[index >>> 0] || null; }, false);
+        define(list, 'namedItem', function (name) {
             for (let i = 0; i < items.length; i++) {
                 if (nameOf(items[i]) === '' + name) {
                     return items[i];
                 }
             }
             return null;
-        });
-        add('refresh', function () {});
+        }, false);
+        define(list, 'refresh', function () {}, false);
         return list;
     }
 
     function describePlugin() {
         const mimeTypes = [];
         for (let i = 0; i < typeList.length; i++) {
-            const mimeType = create(MimeType.prototype);
-            const fields = ['type', 'suffixes', 'description'];
-            for (let j = 0; j < fields.length; j++) {
-                defineProperty(mimeType, fields[j], { value: typeList[i][fields[j]], enumerable: true });
-            }
-            mimeTypes[i] = mimeType;
+            const mimeType = create(MimeTypeClass.prototype);
+            define(mimeType, 'type', typeList[i].type, true);
+            define(mimeType, 'suffixes', typeList[i].suffixes, true);
+            define(mimeType, 'description', typeList[i].description, true);
+            define(mimeTypes, i, mimeType, true);
         }
         const typeName = function (mimeType) { return mimeType.type; };
-        const plugin = listOf(Plugin.prototype, mimeTypes, typeName);
-        defineProperty(plugin, 'name', { value: pluginName, enumerable: true });
-        defineProperty(plugin, 'description', { value: pluginDescription, enumerable: true });
-        defineProperty(plugin, 'filename', { value: pluginFile, enumerable: true });
+        const plugin = listOf(PluginClass, mimeTypes, typeName);
+        define(plugin, 'name', pluginName, true);
+        define(plugin, 'description', pluginDescription, true);
+        define(plugin, 'filename', pluginFile, true);
         for (let i = 0; i < mimeTypes.length; i++) {
-            defineProperty(mimeTypes[i], 'enabledPlugin', { value: plugin, enumerable: true });
+            define(mimeTypes[i], 'enabledPlugin', plugin, true);
         }
-        const plugins = listOf(PluginArray.prototype, [plugin], function () { return pluginName; });
-        const allTypes = listOf(MimeTypeArray.prototype, mimeTypes, typeName);
-        const property = { enumerable: true, configurable: true };
-        defineProperty(Navigator.prototype, 'plugins', assign({ get: function () { return plugins; } }, property));
-        defineProperty(Navigator.prototype, 'mimeTypes', assign({ get: function () { return allTypes; } }, property));
+        return {
+            __proto__: null,
+            plugins: listOf(PluginArrayClass, [plugin], function () { return pluginName; }),
+            mimeTypes: listOf(MimeTypeArrayClass, mimeTypes, typeName)
+        };
     }
-    describePlugin();
+
+    // Few pages ask.
+    let description = null;
+    function describeBy(name) {
+        defineProperty(Navigator.prototype, name, {
+            __proto__: null,
+            get: function () {
+                description = description || describePlugin();
+                return description[name];
+            },
+            enumerable: true,
+            configurable: true
+        });
+    }
+    describeBy('plugins');
+    describeBy('mimeTypes');
 
     // --- Requests of the plug-in
 
@@ -724,7 +814,9 @@
     const headerOf = uncurry(Headers.prototype.get);
     const forEachHeader = uncurry(Headers.prototype.forEach);
     const getReader = uncurry(ReadableStream.prototype.getReader);
-    const readPiece = uncurry(getPrototypeOf(getReader(new ReadableStream())).read);
+    // WPE WebKit 2.38 shows the class by its objects only.
+    const Reader = theWindow.ReadableStreamDefaultReader || getReader(new ReadableStream()).constructor;
+    const readPiece = uncurry(Reader.prototype.read);
     const Bytes = Uint8Array;
     const byteLength = getter(getPrototypeOf(Uint8Array.prototype), 'length');
     const subarray = uncurry(Uint8Array.prototype.subarray);

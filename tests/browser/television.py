@@ -88,7 +88,8 @@ class Lines:
     def __init__(self, stream):
         self.lines = []
         self._changed = threading.Condition()
-        threading.Thread(target=self._read, args=[stream], daemon=True).start()
+        self._thread = threading.Thread(target=self._read, args=[stream], daemon=True)
+        self._thread.start()
 
     def _read(self, stream):
         for line in stream:
@@ -100,6 +101,11 @@ class Lines:
         """Whether there is a line with this ending, waiting for it up to `timeout` seconds."""
         with self._changed:
             return self._changed.wait_for(lambda: any(line.endswith(ending) for line in self.lines), timeout)
+
+    def until_end(self):
+        """All lines, waiting for the end of the stream."""
+        self._thread.join(WAIT_TIMEOUT)
+        return self.lines
 
 
 class Television:

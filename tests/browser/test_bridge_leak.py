@@ -1,5 +1,5 @@
 """Nothing of a page with all seven objects is left after it: many loads leave the memory, threads and file descriptors of the
-web process level. test_bridge_leak.py [LOADS], 300 by default. Prints what the process holds in each tenth of
+web process level. test_bridge_leak.py [LOADS], 500 by default. Prints what the process holds in each tenth of
 the time."""
 
 import contextlib
@@ -14,7 +14,7 @@ import unittest
 from television import Television
 
 PAGE = pathlib.Path(__file__).absolute().parents[2] / 'bench' / 'pages' / 'sevenobjects.html'
-LOADS = int(sys.argv[1]) if len(sys.argv) > 1 else 300
+LOADS = int(sys.argv[1]) if len(sys.argv) > 1 else 500
 PARTS = 10
 # The caches of the engine fill in the first parts.
 SETTLED_PARTS = 5

@@ -4,7 +4,7 @@ import os
 import signal
 import unittest
 
-from television import Television
+from television import WAIT_TIMEOUT, Lines, Television
 
 PAGE = os.path.join(os.path.dirname(os.path.abspath(__file__)), 'pages', 'lowmemory.html')
 
@@ -14,20 +14,18 @@ class LowMemory(unittest.TestCase):
         with Television(os.environ['TELIX_TV']) as television:
             with television.start('--plugin', os.environ['TELIX_PLUGIN'], PAGE,
                                   environment={'LOG_MODULE': '2'}) as process:
-                errors = []
-                while not {'handlers set', 'callback handled'} <= {line.split(': ')[-1] for line in errors}:
-                    line = process.stderr.readline()
-                    self.assertNotEqual(line, '', errors)
-                    errors.append(line.rstrip('\n'))
+                output, errors = Lines(process.stdout), Lines(process.stderr)
+                for ending in ('handlers set', 'callback handled'):
+                    self.assertTrue(errors.wait_for(ending), errors.lines)
                 process.send_signal(signal.SIGTERM)
-                output, rest = process.communicate(timeout=60)
-        errors += rest.splitlines()
-        self.assertEqual(process.returncode, 128 + signal.SIGTERM, output)
-        self.assertEqual([line for line in errors if line.startswith('call ')],
+                status = process.wait(WAIT_TIMEOUT)
+                messages = output.until_end() + errors.until_end()
+        self.assertEqual(status, 128 + signal.SIGTERM, messages)
+        self.assertEqual([line for line in messages if line.startswith('call ')],
                          ['call TELIX_JS_APP_RegisterLowMemory(callback)',
                           'call TELIX_JS_APP_UnRegisterLowMemory(callback)'])
-        self.assertEqual(output.count(':: handleOnLowMemory ::'), 1, output)
-        self.assertFalse([line for line in errors if 'handler called' in line], errors)
+        self.assertEqual(len([line for line in messages if ':: handleOnLowMemory ::' in line]), 1, messages)
+        self.assertFalse([line for line in messages if 'handler called' in line], messages)
 
 
 if __name__ == '__main__':

@@ -40,6 +40,16 @@ constexpr char kPageFunctions[] =
     "window.destroyHbbTVApplication = window.showHbbTVApplication = window.hideHbbTVApplication = function "
     "() {};";
 
+// The engine's own log of the console may be the system's journal.
+constexpr char kConsole[] = "console";
+constexpr char kConsoleFunctions[] = "(function () {"
+                                     "    var log = console.log, page = webkit.messageHandlers.console;"
+                                     "    console.log = function () {"
+                                     "        log.apply(console, arguments);"
+                                     "        page.postMessage(Array.prototype.join.call(arguments, ' '));"
+                                     "    };"
+                                     "}());";
+
 struct Options {
     char* extensions = nullptr;
     char* plugin = nullptr;
@@ -63,6 +73,11 @@ struct Run {
     int status = kSuccess;
     bool isEnding = false;
 };
+
+// Without steps the page is shown until a signal ends the program.
+bool hasSteps(const Options& options) {
+    return options.waitFor || options.eval || options.screenshot;
+}
 
 void complain(const std::string& text) {
     std::fprintf(stderr, "webkit_page_runner: %s\n", text.c_str());
@@ -153,7 +168,7 @@ void onEvaluated(GObject* view, GAsyncResult* result, gpointer data) {
 void evaluateLast(Run& run) {
     if (run.options.eval) {
         evaluate(run, run.options.eval, onEvaluated);
-    } else if (run.options.waitFor || run.options.screenshot) {
+    } else if (hasSteps(run.options)) {
         finish(run, kSuccess);
     }
 }
@@ -214,6 +229,12 @@ void onTerminated(WebKitWebView*, WebKitWebProcessTerminationReason reason, Run*
     }
 }
 
+void onConsoleMessage(WebKitUserContentManager*, WebKitJavascriptResult* message, gpointer) {
+    char* const text = jsc_value_to_string(webkit_javascript_result_get_js_value(message));
+    std::fprintf(stderr, "%s\n", text);
+    g_free(text);
+}
+
 gboolean onTimeout(gpointer data) {
     auto& run = *static_cast<Run*>(data);
     complain("given up after the timeout");
@@ -242,7 +263,6 @@ void onInitializeExtensions(WebKitWebContext* context, Run* run) {
 WebKitSettings* makeSettings(const Options& options) {
     WebKitSettings* const settings = webkit_settings_new();
     webkit_settings_set_hardware_acceleration_policy(settings, WEBKIT_HARDWARE_ACCELERATION_POLICY_NEVER);
-    webkit_settings_set_enable_write_console_messages_to_stdout(settings, TRUE);
     webkit_settings_set_allow_file_access_from_file_urls(settings, TRUE);
     webkit_settings_set_allow_universal_access_from_file_urls(settings, TRUE);
     webkit_settings_set_enable_page_cache(settings, FALSE);
@@ -252,21 +272,34 @@ WebKitSettings* makeSettings(const Options& options) {
     return settings;
 }
 
-void makeView(Run& run) {
-    static const gchar* const everywhere[] = {"*://*/*", nullptr};
-    WebKitWebContext* const context = webkit_web_context_new_ephemeral();
-    g_signal_connect(context, "initialize-web-extensions", G_CALLBACK(onInitializeExtensions), &run);
+void addScript(WebKitUserContentManager* content, const char* source) {
+    WebKitUserScript* const script =
+        webkit_user_script_new(source, WEBKIT_USER_CONTENT_INJECT_ALL_FRAMES,
+                               WEBKIT_USER_SCRIPT_INJECT_AT_DOCUMENT_START, nullptr, nullptr);
+    webkit_user_content_manager_add_script(content, script);
+    webkit_user_script_unref(script);
+}
+
+WebKitUserContentManager* makeContentManager() {
     WebKitUserContentManager* const content = webkit_user_content_manager_new();
     WebKitUserStyleSheet* const style = webkit_user_style_sheet_new(
         kStyle, WEBKIT_USER_CONTENT_INJECT_ALL_FRAMES, WEBKIT_USER_STYLE_LEVEL_USER, nullptr, nullptr);
     webkit_user_content_manager_add_style_sheet(content, style);
-    WebKitUserScript* const functions =
-        webkit_user_script_new(kPageFunctions, WEBKIT_USER_CONTENT_INJECT_ALL_FRAMES,
-                               WEBKIT_USER_SCRIPT_INJECT_AT_DOCUMENT_START, nullptr, nullptr);
-    webkit_user_content_manager_add_script(content, functions);
-    run.view =
-        WEBKIT_WEB_VIEW(g_object_new(WEBKIT_TYPE_WEB_VIEW, "web-context", context, "settings",
-                                     makeSettings(run.options), "user-content-manager", content, nullptr));
+    webkit_user_style_sheet_unref(style);
+    addScript(content, kPageFunctions);
+    g_signal_connect(content, "script-message-received::console", G_CALLBACK(onConsoleMessage), nullptr);
+    webkit_user_content_manager_register_script_message_handler(content, kConsole);
+    addScript(content, kConsoleFunctions);
+    return content;
+}
+
+void makeView(Run& run) {
+    static const gchar* const everywhere[] = {"*://*/*", nullptr};
+    WebKitWebContext* const context = webkit_web_context_new_ephemeral();
+    g_signal_connect(context, "initialize-web-extensions", G_CALLBACK(onInitializeExtensions), &run);
+    run.view = WEBKIT_WEB_VIEW(g_object_new(WEBKIT_TYPE_WEB_VIEW, "web-context", context, "settings",
+                                            makeSettings(run.options), "user-content-manager",
+                                            makeContentManager(), nullptr));
     if (run.options.cors) {
         webkit_web_view_set_cors_allowlist(run.view, everywhere);
     }
@@ -336,7 +369,7 @@ int main(int argc, char** argv) {
     makeView(run);
     webkit_web_view_load_uri(run.view, urlOf(run.options.pages[0]).c_str());
     g_unix_signal_add(SIGTERM, onTerminationSignal, &run);
-    if (run.options.timeout > 0) {
+    if (hasSteps(run.options) && run.options.timeout > 0) {
         g_timeout_add(static_cast<guint>(run.options.timeout * 1000), onTimeout, &run);
     }
     gtk_main();
