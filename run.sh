@@ -100,12 +100,10 @@ if [ ${#channels[@]} -gt 0 ]; then
     export TELIX_CHANNELS
 fi
 if [ -z "$page" ]; then
-    "$top/tools/make-clips.sh" "$build/media"
-    # The server stops when this process exits, which becomes telix-tv or waits for it.
-    exec 3< <(exec "$top/tools/media_server.py" --until-parent-ends "=$top/apps" "media=$build/media")
-    read -r -t 60 url <&3 || fail "tools/media_server.py: did not start within 60 seconds"
-    exec 3<&-
-    page="$url/demo/index.html"
+    # shellcheck source=tools/serve-demonstration.sh
+    . "$top/tools/serve-demonstration.sh"
+    serve_demonstration "$top" "$build/media"
+    page=$demonstration_url
 fi
 
 if [ -n "${DISPLAY:-}" ]; then

@@ -4,7 +4,7 @@
 #include <benchmark/benchmark.h>
 #include <glib.h>
 
-#include "bench/BenchBrowser.h"
+#include "bench/BenchMain.h"
 #include "common/JSPluginBase.h"
 #include "common/PluginExports.h"
 #include "src/avcontrol/AVControl.h"

@@ -9,7 +9,7 @@
 #include <string>
 #include <vector>
 
-#include "bench/BenchBrowser.h"
+#include "bench/BenchMain.h"
 #include "common/PluginExports.h"
 #include "common/ScriptReferences.h"
 #include "src/channel/JSChannel.h"

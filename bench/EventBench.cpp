@@ -9,7 +9,7 @@
 #include <string>
 #include <thread>
 
-#include "bench/BenchBrowser.h"
+#include "bench/BenchMain.h"
 #include "common/PluginExports.h"
 #include "common/PluginUtils.h"
 #include "src/videobroadcast/VideoBroadcast.h"

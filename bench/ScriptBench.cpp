@@ -7,7 +7,7 @@
 
 #include <cstdio>
 
-#include "bench/BenchBrowser.h"
+#include "bench/BenchMain.h"
 #include "common/BrowserGates.h"
 #include "common/PluginExports.h"
 #include "common/ScriptReferences.h"

@@ -59,6 +59,8 @@ class ScriptWrapper : public JSPluginBase {
 public:
     bool InvokeDefault(const NPVariant* args, unsigned int argCount, NPVariant* result) override;
 
+    const ScriptClass& scriptClass() const { return m_class; }
+
 protected:
     ScriptWrapper(NPP npp, const ScriptClass& scriptClass);
 

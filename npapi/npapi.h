@@ -1,6 +1,6 @@
 /* The browser plug-in interface (NPAPI): basic types, instances, windows, streams, variables and errors.
  * Own declarations of the public binary interface for X11. Static assertions check sizes and offsets for
- * 32-bit (i386) and 64-bit (LP64) machines. */
+ * 32-bit (ILP32) and 64-bit (LP64) machines. */
 #ifndef TELIX_NPAPI_NPAPI_H
 #define TELIX_NPAPI_NPAPI_H
 

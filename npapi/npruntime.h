@@ -94,8 +94,16 @@ NPAPI_STATIC_ASSERT(sizeof(NPVariantType) == 4);
 NPAPI_STATIC_ASSERT(sizeof(bool) == 1);
 NPAPI_STATIC_ASSERT(sizeof(NPString) == NPAPI_BY_WORD(8, 16));
 NPAPI_STATIC_ASSERT(offsetof(NPString, UTF8Length) == NPAPI_BY_WORD(4, 8));
-NPAPI_STATIC_ASSERT(sizeof(NPVariant) == NPAPI_BY_WORD(12, 24));
-NPAPI_STATIC_ASSERT(offsetof(NPVariant, value) == NPAPI_BY_WORD(4, 8));
+/* The value is aligned as the stricter of a double and a pointer: of the 32-bit machines, x86 aligns a double
+ * in a struct to 4 bytes, ARM and MIPS align it to 8. */
+typedef struct _NPDoubleAlignment {
+    char before;
+    double value;
+} NPDoubleAlignment;
+NPAPI_STATIC_ASSERT(offsetof(NPVariant, value) == (offsetof(NPDoubleAlignment, value) > sizeof(void*)
+                                                       ? offsetof(NPDoubleAlignment, value)
+                                                       : sizeof(void*)));
+NPAPI_STATIC_ASSERT(sizeof(NPVariant) == offsetof(NPVariant, value) + NPAPI_BY_WORD(8, 16));
 NPAPI_STATIC_ASSERT(sizeof(NPObject) == NPAPI_BY_WORD(8, 16));
 NPAPI_STATIC_ASSERT(offsetof(NPObject, referenceCount) == NPAPI_BY_WORD(4, 8));
 NPAPI_STATIC_ASSERT(sizeof(NPClass) == NPAPI_BY_WORD(52, 104));

@@ -1,24 +1,33 @@
 #!/usr/bin/env bash
-# Installs the Debian packages that are missing for the given purposes.
-# Usage: tools/install-packages.sh run|test ...
+# Installs the packages that are missing for the given purposes: of Debian, and programs from the npm registry.
+# Usage: tools/install-packages.sh run|test|machines|packages ...
 set -euo pipefail
 
 packages=(build-essential cmake ninja-build pkg-config libglib2.0-dev)
+programs=() # of the npm registry: PROGRAM=PACKAGE@VERSION
 for purpose in "$@"; do
     case "$purpose" in
     run)
         packages+=(qtbase5-dev libqt5webkit5-dev fonts-dejavu-core xvfb xauth libgstreamer1.0-dev
             libgstreamer-plugins-base1.0-dev gstreamer1.0-plugins-base gstreamer1.0-plugins-good
             gstreamer1.0-plugins-bad gstreamer1.0-plugins-ugly gstreamer1.0-libav gstreamer1.0-x gstreamer1.0-alsa
-            ffmpeg libjson-glib-dev python3)
+            ffmpeg libjson-glib-dev libcurl4-gnutls-dev libxml2-dev python3)
         ;;
     test)
         packages+=(libgtest-dev libgmock-dev libbenchmark-dev libexpat1-dev clang-14 libclang-rt-14-dev
             clang-format-14 clang-tidy-14 libjavascriptcoregtk-4.1-dev libwebkit2gtk-4.1-dev libwpewebkit-1.1-dev
-            cog python3 binutils util-linux)
+            cog python3 binutils util-linux dpkg-dev man-db openssl)
+        programs+=(tsc=typescript@5.4.5)
+        ;;
+    machines)
+        packages+=(g++-arm-linux-gnueabihf g++-aarch64-linux-gnu g++-i686-linux-gnu g++-mipsel-linux-gnu
+            qemu-user-static googletest python3)
+        ;;
+    packages)
+        packages+=(debhelper dpkg-dev lintian mmdebstrap python3 util-linux git)
         ;;
     *)
-        echo "$0: $purpose: unknown purpose, expected run or test" >&2
+        echo "$0: $purpose: unknown purpose, expected run, test, machines or packages" >&2
         exit 2
         ;;
     esac
@@ -30,19 +39,32 @@ for package in "${packages[@]}"; do
         missing+=("$package")
     fi
 done
-[ ${#missing[@]} -gt 0 ] || exit 0
+missing_programs=()
+for program in "${programs[@]}"; do
+    command -v "${program%%=*}" >/dev/null || missing_programs+=("${program#*=}")
+done
+if [ ${#missing_programs[@]} -gt 0 ] && ! command -v npm >/dev/null; then
+    missing+=(npm) # not in the list above: other packages of nodejs have it too
+fi
+[ ${#missing[@]} -gt 0 ] || [ ${#missing_programs[@]} -gt 0 ] || exit 0
 
 if ! command -v apt-get >/dev/null; then
-    echo "$0: cannot install ${missing[*]}: apt-get not found" >&2
+    echo "$0: cannot install ${missing[*]} ${missing_programs[*]}: apt-get not found" >&2
     exit 2
 elif [ "$(id -u)" -eq 0 ]; then
     sudo=()
 elif command -v sudo >/dev/null; then
     sudo=(sudo)
 else
-    echo "$0: cannot install ${missing[*]}: neither root nor sudo" >&2
+    echo "$0: cannot install ${missing[*]} ${missing_programs[*]}: neither root nor sudo" >&2
     exit 2
 fi
-echo "Installing: ${missing[*]}"
-"${sudo[@]}" apt-get update -q
-"${sudo[@]}" env DEBIAN_FRONTEND=noninteractive apt-get install -q -y --no-install-recommends "${missing[@]}"
+if [ ${#missing[@]} -gt 0 ]; then
+    echo "Installing: ${missing[*]}"
+    "${sudo[@]}" apt-get update -q
+    "${sudo[@]}" env DEBIAN_FRONTEND=noninteractive apt-get install -q -y --no-install-recommends "${missing[@]}"
+fi
+if [ ${#missing_programs[@]} -gt 0 ]; then
+    echo "Installing: ${missing_programs[*]}"
+    "${sudo[@]}" npm install --global --no-fund --no-audit "${missing_programs[@]}"
+fi

@@ -1,6 +1,6 @@
 #!/usr/bin/env python3
-"""Serves folders over HTTP on the loopback interface, as a broadcaster's server does: with byte ranges, and on request
-slowly, without ranges or with an error. For ./run.sh, the demonstration and the tests.
+"""Serves folders over HTTP or HTTPS on the loopback interface, as a broadcaster's server does: with byte ranges, and on
+request slowly, without ranges or with an error. For ./run.sh, the demonstration and the tests.
 
 The query of a URL controls the response:
   ?rate=BYTES      sends this many bytes a second
@@ -8,6 +8,8 @@ The query of a URL controls the response:
   ?ranges=no       does not accept byte ranges
   ?status=NUMBER   responds with this status
   ?cut=BYTES       closes the connection after this many bytes of the body
+  ?redirect=URL    responds with a redirection to URL
+  ?cookie=VALUE    adds a header Set-Cookie with VALUE
 
 In a playlist (.asx), whose clips need absolute URLs, @FOLDER@ stands for the URL of the folder that it is in."""
 
@@ -15,10 +17,12 @@ import argparse
 import contextlib
 import http.server
 import io
+import json
 import mimetypes
 import os
 import re
 import signal
+import ssl
 import sys
 import threading
 import time
@@ -83,10 +87,19 @@ class ResponseOptions:
         self.cut = self._number(values, 'cut', 0)
         self.trickle = self._number(values, 'trickle', 0)
         self.status = self._number(values, 'status', 200, 599)
+        self.redirect = self._header(values, 'redirect')
+        self.cookie = self._header(values, 'cookie')
         ranges = values.get('ranges', 'yes')
         if ranges not in ('yes', 'no'):
             raise BadRequest('ranges: must be yes or no')
         self.ranges = ranges == 'yes'
+
+    @staticmethod
+    def _header(values, name):
+        value = values.get(name)
+        if value is not None and not re.fullmatch(r'[\x20-\x7e]+', value):
+            raise BadRequest(f'{name}: must be printable ASCII')
+        return value
 
     @staticmethod
     def _number(values, name, minimum, maximum=None):
@@ -112,6 +125,8 @@ class Handler(http.server.BaseHTTPRequestHandler):
         self._respond(False)
 
     def _respond(self, with_body):
+        self.server.record(self.command, self.path, self.headers)
+        self._cookie = None
         path, _, query = self.path.partition('?')
         try:
             options = ResponseOptions(query)
@@ -119,12 +134,15 @@ class Handler(http.server.BaseHTTPRequestHandler):
         except BadRequest as error:
             self._refuse(400, str(error), with_body)
             return
-        if options.status is not None and options.status != 200:
+        self._cookie = options.cookie
+        if options.redirect is not None:
+            self._redirect(302, options.redirect)
+        elif options.status is not None and options.status != 200:
             self._refuse(options.status, 'status as requested', with_body)
         elif file is None:
             self._refuse(404, 'no such file', with_body)
         elif os.path.isdir(file):
-            self._redirect(path, query)
+            self._redirect(301, path + '/' + ('?' + query if query else ''))
         else:
             try:
                 with open(file, 'rb') as source:
@@ -138,7 +156,7 @@ class Handler(http.server.BaseHTTPRequestHandler):
         """What to send: a playlist with the URL of its folder, any other file as it is."""
         if not file.lower().endswith('.asx'):
             return source
-        folder = f'http://127.0.0.1:{self.server.server_address[1]}{path.rpartition("/")[0]}'
+        folder = self.server.url + path.rpartition("/")[0]
         return io.BytesIO(source.read().replace(b'@FOLDER@', folder.encode()))
 
     def _send(self, source, file, options, with_body):
@@ -187,9 +205,14 @@ class Handler(http.server.BaseHTTPRequestHandler):
                 time.sleep(max(0, due - time.monotonic()))
         return sent
 
-    def _redirect(self, path, query):
-        self.send_response(301)
-        self.send_header('Location', path + '/' + ('?' + query if query else ''))
+    def end_headers(self):
+        if self._cookie is not None:
+            self.send_header('Set-Cookie', self._cookie)
+        super().end_headers()
+
+    def _redirect(self, status, location):
+        self.send_response(status)
+        self.send_header('Location', location)
         self.send_header('Content-Length', '0')
         self.end_headers()
 
@@ -213,10 +236,25 @@ class Server(http.server.ThreadingHTTPServer):
     daemon_threads = True
     block_on_close = False
 
-    def __init__(self, folders, port):
+    def __init__(self, folders, port, certificate, log):
+        self._log = log
+        self._log_lock = threading.Lock()
         self._folders = sorted(folders.items(), key=lambda each: len(each[0]), reverse=True)
         self._released = threading.Event()
         super().__init__(('127.0.0.1', port), Handler)
+        if certificate:
+            context = ssl.SSLContext(ssl.PROTOCOL_TLS_SERVER)
+            context.load_cert_chain(certificate)
+            # The handshake is left to the thread of the connection.
+            self.socket = context.wrap_socket(self.socket, server_side=True, do_handshake_on_connect=False)
+        self.url = f'{"https" if certificate else "http"}://127.0.0.1:{self.server_address[1]}'
+
+    def record(self, method, path, headers):
+        """Adds a line to the log, before the response is sent."""
+        if self._log:
+            line = json.dumps({'method': method, 'path': path, 'headers': dict(headers.items())})
+            with self._log_lock, open(self._log, 'a', encoding='utf-8') as out:
+                out.write(line + '\n')
 
     def release(self):
         self._released.set()
@@ -249,18 +287,21 @@ class Server(http.server.ThreadingHTTPServer):
         return None
 
     def handle_error(self, request, client_address):
-        if not isinstance(sys.exc_info()[1], (ConnectionError, TimeoutError)):
+        # A client that refuses the certificate ends the connection as well.
+        if not isinstance(sys.exc_info()[1], (ConnectionError, TimeoutError, ssl.SSLError)):
             super().handle_error(request, client_address)
 
 
 class MediaServer:
     """A server on a thread of its own. `folders` maps a prefix of the path to a folder; the longest prefix wins.
-    Port 0: any free one. Raises OSError if the port is not available."""
+    Port 0: any free one. `certificate`: a file (PEM) with the certificate and its key, for HTTPS. `log`: a file that
+    gets a line of JSON for each request, with its method, path and headers. Raises OSError if the port is not
+    available or a file cannot be read."""
 
-    def __init__(self, folders, port=0):
+    def __init__(self, folders, port=0, certificate=None, log=None):
         self._server = Server({prefix.strip('/'): os.path.realpath(folder) for prefix, folder in folders.items()},
-                              port)
-        self.url = f'http://127.0.0.1:{self._server.server_address[1]}'
+                              port, certificate, log)
+        self.url = self._server.url
         self._thread = threading.Thread(target=self._server.serve_forever, args=(0.1,), daemon=True)
         self._thread.start()
 
@@ -287,6 +328,8 @@ def read_arguments():
                         help='serves FOLDER under /PREFIX; an empty PREFIX is the root')
     parser.add_argument('--port', type=int, default=0, help='port to listen on (default: 0, any free one)')
     parser.add_argument('--announce', metavar='FILE', help='writes the base URL to FILE, and removes FILE at the end')
+    parser.add_argument('--certificate', metavar='FILE', help='serves HTTPS with the certificate and key in FILE (PEM)')
+    parser.add_argument('--log', metavar='FILE', help='appends each request to FILE, as a line of JSON')
     parser.add_argument('--until-parent-ends', action='store_true', help='exits with the process that started it')
     arguments = parser.parse_args()
     if not 0 <= arguments.port <= 65535:
@@ -330,7 +373,8 @@ def main():
     for number in (signal.SIGINT, signal.SIGTERM):
         signal.signal(number, lambda *_: ended.set())
     try:
-        with MediaServer(arguments.folders, arguments.port) as server, announced(arguments.announce, server.url):
+        with MediaServer(arguments.folders, arguments.port, arguments.certificate,
+                         arguments.log) as server, announced(arguments.announce, server.url):
             signal.signal(signal.SIGUSR1, lambda *_: server.release())
             with contextlib.suppress(BrokenPipeError):
                 print(server.url, flush=True)

@@ -33,6 +33,7 @@ var media = (function () {
     ];
 
     var onClose = null;
+    /** @type {telix.AVControl} */
     var video = null;
     var objectsCreated = 0;
     var opened = null; // the clip that the object was created for

@@ -14,6 +14,7 @@ var television = (function () {
                    11: 'The set has not enough resources.' };
 
     var on = {};
+    /** @type {telix.VideoBroadcast} */
     var object = null;
     var previous = []; // earlier objects, one of which presents until `object` does
     var objectsCreated = 0;
@@ -200,6 +201,7 @@ var television = (function () {
         if (!state.isTuned) {
             return;
         }
+        /** @type {telix.VideoBroadcast} */
         var reader = tv.createObject('video/broadcast');
         var list = reader.programmes;
         state.programmes = [];

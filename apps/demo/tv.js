@@ -46,9 +46,10 @@ var tv = (function () {
         var created = document.createElement('table');
         rows.forEach(function (row) {
             var line = document.createElement('tr');
-            line.appendChild(element('td', row[0]));
+            var first = element('td', row[0]);
+            line.appendChild(first);
             if (row[1] === '') {
-                line.firstChild.colSpan = 2;
+                first.setAttribute('colspan', '2');
             } else {
                 line.appendChild(element('td', row[1]));
             }
@@ -111,8 +112,9 @@ var tv = (function () {
 
     // Creates a plug-in object that fills the screen. Without an `id` it is invisible and gets no events. `hasPlugin` of
     // the element says whether a plug-in handles it; the read forces the layout, which creates the instance.
+    /** @returns {any} the object that belongs to the type */
     function createObject(type, id) {
-        var created = document.createElement('object');
+        var created = /** @type {any} */ (document.createElement('object'));
         created.type = type;
         if (id) {
             created.id = id;
@@ -129,8 +131,9 @@ var tv = (function () {
         }
     }
 
-    return { byId: byId, element: element, fill: fill, setText: setText, setVisible: setVisible, isVisible: isVisible,
-             table: table, linesAround: linesAround, timeOfDay: timeOfDay, duration: duration,
-             languageName: languageName, describe: describe, describeApplication: describeApplication,
-             ownerApplication: ownerApplication, onKeys: onKeys, createObject: createObject, removeObject: removeObject };
+    return { byId: /** @type {Document['getElementById']} */ (byId), element: element, fill: fill, setText: setText,
+             setVisible: setVisible, isVisible: isVisible, table: table, linesAround: linesAround, timeOfDay: timeOfDay,
+             duration: duration, languageName: languageName, describe: describe,
+             describeApplication: describeApplication, ownerApplication: ownerApplication, onKeys: onKeys,
+             createObject: createObject, removeObject: removeObject };
 }());

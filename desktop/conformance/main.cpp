@@ -1,4 +1,5 @@
 // telix-conformance: checks the platform library of a television set against what the plug-in expects of it.
+#include <clocale>
 #include <cstdio>
 #include <glib.h>
 #include <stdexcept>
@@ -19,7 +20,7 @@ const char kDescription[] =
     "Each\n"
     "check prints one line: ok, FAIL with the reason, or skip with the missing precondition. Output of the\n"
     "library goes to standard error.\n\n"
-    "Exit status: 0 no check has failed, 1 one has failed, 2 bad command line, or not a library.";
+    "Exit status: 0 no check has failed; 1 a check has failed; 2 bad command line, or not a library.";
 
 // Bad input on the command line.
 class UsageError : public std::runtime_error {
@@ -112,6 +113,7 @@ ExitStatus run(const CheckOptions& options) {
 } // namespace desktop
 
 int main(int argc, char** argv) {
+    std::setlocale(LC_CTYPE, ""); // of the help text
     desktop::ExitStatus status = desktop::ExitStatus::BadInput;
     try {
         status = desktop::run(desktop::optionsOf(argc, argv));

@@ -9,10 +9,13 @@
 #include <utility>
 
 #include "desktop/platform/OwnedString.h"
+#include "desktop/platform/RegularFile.h"
 
 namespace desktop {
 
 namespace {
+
+constexpr size_t kMaxDocumentSize = size_t{1} << 20; // bytes
 
 struct MediaProfile {
     const char* element;
@@ -105,7 +108,7 @@ std::optional<Capabilities> Capabilities::parse(const std::string& document, std
 }
 
 std::optional<Capabilities> Capabilities::load(const std::string& file, std::string& error) {
-    const auto document = contentsOf(file, error);
+    const auto document = contentsOf(file, kMaxDocumentSize, error);
     std::optional<Capabilities> capabilities = document ? parse(*document, error) : std::nullopt;
     if (!capabilities) {
         error = file + ": " + error;

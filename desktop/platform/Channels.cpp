@@ -5,9 +5,9 @@
 
 #include <algorithm>
 #include <cstdio>
-#include <memory>
 
 #include "desktop/platform/Multiplex.h"
+#include "desktop/platform/RegularFile.h"
 #include "desktop/platform/Sections.h"
 
 namespace desktop {
@@ -15,6 +15,7 @@ namespace desktop {
 namespace {
 
 constexpr size_t kBytesScanned = size_t{8} << 20; // tables are repeated every two seconds at least
+constexpr size_t kPacketsRead = 1024;             // at once
 constexpr size_t kMaxUnlisted = 256;
 
 // The tables of a file that describe its services.
@@ -26,19 +27,14 @@ struct Scan {
 
 Scan scanFile(const std::string& file) {
     Scan scan;
-    struct Unref {
-        void operator()(GMappedFile* mapping) const { g_mapped_file_unref(mapping); }
-    };
-    GError* error = nullptr;
-    const std::unique_ptr<GMappedFile, Unref> mapping(g_mapped_file_new(file.c_str(), FALSE, &error));
-    if (!mapping) {
-        std::fprintf(stderr, "libtelix: %s\n", error->message);
-        g_error_free(error);
+    std::string error;
+    const auto opened = RegularFile::open(file, error);
+    if (!opened) {
+        std::fprintf(stderr, "libtelix: %s: %s\n", file.c_str(), error.c_str());
         return scan;
     }
-    const auto* bytes = reinterpret_cast<const uint8_t*>(g_mapped_file_get_contents(mapping.get()));
-    const size_t length = std::min(g_mapped_file_get_length(mapping.get()), kBytesScanned);
-    const auto start = findPackets(bytes, length);
+    Bytes packets(kPacketsRead * kPacketSize);
+    const auto start = findPackets(packets.data(), opened->read(packets.data(), packets.size(), 0));
     if (!start) {
         std::fprintf(stderr, "libtelix: %s: not a transport stream\n", file.c_str());
         return scan;
@@ -55,9 +51,17 @@ Scan scanFile(const std::string& file) {
     for (const uint16_t pid : {kPidPat, kPidSdt, kPidNit}) {
         demultiplexer.add(pid);
     }
-    for (size_t at = *start; at + kPacketSize <= length && !(scan.pat && scan.sdt && scan.nit);
-         at += kPacketSize) {
-        demultiplexer.push(bytes + at);
+    for (size_t offset = *start; offset < kBytesScanned; offset += packets.size()) {
+        const size_t length = opened->read(packets.data(), packets.size(), offset);
+        for (size_t at = 0; at + kPacketSize <= length; at += kPacketSize) {
+            if (scan.pat && scan.sdt && scan.nit) {
+                return scan;
+            }
+            demultiplexer.push(packets.data() + at);
+        }
+        if (length < packets.size()) {
+            break;
+        }
     }
     return scan;
 }

@@ -9,6 +9,7 @@
 #include <memory>
 
 #include "desktop/platform/OwnedString.h"
+#include "desktop/platform/RegularFile.h"
 #include "desktop/platform/Settings.h"
 
 namespace desktop {
@@ -16,6 +17,8 @@ namespace desktop {
 namespace {
 
 const char kBuiltInScheme[] = "dvb-si";
+
+constexpr size_t kMaxConfigurationSize = size_t{1} << 20; // bytes
 
 struct KeyFileFree {
     void operator()(GKeyFile* file) const { g_key_file_free(file); }
@@ -65,20 +68,20 @@ unsigned int lineOf(const std::string& contents, const std::string& section, con
     return found;
 }
 
-// The first line that GKeyFile rejects.
+// The first line that GKeyFile rejects: it accepts the lines before it, and rejects every beginning of the
+// file that contains it.
 unsigned int lineOfSyntaxError(const std::string& contents) {
-    std::string beginning;
-    unsigned int number = 0;
+    std::vector<size_t> ends; // of the lines
     for (const std::string& line : linesOf(contents)) {
-        ++number;
-        beginning += line + "\n";
-        const KeyFile file(g_key_file_new());
-        if (!g_key_file_load_from_data(file.get(), beginning.data(), beginning.size(), G_KEY_FILE_NONE,
-                                       nullptr)) {
-            return number;
-        }
+        ends.push_back((ends.empty() ? 0 : ends.back()) + line.size() + 1);
     }
-    return 0;
+    const auto isAccepted = [&](size_t end) {
+        const KeyFile file(g_key_file_new());
+        return g_key_file_load_from_data(file.get(), contents.data(), std::min(end, contents.size()),
+                                         G_KEY_FILE_NONE, nullptr) != FALSE;
+    };
+    const auto first = std::partition_point(ends.begin(), ends.end(), isAccepted);
+    return first == ends.end() ? 0 : static_cast<unsigned int>(first - ends.begin()) + 1;
 }
 
 // ---- Sections
@@ -188,6 +191,21 @@ std::optional<SettingError> readSection(SettingTarget& target, GKeyFile* file, c
     return section == kDrmSection ? finishDrmSystem(target) : std::nullopt;
 }
 
+// A variable of the environment that replaces a setting.
+void applyVariable(Configuration& configuration, const char* variable,
+                   std::string (*read)(SettingTarget& target, const std::string& value)) {
+    const char* value = g_getenv(variable);
+    if (!value || !*value) {
+        return;
+    }
+    const OwnedString folder(g_get_current_dir());
+    SettingTarget target{configuration, folder.get(), ""};
+    const std::string reason = read(target, value);
+    if (!reason.empty()) {
+        std::fprintf(stderr, "libtelix: %s: %s\n", variable, reason.c_str());
+    }
+}
+
 } // namespace
 
 // ---- Configuration
@@ -211,7 +229,7 @@ std::string Configuration::Error::message() const {
 std::optional<Configuration::Error> Configuration::load(const std::string& file,
                                                         Configuration& configuration) {
     std::string reason;
-    const auto found = contentsOf(file, reason);
+    const auto found = contentsOf(file, kMaxConfigurationSize, reason);
     if (!found) {
         return Error{file, 0, reason};
     }
@@ -253,13 +271,9 @@ Configuration Configuration::loadOrDefault() {
             std::fprintf(stderr, "libtelix: %s; the defaults apply\n", error->message().c_str());
         }
     }
-    if (const char* channels = g_getenv("TELIX_CHANNELS"); channels && *channels) {
-        const OwnedString folder(g_get_current_dir());
-        SettingTarget target{configuration, folder.get(), ""};
-        const std::string reason = readSources(target, channels);
-        if (!reason.empty()) {
-            std::fprintf(stderr, "libtelix: TELIX_CHANNELS: %s\n", reason.c_str());
-        }
+    for (const auto& [variable, read] :
+         {std::pair("TELIX_CHANNELS", readSources), std::pair("TELIX_APPLICATIONS", readApplicationsUrl)}) {
+        applyVariable(configuration, variable, read);
     }
     return configuration;
 }

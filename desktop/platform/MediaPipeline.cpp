@@ -8,7 +8,7 @@
 #include <utility>
 
 #include "desktop/platform/AudioSink.h"
-#include "desktop/platform/DeferredTeardown.h"
+#include "desktop/platform/HttpSource.h"
 
 namespace desktop {
 
@@ -20,27 +20,12 @@ constexpr const char* kPlaybinFlags = "video+audio+text+soft-volume+download";
 
 constexpr const char* kDownloadBufferElement = "downloadbuffer";
 
-constexpr guint kNetworkTimeout = 10; // seconds without data after which the connection counts as lost
-constexpr guint kTeardownTimeout = 2 * kNetworkTimeout;
 constexpr gint64 kBufferDuration = 2 * GST_SECOND; // buffered before playback starts
-
-bool hasProperty(GstElement* element, const char* name) {
-    return g_object_class_find_property(G_OBJECT_GET_CLASS(element), name) != nullptr;
-}
 
 void dropElement(GstElement* element) {
     if (element) {
         gst_object_unref(gst_object_ref_sink(element));
     }
-}
-
-// For an "accept-ranges" header anywhere in the structure; `acceptsByteRanges` points to a bool.
-gboolean readAcceptRanges(GQuark name, const GValue* value, gpointer acceptsByteRanges) {
-    if (g_ascii_strcasecmp(g_quark_to_string(name), "accept-ranges") == 0 && G_VALUE_HOLDS_STRING(value) &&
-        g_ascii_strcasecmp(g_value_get_string(value), "bytes") == 0) {
-        *static_cast<bool*>(acceptsByteRanges) = true;
-    }
-    return TRUE;
 }
 
 } // namespace
@@ -51,11 +36,12 @@ MediaPipeline::~MediaPipeline() {
     if (!m_playbin) {
         return;
     }
-    if (isRequestOutstanding()) {
-        DeferredTeardown::schedule(m_playbin, kTeardownTimeout);
-    } else {
-        tearDown(m_playbin);
-    }
+    GstBus* bus = gst_element_get_bus(m_playbin);
+    gst_bus_remove_watch(bus);
+    gst_bus_set_flushing(bus, TRUE);
+    gst_object_unref(bus);
+    gst_element_set_state(m_playbin, GST_STATE_NULL);
+    gst_object_unref(m_playbin);
 }
 
 // ---- Creation
@@ -66,7 +52,6 @@ bool MediaPipeline::start(Picture& picture, Picture::Token token, const Setup& s
     }
     const gchar* scheme = g_uri_peek_scheme(setup.url.c_str());
     m_source.isNetwork = scheme && std::strcmp(scheme, "file") != 0;
-    m_source.isHttp = scheme && g_str_has_prefix(scheme, "http");
     m_isPaused = setup.isPaused;
     m_pendingSeek.position = setup.position;
     if (setup.speed != 1) {
@@ -120,9 +105,6 @@ void MediaPipeline::connectSignals() {
 // GStreamer's thread.
 void MediaPipeline::onSourceSetup(GstElement* playbin, GstElement* source, gpointer shared) {
     (void)playbin;
-    if (hasProperty(source, "timeout") && hasProperty(source, "user-agent")) {
-        g_object_set(source, "timeout", kNetworkTimeout, nullptr);
-    }
     if (GstPad* pad = gst_element_get_static_pad(source, "src")) {
         gst_pad_add_probe(
             pad, GST_PAD_PROBE_TYPE_BUFFER,
@@ -195,8 +177,8 @@ void MediaPipeline::handleMessage(GstMessage* message) {
         onStateChanged(message);
         break;
     case GST_MESSAGE_ELEMENT:
-        if (isHttpHeadersMessage(message)) {
-            onHttpHeaders(gst_message_get_structure(message));
+        if (const auto report = httpResponseReport(message)) {
+            m_source.acceptsByteRanges = report->acceptsByteRanges;
         }
         break;
     case GST_MESSAGE_CLOCK_LOST:
@@ -217,15 +199,6 @@ void MediaPipeline::onStateChanged(GstMessage* message) {
         m_state != State::Started) {
         changeState(State::Started);
         m_listener.onStarted();
-    }
-}
-
-void MediaPipeline::onHttpHeaders(const GstStructure* message) {
-    m_source.hasResponse = true;
-    const GValue* headers = gst_structure_get_value(message, "response-headers");
-    if (headers && GST_VALUE_HOLDS_STRUCTURE(headers)) {
-        gst_structure_foreach(gst_value_get_structure(headers), readAcceptRanges,
-                              &m_source.acceptsByteRanges);
     }
 }
 
@@ -267,11 +240,6 @@ void MediaPipeline::changeState(State state) {
 // Whether playback is at the position and speed where it starts, or has started there.
 bool MediaPipeline::isAtStart() const {
     return m_state == State::Prerolled || m_state == State::Started;
-}
-
-// Whether a response may arrive at any moment.
-bool MediaPipeline::isRequestOutstanding() const {
-    return m_source.isHttp && m_state != State::Failed && (!m_source.hasResponse || m_isSeeking);
 }
 
 // Goes on after preroll and after each seek.

@@ -5,7 +5,7 @@
 //   MediaPipelineStreams.cpp  streams and their selection, audio
 //   MediaPipelineProgress.cpp position, duration, buffering, inspection
 //   MediaPipelineErrors.cpp   what a GStreamer error means to the plug-in
-//   DeferredTeardown.h        the end of the pipeline
+//   HttpSource.h              the source of media at http and https URLs
 //
 // Everything runs on the platform thread but for the callbacks from GStreamer's threads, which touch only
 // what is in Shared.
@@ -126,9 +126,7 @@ private:
     // What the URL and the responses tell of the source.
     struct Source {
         bool isNetwork = false;
-        bool isHttp = false;
         bool isLive = false;            // does not preroll, and does not wait for data
-        bool hasResponse = false;       // the server has responded, to the first request at least
         bool acceptsByteRanges = false; // of HTTP
         bool hasDownloadBuffer = false; // what has been received is kept in a file
     };
@@ -159,13 +157,11 @@ private:
     void changeState(State state);
     void handleMessage(GstMessage* message);
     void onStateChanged(GstMessage* message);
-    void onHttpHeaders(const GstStructure* message);
     void onBuffering(int percent);
     void onPrerolled();
     void settle();
     void applyTargetState();
     bool isAtStart() const;
-    bool isRequestOutstanding() const;
     bool usesDownloadBuffer() const;
 
     // MediaPipelineSeek.cpp

@@ -1,20 +1,10 @@
 // What a GStreamer error means to the plug-in.
+#include "desktop/platform/HttpSource.h"
 #include "desktop/platform/MediaPipeline.h"
 
 namespace desktop {
 
 namespace {
-
-// The status of the response that is the reason of the error; 0 if the reason is another one.
-uint32_t httpStatusOf(GstMessage* message) {
-    const GstStructure* details = nullptr;
-    gst_message_parse_error_details(message, &details);
-    guint status = 0;
-    if (details) {
-        gst_structure_get_uint(details, "http-status-code", &status);
-    }
-    return status;
-}
 
 // A source reports a dropped connection as "internal data stream error", which other elements use as well.
 bool isConnectionDropped(GstMessage* message, const GError& error) {
@@ -33,18 +23,15 @@ void MediaPipeline::onError(GstMessage* message) {
     g_error_free(error);
 }
 
+// Media that the server refuses, or a file that is not there, is the same as a server that cannot be reached:
+// if the browser requests the URL as well, it reports all of them to the plug-in as a network error, and
+// pages are to see one error whichever report comes first.
 TELIX_AV_CB_MSG MediaPipeline::classifyError(GstMessage* message, const GError& error) const {
-    const uint32_t status = httpStatusOf(message);
-    const bool isMissing =
-        (status >= 400 && status < 500) ||
-        (!m_source.isNetwork && g_error_matches(&error, GST_RESOURCE_ERROR, GST_RESOURCE_ERROR_NOT_FOUND));
-    if (isMissing) {
-        return TELIX_AV_CB_MSG_ERR_NOT_FOUND;
-    }
-    const bool isConnectionError =
-        m_source.isNetwork && status == 0 &&
-        (error.domain == GST_RESOURCE_ERROR || isConnectionDropped(message, error));
-    if (isConnectionError) {
+    const bool isOfSource = GST_OBJECT_FLAG_IS_SET(GST_MESSAGE_SRC(message), GST_ELEMENT_FLAG_SOURCE);
+    const bool isUnreachable = httpStatusOf(message) != 0 ||
+                               (error.domain == GST_RESOURCE_ERROR && (m_source.isNetwork || isOfSource)) ||
+                               (m_source.isNetwork && isConnectionDropped(message, error));
+    if (isUnreachable) {
         return m_shared->hasData ? TELIX_AV_CB_MSG_ERR_NET_DISCONNECTED
                                  : TELIX_AV_CB_MSG_ERR_NET_CANNOT_CONNECT;
     }

@@ -4,7 +4,6 @@
 
 #include <glib.h>
 #include <memory>
-#include <optional>
 #include <string>
 
 namespace desktop {
@@ -21,21 +20,6 @@ inline std::string messageOf(GError* error) {
     std::string message = error->message;
     g_error_free(error);
     return message;
-}
-
-// The contents of a file; nothing, with the reason in `error`, if it cannot be read.
-inline std::optional<std::string> contentsOf(const std::string& file, std::string& error) {
-    char* data = nullptr;
-    gsize length = 0;
-    GError* fileError = nullptr;
-    if (!g_file_get_contents(file.c_str(), &data, &length, &fileError)) {
-        error = messageOf(
-            fileError); // "Failed to open file “FILE”: REASON", and callers name the file themselves
-        error.erase(0, error.rfind(": ") == std::string::npos ? 0 : error.rfind(": ") + 2);
-        return std::nullopt;
-    }
-    const OwnedString owner(data);
-    return std::string(data, length);
 }
 
 // Without white space at both ends.

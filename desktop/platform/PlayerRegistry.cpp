@@ -4,7 +4,7 @@
 #include <cassert>
 #include <utility>
 
-#include "desktop/platform/ElementRank.h"
+#include "desktop/platform/HttpSource.h"
 
 namespace desktop {
 
@@ -14,9 +14,7 @@ PlayerRegistry& PlayerRegistry::instance() {
 }
 
 PlayerRegistry::PlayerRegistry() : m_platform(Platform::instance()) {
-    // A web engine in the process registers its own source element for http, which works in the engine's
-    // pipelines alone.
-    setRank("souphttpsrc", GST_RANK_PRIMARY + 1000);
+    registerHttpSource();
 }
 
 // ---- The table

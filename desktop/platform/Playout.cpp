@@ -1,11 +1,11 @@
 // Pacing by the PCR of the file, and its repetition.
 #include "desktop/platform/Playout.h"
 
-#include <glib.h>
-
 #include <algorithm>
+#include <array>
 #include <chrono>
 
+#include "desktop/platform/RegularFile.h"
 #include "desktop/platform/Restamper.h"
 #include "desktop/platform/Sections.h"
 
@@ -18,16 +18,13 @@ constexpr auto kMaxDelay = std::chrono::seconds(1);   // beyond that, playout do
 constexpr int64_t kMaxPcrGap = kSystemClockFrequency; // between two PCRs in a row
 constexpr int64_t kDefaultPcrGap = kSystemClockFrequency / 25; // instead of a gap that is longer or negative
 constexpr size_t kPacketsSearched = 40000;                     // for the following PCR
+constexpr size_t kPacketsRead = 1024;                          // at once
+constexpr auto kRetryInterval = std::chrono::seconds(1);       // while the file has no PCR any more
 
 Clock::Duration durationOf(int64_t ticks) {
     return std::chrono::duration_cast<Clock::Duration>(std::chrono::duration<double>(
         static_cast<double>(ticks) / static_cast<double>(kSystemClockFrequency)));
 }
-
-struct UnrefMapping {
-    void operator()(GMappedFile* mapping) const { g_mapped_file_unref(mapping); }
-};
-using Mapping = std::unique_ptr<GMappedFile, UnrefMapping>;
 
 // The duration of the file in whole frames, so that the next repetition begins where the following frame
 // would be. It cannot be derived from PCRs, which stand between frames.
@@ -56,18 +53,38 @@ private:
 
 } // namespace
 
-// A file that is played out.
+// A file that is played out. It may be written to meanwhile: the same packet may differ when it is read
+// again.
 class Playout::Stream {
 public:
-    Stream(std::string file, Mapping mapping, size_t start, std::unique_ptr<TableInjector> injector)
-        : m_file(std::move(file)), m_mapping(std::move(mapping)),
-          m_packets(reinterpret_cast<const uint8_t*>(g_mapped_file_get_contents(m_mapping.get())) + start),
-          m_count((g_mapped_file_get_length(m_mapping.get()) - start) / kPacketSize),
-          m_injector(std::move(injector)) {}
+    Stream(std::string name, std::unique_ptr<RegularFile> file, std::unique_ptr<TableInjector> injector)
+        : m_name(std::move(name)), m_file(std::move(file)), m_injector(std::move(injector)) {}
 
-    const std::string& file() const { return m_file; }
+    // Looks for the packets that the file has now. False, with nothing to play out, if it has none.
+    bool rewind() {
+        readWindow(0);
+        const auto start = findPackets(m_window.data(), m_window.size());
+        m_start = start.value_or(0);
+        const uint64_t size = m_file->size();
+        m_count = start && size > m_start ? (size - m_start) / kPacketSize : 0;
+        m_window.clear();
+        m_pcrPid = kPidNullPacket;
+        return start.has_value();
+    }
+
+    const std::string& name() const { return m_name; }
     size_t count() const { return m_count; }
-    const uint8_t* packet(size_t index) const { return m_packets + index * kPacketSize; }
+
+    // A null packet if the file has become shorter.
+    const uint8_t* packet(size_t index) {
+        if (index < m_windowBegin || index >= m_windowBegin + m_window.size() / kPacketSize) {
+            m_windowBegin = index;
+            readWindow(m_start + index * kPacketSize);
+        }
+        const size_t at = (index - m_windowBegin) * kPacketSize;
+        return at + kPacketSize <= m_window.size() ? m_window.data() + at : kNullPacket.data();
+    }
+
     TableInjector* injector() const { return m_injector.get(); }
 
     // Of several PIDs with a PCR, the first one in the file paces everything.
@@ -96,10 +113,20 @@ public:
     void withdraw() { m_isWithdrawn = true; }
 
 private:
-    std::string m_file;
-    Mapping m_mapping;
-    const uint8_t* m_packets; // in the mapping
-    size_t m_count;
+    static constexpr std::array<uint8_t, kPacketSize> kNullPacket{kSyncByte, kPidNullPacket >> 8,
+                                                                  kPidNullPacket & 0xFF, kPayloadFlag};
+
+    void readWindow(uint64_t offset) {
+        m_window.resize(kPacketsRead * kPacketSize);
+        m_window.resize(m_file->read(m_window.data(), m_window.size(), offset));
+    }
+
+    std::string m_name;
+    std::unique_ptr<RegularFile> m_file;
+    size_t m_start = 0;       // bytes before the first packet
+    size_t m_count = 0;       // of packets when the file was last rewound
+    Bytes m_window;           // packets that have been read
+    size_t m_windowBegin = 0; // index of the first of them
     std::unique_ptr<TableInjector> m_injector;
     uint16_t m_pcrPid = kPidNullPacket;
     bool m_isWithdrawn = false; // guarded by the playout's mutex
@@ -119,6 +146,9 @@ public:
 private:
     // Sends the file once. False if it was withdrawn.
     bool sendFile() {
+        if (!m_stream.rewind() || m_stream.findPcr(0) == m_stream.count()) {
+            return !isWithdrawnAt(m_playout.m_clock.now() + kRetryInterval);
+        }
         m_frames = FrameCount();
         m_elapsed = 0;
         m_ticksPerPacket = 0;
@@ -173,7 +203,9 @@ private:
         if (end >= m_stream.count()) {
             return static_cast<int64_t>(m_ticksPerPacket * static_cast<double>(end - begin));
         }
-        int64_t gap = *pcrOf(m_stream.packet(end)) - *pcrOf(m_stream.packet(begin));
+        const auto last = pcrOf(m_stream.packet(end));
+        const auto first = pcrOf(m_stream.packet(begin));
+        int64_t gap = last && first ? *last - *first : kDefaultPcrGap; // the file may have been overwritten
         gap = gap < 0 ? gap + kPcrPeriod : gap;
         gap = gap > kMaxPcrGap ? kDefaultPcrGap : gap;
         m_ticksPerPacket = static_cast<double>(gap) / static_cast<double>(end - begin);
@@ -233,26 +265,22 @@ Playout::~Playout() {
 bool Playout::play(const std::string& file, std::unique_ptr<TableInjector> injector, std::string& error) {
     {
         std::lock_guard<std::mutex> lock(m_mutex);
-        if (m_stream && m_stream->file() == file) {
+        if (m_stream && m_stream->name() == file) {
             return true;
         }
     }
     stop();
-    GError* reason = nullptr;
-    Mapping mapping(g_mapped_file_new(file.c_str(), FALSE, &reason));
-    if (!mapping) {
-        error = reason->message;
-        g_error_free(reason);
+    std::string reason;
+    auto opened = RegularFile::open(file, reason);
+    if (!opened) {
+        error = file + ": " + reason;
         return false;
     }
-    const auto start =
-        findPackets(reinterpret_cast<const uint8_t*>(g_mapped_file_get_contents(mapping.get())),
-                    g_mapped_file_get_length(mapping.get()));
-    if (!start) {
+    auto stream = std::make_shared<Stream>(file, std::move(opened), std::move(injector));
+    if (!stream->rewind()) {
         error = file + ": not a transport stream";
         return false;
     }
-    auto stream = std::make_shared<Stream>(file, std::move(mapping), *start, std::move(injector));
     if (stream->findPcr(0) == stream->count()) {
         error = file + ": no PCR";
         return false;

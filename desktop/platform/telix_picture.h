@@ -48,7 +48,9 @@ typedef void (*telix_desktop_release_frame_function)(telix_desktop_frame* frame)
 
 /* NOLINTEND(modernize-use-using) */
 
+#ifndef TELIX_DESKTOP_API
 #define TELIX_DESKTOP_API __attribute__((visibility("default")))
+#endif
 
 /* Sets the wake-up callback, of which there is one; null removes it. It is called immediately if something is
  * presented already. When this returns, the previous callback is not running and is not called again. */

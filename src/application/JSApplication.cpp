@@ -8,19 +8,19 @@ namespace {
 
 // quirk 16: a handler is written as an object or not at all; null is refused.
 constexpr ScriptMember kMembers[] = {
-    property("privateData", read<&Application::privateData>),
-    property("private", read<&Application::privateData>),
-    property("onKeyPress", read<&Application::onKeyPress>, write<&Application::setOnKeyPress>),
-    property("onKeyUp", read<&Application::onKeyUp>, write<&Application::setOnKeyUp>),
-    property("onKeyDown", read<&Application::onKeyDown>, write<&Application::setOnKeyDown>),
-    property("onApplicationShown", read<&Application::onApplicationShown>,
-             write<&Application::setOnApplicationShown>),
-    property("onApplicationHidden", read<&Application::onApplicationHidden>,
-             write<&Application::setOnApplicationHidden>),
-    method("createApplication", invoke<&Application::createApplication>),
-    method("destroyApplication", invoke<&Application::destroyApplication>),
-    method("show", invoke<&Application::show>),
-    method("hide", invoke<&Application::hide>),
+    property("privateData", reader<&Application::privateData>),
+    property("private", reader<&Application::privateData>),
+    property("onKeyPress", reader<&Application::onKeyPress>, writer<&Application::setOnKeyPress>),
+    property("onKeyUp", reader<&Application::onKeyUp>, writer<&Application::setOnKeyUp>),
+    property("onKeyDown", reader<&Application::onKeyDown>, writer<&Application::setOnKeyDown>),
+    property("onApplicationShown", reader<&Application::onApplicationShown>,
+             writer<&Application::setOnApplicationShown>),
+    property("onApplicationHidden", reader<&Application::onApplicationHidden>,
+             writer<&Application::setOnApplicationHidden>),
+    method("createApplication", invoker<&Application::createApplication>),
+    method("destroyApplication", invoker<&Application::destroyApplication>),
+    method("show", invoker<&Application::show>),
+    method("hide", invoker<&Application::hide>),
 };
 
 constexpr ScriptClass kClass("JSApplication", LogModule::APP_MGR, kMembers);

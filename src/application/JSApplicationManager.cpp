@@ -9,15 +9,15 @@ using Model = ApplicationManager;
 
 // Script spells "onLowMemory" with a capital M, the log does not.
 constexpr ScriptMember kMembers[] = {
-    property("onLowMemory", read<&Model::onLowmemory>, writeListener<&Model::setOnLowmemory>)
+    property("onLowMemory", reader<&Model::onLowmemory>, listenerWriter<&Model::setOnLowmemory>)
         .logged("onLowmemory"),
-    property("onApplicationLoaded", read<&Model::onApplicationLoaded>,
-             writeListener<&Model::setOnApplicationLoaded>),
-    property("onApplicationUnloaded", read<&Model::onApplicationUnloaded>,
-             writeListener<&Model::setOnApplicationUnloaded>),
-    property("onApplicationLoadError", read<&Model::onApplicationLoadError>,
-             writeListener<&Model::setOnApplicationLoadError>),
-    method("getOwnerApplication", invoke<&Model::getOwnerApplication>),
+    property("onApplicationLoaded", reader<&Model::onApplicationLoaded>,
+             listenerWriter<&Model::setOnApplicationLoaded>),
+    property("onApplicationUnloaded", reader<&Model::onApplicationUnloaded>,
+             listenerWriter<&Model::setOnApplicationUnloaded>),
+    property("onApplicationLoadError", reader<&Model::onApplicationLoadError>,
+             listenerWriter<&Model::setOnApplicationLoadError>),
+    method("getOwnerApplication", invoker<&Model::getOwnerApplication>),
 };
 
 constexpr ScriptClass kClass("JSApplicationManager", LogModule::APP_MGR, kMembers);

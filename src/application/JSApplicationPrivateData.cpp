@@ -13,8 +13,8 @@ bool readCurrentChannel(PluginBase& model, NPVariant& result) {
 }
 
 constexpr ScriptMember kMembers[] = {
-    property("keyset", read<&Model::keySet>),
-    method("getFreeMem", invoke<&Model::getFreeMem>),
+    property("keyset", reader<&Model::keySet>),
+    method("getFreeMem", invoker<&Model::getFreeMem>),
     property("currentChannel", readCurrentChannel),
 };
 

@@ -19,14 +19,14 @@ bool readAspectRatio(PluginBase& model, NPVariant& result) {
 }
 
 constexpr ScriptMember kMembers[] = {
-    property("type", read<&AVcomponent::getType>),
+    property("type", reader<&AVcomponent::getType>),
     property("encoding", readText<&AVcomponent::getEncoding>),
-    property("encrypted", read<&AVcomponent::getEncrypted>),
+    property("encrypted", reader<&AVcomponent::getEncrypted>),
     property("aspectRatio", readAspectRatio),
     property("language", readText<&AVcomponent::getLanguage>),
-    property("audioDescription", read<&AVcomponent::getAudioDescription>),
-    property("audioChannels", read<&AVcomponent::getAudioChannels>),
-    property("hearingImpaired", read<&AVcomponent::getHearingImpaired>),
+    property("audioDescription", reader<&AVcomponent::getAudioDescription>),
+    property("audioChannels", reader<&AVcomponent::getAudioChannels>),
+    property("hearingImpaired", reader<&AVcomponent::getHearingImpaired>),
 };
 
 constexpr ScriptClass kClass("JSAVcomponent", LogModule::AV_COMP, kMembers);

@@ -4,8 +4,8 @@
 namespace {
 
 constexpr ScriptMember kMembers[] = {
-    method("item", invoke<&AVcomponentList::item>),
-    property("length", read<&AVcomponentList::length>),
+    method("item", invoker<&AVcomponentList::item>),
+    property("length", reader<&AVcomponentList::length>),
 };
 
 // This one line is logged under the channels' module.

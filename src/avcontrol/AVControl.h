@@ -19,6 +19,7 @@
 
 #include <atomic>
 #include <memory>
+#include <mutex>
 #include <queue>
 #include <string>
 
@@ -284,8 +285,8 @@ private:
     bool m_memoryAudio = false;
     // Its sizes are apart from the attributes that the base class keeps.
     DisplayArea m_displayArea{RectangleResult::Tested};
-    // The URL in play: an immutable string that is exchanged as a whole, since the monitor reports it.
-    std::shared_ptr<const std::string> m_currentMedia = std::make_shared<const std::string>();
+    mutable std::mutex m_currentMediaMutex;
+    std::string m_currentMedia;               // the URL in play; the monitor reports it
     NPObject* m_onFullScreenChange = nullptr; // never released at the end
     NPObject* m_onPlaySpeedChanged = nullptr;
     NPObject* m_onPlayPositionChanged = nullptr;

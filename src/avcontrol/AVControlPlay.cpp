@@ -52,11 +52,13 @@ std::string withOneDecimal(double number) {
 } // namespace
 
 std::string AVControl::currentMedia() const {
-    return *std::atomic_load(&m_currentMedia);
+    const std::lock_guard<std::mutex> lock(m_currentMediaMutex);
+    return m_currentMedia;
 }
 
 void AVControl::setCurrentMedia(std::string url) {
-    std::atomic_store(&m_currentMedia, std::make_shared<const std::string>(std::move(url)));
+    const std::lock_guard<std::mutex> lock(m_currentMediaMutex);
+    m_currentMedia = std::move(url);
 }
 
 void AVControl::selectMedia() {

@@ -59,7 +59,7 @@ bool writeOnFullScreenChange(PluginBase& model, const NPVariant& value) {
         controlOf(model).setOnPlayStateChange(nullptr);
         return true;
     }
-    return writeListener<&Model::setOnFullScreenChange>(model, value);
+    return listenerWriter<&Model::setOnFullScreenChange>(model, value);
 }
 
 template <int Direction>
@@ -83,43 +83,43 @@ bool invokeQueue(PluginBase& model, const NPVariant* args, unsigned int, NPVaria
 }
 
 constexpr ScriptMember kMembers[] = {
-    property("data", readData, write<&Model::setData>),
+    property("data", readData, writer<&Model::setData>),
     property("playPosition", readPlayPosition),
     property("playTime", readPlayTime),
     property("playState", readPlayState),
     property("error", readError),
-    property("speed", read<&Model::getPlaySpeed>),
-    property("fullScreen", read<&Model::isFullScreen>),
-    property("onPlayStateChange", read<&Model::getOnPlayStateChange>,
-             writeListener<&Model::setOnPlayStateChange>),
-    property("nrTracks", read<&Model::getNrTracks>),
-    property("currentTrackIndex", read<&Model::getCurTrackIndex>, write<&Model::setCurTrackIndex>),
+    property("speed", reader<&Model::getPlaySpeed>),
+    property("fullScreen", reader<&Model::isFullScreen>),
+    property("onPlayStateChange", reader<&Model::getOnPlayStateChange>,
+             listenerWriter<&Model::setOnPlayStateChange>),
+    property("nrTracks", reader<&Model::getNrTracks>),
+    property("currentTrackIndex", reader<&Model::getCurTrackIndex>, writer<&Model::setCurTrackIndex>),
     // quirk 60: stored and read back; no other effect.
-    property("persist", read<&Model::getPersist>, write<&Model::setPersist>),
-    property("width", read<&Model::getWidth>, write<&Model::setWidth>),
-    property("height", read<&Model::getHeight>, write<&Model::setHeight>),
-    property("onFullScreenChange", read<&Model::getOnFullScreenChange>, writeOnFullScreenChange),
-    property("onPlaySpeedChanged", read<&Model::getOnPlaySpeedChanged>,
-             writeListener<&Model::setOnPlaySpeedChanged>),
-    property("onPlayPositionChanged", read<&Model::getOnPlayPositionChanged>,
-             writeListener<&Model::setOnPlayPositionChanged>),
-    method("play", invoke<&Model::play>),
-    method("seek", invoke<&Model::seek>),
-    method("stop", invoke<&Model::stop>),
+    property("persist", reader<&Model::getPersist>, writer<&Model::setPersist>),
+    property("width", reader<&Model::getWidth>, writer<&Model::setWidth>),
+    property("height", reader<&Model::getHeight>, writer<&Model::setHeight>),
+    property("onFullScreenChange", reader<&Model::getOnFullScreenChange>, writeOnFullScreenChange),
+    property("onPlaySpeedChanged", reader<&Model::getOnPlaySpeedChanged>,
+             listenerWriter<&Model::setOnPlaySpeedChanged>),
+    property("onPlayPositionChanged", reader<&Model::getOnPlayPositionChanged>,
+             listenerWriter<&Model::setOnPlayPositionChanged>),
+    method("play", invoker<&Model::play>),
+    method("seek", invoker<&Model::seek>),
+    method("stop", invoker<&Model::stop>),
     method("next", invokeChangeClip<1>),
     method("previous", invokeChangeClip<-1>),
-    method("getComponents", invoke<&Model::getComponents>),
-    method("getCurrentActiveComponents", invoke<&Model::getCurrentActiveComponents>),
-    method("selectComponent", invoke<&Model::selectComponent>),
-    method("unselectComponent", invoke<&Model::unSelectComponent>),
-    method("setVolume", invoke<&Model::setVolume>),
-    method("setFullScreen", invoke<&Model::setFullScreenChange>),
+    method("getComponents", invoker<&Model::getComponents>),
+    method("getCurrentActiveComponents", invoker<&Model::getCurrentActiveComponents>),
+    method("selectComponent", invoker<&Model::selectComponent>),
+    method("unselectComponent", invoker<&Model::unSelectComponent>),
+    method("setVolume", invoker<&Model::setVolume>),
+    method("setFullScreen", invoker<&Model::setFullScreenChange>),
     constant("COMPONENT_TYPE_VIDEO", 0),
     constant("COMPONENT_TYPE_AUDIO", 1),
     constant("COMPONENT_TYPE_SUBTITLE", 2),
     method("queue", invokeQueue),
-    property("onDRMRightsError", read<&Model::getOnDRMRightsError>,
-             writeListener<&Model::setOnDRMRightsError>),
+    property("onDRMRightsError", reader<&Model::getOnDRMRightsError>,
+             listenerWriter<&Model::setOnDRMRightsError>),
 };
 
 constexpr ScriptClass kClass = ScriptClass("JSAVControl", LogModule::AVCONTROL, kMembers)

@@ -6,10 +6,10 @@
 namespace {
 
 constexpr ScriptMember kMembers[] = {
-    property("xmlCapabilities", read<&Capabilities::getxmlCapabilities>),
-    method("hasCapability", invoke<&Capabilities::hasCapability>),
-    property("extraSDVideoDecodes", read<&Capabilities::getExtraSDVideoDecodes>),
-    property("extraHDVideoDecodes", read<&Capabilities::getExtraHDVideoDecodes>),
+    property("xmlCapabilities", reader<&Capabilities::getxmlCapabilities>),
+    method("hasCapability", invoker<&Capabilities::hasCapability>),
+    property("extraSDVideoDecodes", reader<&Capabilities::getExtraSDVideoDecodes>),
+    property("extraHDVideoDecodes", reader<&Capabilities::getExtraHDVideoDecodes>),
 };
 
 constexpr ScriptClass kClass("JSCapabilities", LogModule::CAPABILITIES, kMembers);

@@ -6,13 +6,13 @@ namespace {
 constexpr const char* kRefusal = "JSChannel class\n";
 
 constexpr ScriptMember kMembers[] = {
-    property("onid", read<&Channel::getOnid>).logged("Onid"),
-    property("tsid", read<&Channel::getTsid>).logged("Tsid"),
-    property("sid", read<&Channel::getSid>).logged("Sid"),
-    property("channelType", read<&Channel::getChannelType>).logged("ChannelType"),
-    property("ccid", read<&Channel::getCcid>).logged("Ccid"),
-    property("name", read<&Channel::getName>).logged("Name"),
-    property("dsd", read<&Channel::getDsd>).logged("Dsd"),
+    property("onid", reader<&Channel::getOnid>).logged("Onid"),
+    property("tsid", reader<&Channel::getTsid>).logged("Tsid"),
+    property("sid", reader<&Channel::getSid>).logged("Sid"),
+    property("channelType", reader<&Channel::getChannelType>).logged("ChannelType"),
+    property("ccid", reader<&Channel::getCcid>).logged("Ccid"),
+    property("name", reader<&Channel::getName>).logged("Name"),
+    property("dsd", reader<&Channel::getDsd>).logged("Dsd"),
     constant("TYPE_TV", 0).logged("ChannelType_TV"),
     constant("TYPE_RADIO", 1).logged("ChannelType_RADIO"),
     constant("TYPE_OTHER", 2).logged("ChannelType_OTHER"),

@@ -6,7 +6,7 @@ namespace {
 constexpr const char* kRefusal = "JSChannelConfig class\n";
 
 constexpr ScriptMember kMembers[] = {
-    property("channelList", read<&ChannelConfig::getChannelList>),
+    property("channelList", reader<&ChannelConfig::getChannelList>),
 };
 
 constexpr ScriptClass kClass = ScriptClass("JSChannelConfig", LogModule::CHANNEL, kMembers)

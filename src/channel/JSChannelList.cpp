@@ -23,9 +23,9 @@ constexpr NPObject* (ChannelList::*kGetChannelByCcid)(const std::string&) = &Cha
 
 constexpr ScriptMember kMembers[] = {
     method("getChannelByTriplet", invokeGetChannelByTriplet),
-    method("item", invoke<&ChannelList::getitem>),
-    method("getChannel", invoke<kGetChannelByCcid>),
-    property("length", read<&ChannelList::getLength>),
+    method("item", invoker<&ChannelList::getitem>),
+    method("getChannel", invoker<kGetChannelByCcid>),
+    property("length", reader<&ChannelList::getLength>),
 };
 
 constexpr ScriptArray kArray =

@@ -4,9 +4,9 @@
 namespace {
 
 constexpr ScriptMember kMembers[] = {
-    property("preferredAudioLanguage", read<&Configuration::getPreferredAudioLanguage>),
-    property("preferredSubtitleLanguage", read<&Configuration::getPreferredSubtitleLanguage>),
-    property("countryId", read<&Configuration::getCountryId>),
+    property("preferredAudioLanguage", reader<&Configuration::getPreferredAudioLanguage>),
+    property("preferredSubtitleLanguage", reader<&Configuration::getPreferredSubtitleLanguage>),
+    property("countryId", reader<&Configuration::getCountryId>),
 };
 
 // A name that isn't one of these leaves the result as the browser gave it.

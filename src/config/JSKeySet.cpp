@@ -15,7 +15,7 @@ bool setValue(PluginBase& model, const NPVariant* args, unsigned int, NPVariant&
 }
 
 constexpr ScriptMember kMembers[] = {
-    property("value", read<&KeySet::getValue>),
+    property("value", reader<&KeySet::getValue>),
     method("setValue", setValue),
     constant("RED", 0x1),
     constant("GREEN", 0x2),

@@ -8,8 +8,8 @@ namespace {
 constexpr const char* kRefusal = "JSOipfConfiguration class\n";
 
 constexpr ScriptMember kMembers[] = {
-    property("keyset", read<&OipfConfiguration::getKeySetObject>),
-    property("configuration", read<&OipfConfiguration::getConfigurationObject>),
+    property("keyset", reader<&OipfConfiguration::getKeySetObject>),
+    property("configuration", reader<&OipfConfiguration::getConfigurationObject>),
 };
 
 constexpr ScriptClass kClass = ScriptClass("JSOipfConfiguration", LogModule::CONFIG, kMembers)

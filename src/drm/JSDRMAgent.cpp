@@ -19,8 +19,8 @@ bool sendDRMMessage(PluginBase& model, const NPVariant* args, unsigned int, NPVa
 }
 
 constexpr ScriptMember kMembers[] = {
-    property("onDRMMessageResult", read<&DRMAgent::getOnDRMMessageResult>,
-             writeListener<&DRMAgent::setOnDRMMessageResult>),
+    property("onDRMMessageResult", reader<&DRMAgent::getOnDRMMessageResult>,
+             listenerWriter<&DRMAgent::setOnDRMMessageResult>),
     method("sendDRMMessage", sendDRMMessage),
 };
 

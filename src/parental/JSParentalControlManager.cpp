@@ -6,7 +6,7 @@
 namespace {
 
 constexpr ScriptMember kMembers[] = {
-    property("parentalRatingSchemes", read<&ParentalControlManager::getParentalRatingSchemes>),
+    property("parentalRatingSchemes", reader<&ParentalControlManager::getParentalRatingSchemes>),
 };
 
 constexpr ScriptClass kClass("JSParentalControlManager", LogModule::PARENTAL, kMembers);

@@ -15,10 +15,10 @@ bool readRegion(PluginBase& model, NPVariant& result) {
 }
 
 constexpr ScriptMember kMembers[] = {
-    property("name", read<&ParentalRating::getName>),
-    property("scheme", read<&ParentalRating::getScheme>),
-    property("value", read<&ParentalRating::getValue>),
-    property("labels", read<&ParentalRating::getLabels>),
+    property("name", reader<&ParentalRating::getName>),
+    property("scheme", reader<&ParentalRating::getScheme>),
+    property("value", reader<&ParentalRating::getValue>),
+    property("labels", reader<&ParentalRating::getLabels>),
     property("region", readRegion),
 };
 

@@ -6,8 +6,8 @@ namespace {
 using Model = ParentalRatingCollection;
 
 constexpr ScriptMember kMembers[] = {
-    method("item", invoke<&Model::getitem>),
-    property("length", read<&Model::getLength>),
+    method("item", invoker<&Model::getitem>),
+    property("length", reader<&Model::getLength>),
 };
 
 // This one line is logged under the channels' module.

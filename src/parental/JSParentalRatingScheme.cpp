@@ -36,9 +36,9 @@ bool invokeIconUri(PluginBase& model, const NPVariant* args, unsigned int, NPVar
 
 constexpr ScriptMember kMembers[] = {
     property("name", readName),
-    property("length", read<&Model::getLength>),
-    property("threshold", read<&Model::getThreshold>),
-    method("indexOf", invoke<&Model::getIndexOf>),
+    property("length", reader<&Model::getLength>),
+    property("threshold", reader<&Model::getThreshold>),
+    method("indexOf", invoker<&Model::getIndexOf>),
     method("item", invokeItem),
     method("iconUri", invokeIconUri),
 };

@@ -6,9 +6,9 @@ namespace {
 using Model = ParentalRatingSchemeCollection;
 
 constexpr ScriptMember kMembers[] = {
-    property("length", read<&Model::getLength>),
-    method("item", invoke<&Model::getitem>),
-    method("getParentalRatingScheme", invoke<&Model::getParentalRatingScheme>),
+    property("length", reader<&Model::getLength>),
+    method("item", invoker<&Model::getitem>),
+    method("getParentalRatingScheme", invoker<&Model::getParentalRatingScheme>),
 };
 
 constexpr ScriptArray kArray = scriptArray<&Model::getLength, &Model::getitem>(LogModule::PARENTAL, "");

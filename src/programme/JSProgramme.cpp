@@ -6,13 +6,13 @@ namespace {
 using Model = Programme;
 
 constexpr ScriptMember kMembers[] = {
-    property("name", read<&Model::getName>, write<&Model::setName>),
-    property("startTime", read<&Model::getStartTime>, write<&Model::setStartTime>),
-    property("duration", read<&Model::getDuration>, write<&Model::setDuration>),
-    property("description", read<&Model::getDescription>, write<&Model::setDescription>),
-    property("channelID", read<&Model::getChannelID>, write<&Model::setChannelID>),
+    property("name", reader<&Model::getName>, writer<&Model::setName>),
+    property("startTime", reader<&Model::getStartTime>, writer<&Model::setStartTime>),
+    property("duration", reader<&Model::getDuration>, writer<&Model::setDuration>),
+    property("description", reader<&Model::getDescription>, writer<&Model::setDescription>),
+    property("channelID", reader<&Model::getChannelID>, writer<&Model::setChannelID>),
     // quirk 33: the name of the property.
-    property("parentalRating", read<&Model::getParentalRatingCollectionObject>),
+    property("parentalRating", reader<&Model::getParentalRatingCollectionObject>),
 };
 
 constexpr ScriptClass kClass =

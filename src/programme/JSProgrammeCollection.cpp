@@ -6,8 +6,8 @@ namespace {
 using Model = ProgrammeCollection;
 
 constexpr ScriptMember kMembers[] = {
-    method("item", invoke<&Model::getitem>),
-    property("length", read<&Model::getLength>),
+    method("item", invoker<&Model::getitem>),
+    property("length", reader<&Model::getLength>),
 };
 
 constexpr ScriptArray kArray = scriptArray<&Model::getLength, &Model::getitem>(LogModule::PROGRAMME, "");

@@ -28,10 +28,15 @@ Type valueOf(const NPVariant& value) {
 
 // This object counts its arguments: a missing one does not match.
 template <auto Operation>
-bool invokeCounted(PluginBase& model, const NPVariant* args, unsigned int argCount, NPVariant& result) {
+bool countAndInvoke(PluginBase& model, const NPVariant* args, unsigned int argCount, NPVariant& result) {
     using Arguments = typename script_detail::Signature<decltype(Operation)>::Arguments;
-    return argCount >= std::tuple_size_v<Arguments> && invoke<Operation>(model, args, argCount, result);
+    return argCount >= std::tuple_size_v<Arguments> &&
+           script_detail::invokeOperation<Operation>(model, args, argCount, result);
 }
+
+template <auto Operation>
+constexpr TypedFunction<ScriptInvoker> invokeCounted{countAndInvoke<Operation>,
+                                                     script_detail::typesOf<Operation>()};
 
 // quirk 79: unlike the other handlers, whatever is not an object clears it.
 bool writeOnParentalRatingChange(PluginBase& model, const NPVariant& value) {
@@ -105,8 +110,8 @@ bool addStreamEventListener(PluginBase& model, const NPVariant* args, unsigned i
         void (Model::*)(const std::string&, const std::string&, const std::string&, const std::string&);
     constexpr PageForm pageForm = &Model::addStreamEventListener;
     constexpr RegisteringForm registeringForm = &Model::addStreamEventListener;
-    return invokeCounted<pageForm>(model, args, argCount, result) ||
-           invokeCounted<registeringForm>(model, args, argCount, result);
+    return countAndInvoke<pageForm>(model, args, argCount, result) ||
+           countAndInvoke<registeringForm>(model, args, argCount, result);
 }
 
 // quirk 89: any argument with a value is accepted, of whatever type.
@@ -170,34 +175,35 @@ bool createChannelObject(PluginBase& model, const NPVariant* args, unsigned int 
 }
 
 constexpr ScriptMember kMembers[] = {
-    property("width", read<&Model::getWidth>, write<&Model::setWidth>),
-    property("height", read<&Model::getHeight>, write<&Model::setHeight>),
-    property("fullScreen", read<&Model::isFullScreen>),
+    property("width", reader<&Model::getWidth>, writer<&Model::setWidth>),
+    property("height", reader<&Model::getHeight>, writer<&Model::setHeight>),
+    property("fullScreen", reader<&Model::isFullScreen>),
     // quirk 84: a write asks the platform for that state.
-    property("playState", read<&Model::getPlayState>, write<&Model::setPlayState>),
-    property("onFullScreenChange", read<&Model::getOnFullScreenChange>,
-             writeListener<&Model::setOnFullScreenChange>),
-    property("onChannelChangeSucceeded", read<&Model::getOnChannelChangeSucceeded>,
-             writeListener<&Model::setOnChannelChangeSucceeded>),
-    property("onChannelChangeError", read<&Model::getOnChannelChangeError>,
-             writeListener<&Model::setOnChannelChangeError>),
-    property("onPlayStateChange", read<&Model::getOnPlayStateChange>,
-             writeListener<&Model::setOnPlayStateChange>),
-    property("onProgrammesChanged", read<&Model::getOnProgrammesChanged>,
-             writeListener<&Model::setOnProgrammesChanged>),
-    property("onParentalRatingChange", read<&Model::getOnParentalRatingChange>, writeOnParentalRatingChange),
-    property("onParentalRatingError", read<&Model::getOnParentalRatingError>, writeOnParentalRatingError),
-    property("programmes", read<&Model::getProgrammes>),
-    property("currentChannel", read<&Model::getCurrChannel>),
-    method("getChannelConfig", invoke<&Model::getChannelConfig>),
+    property("playState", reader<&Model::getPlayState>, writer<&Model::setPlayState>),
+    property("onFullScreenChange", reader<&Model::getOnFullScreenChange>,
+             listenerWriter<&Model::setOnFullScreenChange>),
+    property("onChannelChangeSucceeded", reader<&Model::getOnChannelChangeSucceeded>,
+             listenerWriter<&Model::setOnChannelChangeSucceeded>),
+    property("onChannelChangeError", reader<&Model::getOnChannelChangeError>,
+             listenerWriter<&Model::setOnChannelChangeError>),
+    property("onPlayStateChange", reader<&Model::getOnPlayStateChange>,
+             listenerWriter<&Model::setOnPlayStateChange>),
+    property("onProgrammesChanged", reader<&Model::getOnProgrammesChanged>,
+             listenerWriter<&Model::setOnProgrammesChanged>),
+    property("onParentalRatingChange", reader<&Model::getOnParentalRatingChange>,
+             writeOnParentalRatingChange),
+    property("onParentalRatingError", reader<&Model::getOnParentalRatingError>, writeOnParentalRatingError),
+    property("programmes", reader<&Model::getProgrammes>),
+    property("currentChannel", reader<&Model::getCurrChannel>),
+    method("getChannelConfig", invoker<&Model::getChannelConfig>),
     method("setChannelByTriplet", setChannelByTriplet),
     // quirk 85: no result.
-    method("bindToCurrentChannel", invoke<&Model::bindToCurrentChannel>),
+    method("bindToCurrentChannel", invoker<&Model::bindToCurrentChannel>),
     method("setChannel", setChannel),
-    method("prevChannel", invoke<&Model::prevChannel>),
-    method("nextChannel", invoke<&Model::nextChannel>),
+    method("prevChannel", invoker<&Model::prevChannel>),
+    method("nextChannel", invoker<&Model::nextChannel>),
     method("setFullScreen", invokeCounted<&Model::setFullScreenChange>),
-    method("release", invoke<&Model::release>),
+    method("release", invoker<&Model::release>),
     method("addCarouselListener", addCarouselListener),
     method("addStreamEventListener", addStreamEventListener),
     method("removeStreamEventListener", invokeCounted<&Model::removeStreamEventListener>),
@@ -209,7 +215,7 @@ constexpr ScriptMember kMembers[] = {
     constant("COMPONENT_TYPE_SUBTITLE", 2),
     method("getComponents", invokeCounted<&Model::getComponents>),
     method("getCurrentActiveComponents", invokeCounted<&Model::getCurrentActiveComponents>),
-    method("stop", invoke<&Model::stop>),
+    method("stop", invoker<&Model::stop>),
 };
 
 constexpr ScriptClass kClass("JSVideoBroadcast", LogModule::VIDEOBCAST, kMembers);

@@ -4,6 +4,7 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 #include <set>
+#include <sys/stat.h>
 #include <unistd.h>
 
 #include "desktop/platform/Configuration.h"
@@ -94,6 +95,9 @@ TEST_F(ConfigurationTest, NamesFileLineAndReasonOfEveryFault) {
         {"[drm a]\nanswer=1\n", 2, "unknown key \"answer\""},
         {"[drm a]\n[drm  a]\n", 2, "given twice"},
         {"[set]\nkeys=red;pink\n", 2, "\"pink\" is not a group of keys"},
+        {"[test]\napplications=apps/\n", 2, "\"apps/\" is not an absolute URL"},
+        {"[set]\ninstant-zap=maybe\n", 2, "\"maybe\" is neither true nor false"},
+        {"[set]\nzap-delay=60001\n", 2, "zap-delay"},
         {"[set]\ncapabilities=missing.xml\n", 2, "missing.xml"},
     };
     for (const auto& fault : faults) {
@@ -124,6 +128,42 @@ TEST_F(ConfigurationTest, ChecksTheDocumentOfTheCapabilities) {
     std::remove(document.c_str());
 }
 
+// A device would be read without end, a pipe would block.
+TEST_F(ConfigurationTest, ReadsRegularFilesOfABoundedSizeOnly) {
+    const std::string fifo = m_file + ".fifo";
+    ASSERT_EQ(mkfifo(fifo.c_str(), 0600), 0);
+    for (const std::string& file : {std::string("/dev/zero"), fifo, std::string("/")}) {
+        const auto error = Configuration::load(file, m_configuration);
+        ASSERT_TRUE(error) << file;
+        EXPECT_EQ(error->message(), file + ": Not a regular file");
+        const auto inSetting = load("[set]\ncapabilities=" + file + "\n");
+        ASSERT_TRUE(inSetting) << file;
+        EXPECT_EQ(inSetting->message(), m_file + ":2: capabilities: " + file + ": Not a regular file");
+    }
+    unlink(fifo.c_str());
+
+    const std::string document = m_file + ".xml";
+    std::ofstream(document) << "<profilelist>" << std::string(1 << 20, ' ') << "</profilelist>";
+    const auto error = load("[set]\ncapabilities=" + document + "\n");
+    unlink(document.c_str());
+    ASSERT_TRUE(error);
+    EXPECT_EQ(error->reason, "capabilities: " + document + ": Larger than 1048576 bytes");
+    const auto tooLarge = load("[viewer]\ncountry=FRA\n" + std::string(1 << 20, '#'));
+    ASSERT_TRUE(tooLarge);
+    EXPECT_EQ(tooLarge->message(), m_file + ": Larger than 1048576 bytes");
+    EXPECT_EQ(m_configuration.country, "DEU");
+}
+
+TEST_F(ConfigurationTest, FindsTheLineOfASyntaxErrorInALargeFile) {
+    std::string contents = "[viewer]\n";
+    for (int line = 0; line < 50000; ++line) {
+        contents += "# note\n";
+    }
+    const auto error = load(contents + "nonsense\n" + contents);
+    ASSERT_TRUE(error);
+    EXPECT_EQ(error->line, 50002U);
+}
+
 TEST_F(ConfigurationTest, HasTheDefaultsOfTheTableWithoutAFile) {
     const Configuration defaults;
     ASSERT_EQ(defaults.sources.size(), 1U);
@@ -136,12 +176,26 @@ TEST_F(ConfigurationTest, HasTheDefaultsOfTheTableWithoutAFile) {
     EXPECT_EQ(defaults.ratingThreshold, 16U);
     EXPECT_TRUE(defaults.ratingSchemes.empty());
     EXPECT_TRUE(defaults.drmSystems.empty());
+    EXPECT_EQ(defaults.signalTimeout, 6U);
     EXPECT_EQ(defaults.freeMemory, 64U * 1024 * 1024);
     EXPECT_EQ(defaults.keys, 0x3FFU);
     EXPECT_EQ(defaults.keySet, 0x1FU);
     EXPECT_EQ(defaults.capabilitiesFile, "");
     EXPECT_EQ(defaults.extraSdVideoDecodes, 1U);
     EXPECT_EQ(defaults.extraHdVideoDecodes, 0U);
+    EXPECT_EQ(defaults.applicationsUrl, "");
+    EXPECT_TRUE(defaults.instantZap);
+    EXPECT_EQ(defaults.zapDelay, 0U);
+}
+
+TEST_F(ConfigurationTest, TakesTheFolderOfTheApplicationsFromTheEnvironmentToo) {
+    ASSERT_FALSE(load("[test]\napplications=http://a.example/apps\n"));
+    EXPECT_EQ(m_configuration.applicationsUrl, "http://a.example/apps/"); // paths are appended
+    setenv("TELIX_APPLICATIONS", "file:///apps/", 1);
+    EXPECT_EQ(Configuration::loadOrDefault().applicationsUrl, "file:///apps/");
+    setenv("TELIX_APPLICATIONS", "apps", 1);
+    EXPECT_EQ(Configuration::loadOrDefault().applicationsUrl, "http://127.0.0.1/apps/"); // that of the file
+    unsetenv("TELIX_APPLICATIONS");
 }
 
 TEST_F(ConfigurationTest, ReadsEverySettingOfTheTableFromItsSection) {

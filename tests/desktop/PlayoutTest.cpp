@@ -1,5 +1,6 @@
 // Playout by a clock that the test advances: pacing, repetition, injected tables; and what a tune does with a
 // stream that never shows anything.
+#include <fcntl.h>
 #include <glib.h>
 #include <gtest/gtest.h>
 #include <unistd.h>
@@ -74,6 +75,14 @@ public:
     StreamFile& operator=(const StreamFile&) = delete;
 
     std::string name() const { return m_name; }
+
+    // Replaces the contents of the same file, which may be open.
+    void overwrite(const Bytes& stream) const {
+        const int file = open(m_name, O_WRONLY | O_TRUNC);
+        EXPECT_GE(file, 0);
+        EXPECT_EQ(write(file, stream.data(), stream.size()), static_cast<ssize_t>(stream.size()));
+        close(file);
+    }
 
 private:
     char* m_name = nullptr;
@@ -156,7 +165,7 @@ TEST_F(PlayoutTest, StartsAgainAtTheEndWithPcrsThatRunOn) {
 TEST_F(PlayoutTest, InjectsTablesAtTheirIntervals) {
     const StreamFile file(makeStream(50, milliseconds(40)));
     std::string error;
-    ASSERT_TRUE(m_playout.play(file.name(), makeTestTableInjector(300, 0), error)) << error;
+    ASSERT_TRUE(m_playout.play(file.name(), makeTestTableInjector(300, 0, ""), error)) << error;
     ASSERT_TRUE(m_clock.settle());
     const std::set<uint16_t> pids{kPidPat, kPidNit, kPidSdt, kPidEit, kPidTdt};
     const size_t services = testServices().size();
@@ -197,10 +206,39 @@ TEST_F(PlayoutTest, TakesAFileWhoseClockStandsStillWithoutHarm) {
     m_playout.stop();
 }
 
+TEST_F(PlayoutTest, SurvivesAFileThatShrinksAndPlaysWhatComesIntoItNext) {
+    constexpr int kPackets = 5000; // more than are read at once
+    const StreamFile file(makeStream(kPackets, milliseconds(40)));
+    std::string error;
+    ASSERT_TRUE(m_playout.play(file.name(), nullptr, error)) << error;
+    ASSERT_TRUE(m_clock.settle());
+    EXPECT_EQ(sentPcrs().size(), 1U);
+    file.overwrite({});
+    ASSERT_NO_FATAL_FAILURE(advance(milliseconds(kPackets * 40)));
+    const size_t before = sentPcrs().size();
+    EXPECT_LE(before, 2000U);
+    file.overwrite(makeStream(kPackets, milliseconds(40)));
+    ASSERT_NO_FATAL_FAILURE(advance(milliseconds(2000)));
+    EXPECT_GT(sentPcrs().size(), before + 20);
+    m_playout.stop();
+}
+
+TEST_F(PlayoutTest, SurvivesAFileThatIsOverwrittenWithSomethingElse) {
+    const StreamFile file(makeStream(5000, milliseconds(40)));
+    std::string error;
+    ASSERT_TRUE(m_playout.play(file.name(), nullptr, error)) << error;
+    ASSERT_TRUE(m_clock.settle());
+    file.overwrite(Bytes(5000 * kPacketSize, 0x55));
+    ASSERT_NO_FATAL_FAILURE(advance(milliseconds(1000)));
+    m_playout.stop();
+}
+
 TEST_F(PlayoutTest, RefusesWhatIsNoTransportStream) {
     std::string error;
     EXPECT_FALSE(m_playout.play("/nonexistent/file.ts", nullptr, error));
-    EXPECT_NE(error, "");
+    EXPECT_EQ(error, "/nonexistent/file.ts: No such file or directory");
+    EXPECT_FALSE(m_playout.play("/dev/zero", nullptr, error));
+    EXPECT_EQ(error, "/dev/zero: Not a regular file");
     const StreamFile garbage(Bytes(5000, 0x55));
     EXPECT_FALSE(m_playout.play(garbage.name(), nullptr, error));
     EXPECT_EQ(error, garbage.name() + ": not a transport stream");
@@ -241,6 +279,8 @@ TEST(TuneTimeoutTest, EndsATuneThatShowsNothingAfterSixSeconds) {
     }
     const StreamFile file(stream);
     setenv("TELIX_CHANNELS", file.name().c_str(), 1);
+    unsetenv("TELIX_CONFIG"); // the default of signal-timeout, 6 seconds
+    setenv("XDG_CONFIG_HOME", "/nonexistent", 1);
     static auto* const clock = new BroadcastClock(kUtcStart); // broadcast uses it until the process ends
     Broadcast::useClock(*clock);
 

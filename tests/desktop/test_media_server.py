@@ -2,9 +2,11 @@
 """Tests of the media server: as a module and as a command."""
 
 import http.client
+import json
 import os
 import signal
 import socket
+import ssl
 import subprocess
 import sys
 import tempfile
@@ -127,6 +129,27 @@ class Responses(Folder):
         for query in ('rate=0', 'rate=fast', 'ranges=maybe', 'status=99', 'status=', 'cut=-1', 'trickle=x'):
             self.assertEqual(self.get('/media/clip.mp4?' + query)[0], 400, query)
 
+    def test_redirects_and_sets_cookies(self):
+        status, headers, body = self.get('/media/clip.mp4?redirect=http://x/y%3Fz')
+        self.assertEqual((status, headers['Location'], body), (302, 'http://x/y?z', b''))
+        status, headers, body = self.get('/media/clip.mp4?cookie=a%3Db')
+        self.assertEqual((status, headers['Set-Cookie'], body), (200, 'a=b', CONTENT))
+        self.assertIsNone(self.get('/media/clip.mp4')[1]['Set-Cookie'])
+        for query in ('redirect=', 'cookie=a%0d%0ab'):
+            self.assertEqual(self.get('/media/clip.mp4?' + query)[0], 400, query)
+
+    def test_records_requests(self):
+        log = os.path.join(self._folder.name, 'log')
+        with media_server.MediaServer({'media': self.media}, log=log) as server:
+            connection = http.client.HTTPConnection(server.url.split('//')[1], timeout=TIMEOUT)
+            connection.request('GET', '/media/clip.mp4?x', headers={'Range': 'bytes=1-2'})
+            connection.getresponse().read()
+            connection.close()
+        with open(log, encoding='utf-8') as lines:
+            records = [json.loads(line) for line in lines]
+        self.assertEqual([(each['method'], each['path'], each['headers']['Range']) for each in records],
+                         [('GET', '/media/clip.mp4?x', 'bytes=1-2')])
+
     def test_trickles_until_it_is_released(self):
         self.connection.request('GET', '/media/clip.mp4?trickle=5000')
         response = self.connection.getresponse()
@@ -169,6 +192,27 @@ class Responses(Folder):
                 sys.stderr = errors
             heard.seek(0)
             self.assertEqual(heard.read(), '')
+
+
+class Secure(Folder):
+    def test_serves_https_with_a_certificate(self):
+        certificate = os.path.join(self._folder.name, 'certificate.pem')
+        subprocess.run(['openssl', 'req', '-x509', '-newkey', 'rsa:2048', '-nodes', '-subj', '/CN=127.0.0.1', '-addext',
+                        'subjectAltName=IP:127.0.0.1', '-keyout', certificate, '-out', certificate + '.public'],
+                       check=True, capture_output=True, timeout=TIMEOUT)
+        with open(certificate + '.public', encoding='utf-8') as source, open(certificate, 'a', encoding='utf-8') as out:
+            out.write(source.read())
+        with media_server.MediaServer({'media': self.media}, certificate=certificate) as server:
+            self.assertRegex(server.url, '^https://')
+            for trusted, expected in ((certificate + '.public', CONTENT), (None, None)):
+                connection = http.client.HTTPSConnection(server.url.split('//')[1], timeout=TIMEOUT,
+                                                         context=ssl.create_default_context(cafile=trusted))
+                if expected is None:
+                    self.assertRaises(ssl.SSLError, connection.request, 'GET', '/media/clip.mp4')
+                else:
+                    connection.request('GET', '/media/clip.mp4')
+                    self.assertEqual(connection.getresponse().read(), expected)
+                connection.close()
 
 
 class Command(Folder):
@@ -224,7 +268,8 @@ class Command(Folder):
             for arguments in ((), ('x',), ('a=/nowhere',), (f'a={self.media}', f'/a/={self.media}'),
                               ('--port', '70000', f'a={self.media}'), ('--port', 'x', f'a={self.media}'),
                               ('--port', str(taken.getsockname()[1]), f'a={self.media}'),
-                              ('--announce', '/nowhere/x', f'a={self.media}'), ('--unheard-of', f'a={self.media}')):
+                              ('--announce', '/nowhere/x', f'a={self.media}'),
+                              ('--certificate', '/nowhere/x', f'a={self.media}'), ('--unheard-of', f'a={self.media}')):
                 process = self.start(*arguments)
                 self.assertEqual(process.wait(TIMEOUT), 2, arguments)
                 self.assertNotEqual(process.stderr.read(), '', arguments)

@@ -1,5 +1,4 @@
 // telix-tv: starts the window of the desktop television on the engine that --engine selects.
-#include <glib.h>
 #include <unistd.h>
 
 #include <cerrno>
@@ -8,6 +7,7 @@
 
 #include "desktop/window/shared/CommandLine.h"
 #include "desktop/window/shared/Diagnostics.h"
+#include "desktop/window/shared/ProgramFolder.h"
 
 namespace desktop {
 
@@ -16,15 +16,8 @@ namespace {
 // The default first. Each has a program of its own beside this one.
 const char* const kEngines[] = {"webkit", "npapi"};
 
-// The folder of this program.
-std::string ownFolder() {
-    g_autofree char* program = g_file_read_link("/proc/self/exe", nullptr);
-    g_autofree char* folder = g_path_get_dirname(program ? program : ".");
-    return folder;
-}
-
 std::string programOf(const std::string& engine) {
-    return ownFolder() + "/telix-tv-" + engine;
+    return besideProgram("telix-tv-" + engine);
 }
 
 bool isBuilt(const std::string& engine) {

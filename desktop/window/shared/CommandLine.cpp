@@ -9,6 +9,7 @@
 #include <regex>
 
 #include "desktop/window/shared/Diagnostics.h"
+#include "desktop/window/shared/ProgramFolder.h"
 
 namespace desktop {
 
@@ -30,12 +31,14 @@ Exit status: 0 if all steps are done; 1 after a timeout or if --eval throws; 2 f
 plug-in that cannot be loaded; 3 if the process of the page ends by itself, with the engine webkit.
 
 Keyboard: arrow keys, Enter (OK), Backspace or Escape (Back), F1 to F4 (red, green, yellow, blue), F5 to F10 or the
-media keys (play, pause, stop, rewind, fast forward, info), and the digits.)";
+media keys (play, pause, stop, rewind, fast forward, info), F11 and F12 (channel up and down), End (exit), and the
+digits. With the engine webkit, a page gets the keys of its key set; digits outside of it select a channel.)";
 
 constexpr int kMaxSide = 16384;
 constexpr double kMaxTimeoutSeconds = 24 * 60 * 60;
 constexpr char kDefaultSize[] = "1280x720";
 constexpr char kDefaultTimeout[] = "30";
+constexpr char kPlugin[] = "nptelixjs.so";
 
 // HbbTV token of TS 102 796: capabilities (none), vendor, model, software version, hardware version, a
 // reserved field.
@@ -82,6 +85,7 @@ class Parser {
 public:
     Parser(Values& values, const std::string& userAgent)
         : m_keys("Press keys of the remote control: " + keyNames() + "."),
+          m_plugin("The plug-in to load, default " + besideProgram(kPlugin) + "."),
           m_userAgent("The user agent string, default " + userAgent + ".") {
         m_context = g_option_context_new("URL-or-FILE");
         g_option_context_set_help_enabled(m_context, FALSE);
@@ -125,8 +129,7 @@ private:
             {"size", 0, 0, kText, &values.size,
              "Size of the window in pixels, default 1280x720. The page is scaled to it.", "WxH"},
             {"fullscreen", 0, 0, kFlag, &values.fullscreen, "Fill the screen.", nullptr},
-            {"plugin", 0, 0, kText, &values.plugin, "The plug-in to load, default " TELIX_DEFAULT_PLUGIN ".",
-             "FILE"},
+            {"plugin", 0, 0, kText, &values.plugin, m_plugin.c_str(), "FILE"},
             {"keys", 0, 0, kText, &values.keys, m_keys.c_str(), "NAME,NAME..."},
             {"wait-for", 0, 0, kText, &values.waitFor, "Wait until the expression is true.", "EXPR"},
             {"wait-for-picture", 0, 0, kFlag, &values.waitForPicture,
@@ -147,6 +150,7 @@ private:
     }
 
     std::string m_keys;
+    std::string m_plugin;
     std::string m_userAgent;
     GOptionContext* m_context;
 };
@@ -299,7 +303,7 @@ std::optional<int> readCommandLine(const std::vector<std::string>& arguments, co
     }
     commandLine.fullscreen = values.fullscreen;
     commandLine.inspect = values.inspect;
-    commandLine.plugin = values.plugin ? values.plugin : TELIX_DEFAULT_PLUGIN;
+    commandLine.plugin = values.plugin ? values.plugin : besideProgram(kPlugin);
     commandLine.userAgent = values.userAgent ? values.userAgent : defaultUserAgent;
     commandLine.waitForPicture = values.waitForPicture;
     commandLine.waitFor = optional(values.waitFor);

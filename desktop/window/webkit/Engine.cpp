@@ -3,6 +3,7 @@
 
 #include "desktop/window/shared/CommandLine.h"
 #include "desktop/window/shared/PluginFile.h"
+#include "desktop/window/shared/ProgramFolder.h"
 #include "desktop/window/webkit/PageChannel.h"
 #include "desktop/window/webkit/Profile.h"
 #include "desktop/window/webkit/WebProcessOutput.h"
@@ -107,15 +108,15 @@ WebKitWebView* Engine::newView(WebKitWebView* related) const {
     return view;
 }
 
-// Emitted before each start of a web process.
+// Emitted after each start of a web process, which waits for the data.
 void Engine::onInitializeExtensions(WebKitWebContext* context) {
-    webkit_web_context_set_web_extensions_directory(context, TELIX_EXTENSIONS);
+    webkit_web_context_set_web_extensions_directory(context, besideProgram("extensions").c_str());
     GVariantDict data;
     g_variant_dict_init(&data, nullptr);
     g_variant_dict_insert(&data, "plugin", "s", m_plugin.path().c_str());
     g_variant_dict_insert(&data, "output", "i", m_output.startProcess());
     g_variant_dict_insert(&data, "errors", "i", m_output.errorDescriptor());
-    g_variant_dict_insert(&data, "channel", "i", m_channel.startProcess());
+    g_variant_dict_insert(&data, "channel", "i", m_channel.useProcess());
     webkit_web_context_set_web_extensions_initialization_user_data(context, g_variant_dict_end(&data));
 }
 

@@ -58,20 +58,20 @@ bool readDuplicate(PluginBase& model, NPVariant& result) {
 }
 
 constexpr ScriptMember kShelfMembers[] = {
-    property("isOpen", read<&Shelf::isOpen>),
-    property("depth", read<&Shelf::depth>, write<&Shelf::setDepth>),
-    property("highNumber", read<&Shelf::highNumber>),
-    property("weight", read<&Shelf::weight>),
-    property("label", read<&Shelf::label>, write<&Shelf::setLabel>),
+    property("isOpen", reader<&Shelf::isOpen>),
+    property("depth", reader<&Shelf::depth>, writer<&Shelf::setDepth>),
+    property("highNumber", reader<&Shelf::highNumber>),
+    property("weight", reader<&Shelf::weight>),
+    property("label", reader<&Shelf::label>, writer<&Shelf::setLabel>),
     property("duplicate", readDuplicate),
-    property("onChange", read<&Shelf::listener>, writeListener<&Shelf::setListener>),
-    property("length", read<&Shelf::length>),
+    property("onChange", reader<&Shelf::listener>, listenerWriter<&Shelf::setListener>),
+    property("length", reader<&Shelf::length>),
     constant("LIMIT", 12),
-    method("item", invoke<&Shelf::item>),
-    method("clear", invoke<&Shelf::clear>),
-    method("join", invoke<&Shelf::join>),
-    method("note", invoke<&Shelf::note>),
-    method("echo", invoke<&Shelf::echo>),
+    method("item", invoker<&Shelf::item>),
+    method("clear", invoker<&Shelf::clear>),
+    method("join", invoker<&Shelf::join>),
+    method("note", invoker<&Shelf::note>),
+    method("echo", invoker<&Shelf::echo>),
 };
 
 constexpr ScriptArray kShelfItems = scriptArray<&Shelf::length, &Shelf::item>(LogModule::CHANNEL, " ");
