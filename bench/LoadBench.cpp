@@ -140,7 +140,7 @@ int main(int argc, char** argv) {
     if (argc < 2 || argc > 3 || rounds < 1) {
         fail("usage", "load_bench PLUGIN [ROUNDS]");
     }
-    g_module_supported();
+    static_cast<void>(g_module_supported());
     g_main_context_default();
     Round best = measureApart(argv[1]);
     for (int n = 1; n < rounds; ++n) {
