@@ -978,13 +978,14 @@
 
     // javascript: URLs: the value is the response, if it is a string.
     function runScript(number, source) {
-        let text = null;
+        let program = '';
         try {
-            const value = hostRun(decode(source));
-            text = typeof value === 'string' ? bytesAsText(encode(value)) : null;
+            program = decode(source);
         } catch (error) {
-            // a malformed escape sequence in the source, or half a character in the value
+            // a malformed escape sequence
         }
+        const value = hostRun(program);
+        const text = typeof value === 'string' ? bytesAsText(encode(value)) : null;
         if (text !== null && requests[number]) {
             requests[number].text = text;
             hostResponse(number, requests[number].url, 'text/plain', '', text.length, 0);
