@@ -195,7 +195,7 @@ GObjectEngine::GObjectEngine(JSCContext* context, Client& client)
 }
 
 GObjectEngine::~GObjectEngine() {
-    close();
+    GObjectEngine::close();
 }
 
 void GObjectEngine::runScript() {

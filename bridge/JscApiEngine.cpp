@@ -173,7 +173,7 @@ JscApiEngine::JscApiEngine(JSGlobalContextRef context, Client& client)
 }
 
 JscApiEngine::~JscApiEngine() {
-    close();
+    JscApiEngine::close();
 }
 
 void JscApiEngine::close() {
