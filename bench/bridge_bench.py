@@ -18,7 +18,7 @@ PAGES = os.path.join(TOP, 'bench', 'pages')
 GOAL = 1.5
 ROUNDS = 3
 WITH_OBJECTS, WITHOUT_OBJECTS = 'page load with all seven objects', 'page load without objects'
-ADDED = 'the former minus an empty page'
+ADDED = 'seven objects minus an empty page'
 NPAPI, ALONE, C_API, GOBJECT = 'NPAPI engine', 'WebKitGTK alone', 'bridge, C API', 'bridge, GObject API'
 
 
