@@ -11,6 +11,7 @@ from television import PngImage, Television, temporary_folder
 
 PAGES = os.path.join(os.path.dirname(os.path.abspath(__file__)), 'pages')
 PLUGIN = os.environ['TELIX_PLUGIN']
+IS_NPAPI = os.environ['TELIX_ENGINE'] == 'npapi'  # else WebKitGTK
 BLACK, GREEN, BLUE = (0, 0, 0), (0, 128, 0), (0, 0, 255)
 
 # The keys of the remote control with their key codes in pages.

@@ -123,11 +123,15 @@ class Applications(TelixTv):
 
     def test_a_page_knows_whether_it_is_on_the_screen(self):
         page = self.write(f'''<script>seen = [document.hidden];
-            document.addEventListener('visibilitychange', function () {{ seen.push(document.hidden); }}, false);
-            onload = function () {{
-                hideHbbTVApplication(); showHbbTVApplication();
-                createHbbTVApplication('file://{shipped("second.html")}'); destroyHbbTVApplication(); }}</script>''')
-        self.assertEqual(self.value(page, '--eval', 'seen'), [False, True, False, True, False])
+            var steps = [hideHbbTVApplication, showHbbTVApplication, function () {{
+                createHbbTVApplication('file://{shipped("second.html")}'); }}, destroyHbbTVApplication];
+            // An engine may report a change later, so each step waits for the one before.
+            onload = function () {{ setTimeout(steps.shift(), 0); }};
+            document.addEventListener('visibilitychange', function () {{
+                seen.push(document.hidden);
+                if (steps.length > 0) {{ onload(); }} }}, false);</script>''')
+        self.assertEqual(self.value(page, '--wait-for', 'seen.length === 5', '--eval', 'seen'),
+                         [False, True, False, True, False])
 
     def test_an_application_of_a_server_opens_if_the_server_has_it(self):
         with server() as url:

@@ -3,12 +3,14 @@
 import os
 import shutil
 import signal
+import subprocess
 import unittest
 
-from telix_tv import BLACK, BLUE, GREEN, KEY_CODES, PLUGIN, TelixTv, shipped
+from telix_tv import BLACK, BLUE, GREEN, IS_NPAPI, KEY_CODES, PLUGIN, TelixTv, shipped
 from television import RUN_TIMEOUT, Lines, PngImage, wait_for
 
 FOREIGN_PLUGIN = os.environ['TELIX_FOREIGN_PLUGIN']
+DEFAULT_PLUGIN = os.environ['TELIX_DESKTOP_PLUGIN']
 
 
 class CommandLine(TelixTv):
@@ -16,7 +18,7 @@ class CommandLine(TelixTv):
         run = self.television.run('--help', environment={'DISPLAY': ''})
         self.assertEqual((run.status, run.errors), (0, ''), run)
         for option in ('size', 'fullscreen', 'plugin', 'screenshot', 'wait-for', 'wait-for-picture', 'timeout', 'eval',
-                       'keys', 'user-agent', 'inspect', 'help', 'version'):
+                       'keys', 'user-agent', 'inspect', 'inspector-server', 'engine', 'help', 'version'):
             self.assertIn(f'--{option}', run.output)
 
     def test_help_names_every_key(self):
@@ -27,7 +29,23 @@ class CommandLine(TelixTv):
     def test_version(self):
         run = self.television.run('--version', environment={'DISPLAY': ''})
         self.assertEqual((run.status, run.errors), (0, ''), run)
-        self.assertRegex(run.output, r'^telix-tv 1\.25 \(QtWebKit 5\.212[.0-9]*, Qt 5\.[0-9.]+\)\n$')
+        versions = r'QtWebKit 5\.212[.0-9]*, Qt 5\.[0-9.]+' if IS_NPAPI else r'WebKitGTK 2\.[0-9.]+, GTK 3\.[0-9.]+'
+        self.assertRegex(run.output, rf'^telix-tv 1\.25 \({versions}\)\n$')
+
+    def test_an_unknown_engine_is_refused(self):
+        self.assert_refused(self.run_tv('--engine', 'paper', shipped('first.html')), 'engine', '"paper"')
+
+    def test_an_engine_that_is_not_built_is_refused(self):
+        # The programs of the engines are beside the one that starts them.
+        launcher = shutil.copy(os.path.join(os.path.dirname(DEFAULT_PLUGIN), 'telix-tv'), self.folder)
+        run = subprocess.run([launcher, '--engine', 'webkit', shipped('first.html')], capture_output=True, text=True,
+                             timeout=RUN_TIMEOUT, check=False)
+        self.assertEqual((run.returncode, run.stderr), (2, 'telix-tv: --engine: the engine "webkit" is not built\n'))
+
+    def test_a_bad_inspector_server_is_refused(self):
+        for server in ('', '127.0.0.1', '127.0.0.1:', ':', 'a:b:c'):
+            self.assert_refused(self.run_tv(f'--inspector-server={server}', shipped('first.html')),
+                                'inspector-server', f'"{server}"')
 
     def test_an_unknown_option_is_refused(self):
         self.assert_refused(self.run_tv('--colour', shipped('first.html')), 'colour')
@@ -61,6 +79,7 @@ class CommandLine(TelixTv):
         run = self.run_tv(shipped('first.html'), environment={'DISPLAY': ''})
         self.assert_refused(run, 'display')
 
+    @unittest.skipUnless(IS_NPAPI, 'Qt only')
     def test_a_qt_that_does_not_run_on_glib_is_refused(self):
         run = self.run_tv(shipped('first.html'), environment={'QT_NO_GLIB': '1'})
         self.assert_refused(run, 'GLib')

@@ -173,8 +173,8 @@ void Application::onLoadChanged(WebKitLoadEvent event) {
         break;
     case WEBKIT_LOAD_FINISHED:
         m_isLoaded = m_hasDocument;
-        if (m_onUnloaded && g_strcmp0(webkit_web_view_get_uri(m_view), kEmptyPage) == 0) {
-            passTurns(kTurnsOfTeardown, m_onUnloaded);
+        if (!m_onUnloaded.empty() && g_strcmp0(webkit_web_view_get_uri(m_view), kEmptyPage) == 0) {
+            passTurns(kTurnsOfTeardown, [this] { onUnloaded(); });
         }
         break;
     case WEBKIT_LOAD_REDIRECTED:
@@ -335,9 +335,16 @@ void Application::passTurns(int count, std::function<void()> done) {
 
 void Application::evaluate(const std::string& expression,
                            std::function<void(ScriptedWindow::Evaluation)> done) {
-    evaluateScript(
-        m_view, m_calls, pageScriptCall("evaluate", {expression}),
-        [done = std::move(done)](JSCValue* value, const GError* error) { done(evaluationOf(value, error)); });
+    const auto call = m_onGone.insert(m_onGone.end(), [done] {
+        ScriptedWindow::Evaluation evaluation;
+        evaluation.error = "the application has ended";
+        done(evaluation);
+    });
+    evaluateScript(m_view, m_calls, pageScriptCall("evaluate", {expression}),
+                   [this, call, done = std::move(done)](JSCValue* value, const GError* error) {
+                       m_onGone.erase(call);
+                       done(evaluationOf(value, error));
+                   });
 }
 
 void Application::takeSnapshot(std::function<void(cairo_surface_t*)> done) {
@@ -364,26 +371,36 @@ void Application::showNotice(const std::string& html) {
 }
 
 void Application::unload(std::function<void()> done) {
-    const auto isDone = std::make_shared<bool>(false);
-    m_onUnloaded = [this, isDone, done = std::move(done)] {
-        if (!std::exchange(*isDone, true)) {
-            if (m_unloadTimeout) {
-                g_source_remove(std::exchange(m_unloadTimeout, 0));
-            }
-            done();
-        }
-    };
+    if (m_isUnloaded) {
+        done();
+        return;
+    }
+    m_onUnloaded.push_back(std::move(done));
+    if (m_onUnloaded.size() > 1) {
+        return;
+    }
     m_unloadTimeout = g_timeout_add(
         kUnloadTimeoutMs,
-        [](gpointer data) -> gboolean {
-            auto* self = static_cast<Application*>(data);
+        [](gpointer application) -> gboolean {
+            auto* self = static_cast<Application*>(application);
             self->m_unloadTimeout = 0;
-            const auto onUnloaded = self->m_onUnloaded;
-            onUnloaded();
+            self->onUnloaded();
             return G_SOURCE_REMOVE;
         },
         this);
     load(kEmptyPage);
+}
+
+// The calls may destroy the application.
+void Application::onUnloaded() {
+    m_isUnloaded = true;
+    if (m_unloadTimeout) {
+        g_source_remove(std::exchange(m_unloadTimeout, 0));
+    }
+    const auto calls = std::exchange(m_onUnloaded, {});
+    for (const auto& call : calls) {
+        call();
+    }
 }
 
 } // namespace desktop

@@ -7,6 +7,7 @@
 #include <functional>
 #include <list>
 #include <string>
+#include <vector>
 
 #include "desktop/window/shared/ScriptedWindow.h"
 
@@ -65,6 +66,7 @@ public:
     // Done when the page has handled all keys that have been sent, and has begun to load the page that it has
     // gone to, or when the application has ended.
     void waitForKeys(std::function<void()> done);
+    // Done with an error if the application ends before.
     void evaluate(const std::string& expression, std::function<void(ScriptedWindow::Evaluation)> done);
     // An image of the page, transparent where it is; null if there is none. The caller owns it.
     void takeSnapshot(std::function<void(cairo_surface_t*)> done);
@@ -86,6 +88,7 @@ private:
     void updateVisibility();
     void dispatchKeyEvent(const char* type, const RemoteKey& key, bool isRepeat);
     void sendKeyEvent(GdkEventType type, const RemoteKey& key);
+    void onUnloaded();
     void passTurns(int count, std::function<void()> done);
 
     Listener& m_listener;
@@ -99,7 +102,8 @@ private:
     bool m_hasDocument = false;
     bool m_isOnTop = false;
     bool m_isShown = true;
-    std::function<void()> m_onUnloaded;
+    std::vector<std::function<void()>> m_onUnloaded;
+    bool m_isUnloaded = false;
     unsigned m_unloadTimeout = 0;
 };
 

@@ -4,8 +4,8 @@
 
 namespace desktop {
 
-// Ends all child processes of this process and waits until they have ended. The engine ends its own only when this
-// process ends, and they write to the profile until then.
+// Ends all child processes of this process and waits until they have ended. The engine ends its own only when
+// this process ends, and they write to the profile until then.
 void endChildProcesses();
 
 } // namespace desktop

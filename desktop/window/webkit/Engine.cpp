@@ -108,7 +108,7 @@ WebKitWebView* Engine::newView(WebKitWebView* related) const {
     return view;
 }
 
-// Emitted before each start of a web process.
+// Emitted after each start of a web process, which waits for the data.
 void Engine::onInitializeExtensions(WebKitWebContext* context) {
     webkit_web_context_set_web_extensions_directory(context, besideProgram("extensions").c_str());
     GVariantDict data;
@@ -116,7 +116,7 @@ void Engine::onInitializeExtensions(WebKitWebContext* context) {
     g_variant_dict_insert(&data, "plugin", "s", m_plugin.path().c_str());
     g_variant_dict_insert(&data, "output", "i", m_output.startProcess());
     g_variant_dict_insert(&data, "errors", "i", m_output.errorDescriptor());
-    g_variant_dict_insert(&data, "channel", "i", m_channel.startProcess());
+    g_variant_dict_insert(&data, "channel", "i", m_channel.useProcess());
     webkit_web_context_set_web_extensions_initialization_user_data(context, g_variant_dict_end(&data));
 }
 

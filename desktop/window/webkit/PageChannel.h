@@ -19,25 +19,31 @@ public:
     using Handler = std::function<void(uint64_t page, const std::string& function,
                                        const std::string& argument, const Reply& reply)>;
 
-    PageChannel() = default;
+    PageChannel();
     ~PageChannel();
     PageChannel(const PageChannel&) = delete;
     PageChannel& operator=(const PageChannel&) = delete;
 
     void setHandler(Handler handler) { m_handler = std::move(handler); }
 
-    // Makes a connection for the web process that is started next, which takes the place of the one before.
-    // Returns the descriptor that the process inherits, which stays with this object; -1 if there is none
-    // left.
-    int startProcess();
+    // Uses the connection that the web process which has just been started has inherited, in place of the one
+    // of the process before. Returns its descriptor in that process, -1 if there is none.
+    int useProcess();
 
 private:
+    struct Pair {
+        int own = -1;
+        int inherited = -1;
+    };
+
+    static Pair makePair();
+    static void closePair(const Pair& pair);
     bool onReadable();
-    void stopProcess();
 
     Handler m_handler;
-    int m_own = -1;
-    int m_inherited = -1;
+    Pair m_current;
+    // For the next web process: a process inherits what there is before its start.
+    Pair m_prepared;
     unsigned m_watch = 0;
     // Identifies the connection that a reply belongs to.
     unsigned m_generation = 0;

@@ -18,10 +18,9 @@ constexpr char kHostObject[] = "telixTvBrowser";
 
 int g_channel = -1;
 
-// The frame whose page calls.
+// The page that calls.
 struct Caller {
     uint64_t page;
-    JSCContext* context; // not owned: it outlives its functions
 };
 
 ssize_t withoutInterruption(ssize_t (*call)(int, void*, std::size_t), void* data, std::size_t size) {
@@ -50,7 +49,7 @@ bool callWindow(uint64_t page, const char* function, const std::string& argument
 
 gboolean createApplication(const char* url, gpointer data) {
     const auto* caller = static_cast<Caller*>(data);
-    g_autoptr(JSCValue) base = jsc_context_evaluate(caller->context, "document.baseURI", -1);
+    g_autoptr(JSCValue) base = jsc_context_evaluate(jsc_context_get_current(), "document.baseURI", -1);
     g_autofree char* baseUrl = jsc_value_to_string(base);
     g_autofree char* absolute = g_uri_resolve_relative(baseUrl, url, G_URI_FLAGS_PARSE_RELAXED, nullptr);
     return callWindow(caller->page, "create", absolute ? absolute : url);
@@ -79,7 +78,7 @@ void setFunction(JSCValue* host, const char* name, JSCValue* function) {
 void onWindowObjectCleared(WebKitScriptWorld* world, WebKitWebPage* page, WebKitFrame* frame, gpointer) {
     g_autoptr(JSCContext) context = webkit_frame_get_js_context_for_script_world(frame, world);
     g_autoptr(JSCValue) host = jsc_value_new_object(context, nullptr, nullptr);
-    const Caller caller{webkit_web_page_get_id(page), context};
+    const Caller caller{webkit_web_page_get_id(page)};
     setFunction(host, "createApplication",
                 jsc_value_new_function(context, "createApplication", G_CALLBACK(createApplication),
                                        new Caller(caller), deleteCaller, G_TYPE_BOOLEAN, 1, G_TYPE_STRING));
