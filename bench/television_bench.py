@@ -1,8 +1,10 @@
 #!/usr/bin/env python3
-"""Measures the CPU load of the desktop television with 720p25 video, compared with decoding alone in the same run, and the
-time from program start to the first picture. Usage: television_bench.py BUILD-FOLDER"""
+"""Measures the CPU load of all processes of the desktop television with 720p25 video on each engine, compared in the same run
+with decoding alone and, where it is installed, with mpv in a window, and the time from program start to the first picture.
+Usage: television_bench.py BUILD-FOLDER"""
 
 import os
+import shutil
 import statistics
 import subprocess
 import sys
@@ -32,24 +34,59 @@ def make_stream(file):
          '-muxdelay', '0.2', '-muxpreload', '0.2', '-f', 'mpegts', file], check=True)
 
 
+def stat(pid):
+    """The fields of a process after its name; None if it has ended."""
+    try:
+        with open(f'/proc/{pid}/stat', encoding='ascii', errors='replace') as file:
+            return file.read().rpartition(')')[2].split()
+    except OSError:
+        return None
+
+
 def cpu_seconds(process):
-    with open(f'/proc/{process.pid}/stat', encoding='ascii') as file:
-        fields = file.read().rpartition(')')[2].split()
-    return (int(fields[11]) + int(fields[12])) / os.sysconf('SC_CLK_TCK')
+    """Of the process and all that it has started."""
+    processes = {int(pid): stat(pid) for pid in os.listdir('/proc') if pid.isdigit()}
+    family, size = {process.pid}, 0
+    while len(family) > size:
+        size = len(family)
+        family |= {pid for pid, fields in processes.items() if fields and int(fields[1]) in family}
+    ticks = sum(int(processes[pid][11]) + int(processes[pid][12]) for pid in family if processes.get(pid))
+    return ticks / os.sysconf('SC_CLK_TCK')
 
 
-def television_load(television, page, environment):
-    """The CPU load of the whole process from the first picture on, 1 for one core."""
-    with television.start(page, environment=environment) as process:
+def load(process):
+    """The CPU load of a process and all that it has started, 1 for one core."""
+    before, begin = cpu_seconds(process), time.monotonic()
+    time.sleep(SECONDS)
+    return (cpu_seconds(process) - before) / (time.monotonic() - begin)
+
+
+def television_load(television, engine, page, environment):
+    """The load from the first picture on."""
+    with television.start('--engine', engine, page, environment=environment) as process:
         try:
             for line in process.stderr:
                 if 'presenting' in line:
                     break
             else:
                 sys.exit('television_bench.py: telix-tv exited without a picture')
-            before, begin = cpu_seconds(process), time.monotonic()
-            time.sleep(SECONDS)
-            return (cpu_seconds(process) - before) / (time.monotonic() - begin)
+            return load(process)
+        finally:
+            process.terminate()
+            process.communicate()
+
+
+def mpv_load(television, stream):
+    """The load of a player that shows each frame of the stream in a window of the same size, with silent audio."""
+    with subprocess.Popen(
+            ['mpv', '--no-config', '--vo=x11', '--ao=null', '--hwdec=no', '--framedrop=no', '--no-border',
+             '--geometry=1280x720+0+0', '--msg-level=all=error,statusline=status',
+             '--term-status-msg=${time-pos}', stream],
+            env=television.environment, stdout=subprocess.PIPE, stderr=subprocess.STDOUT, text=True) as process:
+        try:
+            if not process.stdout.read(1):  # the status: it plays
+                sys.exit('television_bench.py: mpv exited without a picture')
+            return load(process)
         finally:
             process.terminate()
             process.communicate()
@@ -61,10 +98,10 @@ def decoding_load(build, stream):
     return float(run.stdout)
 
 
-def start_seconds(television, page, environment):
+def start_seconds(television, engine, page, environment):
     """The time from program start to the first picture in the window."""
     begin = time.time()
-    run = television.run('--wait-for-picture', '--eval', 'Date.now()', page, environment=environment)
+    run = television.run('--engine', engine, '--wait-for-picture', '--eval', 'Date.now()', page, environment=environment)
     if run.status != 0:
         sys.exit(str(run))
     return run.value / 1000 - begin
@@ -75,20 +112,30 @@ def main():
         print(__doc__, file=sys.stderr)
         sys.exit(2)
     build = sys.argv[1]
+    engines = [engine for engine in ('webkit', 'npapi')
+               if os.path.isfile(os.path.join(build, 'desktop', f'telix-tv-{engine}'))]
     with temporary_folder() as folder, Television(os.path.join(build, 'desktop', 'telix-tv')) as television:
         stream, page = os.path.join(folder, 'stream.ts'), os.path.join(folder, 'page.html')
         make_stream(stream)
         with open(page, 'w', encoding='utf-8') as file:
             file.write(PAGE)
         channels = {'TELIX_CHANNELS': stream}
-        # In turns, so that other load of the machine affects both.
-        loads = [(television_load(television, page, channels), decoding_load(build, stream)) for _ in range(ROUNDS)]
-        ours, decoding = (statistics.median(each) for each in zip(*loads))
-        starts = [start_seconds(television, page, {}) for _ in range(STARTS)]
-    print(f'CPU load at 720p25, of one core: television {100 * ours:.1f} %, decoding alone {100 * decoding:.1f} %, '
-          f'difference {100 * (ours - decoding):.1f} %')
-    print(f'program start to first picture, test multiplex: median {statistics.median(starts):.2f} s '
-          f'({min(starts):.2f} to {max(starts):.2f} s)')
+        measurements = {f'television, {engine}': lambda engine=engine: television_load(television, engine, page, channels)
+                        for engine in engines}
+        measurements['decoding alone'] = lambda: decoding_load(build, stream)
+        if shutil.which('mpv'):
+            measurements['mpv --vo=x11'] = lambda: mpv_load(television, stream)
+        # In turns, so that other load of the machine affects all.
+        rounds = [{name: measure() for name, measure in measurements.items()} for _ in range(ROUNDS)]
+        starts = {engine: [start_seconds(television, engine, page, {}) for _ in range(STARTS)] for engine in engines}
+    print('CPU load at 720p25, of one core, without the X server:')
+    for name in measurements:
+        loads = [each[name] for each in rounds]
+        print(f'  {name}: median {100 * statistics.median(loads):.1f} % '
+              f'({100 * min(loads):.1f} to {100 * max(loads):.1f} %)')
+    print('program start to first picture, test multiplex:')
+    for engine, times in starts.items():
+        print(f'  {engine}: median {statistics.median(times):.2f} s ({min(times):.2f} to {max(times):.2f} s)')
 
 
 if __name__ == '__main__':

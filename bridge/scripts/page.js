@@ -92,6 +92,7 @@
     const removeEventListener = uncurry(EventTarget.prototype.removeEventListener);
     const isPersisted = getter(PageTransitionEvent.prototype, 'persisted');
     const setTimer = setTimeout.bind(theWindow);
+    const clearTimer = clearTimeout.bind(theWindow);
     const requestFrame = requestAnimationFrame.bind(theWindow);
     const openWindow = theWindow.open.bind(theWindow);
     const takeRecords = uncurry(MutationObserver.prototype.takeRecords);
@@ -632,8 +633,8 @@
             min(right, viewLeft + innerWidth(theWindow)), min(bottom, viewTop + innerHeight(theWindow))];
     }
 
-    // Tells the plug-in where its element is, if that is not where it was. An element that has never been laid out is
-    // nowhere.
+    // Tells the plug-in where its element is, and returns true, if that is not where it was. An element that has never
+    // been laid out is nowhere.
     function place(record) {
         const values = placeOf(record.element);
         let text = '';
@@ -643,33 +644,62 @@
             isEmpty = isEmpty && values[i] === 0;
         }
         if (text === record.place || (isEmpty && record.place === '')) {
-            return;
+            return false;
         }
         record.place = text;
         hostPlace(record.number, values[0], values[1], values[2], values[3], values[4], values[5], values[6], values[7]);
+        return true;
     }
 
     // Nothing tells of a change of position. While there are instances their places are read once for each picture of
-    // the page, which is when they can change.
+    // the page, which is when they can change. But a page that asks for pictures keeps three processes busy: when nothing
+    // has moved for a while, a timer reads the places until something moves.
+    const picturesUntilRest = 30;
+    const restInterval = 100; // milliseconds
     let isWatchingPlaces = false;
+    let picturesAtRest = 0;
+    let restTimer = 0;
+
+    function readPlaces() {
+        isWatchingPlaces = false;
+        restTimer = 0;
+        applyStyle();
+        const current = records;
+        picturesAtRest++;
+        for (let i = 0; i < current.length; i++) {
+            if (!isHere(current[i].element)) {
+                sweepLater();
+            } else if (place(current[i])) {
+                picturesAtRest = 0;
+            }
+        }
+        watchPlaces();
+    }
+
     function watchPlaces() {
-        if (!isWatchingPlaces && records.length > 0) {
-            isWatchingPlaces = true;
-            requestFrame(function () {
-                isWatchingPlaces = false;
-                applyStyle();
-                const current = records;
-                for (let i = 0; i < current.length; i++) {
-                    if (isHere(current[i].element)) {
-                        place(current[i]);
-                    } else {
-                        sweepLater();
-                    }
-                }
-                watchPlaces();
-            });
+        if (isWatchingPlaces || records.length === 0) {
+            return;
+        }
+        isWatchingPlaces = true;
+        if (picturesAtRest < picturesUntilRest) {
+            requestFrame(readPlaces);
+        } else {
+            restTimer = setTimer(readPlaces, restInterval);
         }
     }
+
+    // What moves elements most often need not wait for the timer: places are read in the next two pictures.
+    function onStyleMutations() {
+        picturesAtRest = min(picturesAtRest, picturesUntilRest - 2);
+        if (restTimer) {
+            clearTimer(restTimer);
+            restTimer = 0;
+            requestFrame(readPlaces);
+        }
+    }
+
+    observe(new MutationObserver(onStyleMutations), theDocument,
+        { __proto__: null, childList: true, subtree: true, attributes: true, attributeFilter: ['style', 'class'] });
 
     // --- The document's end
 

@@ -65,8 +65,8 @@ class Screen(TelixTv):
                 process.communicate(timeout=RUN_TIMEOUT)
 
 
-class VideoPlane(TelixTv):
-    """The video plane with the frame of platforms/picture.cpp: four quadrants of one colour each."""
+class VideoPlanePages(TelixTv):
+    """Pages with the frame of platforms/picture.cpp: four quadrants of one colour each."""
 
     RED, LIME, WHITE = (255, 0, 0), (0, 255, 0), (255, 255, 255)
     PATTERN = [RED, LIME, BLUE, WHITE]
@@ -92,6 +92,15 @@ class VideoPlane(TelixTv):
         """The colours in the centres of the quadrants of a rectangle."""
         return [picture.colour(left + x * width // 4, top + y * height // 4) for y in (1, 3) for x in (1, 3)]
 
+    def run_with_wake_ups(self):
+        page = self.page(frame='16, 9, 3', script='ticks = 0; setInterval(function () { ticks += 1; }, 10)')
+        file_name = os.path.join(self.folder, 'picture.png')
+        run = self.run_tv(page, '--size', '64x36', '--wait-for', 'window.ticks > 30', '--screenshot', file_name)
+        self.assertEqual(run.status, 0, run)
+        return run, PngImage(file_name)
+
+
+class VideoPlane(VideoPlanePages):
     def test_the_picture_fills_the_page(self):
         picture = self.shown(self.page(), size='128x72')
         self.assertEqual(self.quarters(picture, 0, 0, 128, 72), self.PATTERN)
@@ -189,12 +198,30 @@ class VideoPlane(TelixTv):
             # Called by the page and by the teardown of the object.
             self.assertEqual(run.output.count('TELIX_JS_VB_Release is called'), 2, run)
 
-    def test_wake_ups_without_end_leave_the_page_its_time_and_end_with_the_window(self):
-        page = self.page(frame='16, 9, 3', script='ticks = 0; setInterval(function () { ticks += 1; }, 10)')
-        file_name = os.path.join(self.folder, 'picture.png')
-        run = self.run_tv(page, '--size', '64x36', '--wait-for', 'window.ticks > 30', '--screenshot', file_name)
-        self.assertEqual(run.status, 0, run)
-        self.assertEqual(self.quarters(PngImage(file_name), 0, 0, 64, 36), self.PATTERN)
+    def test_wake_ups_without_end_leave_the_page_its_time(self):
+        _, picture = self.run_with_wake_ups()
+        self.assertEqual(self.quarters(picture, 0, 0, 64, 36), self.PATTERN)
+
+    def test_the_display_shows_one_frame_after_the_other(self):
+        page = self.page(script='frame = 1; setInterval(function () { frame = 3 - frame; '
+                                'tv.setChannelByTriplet(16, 9, frame); }, 500)')
+        # With each way of painting, where the window has several; the pixels of the display, not of a screenshot.
+        for painting in ('cairo', 'gl'):
+            with self.subTest(painting), self.television.start('--plugin', PLUGIN, '--size', '640x360', page,
+                                                               environment={'TELIX_VIDEO': painting}) as process:
+                for _ in range(2):
+                    for point, colour in zip(((160, 90), (480, 90), (160, 270), (480, 270)), self.PATTERN):
+                        self.television.wait_for_colour(point, colour)
+                        self.television.wait_for_colour(point, tuple(255 - value for value in colour))
+                process.send_signal(signal.SIGTERM)
+                process.communicate(timeout=RUN_TIMEOUT)
+
+
+class PlatformLibraryOfTheWindow(VideoPlanePages):
+    """Only of a window that has the library in its own process."""
+
+    def test_wake_ups_end_with_the_window(self):
+        run, _ = self.run_with_wake_ups()
         self.assertEqual([line for line in run.errors.splitlines() if line.startswith('picture: ')],
                          ['picture: wake-up removed', 'picture: 0 frames not released'])
 

@@ -5,7 +5,7 @@
 #include <webkit2/webkit-web-extension.h>
 
 #include "desktop/window/frames/FrameRing.h"
-#include "desktop/window/webkit/extension/FramePublisher.h"
+#include "desktop/window/frames/FramePublisher.h"
 
 namespace desktop {
 

@@ -1,5 +1,7 @@
 // Copies the frames of the platform library that the plug-in has loaded into a ring for the window.
-#include "desktop/window/webkit/extension/FramePublisher.h"
+#include "desktop/window/frames/FramePublisher.h"
+
+#include <pthread.h>
 
 #include <algorithm>
 #include <cerrno>
@@ -48,6 +50,7 @@ void FramePublisher::onWakeup(void* publisher) {
 }
 
 void FramePublisher::run() {
+    pthread_setname_np(pthread_self(), "telix-frames");
     while (waitForWakeup()) {
         publish();
     }

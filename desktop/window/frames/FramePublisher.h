@@ -1,6 +1,6 @@
 // Copies the frames of the platform library that the plug-in has loaded into a ring for the window.
-#ifndef TELIX_DESKTOP_WINDOW_WEBKIT_EXTENSION_FRAMEPUBLISHER_H
-#define TELIX_DESKTOP_WINDOW_WEBKIT_EXTENSION_FRAMEPUBLISHER_H
+#ifndef TELIX_DESKTOP_WINDOW_FRAMES_FRAMEPUBLISHER_H
+#define TELIX_DESKTOP_WINDOW_FRAMES_FRAMEPUBLISHER_H
 
 #include <condition_variable>
 #include <functional>
@@ -39,7 +39,6 @@ private:
     bool replaceRing(size_t frameSize);
 
     SendRing m_sendRing;
-    FrameSource m_source;
     std::thread m_thread;
 
     std::mutex m_mutex; // guards what follows
@@ -48,6 +47,7 @@ private:
     bool m_isEnding = false;
 
     std::unique_ptr<FrameWriter> m_writer; // of the thread
+    FrameSource m_source;                  // ends first: until then the library calls
 };
 
 } // namespace desktop
