@@ -5,10 +5,10 @@
 
 #include <algorithm>
 #include <cmath>
+#include <cstdio>
 #include <cstdlib>
 #include <cstring>
 #include <limits>
-#include <memory>
 
 #include <glib.h>
 
@@ -271,10 +271,22 @@ bool escapesEvents() {
     return value && *value && std::strcmp(value, "0") != 0;
 }
 
+// With U+FFFD for every byte that is not part of a UTF-8 sequence.
 std::string validUTF8(const std::string& text) {
-    const std::unique_ptr<char, decltype(&g_free)> valid(
-        g_utf8_make_valid(text.data(), static_cast<gssize>(text.size())), g_free);
-    return valid.get();
+    std::string result;
+    const char* from = text.data();
+    const char* const end = from + text.size();
+    while (from < end) {
+        const char* invalid = nullptr;
+        g_utf8_validate(from, end - from, &invalid);
+        result.append(from, invalid);
+        from = invalid;
+        if (from < end) {
+            result += "\xEF\xBF\xBD";
+            ++from;
+        }
+    }
+    return result;
 }
 
 std::string escapedForLiteral(const std::string& text) {
