@@ -1,6 +1,7 @@
 // Conversions between the engine's UTF-16 and the plug-in's UTF-8.
 #include "bridge/Text.h"
 
+#include <algorithm>
 #include <cstdint>
 
 namespace bridge {
@@ -117,13 +118,16 @@ std::u16string utf16From(std::string_view text) {
     std::u16string converted;
     converted.reserve(text.size());
     for (size_t i = 0; i < text.size();) {
-        if (static_cast<uint8_t>(text[i]) < 0x80) {
-            converted += static_cast<char16_t>(text[i++]);
-            continue;
+        const auto isAscii = [](char byte) { return static_cast<uint8_t>(byte) < 0x80; };
+        const auto* const start = text.begin() + i;
+        const auto* const end = std::find_if_not(start, text.end(), isAscii);
+        converted.append(start, end);
+        i += static_cast<size_t>(end - start);
+        if (i < text.size()) {
+            size_t length = 0;
+            appendUtf16(converted, readUtf8(text.substr(i), length));
+            i += length;
         }
-        size_t length = 0;
-        appendUtf16(converted, readUtf8(text.substr(i), length));
-        i += length;
     }
     return converted;
 }

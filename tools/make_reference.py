@@ -196,12 +196,14 @@ class Reference:
     def markdown(self):
         """The files of the reference by name."""
         files = {f'{page["file"]}.md': self.page_text(page) for page in self.pages}
-        rows = [f'| {", ".join(f"`{each}`" for each in self.tables[described["class"]]["mimeTypes"])} '
-                f'| `{described["name"]}` | [{page["title"]}]({page["file"]}.md) |'
+        rows = [f'| {self.mime_types(described)} | `{described["name"]}` | [{page["title"]}]({page["file"]}.md) |'
                 for page in self.pages for described in page['object']
                 if self.tables[described['class']]['mimeTypes']]
         files['README.md'] = ABOUT.format(rows='\n'.join(rows))
         return files
+
+    def mime_types(self, described):
+        return ', '.join(f'`{each}`' for each in self.tables[described['class']]['mimeTypes'])
 
     def page_text(self, page):
         lines = [f'# {page["title"]}', '', '<!-- Made by tools/make_reference.py from names.toml and the tables of the '
@@ -214,6 +216,8 @@ class Reference:
     def object_lines(self, described):
         table = self.tables[described['class']]
         lines = ['', f'## {described["name"]}', '', described['about'].strip()]
+        if table['mimeTypes']:
+            lines.append(f'Types of the element: {self.mime_types(described)}.')
         if table['isArray']:
             lines.append('Items are also read as `list[index]`.')
         for kind, title, columns in (('property', 'Property', 'Type | Access | Meaning'),

@@ -15,7 +15,7 @@
 (function (host, pluginName, pluginDescription, pluginFile) {
     'use strict';
 
-    const { apply, construct, defineProperty, deleteProperty, get, getOwnPropertyDescriptor, getPrototypeOf, has,
+    const { apply, defineProperty, deleteProperty, get, getOwnPropertyDescriptor, getPrototypeOf, has,
         ownKeys, set, setPrototypeOf } = Reflect;
     const { create, assign } = Object;
     const typeFields = 3;
@@ -721,56 +721,73 @@
 
     // --- navigator.plugins and navigator.mimeTypes
 
+    const { MimeType: MimeTypeClass, MimeTypeArray: MimeTypeArrayClass, Plugin: PluginClass,
+        PluginArray: PluginArrayClass } = theWindow;
+
+    function define(object, name, value, enumerable) {
+        defineProperty(object, name, { __proto__: null, value, enumerable, configurable: true });
+    }
+
     // An array-like object of that class with the items by index and, hidden, by name.
-    function listOf(prototype, items, nameOf) {
-        const list = create(prototype);
-        const hidden = { writable: false, enumerable: false, configurable: true };
-        const add = function (name, value) {
-            defineProperty(list, name, assign({ value: value }, hidden));
-        };
+    function listOf(itsClass, items, nameOf) {
+        const list = create(itsClass.prototype);
         for (let i = 0; i < items.length; i++) {
-            defineProperty(list, i, { value: items[i], writable: false, enumerable: true, configurable: true });
-            add(nameOf(items[i]), items[i]);
+            define(list, i, items[i], true);
+            define(list, nameOf(items[i]), items[i], false);
         }
-        add('length', items.length);
-        add('item', function (index) { return items[index >>> 0] || null; });
-        add('namedItem', function (name) {
+        define(list, 'length', items.length, false);
+        define(list, 'item', function (index) { return items[index >>> 0] || null; }, false);
+        define(list, 'namedItem', function (name) {
             for (let i = 0; i < items.length; i++) {
                 if (nameOf(items[i]) === '' + name) {
                     return items[i];
                 }
             }
             return null;
-        });
-        add('refresh', function () {});
+        }, false);
+        define(list, 'refresh', function () {}, false);
         return list;
     }
 
     function describePlugin() {
         const mimeTypes = [];
         for (let i = 0; i < typeList.length; i++) {
-            const mimeType = create(MimeType.prototype);
-            const fields = ['type', 'suffixes', 'description'];
-            for (let j = 0; j < fields.length; j++) {
-                defineProperty(mimeType, fields[j], { value: typeList[i][fields[j]], enumerable: true });
-            }
-            mimeTypes[i] = mimeType;
+            const mimeType = create(MimeTypeClass.prototype);
+            define(mimeType, 'type', typeList[i].type, true);
+            define(mimeType, 'suffixes', typeList[i].suffixes, true);
+            define(mimeType, 'description', typeList[i].description, true);
+            define(mimeTypes, i, mimeType, true);
         }
         const typeName = function (mimeType) { return mimeType.type; };
-        const plugin = listOf(Plugin.prototype, mimeTypes, typeName);
-        defineProperty(plugin, 'name', { value: pluginName, enumerable: true });
-        defineProperty(plugin, 'description', { value: pluginDescription, enumerable: true });
-        defineProperty(plugin, 'filename', { value: pluginFile, enumerable: true });
+        const plugin = listOf(PluginClass, mimeTypes, typeName);
+        define(plugin, 'name', pluginName, true);
+        define(plugin, 'description', pluginDescription, true);
+        define(plugin, 'filename', pluginFile, true);
         for (let i = 0; i < mimeTypes.length; i++) {
-            defineProperty(mimeTypes[i], 'enabledPlugin', { value: plugin, enumerable: true });
+            define(mimeTypes[i], 'enabledPlugin', plugin, true);
         }
-        const plugins = listOf(PluginArray.prototype, [plugin], function () { return pluginName; });
-        const allTypes = listOf(MimeTypeArray.prototype, mimeTypes, typeName);
-        const property = { enumerable: true, configurable: true };
-        defineProperty(Navigator.prototype, 'plugins', assign({ get: function () { return plugins; } }, property));
-        defineProperty(Navigator.prototype, 'mimeTypes', assign({ get: function () { return allTypes; } }, property));
+        return {
+            __proto__: null,
+            plugins: listOf(PluginArrayClass, [plugin], function () { return pluginName; }),
+            mimeTypes: listOf(MimeTypeArrayClass, mimeTypes, typeName)
+        };
     }
-    describePlugin();
+
+    // Few pages ask.
+    let description = null;
+    function describeBy(name) {
+        defineProperty(Navigator.prototype, name, {
+            __proto__: null,
+            get: function () {
+                description = description || describePlugin();
+                return description[name];
+            },
+            enumerable: true,
+            configurable: true
+        });
+    }
+    describeBy('plugins');
+    describeBy('mimeTypes');
 
     // --- Requests of the plug-in
 
@@ -797,7 +814,9 @@
     const headerOf = uncurry(Headers.prototype.get);
     const forEachHeader = uncurry(Headers.prototype.forEach);
     const getReader = uncurry(ReadableStream.prototype.getReader);
-    const readPiece = uncurry(getPrototypeOf(getReader(new ReadableStream())).read);
+    // WPE WebKit 2.38 shows the class by its objects only.
+    const Reader = theWindow.ReadableStreamDefaultReader || getReader(new ReadableStream()).constructor;
+    const readPiece = uncurry(Reader.prototype.read);
     const Bytes = Uint8Array;
     const byteLength = getter(getPrototypeOf(Uint8Array.prototype), 'length');
     const subarray = uncurry(Uint8Array.prototype.subarray);

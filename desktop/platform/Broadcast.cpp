@@ -40,11 +40,19 @@ TunerArbiter::Listener Broadcast::arbiterListener() {
     TunerArbiter::Listener listener;
     listener.onTune = [this](const Tune& tune) { m_presentation.tune(tune); };
     listener.onRelease = [this] { m_presentation.stop(); };
+    listener.onChannel = [this](TELIX_JS_CM_HANDLE channel) { m_presentation.receive(channel); };
     return listener;
 }
 
 ServicePresentation::Listener Broadcast::presentationListener() {
     ServicePresentation::Listener listener;
+    listener.onServiceSelected = [this](TELIX_JS_CM_HANDLE channel) {
+        m_applications.onServiceSelected(channel);
+    };
+    listener.onServiceLost = [this] { m_applications.onServiceLost(); };
+    listener.onApplications = [this](TELIX_JS_CM_HANDLE channel, const ApplicationList& list) {
+        m_applications.onApplications(channel, list);
+    };
     listener.onEit = [this](TELIX_JS_CM_HANDLE channel, const Eit& eit) {
         m_presentFollowing.onEit(channel, eit);
     };
@@ -54,6 +62,10 @@ ServicePresentation::Listener Broadcast::presentationListener() {
     listener.onEnd = [this] { m_ratings.reset(); };
     listener.onEndLocked = [this] { m_presentFollowing.clearLocked(); };
     return listener;
+}
+
+void Broadcast::followApplications() {
+    m_platform.post([this] { m_presentation.receive(m_arbiter.currentChannel()); });
 }
 
 bool Broadcast::changeView(TELIX_JS_VB_HANDLE object,
@@ -115,6 +127,8 @@ Broadcast::State Broadcast::state() const {
         state.present = m_presentFollowing.presentLocked();
         state.following = m_presentFollowing.followingLocked();
     }
+    state.instantZap = m_presentation.receiver().keepsPackets();
+    state.keptPackets = m_presentation.receiver().keptSize();
     state.subscriptions = m_streamEvents.subscriptions();
     return state;
 }

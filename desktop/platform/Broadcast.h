@@ -10,9 +10,10 @@
 //   BroadcastCallbacks  callbacks of the plug-in
 //   Channels            the channel list
 //   Programmes          programmes and ratings by handle
+//   ApplicationSignalling  applications of the current channel, for the window
 // Below them lie BroadcastSource (Playout with a TableInjector, Restamper, Receiver), Multiplex (the test
-// multiplex), Sections and TsTables (reading and writing of tables, DvbConstants) and Tuner (the pipeline).
-// Time comes from a Clock.
+// multiplex), Sections and TsTables (reading and writing of tables, DvbConstants), ApplicationInformation
+// (the AIT) and Tuner (the pipeline). Time comes from a Clock.
 //
 // Threads and locks: the plug-in calls on any thread, and these calls read or change plain data under
 // Platform::mutex() and post the rest. Tunes, reports and all callbacks of the plug-in happen on the platform
@@ -25,6 +26,7 @@
 #include <optional>
 #include <vector>
 
+#include "desktop/platform/ApplicationSignalling.h"
 #include "desktop/platform/BroadcastCallbacks.h"
 #include "desktop/platform/BroadcastComponents.h"
 #include "desktop/platform/Channels.h"
@@ -61,10 +63,17 @@ public:
     const PresentFollowing& presentFollowing() const { return m_presentFollowing; }
     RatingMonitor& ratings() { return m_ratings; }
     StreamEvents& streamEvents() { return m_streamEvents; }
+    ApplicationSignalling& applications() { return m_applications; }
     FaultInjection& faults() { return m_faults; }
+
+    // Receives the current channel even if no object has tuned to it yet, so that its applications are known.
+    void followApplications();
 
     // Changes how and where an object shows its picture.
     bool changeView(TELIX_JS_VB_HANDLE object, const std::function<void(Picture::View& view)>& change);
+
+    // Whether channel changes within the multiplex begin with what has been received since the last keyframe.
+    void setInstantZap(bool isOn) { m_presentation.setInstantZap(isOn); }
 
     // The components of one type of what the object presents, or the active ones of them. Empty if it does
     // not own the tuner.
@@ -79,6 +88,9 @@ public:
 
     // The PID of the audio that the pipeline lets through. Platform thread.
     std::optional<uint16_t> activeAudioPid() const { return m_presentation.activeAudioPid(); }
+
+    // How late picture and sound are presented. Platform thread.
+    ServicePresentation::Lateness lateness() const { return m_presentation.lateness(); }
 
     // Everything at one moment.
     struct State {
@@ -95,6 +107,8 @@ public:
         std::vector<StreamEvents::Subscription> subscriptions;
         TELIX_JS_SI_HANDLE present; // 0: none
         TELIX_JS_SI_HANDLE following;
+        bool instantZap;
+        size_t keptPackets; // bytes, of all services
     };
     State state() const;
 
@@ -109,6 +123,7 @@ private:
     Channels m_channels;
     Programmes m_programmes;
     StreamEvents m_streamEvents;
+    ApplicationSignalling m_applications;
     RatingMonitor m_ratings;
     TunerArbiter m_arbiter;
     BroadcastComponents m_components;

@@ -9,7 +9,7 @@
 namespace desktop {
 
 BroadcastSource::BroadcastSource(Clock& clock, std::function<void()> onTestMultiplex)
-    : m_platform(Platform::instance()), m_onTestMultiplex(std::move(onTestMultiplex)),
+    : m_platform(Platform::instance()), m_onTestMultiplex(std::move(onTestMultiplex)), m_receiver(clock),
       m_playout(clock, [this](const uint8_t* packets, size_t size) { m_receiver.push(packets, size); }) {}
 
 void BroadcastSource::makeTestMultiplexFile() {
@@ -50,7 +50,8 @@ BroadcastSource::Result BroadcastSource::open(const Channel& channel, std::strin
     m_playedFile.clear();
     const Configuration& configuration = m_platform.configuration();
     auto injector =
-        isTest ? makeTestTableInjector(configuration.programmeSeconds, configuration.streamEventSeconds)
+        isTest ? makeTestTableInjector(configuration.programmeSeconds, configuration.streamEventSeconds,
+                                       configuration.applicationsUrl)
                : nullptr;
     if (!m_playout.play(file, std::move(injector), error)) {
         return Result::Failed;

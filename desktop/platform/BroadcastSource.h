@@ -31,6 +31,7 @@ public:
     Result open(const Channel& channel, std::string& error);
 
     Receiver& receiver() { return m_receiver; }
+    const Receiver& receiver() const { return m_receiver; }
 
 private:
     void onTestFile(const std::string& file, const std::string& error);

@@ -15,7 +15,7 @@ namespace desktop {
 namespace {
 
 constexpr size_t kBytesScanned = size_t{8} << 20; // tables are repeated every two seconds at least
-constexpr size_t kPacketsRead = 1024; // at once
+constexpr size_t kPacketsRead = 1024;             // at once
 constexpr size_t kMaxUnlisted = 256;
 
 // The tables of a file that describe its services.

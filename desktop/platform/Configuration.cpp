@@ -68,8 +68,8 @@ unsigned int lineOf(const std::string& contents, const std::string& section, con
     return found;
 }
 
-// The first line that GKeyFile rejects: it accepts the lines before it, and rejects every beginning of the file
-// that contains it.
+// The first line that GKeyFile rejects: it accepts the lines before it, and rejects every beginning of the
+// file that contains it.
 unsigned int lineOfSyntaxError(const std::string& contents) {
     std::vector<size_t> ends; // of the lines
     for (const std::string& line : linesOf(contents)) {
@@ -191,6 +191,21 @@ std::optional<SettingError> readSection(SettingTarget& target, GKeyFile* file, c
     return section == kDrmSection ? finishDrmSystem(target) : std::nullopt;
 }
 
+// A variable of the environment that replaces a setting.
+void applyVariable(Configuration& configuration, const char* variable,
+                   std::string (*read)(SettingTarget& target, const std::string& value)) {
+    const char* value = g_getenv(variable);
+    if (!value || !*value) {
+        return;
+    }
+    const OwnedString folder(g_get_current_dir());
+    SettingTarget target{configuration, folder.get(), ""};
+    const std::string reason = read(target, value);
+    if (!reason.empty()) {
+        std::fprintf(stderr, "libtelix: %s: %s\n", variable, reason.c_str());
+    }
+}
+
 } // namespace
 
 // ---- Configuration
@@ -256,13 +271,9 @@ Configuration Configuration::loadOrDefault() {
             std::fprintf(stderr, "libtelix: %s; the defaults apply\n", error->message().c_str());
         }
     }
-    if (const char* channels = g_getenv("TELIX_CHANNELS"); channels && *channels) {
-        const OwnedString folder(g_get_current_dir());
-        SettingTarget target{configuration, folder.get(), ""};
-        const std::string reason = readSources(target, channels);
-        if (!reason.empty()) {
-            std::fprintf(stderr, "libtelix: TELIX_CHANNELS: %s\n", reason.c_str());
-        }
+    for (const auto& [variable, read] : {std::make_pair("TELIX_CHANNELS", readSources),
+                                         std::make_pair("TELIX_APPLICATIONS", readApplicationsUrl)}) {
+        applyVariable(configuration, variable, read);
     }
     return configuration;
 }

@@ -60,12 +60,14 @@ struct Configuration {
     static std::string file();
 
     // The configuration of this process: that of file() or, after an error, which goes to standard error, the
-    // defaults. If TELIX_CHANNELS is not empty, it replaces `sources`, in the notation of the file.
+    // defaults. If TELIX_CHANNELS or TELIX_APPLICATIONS is not empty, it replaces `sources` or
+    // `applicationsUrl`, in the notation of the file.
     static Configuration loadOrDefault();
 
     std::vector<Source> sources;
     uint32_t programmeSeconds;
     uint32_t streamEventSeconds; // 0: no stream events
+    std::string applicationsUrl; // of the folder with the test applications; empty: none are signalled
     std::string country;         // ISO codes of three letters
     std::string audioLanguage;
     std::string subtitleLanguage;
@@ -77,8 +79,10 @@ struct Configuration {
     std::string capabilitiesFile; // absolute path; empty: the generated document
     uint32_t extraSdVideoDecodes;
     uint32_t extraHdVideoDecodes;
-    uint32_t keys;   // bits of the key groups that the remote control has
-    uint32_t keySet; // bits of those that pages receive until one sets a key set
+    bool instantZap;   // changes of the channel begin with kept packets
+    uint32_t zapDelay; // milliseconds before a tune begins
+    uint32_t keys;     // bits of the key groups that the remote control has
+    uint32_t keySet;   // bits of those that pages receive until one sets a key set
 };
 
 } // namespace desktop

@@ -27,6 +27,22 @@ CONTROL_COMMAND("state", reportState, printState,
                 "Print what is presented, by which objects and players, and which listeners are registered")
 CONTROL_COMMAND("channel", tuneToChannel, printChannel, "Tune to a channel, as the viewer would",
                 argument("number", number(1, UINT32_MAX), "NUMBER", "Position in the channel list, from 1"))
+CONTROL_COMMAND("applications", listApplications, printApplications,
+                "List the applications that the current channel signals")
+CONTROL_COMMAND("signal", signalApplication, printNothing,
+                "Signal a page as application of a channel, beside those of the broadcast",
+                optionalArgument("url", string(), "URL", "none, ends the signalling",
+                                 "Absolute URL of the page"),
+                option("on", number(1, UINT32_MAX), "CHANNEL", "the current channel",
+                       "Position in the channel list, from 1"),
+                option("control-code", choice("autostart|present|kill|disabled"),
+                       "autostart|present|kill|disabled", "autostart", "Control code"),
+                option("service-bound", onOff(), "on|off", "off",
+                       "Whether the application ends when another channel is selected"))
+CONTROL_COMMAND("instant-zap", setInstantZap, printNothing, "Switch instant channel changes on or off",
+                argument("on", onOff(), "on|off",
+                         "Whether a channel change presents at once what has been received since the last "
+                         "keyframe"))
 CONTROL_COMMAND("channel-error", sendChannelError, printNothing,
                 "Report that the current channel cannot be presented",
                 argument("error", number(0, 100), "ERROR", "Error code as pages see it; 1 is no signal"))

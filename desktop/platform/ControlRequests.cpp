@@ -39,6 +39,36 @@ JsonObjectWriter tuneToChannel(const ControlRequest& request) {
     return response;
 }
 
+uint8_t controlCodeOf(const std::string& name) {
+    for (const ControlCode& each : controlCodes()) {
+        if (g_ascii_strcasecmp(name.c_str(), each.name) == 0) {
+            return each.value;
+        }
+    }
+    return kControlCodeAutostart; // not reached: the command table has the same names
+}
+
+JsonObjectWriter signalApplication(const ControlRequest& request) {
+    const auto& list = broadcast().channels().list();
+    const auto number = static_cast<size_t>(request.has("on") ? request.number("on") : 0);
+    if (number > list.size()) {
+        throw ControlError("\"on\" is out of range: there are " + std::to_string(list.size()) + " channels");
+    }
+    const TELIX_JS_CM_HANDLE channel =
+        number == 0 ? broadcast().arbiter().currentChannel() : list[number - 1];
+    require(channel != 0, "there are no channels");
+    require(broadcast().applications().signal(
+                channel, request.string("url"), controlCodeOf(request.string("control-code", "autostart")),
+                request.has("service-bound") && request.boolean("service-bound")),
+            "\"url\" is not an absolute URL");
+    return {};
+}
+
+JsonObjectWriter setInstantZap(const ControlRequest& request) {
+    broadcast().setInstantZap(request.boolean("on"));
+    return {};
+}
+
 JsonObjectWriter sendChannelError(const ControlRequest& request) {
     require(broadcast().callbacks().onChannelError.isSet(), "no listener is registered for channel errors");
     require(broadcast().faults().channelError(static_cast<int32_t>(request.number("error"))), kNoObject);

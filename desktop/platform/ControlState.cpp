@@ -93,6 +93,19 @@ JsonArrayWriter componentsJson(const Broadcast::State& state) {
     return components;
 }
 
+// In milliseconds, negative for what waits for its time; null before anything is presented.
+void setLateness(JsonObjectWriter& json) {
+    const ServicePresentation::Lateness lateness = broadcast().lateness();
+    for (const auto& [name, value] :
+         {std::pair("videoLateness", lateness.video), std::pair("audioLateness", lateness.audio)}) {
+        if (value) {
+            json.number(name, value->count());
+        } else {
+            json.null(name);
+        }
+    }
+}
+
 // The PIDs that are presented: of the audio, the one that leaves the pipeline, which follows the active
 // component a little later.
 void setActivePids(JsonObjectWriter& json, const Broadcast::State& state) {
@@ -132,6 +145,35 @@ void setProgramme(JsonObjectWriter& programmes, const char* name, TELIX_JS_SI_HA
     }
     object.array("ratings", std::move(ratings));
     programmes.object(name, std::move(object));
+}
+
+const char* nameOf(ApplicationSignalling::State state) {
+    switch (state) {
+    case ApplicationSignalling::State::Known:
+        return "known";
+    case ApplicationSignalling::State::Awaited:
+        return "awaited";
+    default:
+        return "no service";
+    }
+}
+
+JsonObjectWriter applicationJson(const SignalledApplication& application) {
+    JsonArrayWriter boundaries;
+    for (const std::string& each : application.boundaries) {
+        boundaries.add(each);
+    }
+    JsonObjectWriter json;
+    json.string("id", toString(application.id))
+        .string("controlCode", controlCodeName(application.controlCode))
+        .string("name", application.name)
+        .string("url", application.url)
+        .number("priority", application.priority)
+        .boolean("serviceBound", application.isServiceBound)
+        .number("visibility", application.visibility)
+        .number("usage", application.usage)
+        .array("boundaries", std::move(boundaries));
+    return json;
 }
 
 JsonObjectWriter pictureJson() {
@@ -229,6 +271,25 @@ JsonObjectWriter listChannels(const ControlRequest& request) {
     return response;
 }
 
+JsonObjectWriter listApplications(const ControlRequest& request) {
+    (void)request;
+    const ApplicationSignalling::Snapshot snapshot = broadcast().applications().snapshot();
+    JsonArrayWriter applications;
+    for (const SignalledApplication& each : snapshot.list.applications) {
+        applications.add(applicationJson(each));
+    }
+    JsonArrayWriter skipped;
+    for (const std::string& each : snapshot.list.skipped) {
+        skipped.add(each);
+    }
+    JsonObjectWriter response;
+    setChannel(response, "channel", snapshot.channel);
+    response.string("state", nameOf(snapshot.state))
+        .array("applications", std::move(applications))
+        .array("skipped", std::move(skipped));
+    return response;
+}
+
 JsonObjectWriter reportState(const ControlRequest& request) {
     (void)request;
     const Broadcast::State state = broadcast().state();
@@ -239,8 +300,12 @@ JsonObjectWriter reportState(const ControlRequest& request) {
     setChannel(response, "channel", state.channel);
     response.array("objects", objectsJson(state)).array("components", componentsJson(state));
     setActivePids(response, state);
+    setLateness(response);
     response.object("programmes", std::move(programmes))
         .object("picture", pictureJson())
+        .boolean("instantZap", state.instantZap)
+        .number("keptPackets", static_cast<int64_t>(state.keptPackets))
+        .number("zapDelay", device().configuration().zapDelay)
         .array("players", playersJson())
         .number("keySet", device().keySet())
         .array("keys", keysJson())

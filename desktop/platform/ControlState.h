@@ -14,8 +14,9 @@ namespace desktop {
 // to null if there is no such channel.
 void setChannel(JsonObjectWriter& object, const char* name, TELIX_JS_CM_HANDLE handle);
 
-// Handlers of the commands "channels" and "state".
+// Handlers of the commands "channels", "applications" and "state".
 JsonObjectWriter listChannels(const ControlRequest& request);
+JsonObjectWriter listApplications(const ControlRequest& request);
 JsonObjectWriter reportState(const ControlRequest& request);
 
 } // namespace desktop

@@ -25,6 +25,7 @@ constexpr uint8_t kPayloadFlag = 0x10;
 constexpr uint8_t kContinuityCounterMask = 0x0F;
 
 // The adaptation field: flags byte, and the size of the flags and the PCR together.
+constexpr uint8_t kRandomAccessIndicator = 0x40;
 constexpr uint8_t kPcrFlag = 0x10;
 constexpr uint8_t kAdaptationFieldWithPcrLength = 7;
 constexpr uint8_t kPcrReservedBits = 0x7E; // of the fifth byte of a PCR
@@ -100,6 +101,7 @@ constexpr uint8_t kTableIdSdtActual = 0x42;
 constexpr uint8_t kTableIdEitActualPresentFollowing = 0x4E;
 constexpr uint8_t kTableIdTdt = 0x70;
 constexpr uint8_t kTableIdTot = 0x73;
+constexpr uint8_t kTableIdAit = 0x74; // TS 102 809, 5.3.4
 
 // section_number of the EIT present/following: EN 300 468, 5.2.4
 constexpr uint8_t kEitSectionPresent = 0;
@@ -118,6 +120,7 @@ constexpr uint8_t kStreamTypeMpeg1Video = 0x01;
 constexpr uint8_t kStreamTypeMpeg2Video = 0x02;
 constexpr uint8_t kStreamTypeMpeg1Audio = 0x03;
 constexpr uint8_t kStreamTypeMpeg2Audio = 0x04;
+constexpr uint8_t kStreamTypePrivateSections = 0x05;
 constexpr uint8_t kStreamTypePrivatePes = 0x06;
 constexpr uint8_t kStreamTypeDsmccStreamDescriptors = 0x0C;
 constexpr uint8_t kStreamTypeAacAdts = 0x0F;
@@ -126,6 +129,16 @@ constexpr uint8_t kStreamTypeAvcVideo = 0x1B;
 constexpr uint8_t kStreamTypeHevcVideo = 0x24;
 constexpr uint8_t kStreamTypeAc3 = 0x81;
 constexpr uint8_t kStreamTypeEnhancedAc3 = 0x87;
+
+// ---- Beginnings of pictures that decode alone, after a start code: ISO/IEC 13818-2, 6.2.1; ISO/IEC
+// 14496-10, 7.4.1; ISO/IEC 23008-2, 7.4.2.2
+
+constexpr uint8_t kMpegSequenceHeaderCode = 0xB3;
+constexpr uint8_t kAvcNalIdrSlice = 5;
+constexpr uint8_t kAvcNalSequenceParameterSet = 7;
+constexpr uint8_t kHevcNalFirstIrap = 16;
+constexpr uint8_t kHevcNalLastIrap = 23;
+constexpr uint8_t kHevcNalVideoParameterSet = 32;
 
 // ---- Descriptors
 
@@ -148,6 +161,7 @@ constexpr uint8_t kTagParentalRating = 0x55;
 constexpr uint8_t kTagSubtitling = 0x59;
 constexpr uint8_t kTagTerrestrialDeliverySystem = 0x5A;
 constexpr uint8_t kTagAc3 = 0x6A;
+constexpr uint8_t kTagApplicationSignalling = 0x6F; // TS 102 809, 5.3.5.1
 constexpr uint8_t kTagEnhancedAc3 = 0x7A;
 
 // ISO 639-2 language and ISO 3166 country codes have three letters.
@@ -213,6 +227,45 @@ constexpr uint8_t kRegionCompositionSegment = 0x11;
 constexpr size_t kSubtitlingSegmentHeaderSize = 6;
 constexpr size_t kSubtitlingDataHeaderSize = 2; // data_identifier and subtitle_stream_id
 constexpr size_t kRegionWidthOffset = 2;        // in the body of a region composition segment
+
+// ---- Application information table: TS 102 809, 5.3, and TS 102 796, 7.2.3
+
+// application_type, in the table_id_extension of the section below the flag of test applications.
+constexpr uint16_t kApplicationTypeHbbTv = 0x0010;
+constexpr uint16_t kApplicationTypeMask = 0x7FFF;
+constexpr uint16_t kTestApplicationFlag = 0x8000;
+
+// application_control_code: TS 102 809, 5.2.4
+constexpr uint8_t kControlCodeAutostart = 0x01;
+constexpr uint8_t kControlCodePresent = 0x02;
+constexpr uint8_t kControlCodeKill = 0x04;
+constexpr uint8_t kControlCodeDisabled = 0x07;
+
+// descriptor_tag in an AIT, which has a numbering of its own
+constexpr uint8_t kTagApplication = 0x00;
+constexpr uint8_t kTagApplicationName = 0x01;
+constexpr uint8_t kTagTransportProtocol = 0x02;
+constexpr uint8_t kTagSimpleApplicationLocation = 0x15;
+constexpr uint8_t kTagApplicationUsage = 0x16;
+constexpr uint8_t kTagSimpleApplicationBoundary = 0x17;
+
+// Bits around the fields of the application signalling descriptor
+constexpr uint8_t kReservedBeforeAitVersion = 0xE0;
+constexpr size_t kAitSignallingEntrySize = 3;
+
+// protocol_id of the transport protocol descriptor
+constexpr uint16_t kTransportProtocolHttp = 0x0003;
+
+// The byte of the application descriptor with service_bound_flag, visibility and reserved bits, which are set
+constexpr uint8_t kServiceBoundFlag = 0x80;
+constexpr uint8_t kVisibilityMask = 0x03;
+constexpr uint8_t kVisibilityShift = 5;
+constexpr uint8_t kReservedAfterVisibility = 0x1F;
+constexpr uint8_t kVisibilityAll = 0x03; // to the viewer, and to applications
+
+// usage_type of the application usage descriptor
+constexpr uint8_t kUsageNone = 0x00; // no such descriptor
+constexpr uint8_t kUsageDigitalText = 0x01;
 
 // ---- original_network_id: the values from here on are for private use, TS 101 162
 

@@ -13,10 +13,11 @@ namespace desktop {
 
 namespace {
 
-constexpr size_t kMaxBody = size_t{256} << 10;           // bytes received and not read
-constexpr long kBufferSize = 64 << 10;                   // bytes that libcurl receives at once
-constexpr auto kTimeout = std::chrono::seconds(10);      // without progress
-constexpr auto kMaxWait = std::chrono::milliseconds(500); // libcurl wakes up earlier if there is something to do
+constexpr size_t kMaxBody = size_t{256} << 10;      // bytes received and not read
+constexpr long kBufferSize = 64 << 10;              // bytes that libcurl receives at once
+constexpr auto kTimeout = std::chrono::seconds(10); // without progress
+constexpr auto kMaxWait =
+    std::chrono::milliseconds(500); // libcurl wakes up earlier if there is something to do
 constexpr const char* kDefaultUserAgent = "HbbTV/1.2.1 (;;;;;) libtelix";
 
 constexpr long kStatusPartialContent = 206;
@@ -94,13 +95,13 @@ bool HttpClient::begin(const Request& request) {
     transfer.set(CURLOPT_PROTOCOLS_STR, "http,https");
     transfer.set(CURLOPT_NOSIGNAL, 1L);
     transfer.set(CURLOPT_QUICK_EXIT, 1L); // does not wait for a name that is being resolved
-    transfer.set(CURLOPT_CONNECTTIMEOUT_MS,
-                 static_cast<long>(std::chrono::milliseconds(kTimeout).count()));
+    transfer.set(CURLOPT_CONNECTTIMEOUT_MS, static_cast<long>(std::chrono::milliseconds(kTimeout).count()));
     transfer.set(CURLOPT_BUFFERSIZE, kBufferSize);
     transfer.set(CURLOPT_ERRORBUFFER, transfer.errorText);
     transfer.set(CURLOPT_WRITEFUNCTION, onData);
     transfer.set(CURLOPT_WRITEDATA, this);
-    transfer.setString(CURLOPT_USERAGENT, identity.userAgent.empty() ? kDefaultUserAgent : identity.userAgent);
+    transfer.setString(CURLOPT_USERAGENT,
+                       identity.userAgent.empty() ? kDefaultUserAgent : identity.userAgent);
     transfer.setString(CURLOPT_REFERER, identity.referer);
     transfer.setString(CURLOPT_COOKIE, identity.cookies);
     transfer.setString(CURLOPT_CAINFO, identity.certificates);
@@ -226,9 +227,8 @@ void HttpClient::readResponse() {
     m_hasHeaders = true;
     CURL* easy = m_transfer->easy;
     curl_easy_getinfo(easy, CURLINFO_RESPONSE_CODE, &m_response.status);
-    m_response.acceptsByteRanges =
-        g_ascii_strcasecmp(headerOf("Accept-Ranges").c_str(), "bytes") == 0 ||
-        m_response.status == kStatusPartialContent;
+    m_response.acceptsByteRanges = g_ascii_strcasecmp(headerOf("Accept-Ranges").c_str(), "bytes") == 0 ||
+                                   m_response.status == kStatusPartialContent;
     const char* location = nullptr;
     curl_easy_getinfo(easy, CURLINFO_REDIRECT_URL, &location);
     m_response.location = location ? location : "";

@@ -1,6 +1,6 @@
 // A GstPushSrc whose create() does all of the work: the element has no thread of its own, so that nothing is
-// left to end when it stops. GstBaseSrc serialises create(), start(), stop() and do_seek(), and calls unlock()
-// to end one that blocks.
+// left to end when it stops. GstBaseSrc serialises create(), start(), stop() and do_seek(), and calls
+// unlock() to end one that blocks.
 #include "desktop/platform/HttpSource.h"
 
 #include <gst/base/gstpushsrc.h>
@@ -334,9 +334,9 @@ void initialise(GTypeInstance* instance, gpointer gClass) {
 }
 
 GType registerType() {
-    const GType type = g_type_register_static_simple(GST_TYPE_PUSH_SRC, "TelixHttpSource",
-                                                     sizeof(GstPushSrcClass), initialiseClass,
-                                                     sizeof(Instance), initialise, {});
+    const GType type =
+        g_type_register_static_simple(GST_TYPE_PUSH_SRC, "TelixHttpSource", sizeof(GstPushSrcClass),
+                                      initialiseClass, sizeof(Instance), initialise, {});
     const GInterfaceInfo uriHandler{initialiseUriHandler, nullptr, nullptr};
     g_type_add_interface_static(type, GST_TYPE_URI_HANDLER, &uriHandler);
     return type;

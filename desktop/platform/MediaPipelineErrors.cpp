@@ -24,8 +24,8 @@ void MediaPipeline::onError(GstMessage* message) {
 }
 
 // Media that the server refuses, or a file that is not there, is the same as a server that cannot be reached:
-// if the browser requests the URL as well, it reports all of them to the plug-in as a network error, and pages
-// are to see one error whichever report comes first.
+// if the browser requests the URL as well, it reports all of them to the plug-in as a network error, and
+// pages are to see one error whichever report comes first.
 TELIX_AV_CB_MSG MediaPipeline::classifyError(GstMessage* message, const GError& error) const {
     const bool isOfSource = GST_OBJECT_FLAG_IS_SET(GST_MESSAGE_SRC(message), GST_ELEMENT_FLAG_SOURCE);
     const bool isUnreachable = httpStatusOf(message) != 0 ||

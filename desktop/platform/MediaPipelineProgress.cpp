@@ -5,6 +5,14 @@
 
 namespace desktop {
 
+namespace {
+
+// How far the estimated times of a buffered range may be from the real ones.
+constexpr double kRangeDistance = 0.05;      // of the duration
+constexpr double kMinRangeDistance = 2000.0; // milliseconds
+
+} // namespace
+
 MediaPipeline::Progress MediaPipeline::progress() {
     gint64 value = 0;
     if (!isSeeking() && gst_element_query_position(m_playbin, GST_FORMAT_TIME, &value) && value >= 0) {
@@ -23,27 +31,31 @@ MediaPipeline::Progress MediaPipeline::progress() {
     return progress;
 }
 
-// Reports the range around the position; without one, nothing is buffered at the position.
+// Reports the buffered range around the position. Ranges are known in bytes, and their times are estimated
+// from the average bit rate: after a seek, the range that is played can seem to begin after the position or
+// to end before it. So the nearest range counts, unless it is too far away for that.
 void MediaPipeline::readBufferedRanges(Progress& progress) {
     GstQuery* query = gst_query_new_buffering(GST_FORMAT_PERCENT);
-    if (gst_element_query(m_playbin, query)) {
-        const double millisecondsPerUnit = static_cast<double>(m_duration) / GST_FORMAT_PERCENT_MAX;
-        const guint count = gst_query_get_n_buffering_ranges(query);
-        for (guint index = 0; index < count; ++index) {
-            gint64 start = 0;
-            gint64 stop = 0;
-            gst_query_parse_nth_buffering_range(query, index, &start, &stop);
-            const double startTime = static_cast<double>(start) * millisecondsPerUnit;
-            const double stopTime = static_cast<double>(stop) * millisecondsPerUnit;
-            if (startTime <= m_position && m_position <= stopTime) {
-                // Rounded down, so that it never exceeds the duration.
-                progress.bufferedEnd = static_cast<uint32_t>(stopTime / 1000);
-                progress.buffered = static_cast<uint32_t>((stopTime - m_position) / 1000);
-            }
-        }
-        if (count > 0 && progress.buffered == kNoBufferReport) {
-            progress.bufferedEnd = m_position / 1000;
-            progress.buffered = 0;
+    const guint count = gst_element_query(m_playbin, query) ? gst_query_get_n_buffering_ranges(query) : 0;
+    const double millisecondsPerUnit = static_cast<double>(m_duration) / GST_FORMAT_PERCENT_MAX;
+    double nearest = std::max(kMinRangeDistance, m_duration * kRangeDistance);
+    if (count > 0) {
+        progress.bufferedEnd = m_position / 1000;
+        progress.buffered = 0;
+    }
+    for (guint index = 0; index < count; ++index) {
+        gint64 first = 0;
+        gint64 last = 0;
+        gst_query_parse_nth_buffering_range(query, index, &first, &last);
+        const double start = static_cast<double>(first) * millisecondsPerUnit;
+        const double stop = static_cast<double>(last) * millisecondsPerUnit;
+        const double distance = std::max({start - m_position, m_position - stop, 0.0});
+        if (distance < nearest) {
+            nearest = distance;
+            const double begin = std::clamp<double>(m_position, start, stop);
+            // Rounded down, so that it never exceeds the duration.
+            progress.buffered = static_cast<uint32_t>((stop - begin) / 1000);
+            progress.bufferedEnd = static_cast<uint32_t>(std::max<double>(stop, m_position) / 1000);
         }
     }
     gst_query_unref(query);

@@ -1,4 +1,4 @@
-// The services of the test multiplex.
+// The services and applications of the test multiplex.
 #include "desktop/platform/Multiplex.h"
 
 namespace desktop {
@@ -58,6 +58,14 @@ const std::vector<TestService>& testServices() {
          {0, 0, 3, 5}},
     };
     return services;
+}
+
+const std::vector<TestApplication>& testApplications() {
+    static const auto& applications = *new std::vector<TestApplication>{
+        {1, "Demonstration", "demo/index.html", kControlCodeAutostart, 10, false, {101, 102}},
+        {2, "Media", "media/index.html", kControlCodePresent, 5, true, {101}},
+    };
+    return applications;
 }
 
 const Bytes& testDeliveryDescriptor() {

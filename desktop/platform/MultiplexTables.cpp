@@ -1,7 +1,9 @@
 // The tables of the test multiplex, and how often each is repeated.
+#include <algorithm>
 #include <chrono>
 #include <map>
 #include <string>
+#include <utility>
 
 #include "desktop/platform/Multiplex.h"
 
@@ -15,12 +17,33 @@ using std::chrono::milliseconds;
 constexpr auto kPsiInterval = milliseconds(100);
 constexpr auto kSiInterval = milliseconds(1000); // NIT, SDT, TDT
 constexpr auto kEitInterval = milliseconds(500);
+constexpr auto kAitInterval = milliseconds(500);
 constexpr auto kStreamEventInterval = milliseconds(250);
+
+constexpr uint8_t kTransportLabel = 1;
+constexpr ApplicationProfile kHbbTvProfile{0, 1, 1, 1};
+
+// The PID after those of the streams.
+uint16_t aitPidOf(const TestService& service) {
+    return static_cast<uint16_t>(service.streams.back().pid + 1);
+}
+
+std::vector<const TestApplication*> applicationsOf(const TestService& service) {
+    std::vector<const TestApplication*> applications;
+    for (const TestApplication& each : testApplications()) {
+        if (std::find(each.serviceIds.begin(), each.serviceIds.end(), service.serviceId) !=
+            each.serviceIds.end()) {
+            applications.push_back(&each);
+        }
+    }
+    return applications;
+}
 
 class TestTableInjector final : public TableInjector {
 public:
-    TestTableInjector(uint32_t programmeSeconds, uint32_t streamEventSeconds)
-        : m_programmeSeconds(programmeSeconds), m_streamEventSeconds(streamEventSeconds) {
+    TestTableInjector(uint32_t programmeSeconds, uint32_t streamEventSeconds, std::string applicationsUrl)
+        : m_programmeSeconds(programmeSeconds), m_streamEventSeconds(streamEventSeconds),
+          m_applicationsUrl(std::move(applicationsUrl)) {
         for (const TestService& service : testServices()) {
             for (const ElementaryStream& stream : service.streams) {
                 if (stream.type != kStreamTypeDsmccStreamDescriptors) {
@@ -43,6 +66,9 @@ public:
         }
         if (isDue(m_eitDue, now, kEitInterval)) {
             appendEits(utcSeconds, packets);
+        }
+        if (!m_applicationsUrl.empty() && isDue(m_aitDue, now, kAitInterval)) {
+            appendAits(packets);
         }
         if (m_streamEventSeconds != 0 && isDue(m_streamEventsDue, now, kStreamEventInterval)) {
             appendStreamEvents(utcSeconds, packets);
@@ -76,6 +102,10 @@ private:
             pmt.serviceId = service.serviceId;
             pmt.pcrPid = service.streams[0].pid;
             pmt.streams = service.streams;
+            if (!m_applicationsUrl.empty() && !applicationsOf(service).empty()) {
+                pmt.streams.push_back({kStreamTypePrivateSections, aitPidOf(service),
+                                       applicationSignallingDescriptor(kApplicationTypeHbbTv, 0)});
+            }
             append(pack(pmt), service.pmtPid, packets);
         }
     }
@@ -115,6 +145,36 @@ private:
         }
     }
 
+    // One section for each application.
+    void appendAits(Bytes& packets) {
+        for (const TestService& service : testServices()) {
+            const auto applications = applicationsOf(service);
+            for (size_t index = 0; index < applications.size(); ++index) {
+                Ait ait;
+                ait.sectionNumber = static_cast<uint8_t>(index);
+                ait.lastSectionNumber = static_cast<uint8_t>(applications.size() - 1);
+                ait.commonDescriptors = httpTransportDescriptor(kTransportLabel, m_applicationsUrl, {});
+                ait.applications = {makeApplication(*applications[index])};
+                append(pack(ait), aitPidOf(service), packets);
+            }
+        }
+    }
+
+    AitApplication makeApplication(const TestApplication& application) const {
+        AitApplication made;
+        made.organisationId = kTestOrganisationId;
+        made.applicationId = application.applicationId;
+        made.controlCode = application.controlCode;
+        for (const Bytes& descriptor : {applicationDescriptor(kHbbTvProfile, application.isServiceBound,
+                                                              application.priority, kTransportLabel),
+                                        applicationNameDescriptor("eng", application.name),
+                                        simpleApplicationLocationDescriptor(application.path),
+                                        simpleApplicationBoundaryDescriptor({m_applicationsUrl})}) {
+            made.descriptors.insert(made.descriptors.end(), descriptor.begin(), descriptor.end());
+        }
+        return made;
+    }
+
     // One event in each period, repeated during the period's first second.
     void appendStreamEvents(int64_t utcSeconds, Bytes& packets) {
         if (utcSeconds % m_streamEventSeconds != 0) {
@@ -132,18 +192,21 @@ private:
 
     uint32_t m_programmeSeconds;
     uint32_t m_streamEventSeconds;
+    std::string m_applicationsUrl;
     std::set<uint16_t> m_passedPids;
     std::map<uint16_t, uint8_t> m_continuity; // by PID
     Clock::Instant m_psiDue;
     Clock::Instant m_siDue;
     Clock::Instant m_eitDue;
+    Clock::Instant m_aitDue;
     Clock::Instant m_streamEventsDue;
 };
 
 } // namespace
 
-std::unique_ptr<TableInjector> makeTestTableInjector(uint32_t programmeSeconds, uint32_t streamEventSeconds) {
-    return std::make_unique<TestTableInjector>(programmeSeconds, streamEventSeconds);
+std::unique_ptr<TableInjector> makeTestTableInjector(uint32_t programmeSeconds, uint32_t streamEventSeconds,
+                                                     const std::string& applicationsUrl) {
+    return std::make_unique<TestTableInjector>(programmeSeconds, streamEventSeconds, applicationsUrl);
 }
 
 } // namespace desktop

@@ -139,9 +139,9 @@ void Picture::setHidden(Token token, bool isHidden) {
 
 GstElement* Picture::makeSink(Token token) {
     GError* error = nullptr;
-    GstElement* bin = gst_parse_bin_from_description(
-        "videoconvert ! appsink name=picture caps=video/x-raw,format=BGRx max-buffers=2 drop=true", TRUE,
-        &error);
+    const std::string description = std::string("videoconvert ! appsink name=") + kSinkName +
+                                    " caps=video/x-raw,format=BGRx max-buffers=2 drop=true";
+    GstElement* bin = gst_parse_bin_from_description(description.c_str(), TRUE, &error);
     g_clear_error(&error);
     if (!bin) {
         return nullptr;
@@ -152,7 +152,7 @@ GstElement* Picture::makeSink(Token token) {
         id = ++m_lastSink;
     }
     blank(token); // the frame of the previous sink
-    GstElement* sink = gst_bin_get_by_name(GST_BIN(bin), "picture");
+    GstElement* sink = gst_bin_get_by_name(GST_BIN(bin), kSinkName);
     GstAppSinkCallbacks callbacks{};
     callbacks.new_sample = [](GstAppSink* appSink, gpointer data) {
         return onSample(*static_cast<SinkData*>(data), gst_app_sink_try_pull_sample(appSink, 0));

@@ -45,6 +45,9 @@ public:
     // While it is hidden, frames still arrive, and the newest is there at once when it is shown again.
     void setHidden(Token token, bool isHidden);
 
+    // The name of the GstBaseSink in the bin that makeSink() returns.
+    static constexpr const char* kSinkName = "picture";
+
     // A sink for raw video of any format, which presents it as `token`. It replaces the sink that was made
     // last: that one's frames are dropped. A floating reference; null if an element is missing. Platform
     // thread.

@@ -53,7 +53,8 @@ private:
 
 } // namespace
 
-// A file that is played out. It may be written to meanwhile: the same packet may differ when it is read again.
+// A file that is played out. It may be written to meanwhile: the same packet may differ when it is read
+// again.
 class Playout::Stream {
 public:
     Stream(std::string name, std::unique_ptr<RegularFile> file, std::unique_ptr<TableInjector> injector)

@@ -6,6 +6,8 @@
 #include <algorithm>
 #include <memory>
 
+#include "desktop/platform/ByteReader.h"
+
 namespace desktop {
 
 namespace {
@@ -17,64 +19,15 @@ constexpr size_t kSdtServiceSize = 5;
 constexpr size_t kEitEventSize = 12;
 constexpr size_t kRatingSize = 4;
 constexpr size_t kTimeSize = 5;
-
-// Reads numbers one after the other; beyond the end every number is 0 and good() is false.
-class Reader {
-public:
-    Reader(const uint8_t* bytes, size_t length) : m_at(bytes), m_left(length) {}
-
-    unsigned int read8() {
-        if (m_left == 0) {
-            m_good = false;
-            return 0;
-        }
-        --m_left;
-        return *m_at++;
-    }
-    unsigned int read16() {
-        const unsigned int high = read8();
-        return high << 8 | read8();
-    }
-    uint32_t read32() {
-        const uint32_t high = read16();
-        return high << 16 | read16();
-    }
-    // The next `length` bytes as a reader of their own.
-    Reader take(size_t length) {
-        if (length > m_left) {
-            m_good = false;
-            length = m_left;
-        }
-        Reader part(m_at, length);
-        m_at += length;
-        m_left -= length;
-        return part;
-    }
-    Reader takeLoop() { return take(read16() & kLengthMask); }
-    std::string takeString() {
-        const Reader part = take(read8());
-        return decodeString(part.m_at, part.m_left);
-    }
-    std::string takeCode() {
-        const Reader part = take(kCodeSize);
-        return {reinterpret_cast<const char*>(part.m_at), part.m_left};
-    }
-    Bytes rest() const { return {m_at, m_at + m_left}; }
-    size_t left() const { return m_left; }
-    bool good() const { return m_good; }
-
-private:
-    const uint8_t* m_at;
-    size_t m_left;
-    bool m_good = true;
-};
+constexpr size_t kAitApplicationSize = 9;
 
 // The header fields and the body of a section of the long form.
 struct LongSection {
     uint16_t tableIdExtension;
     uint8_t version;
     uint8_t number;
-    Reader body;
+    uint8_t lastNumber;
+    ByteReader body;
 };
 
 std::optional<LongSection> openSection(const Bytes& section, uint8_t tableId) {
@@ -82,23 +35,23 @@ std::optional<LongSection> openSection(const Bytes& section, uint8_t tableId) {
         (section[5] & kCurrentNextIndicator) == 0) {
         return std::nullopt;
     }
-    return LongSection{
-        static_cast<uint16_t>(section[3] << 8 | section[4]),
-        static_cast<uint8_t>(section[5] >> 1 & (kVersionCount - 1)), section[6],
-        Reader(section.data() + kLongSectionHeaderSize, section.size() - kLongSectionHeaderSize - kCrcSize)};
+    return LongSection{static_cast<uint16_t>(section[3] << 8 | section[4]),
+                       static_cast<uint8_t>(section[5] >> 1 & (kVersionCount - 1)), section[6], section[7],
+                       ByteReader(section.data() + kLongSectionHeaderSize,
+                                  section.size() - kLongSectionHeaderSize - kCrcSize)};
 }
 
 unsigned int fromBcd(unsigned int value) {
     return (value >> 4) * 10 + (value & 0x0F);
 }
 
-uint32_t readDuration(Reader& reader) {
+uint32_t readDuration(ByteReader& reader) {
     const unsigned int hours = fromBcd(reader.read8());
     const unsigned int minutes = fromBcd(reader.read8());
     return hours * 3600 + minutes * 60 + fromBcd(reader.read8());
 }
 
-int64_t readTime(Reader& reader) {
+int64_t readTime(ByteReader& reader) {
     constexpr int64_t kSecondsPerDay = 86400;
     const int64_t day = reader.read16();
     return (day - kModifiedJulianDateOf1970) * kSecondsPerDay + readDuration(reader);
@@ -274,7 +227,7 @@ std::optional<Nit> parseNit(const Bytes& section) {
             nit.name = decodeString(body, length);
         }
     });
-    Reader streams = open->body.takeLoop();
+    ByteReader streams = open->body.takeLoop();
     nit.transportStreamId = static_cast<uint16_t>(streams.read16());
     nit.originalNetworkId = static_cast<uint16_t>(streams.read16());
     forEachDescriptor(streams.takeLoop().rest(), [&](uint8_t tag, const uint8_t* body, size_t length) {
@@ -303,7 +256,7 @@ std::optional<Sdt> parseSdt(const Bytes& section) {
         open->body.read8();
         forEachDescriptor(open->body.takeLoop().rest(), [&](uint8_t tag, const uint8_t* body, size_t length) {
             if (tag == kTagService) {
-                Reader words(body, length);
+                ByteReader words(body, length);
                 service.type = static_cast<uint8_t>(words.read8());
                 service.provider = words.takeString();
                 service.name = words.takeString();
@@ -320,7 +273,7 @@ namespace {
 void readEventDescriptors(const Bytes& descriptors, EitEvent& event) {
     bool hasShortEvent = false;
     forEachDescriptor(descriptors, [&](uint8_t tag, const uint8_t* body, size_t length) {
-        Reader words(body, length);
+        ByteReader words(body, length);
         if (tag == kTagShortEvent && !hasShortEvent) {
             hasShortEvent = true;
             event.language = words.takeCode();
@@ -366,7 +319,7 @@ std::optional<int64_t> parseTime(const Bytes& section) {
     if (!isTime) {
         return std::nullopt;
     }
-    Reader reader(section.data() + kSectionHeaderSize, section.size() - kSectionHeaderSize);
+    ByteReader reader(section.data() + kSectionHeaderSize, section.size() - kSectionHeaderSize);
     return readTime(reader);
 }
 
@@ -384,6 +337,32 @@ std::vector<StreamEvent> parseStreamEvents(const Bytes& section) {
         });
     }
     return events;
+}
+
+std::optional<Ait> parseAit(const Bytes& section) {
+    auto open = openSection(section, kTableIdAit);
+    if (!open) {
+        return std::nullopt;
+    }
+    Ait ait;
+    ait.applicationType = open->tableIdExtension & kApplicationTypeMask;
+    ait.isTest = (open->tableIdExtension & kTestApplicationFlag) != 0;
+    ait.version = open->version;
+    ait.sectionNumber = open->number;
+    ait.lastSectionNumber = open->lastNumber;
+    ait.commonDescriptors = open->body.takeLoop().rest();
+    ByteReader applications = open->body.takeLoop();
+    while (applications.left() >= kAitApplicationSize) {
+        AitApplication application;
+        application.organisationId = applications.read32();
+        application.applicationId = static_cast<uint16_t>(applications.read16());
+        application.controlCode = static_cast<uint8_t>(applications.read8());
+        application.descriptors = applications.takeLoop().rest();
+        ait.applications.push_back(application);
+    }
+    const bool isWhole = open->body.good() && applications.good() && applications.left() == 0 &&
+                         ait.sectionNumber <= ait.lastSectionNumber;
+    return isWhole ? std::optional(ait) : std::nullopt;
 }
 
 namespace {
@@ -448,17 +427,18 @@ std::string decodeString(const uint8_t* bytes, size_t length) {
     return "";
 }
 
-void forEachDescriptor(const Bytes& descriptors,
+bool forEachDescriptor(const Bytes& descriptors,
                        const std::function<void(uint8_t tag, const uint8_t* body, size_t length)>& visit) {
     size_t at = 0;
     while (at + kDescriptorHeaderSize <= descriptors.size()) {
         const size_t length = descriptors[at + 1];
         if (at + kDescriptorHeaderSize + length > descriptors.size()) {
-            return;
+            return false;
         }
         visit(descriptors[at], descriptors.data() + at + kDescriptorHeaderSize, length);
         at += kDescriptorHeaderSize + length;
     }
+    return at == descriptors.size();
 }
 
 } // namespace desktop

@@ -67,12 +67,13 @@ std::optional<Sdt> parseSdt(const Bytes& section);      // actual transport stre
 std::optional<Eit> parseEit(const Bytes& section);      // actual transport stream, present/following
 std::optional<int64_t> parseTime(const Bytes& section); // TDT or TOT: seconds since 1970, UTC
 std::vector<StreamEvent> parseStreamEvents(const Bytes& section);
+std::optional<Ait> parseAit(const Bytes& section); // of any application type
 
 // A string of a table as UTF-8, without its control codes.
 std::string decodeString(const uint8_t* bytes, size_t length);
 
-// Calls `visit` for each descriptor that is whole.
-void forEachDescriptor(const Bytes& descriptors,
+// Calls `visit` for each descriptor up to the first one that is not whole. False if there is such a one.
+bool forEachDescriptor(const Bytes& descriptors,
                        const std::function<void(uint8_t tag, const uint8_t* body, size_t length)>& visit);
 
 } // namespace desktop

@@ -11,24 +11,39 @@ namespace desktop {
 ServicePresentation::ServicePresentation(const Channels& channels, TunerArbiter& arbiter,
                                          BroadcastComponents& components, Clock& clock, Listener listener)
     : m_platform(Platform::instance()), m_channels(channels), m_arbiter(arbiter), m_components(components),
-      m_clock(clock), m_listener(std::move(listener)), m_source(clock, [this] {
-          if (m_pendingTune.id != 0) {
-              present(m_pendingTune);
-          }
-      }) {}
+      m_clock(clock), m_listener(std::move(listener)), m_source(clock, [this] { onTestMultiplex(); }) {}
 
 // Not in the constructor, because the platform thread may use this object as soon as the file is there.
 void ServicePresentation::start() {
+    setInstantZap(m_platform.configuration().instantZap);
     if (m_channels.usesTestMultiplex()) {
         m_source.makeTestMultiplexFile();
     }
 }
 
+void ServicePresentation::onTestMultiplex() {
+    if (m_pendingTune.id != 0) {
+        present(m_pendingTune);
+    } else if (m_awaitedChannel != 0) {
+        receive(m_awaitedChannel);
+    }
+}
+
 void ServicePresentation::tune(const Tune& tune) {
     stop();
+    m_awaitedChannel = 0;
     m_pendingTune = tune;
     m_arbiter.reportConnecting(tune);
-    present(tune);
+    const uint32_t delay = m_platform.configuration().zapDelay;
+    if (delay == 0) {
+        present(tune);
+        return;
+    }
+    m_clock.callAfter(std::chrono::milliseconds(delay), [this, tune] {
+        if (m_pendingTune.id == tune.id && m_activeTuneId != tune.id) {
+            present(tune);
+        }
+    });
 }
 
 void ServicePresentation::stop() {
@@ -42,6 +57,54 @@ void ServicePresentation::abortPendingTune() {
     }
 }
 
+// ---- Reception
+
+void ServicePresentation::receive(TELIX_JS_CM_HANDLE handle) {
+    if (m_pendingTune.id != 0 || m_tuner) {
+        return; // the channel is received already
+    }
+    const Channel channel = m_channels.find(handle).value_or(Channel());
+    std::string error = "unknown channel";
+    const auto result = channel.origin == Channel::Origin::None ? BroadcastSource::Result::Failed
+                                                                : openSource(channel, error);
+    m_awaitedChannel = result == BroadcastSource::Result::Pending ? handle : 0;
+    if (result == BroadcastSource::Result::Failed) {
+        std::fprintf(stderr, "libtelix: channel: %s\n", error.c_str());
+        loseService();
+    }
+}
+
+// Follows the applications of the channel, too, if it is received.
+BroadcastSource::Result ServicePresentation::openSource(const Channel& channel, std::string& error) {
+    const auto result = m_source.open(channel, error);
+    if (result == BroadcastSource::Result::Open) {
+        followApplications(channel);
+    }
+    return result;
+}
+
+// A channel that is tuned to again keeps what is known of it.
+void ServicePresentation::followApplications(const Channel& channel) {
+    if (m_followedChannel == channel.handle) {
+        return;
+    }
+    m_followedChannel = channel.handle;
+    m_listener.onServiceSelected(channel.handle);
+    const auto onApplications = [this, handle = channel.handle](const ApplicationList& list) {
+        m_platform.post([this, handle, list] {
+            if (m_followedChannel == handle) {
+                m_listener.onApplications(handle, list);
+            }
+        });
+    };
+    m_source.receiver().followApplications(static_cast<uint16_t>(channel.sid), onApplications);
+}
+
+void ServicePresentation::loseService() {
+    m_followedChannel = 0;
+    m_listener.onServiceLost();
+}
+
 // ---- From the channel to the running pipeline
 
 void ServicePresentation::present(const Tune& tune) {
@@ -50,14 +113,16 @@ void ServicePresentation::present(const Tune& tune) {
     }
     const Channel channel = m_channels.find(tune.channel).value_or(Channel());
     if (channel.origin == Channel::Origin::None) {
+        loseService();
         fail(tune.id, kErrorUnknownChannel, "unknown channel");
         return;
     }
     std::string error;
-    switch (m_source.open(channel, error)) {
+    switch (openSource(channel, error)) {
     case BroadcastSource::Result::Pending:
         return;
     case BroadcastSource::Result::Failed:
+        loseService();
         fail(tune.id, kErrorNoSignal, error);
         return;
     case BroadcastSource::Result::Open:
@@ -89,7 +154,8 @@ void ServicePresentation::startTuner(const Tune& tune, uint16_t serviceId) {
         m_pictureToken = token;
     }
     std::string error;
-    if (!m_tuner->start(m_platform.picture(), token, error)) {
+    const Clock::Duration age = m_source.receiver().keptAge(serviceId);
+    if (!m_tuner->start(m_platform.picture(), token, age, error)) {
         fail(tune.id, kErrorNoSignal, error);
         return;
     }
@@ -112,8 +178,11 @@ void ServicePresentation::selectService(const Tune& tune, uint16_t serviceId) {
     service.onPmt = [this, tune, postIfActive](const Pmt& pmt) {
         postIfActive([this, tune, pmt] { onPmt(tune, pmt); });
     };
-    service.onMissing = [this, id = tune.id] {
-        m_platform.post([this, id] { fail(id, kErrorUnknownChannel, "the multiplex has no such service"); });
+    service.onMissing = [this, tune, postIfActive] {
+        postIfActive([this, tune] {
+            loseService();
+            fail(tune.id, kErrorUnknownChannel, "the multiplex has no such service");
+        });
     };
     service.onEit = [this, tune, postIfActive](const Eit& eit) {
         postIfActive([this, tune, eit] { m_listener.onEit(tune.channel, eit); });
@@ -208,6 +277,11 @@ void ServicePresentation::applySelection() {
     if (!pids.video && m_pendingTune.id == 0) {
         m_platform.picture().blank(m_pictureToken); // no lock: this thread alone changes it
     }
+}
+
+ServicePresentation::Lateness ServicePresentation::lateness() const {
+    return m_tuner ? Lateness{m_tuner->videoTiming().lateness(), m_tuner->audioTiming().lateness()}
+                   : Lateness{};
 }
 
 std::optional<uint16_t> ServicePresentation::activeAudioPid() const {

@@ -22,8 +22,11 @@ namespace desktop {
 // picture and the clock is posted here with the id of its tune; those of an earlier tune are dropped.
 class ServicePresentation {
 public:
-    // What arrives for the service that is presented.
+    // What arrives for the service that is received, and for the one that is presented.
     struct Listener {
+        std::function<void(TELIX_JS_CM_HANDLE channel)> onServiceSelected; // received from now on
+        std::function<void()> onServiceLost; // nothing is received until the next service is selected
+        std::function<void(TELIX_JS_CM_HANDLE channel, const ApplicationList& list)> onApplications;
         std::function<void(TELIX_JS_CM_HANDLE channel, const Eit& eit)> onEit;
         std::function<void(uint8_t componentTag, const StreamEvent& event)> onStreamEvent;
         std::function<void()> onEnd;       // the service is not presented any more
@@ -44,17 +47,35 @@ public:
     // Ends what is presented.
     void stop();
 
+    // Receives the signalling of a channel while nothing is presented.
+    void receive(TELIX_JS_CM_HANDLE channel);
+
+    // Whether changes within the multiplex begin with what has been received before. Any thread.
+    void setInstantZap(bool isOn) { m_source.receiver().keepPackets(isOn); }
+    const Receiver& receiver() const { return m_source.receiver(); }
+
     // Passes the active components on to the pipeline.
     void applySelection();
 
     // The PID of the audio that the pipeline lets through.
     std::optional<uint16_t> activeAudioPid() const;
 
+    // How late picture and sound are (negative: they wait for their time); nothing before they are presented.
+    struct Lateness {
+        std::optional<std::chrono::milliseconds> video;
+        std::optional<std::chrono::milliseconds> audio;
+    };
+    Lateness lateness() const;
+
     // Of the presentation's picture; 0: none. With Platform::mutex() held.
     Picture::Token pictureTokenLocked() const { return m_pictureToken; }
 
 private:
+    void onTestMultiplex();
     void present(const Tune& tune);
+    BroadcastSource::Result openSource(const Channel& channel, std::string& error);
+    void followApplications(const Channel& channel);
+    void loseService();
     void startTuner(const Tune& tune, uint16_t serviceId);
     void selectService(const Tune& tune, uint16_t serviceId);
     void onPmt(const Tune& tune, const Pmt& pmt);
@@ -75,8 +96,10 @@ private:
     BroadcastSource m_source;
 
     std::unique_ptr<Tuner> m_tuner;
-    Tune m_pendingTune;                // without an outcome yet
-    uint64_t m_activeTuneId = 0;       // the tune to which the tuner belongs; 0: there is none
+    Tune m_pendingTune;                       // without an outcome yet
+    TELIX_JS_CM_HANDLE m_awaitedChannel = 0;  // to be received when the test multiplex is there; 0: none
+    TELIX_JS_CM_HANDLE m_followedChannel = 0; // whose applications are followed; 0: none
+    uint64_t m_activeTuneId = 0;              // the tune to which the tuner belongs; 0: there is none
     Picture::Token m_pictureToken = 0; // changed on the platform thread alone, guarded by Platform::mutex()
 };
 

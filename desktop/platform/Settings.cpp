@@ -14,6 +14,8 @@ namespace {
 
 constexpr uint32_t kMaxAge = 18;
 constexpr uint32_t kSecondsPerDay = 86400;
+constexpr uint32_t kMaxZapDelay = 60000;
+constexpr size_t kMaxApplicationsUrl = 240; // it must fit into a descriptor
 
 const char kTestMultiplex[] = "test";
 
@@ -53,6 +55,16 @@ std::string range(uint32_t minimum, uint32_t maximum) {
 SettingReader number(uint32_t Configuration::*member, uint32_t minimum, uint32_t maximum) {
     return {range(minimum, maximum), [=](SettingTarget& target, const std::string& value) {
                 return readNumber(value, minimum, maximum, target.configuration.*member);
+            }};
+}
+
+SettingReader flag(bool Configuration::*member) {
+    return {"true or false", [=](SettingTarget& target, const std::string& value) -> std::string {
+                if (value != "true" && value != "false") {
+                    return "\"" + value + "\" is neither true nor false";
+                }
+                target.configuration.*member = value == "true";
+                return "";
             }};
 }
 
@@ -182,6 +194,19 @@ const std::vector<KeyGroup>& keyGroups() {
     return groups;
 }
 
+// A folder, so that paths can be appended.
+std::string readApplicationsUrl(SettingTarget& target, const std::string& value) {
+    const OwnedString scheme(g_uri_parse_scheme(value.c_str()));
+    if (!value.empty() && !scheme) {
+        return "\"" + value + "\" is not an absolute URL";
+    }
+    if (value.size() > kMaxApplicationsUrl) {
+        return "longer than " + std::to_string(kMaxApplicationsUrl) + " bytes";
+    }
+    target.configuration.applicationsUrl = value.empty() || value.back() == '/' ? value : value + "/";
+    return "";
+}
+
 const std::vector<Setting>& settings() {
     using C = Configuration;
     static const auto& table = *new std::vector<Setting>{
@@ -192,6 +217,9 @@ const std::vector<Setting>& settings() {
          "Duration of the programmes of the test multiplex"},
         {"test", "stream-event-seconds", number(&C::streamEventSeconds, 0, kSecondsPerDay), "10",
          "Interval of the stream events of the test multiplex; 0 sends none"},
+        {"test", "applications", custom("URL", readApplicationsUrl), "",
+         "Folder of the applications that the test multiplex signals, `demo/index.html` and "
+         "`media/index.html` in it; if empty, it signals none. `TELIX_APPLICATIONS` overrides the setting"},
         {"viewer", "country", isoCode(&C::country), "DEU", "Country of the viewer"},
         {"viewer", "audio-language", isoCode(&C::audioLanguage), "deu", "Preferred audio language"},
         {"viewer", "subtitle-language", isoCode(&C::subtitleLanguage), "deu", "Preferred subtitle language"},
@@ -220,6 +248,11 @@ const std::vector<Setting>& settings() {
          "Number of further SD videos that could be decoded"},
         {"set", "extra-hd-video-decodes", number(&C::extraHdVideoDecodes, 0, 16), "0",
          "Number of further HD videos that could be decoded"},
+        {"set", "instant-zap", flag(&C::instantZap), "true",
+         "Whether a channel change within the multiplex presents at once what has been received since the "
+         "last keyframe; if false, it waits for the next one"},
+        {"set", "zap-delay", number(&C::zapDelay, 0, kMaxZapDelay), "0",
+         "Milliseconds before each tune begins, as on a slower set"},
     };
     return table;
 }

@@ -41,8 +41,9 @@ inline constexpr char kDrmSection[] = "drm SYSTEM-ID";
 // All settings, in the order of the documentation.
 const std::vector<Setting>& settings();
 
-// The setting `sources`, which the environment can override.
+// The settings `sources` and `applications`, which the environment can override.
 std::string readSources(SettingTarget& target, const std::string& value);
+std::string readApplicationsUrl(SettingTarget& target, const std::string& value);
 
 } // namespace desktop
 

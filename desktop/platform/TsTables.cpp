@@ -62,6 +62,13 @@ void putString(Bytes& bytes, const std::string& string, size_t maxSize) {
     }
 }
 
+// Raw bytes with their length before them, as in the descriptors of an AIT.
+void putRaw(Bytes& bytes, const std::string& string) {
+    const size_t length = std::min(string.size(), kMaxDescriptorBodySize);
+    put8(bytes, static_cast<unsigned int>(length));
+    bytes.insert(bytes.end(), string.begin(), string.begin() + static_cast<std::ptrdiff_t>(length));
+}
+
 void putCode(Bytes& bytes, const std::string& code) {
     for (size_t index = 0; index < kCodeSize; ++index) {
         put8(bytes, index < code.size() ? static_cast<uint8_t>(code[index]) : ' ');
@@ -232,6 +239,23 @@ Bytes pack(const StreamEvent& event) {
         Family::Mpeg, descriptor(kTagStreamEvent, body));
 }
 
+Bytes pack(const Ait& ait) {
+    Bytes applications;
+    for (const AitApplication& application : ait.applications) {
+        put32(applications, application.organisationId);
+        put16(applications, application.applicationId);
+        put8(applications, application.controlCode);
+        putLoop(applications, application.descriptors);
+    }
+    Bytes body;
+    putLoop(body, ait.commonDescriptors);
+    putLoop(body, applications);
+    const uint16_t extension =
+        static_cast<uint16_t>(ait.applicationType | (ait.isTest ? kTestApplicationFlag : 0));
+    return packSection({kTableIdAit, extension, ait.version, ait.sectionNumber, ait.lastSectionNumber},
+                       Family::Dvb, body);
+}
+
 Bytes packTdt(int64_t utcSeconds) {
     constexpr unsigned int kTimeSize = 5;
     Bytes bytes;
@@ -259,6 +283,68 @@ Bytes subtitlingDescriptor(const std::string& language, uint8_t subtitlingType) 
 
 Bytes streamIdentifierDescriptor(uint8_t componentTag) {
     return descriptor(kTagStreamIdentifier, {componentTag});
+}
+
+Bytes applicationSignallingDescriptor(uint16_t applicationType, uint8_t version) {
+    Bytes body;
+    put16(body,
+          static_cast<unsigned int>(kTestApplicationFlag | applicationType)); // the first bit is reserved
+    put8(body, kReservedBeforeAitVersion | version % kVersionCount);
+    return descriptor(kTagApplicationSignalling, body);
+}
+
+Bytes applicationDescriptor(const ApplicationProfile& profile, bool isServiceBound, uint8_t priority,
+                            uint8_t label) {
+    Bytes profiles;
+    put16(profiles, profile.profile);
+    put8(profiles, profile.versionMajor);
+    put8(profiles, profile.versionMinor);
+    put8(profiles, profile.versionMicro);
+    Bytes body;
+    put8(body, static_cast<unsigned int>(profiles.size()));
+    putBytes(body, profiles);
+    put8(body, (isServiceBound ? kServiceBoundFlag : 0U) | kVisibilityAll << kVisibilityShift |
+                   kReservedAfterVisibility);
+    put8(body, priority);
+    put8(body, label);
+    return descriptor(kTagApplication, body);
+}
+
+Bytes applicationNameDescriptor(const std::string& language, const std::string& name) {
+    Bytes body;
+    putCode(body, language);
+    putString(body, name, kMaxNameSize);
+    return descriptor(kTagApplicationName, body);
+}
+
+Bytes httpTransportDescriptor(uint8_t label, const std::string& baseUrl,
+                              const std::vector<std::string>& extensions) {
+    Bytes body;
+    put16(body, kTransportProtocolHttp);
+    put8(body, label);
+    putRaw(body, baseUrl);
+    put8(body, static_cast<unsigned int>(extensions.size()));
+    for (const std::string& extension : extensions) {
+        putRaw(body, extension);
+    }
+    return descriptor(kTagTransportProtocol, body);
+}
+
+Bytes simpleApplicationLocationDescriptor(const std::string& initialPath) {
+    return descriptor(kTagSimpleApplicationLocation, Bytes(initialPath.begin(), initialPath.end()));
+}
+
+Bytes applicationUsageDescriptor(uint8_t usage) {
+    return descriptor(kTagApplicationUsage, {usage});
+}
+
+Bytes simpleApplicationBoundaryDescriptor(const std::vector<std::string>& urls) {
+    Bytes body;
+    put8(body, static_cast<unsigned int>(urls.size()));
+    for (const std::string& url : urls) {
+        putRaw(body, url);
+    }
+    return descriptor(kTagSimpleApplicationBoundary, body);
 }
 
 Bytes packetsOf(const Bytes& section, uint16_t pid, uint8_t& continuity) {

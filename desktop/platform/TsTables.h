@@ -1,5 +1,6 @@
 // The tables of a transport stream as plain records, and packing them into sections and packets. Tables and
-// descriptors are those of ISO/IEC 13818-1 and EN 300 468, stream events those of TS 102 809.
+// descriptors are those of ISO/IEC 13818-1 and EN 300 468, stream events and the AIT those of TS
+// 102 809.
 #ifndef TELIX_DESKTOP_PLATFORM_TSTABLES_H
 #define TELIX_DESKTOP_PLATFORM_TSTABLES_H
 
@@ -97,6 +98,24 @@ struct StreamEvent {
     Bytes data;          // at most 245 bytes
 };
 
+struct AitApplication {
+    uint32_t organisationId = 0;
+    uint16_t applicationId = 0;
+    uint8_t controlCode = kControlCodeAutostart;
+    Bytes descriptors;
+};
+
+// One section of the AIT of one application type.
+struct Ait {
+    uint16_t applicationType = kApplicationTypeHbbTv;
+    bool isTest = false; // applications that only sets under test start
+    uint8_t version = 0;
+    uint8_t sectionNumber = 0;
+    uint8_t lastSectionNumber = 0;
+    Bytes commonDescriptors; // of all applications of the section
+    std::vector<AitApplication> applications;
+};
+
 // Whole sections, with their CRC.
 Bytes pack(const Pat& pat);
 Bytes pack(const Pmt& pmt);
@@ -104,12 +123,32 @@ Bytes pack(const Nit& nit);
 Bytes pack(const Sdt& sdt);
 Bytes pack(const Eit& eit);
 Bytes pack(const StreamEvent& event);
+Bytes pack(const Ait& ait);
 Bytes packTdt(int64_t utcSeconds); // since 1970; a TDT has no CRC
 
 // Whole descriptors, with tag and length. `language` is an ISO 639-2 code.
 Bytes iso639LanguageDescriptor(const std::string& language, uint8_t audioType);
 Bytes subtitlingDescriptor(const std::string& language, uint8_t subtitlingType);
 Bytes streamIdentifierDescriptor(uint8_t componentTag);
+
+// Of the stream with an AIT, in the PMT.
+Bytes applicationSignallingDescriptor(uint16_t applicationType, uint8_t version);
+
+// Descriptors of an AIT. A label connects an application with its transport protocols.
+struct ApplicationProfile {
+    uint16_t profile = 0;
+    uint8_t versionMajor = 0;
+    uint8_t versionMinor = 0;
+    uint8_t versionMicro = 0;
+};
+Bytes applicationDescriptor(const ApplicationProfile& profile, bool isServiceBound, uint8_t priority,
+                            uint8_t label);
+Bytes applicationNameDescriptor(const std::string& language, const std::string& name);
+Bytes httpTransportDescriptor(uint8_t label, const std::string& baseUrl,
+                              const std::vector<std::string>& extensions);
+Bytes simpleApplicationLocationDescriptor(const std::string& initialPath);
+Bytes applicationUsageDescriptor(uint8_t usage);
+Bytes simpleApplicationBoundaryDescriptor(const std::vector<std::string>& urls);
 
 // The packets that carry a section; `continuity` is the continuity counter of the PID, which is advanced.
 Bytes packetsOf(const Bytes& section, uint16_t pid, uint8_t& continuity);

@@ -3,11 +3,14 @@
 
 #include <gst/app/gstappsrc.h>
 
+#include <algorithm>
+#include <chrono>
 #include <cstring>
 #include <memory>
 
 #include "desktop/platform/AudioSink.h"
 #include "desktop/platform/Platform.h"
+#include "desktop/platform/RecentPackets.h"
 
 namespace desktop {
 
@@ -32,6 +35,12 @@ const Decoder kAudioDecoders[] = {
 
 // Up to three seconds wait for the decoder, however many bytes and buffers that is.
 const char* const kDecoderQueue = "queue max-size-time=3000000000 max-size-bytes=0 max-size-buffers=0 ! ";
+
+constexpr guint64 kMaxWaiting = guint64{8} << 20; // bytes from the receiver that wait for the demultiplexer
+
+GstClockTime toGstreamer(Clock::Duration duration) {
+    return static_cast<GstClockTime>(std::chrono::nanoseconds(duration).count());
+}
 
 template <size_t Count>
 const char* decoderFor(const GstCaps* caps, const Decoder (&decoders)[Count]) {
@@ -83,7 +92,7 @@ GstPadProbeReturn probeAudio(GstPad* pad, GstPadProbeInfo* info, gpointer data) 
 Tuner::Tuner(uint16_t serviceId, Listener listener)
     : m_serviceId(serviceId), m_listener(std::move(listener)) {}
 
-bool Tuner::start(Picture& picture, Picture::Token token, std::string& error) {
+bool Tuner::start(Picture& picture, Picture::Token token, Clock::Duration age, std::string& error) {
     m_pipeline = gst_pipeline_new("tuner");
     if (!addElements(picture, token)) {
         error = "a GStreamer element is missing";
@@ -95,7 +104,10 @@ bool Tuner::start(Picture& picture, Picture::Token token, std::string& error) {
     GstBus* bus = gst_element_get_bus(m_pipeline);
     m_watch = gst_bus_add_watch(bus, onMessage, this);
     gst_object_unref(bus);
-    if (gst_element_set_state(m_pipeline, GST_STATE_PLAYING) == GST_STATE_CHANGE_FAILURE) {
+    // Running time begins `age` ago: what arrived since then is late, and presented at once.
+    const bool isPaused = gst_element_set_state(m_pipeline, GST_STATE_PAUSED) != GST_STATE_CHANGE_FAILURE;
+    gst_element_set_start_time(m_pipeline, toGstreamer(age));
+    if (!isPaused || gst_element_set_state(m_pipeline, GST_STATE_PLAYING) == GST_STATE_CHANGE_FAILURE) {
         error = "the pipeline does not start";
         return false;
     }
@@ -127,9 +139,13 @@ bool Tuner::addElements(Picture& picture, Picture::Token token) {
 }
 
 void Tuner::configureElements() {
+    GstElement* videoSink = gst_bin_get_by_name(GST_BIN(m_videoSink), Picture::kSinkName);
+    m_videoTiming.observe(videoSink);
+    gst_object_unref(videoSink); // the bin owns it
+    m_audioTiming.observe(m_audioSink);
     GstCaps* caps = gst_caps_from_string("video/mpegts,systemstream=(boolean)true,packetsize=(int)188");
-    g_object_set(m_source, "caps", caps, "format", GST_FORMAT_TIME, "is-live", TRUE, "do-timestamp", TRUE,
-                 "max-bytes", guint64{8} << 20, nullptr);
+    g_object_set(m_source, "caps", caps, "format", GST_FORMAT_TIME, "is-live", TRUE, "max-bytes",
+                 guint64{kMaxRecentPackets + kMaxWaiting}, nullptr);
     gst_caps_unref(caps);
     gst_util_set_object_arg(G_OBJECT(m_source), "leaky-type", "downstream");
     g_object_set(m_demultiplexer, "program-number", static_cast<gint>(m_serviceId), "latency", 50, nullptr);
@@ -169,11 +185,15 @@ Tuner::~Tuner() {
     }
 }
 
-std::function<void(const Bytes& packets)> Tuner::feed() const {
+std::function<void(const Bytes& packets, Clock::Duration age)> Tuner::feed() const {
     const std::shared_ptr<GstElement> source(GST_ELEMENT(gst_object_ref(m_source)), gst_object_unref);
-    return [source](const Bytes& packets) {
-        gst_app_src_push_buffer(GST_APP_SRC(source.get()),
-                                gst_buffer_new_memdup(packets.data(), packets.size()));
+    return [source](const Bytes& packets, Clock::Duration age) {
+        GstBuffer* buffer = gst_buffer_new_memdup(packets.data(), packets.size());
+        const GstClockTime now = gst_element_get_current_running_time(source.get());
+        if (GST_CLOCK_TIME_IS_VALID(now)) {
+            GST_BUFFER_DTS(buffer) = now - std::min(now, toGstreamer(age));
+        }
+        gst_app_src_push_buffer(GST_APP_SRC(source.get()), buffer);
     };
 }
 

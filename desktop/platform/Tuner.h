@@ -8,7 +8,9 @@
 #include <optional>
 #include <string>
 
+#include "desktop/platform/Clock.h"
 #include "desktop/platform/Picture.h"
+#include "desktop/platform/SinkTiming.h"
 #include "desktop/platform/TsTables.h"
 
 namespace desktop {
@@ -28,12 +30,13 @@ public:
     Tuner(const Tuner&) = delete;
     Tuner& operator=(const Tuner&) = delete;
 
-    // Starts to present as `token`. False with the reason in `error` if that is impossible. Once.
-    bool start(Picture& picture, Picture::Token token, std::string& error);
+    // Starts to present as `token` what has arrived up to `age` ago, as if it had been started then. False
+    // with the reason in `error` if that is impossible. Once.
+    bool start(Picture& picture, Picture::Token token, Clock::Duration age, std::string& error);
 
-    // A function that takes the packets of the service and its tables. It may be called on any thread, also
-    // during the tuner's teardown and later. After start().
-    std::function<void(const Bytes& packets)> feed() const;
+    // A function that takes the packets of the service and its tables, and how long ago they arrived. It may
+    // be called on any thread, also during the tuner's teardown and later. After start().
+    std::function<void(const Bytes& packets, Clock::Duration age)> feed() const;
 
     // What is presented; a stream may be selected before the demultiplexer finds it. Nothing is silence, no
     // video, no subtitles.
@@ -43,6 +46,10 @@ public:
 
     // The PID of the audio that the pipeline lets through; nothing if it is muted.
     std::optional<uint16_t> activeAudioPid() const;
+
+    // How late picture and sound are.
+    const SinkTiming& videoTiming() const { return m_videoTiming; }
+    const SinkTiming& audioTiming() const { return m_audioTiming; }
 
 private:
     static void onPadAdded(GstElement* demultiplexer, GstPad* pad, gpointer tuner);
@@ -61,6 +68,8 @@ private:
 
     uint16_t m_serviceId;
     Listener m_listener;
+    SinkTiming m_videoTiming{SinkTiming::LateStart::Present};
+    SinkTiming m_audioTiming{SinkTiming::LateStart::Drop};
     GstElement* m_pipeline = nullptr;
     // Owned by the pipeline, which is not changed after start() but for the streams' bins.
     GstElement* m_source = nullptr;

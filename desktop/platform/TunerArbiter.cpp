@@ -136,6 +136,7 @@ bool TunerArbiter::zap(TELIX_JS_CM_HANDLE channel) {
         requestLocked(m_tunerOwner, channel);
     } else {
         m_currentChannel = channel;
+        m_platform.post([this, channel] { m_listener.onChannel(channel); });
     }
     return true;
 }

@@ -35,8 +35,9 @@ class TunerArbiter {
 public:
     // Platform thread.
     struct Listener {
-        std::function<void(const Tune& tune)> onTune; // the owner asks for a channel
-        std::function<void()> onRelease;              // the owner gives the tuner up
+        std::function<void(const Tune& tune)> onTune;              // the owner asks for a channel
+        std::function<void()> onRelease;                           // the owner gives the tuner up
+        std::function<void(TELIX_JS_CM_HANDLE channel)> onChannel; // the current one changes without an owner
     };
 
     struct Object {

@@ -4,6 +4,7 @@
 #include <cstdio>
 #include <ctime>
 #include <string>
+#include <vector>
 
 namespace desktop {
 
@@ -30,14 +31,27 @@ bool booleanMember(JsonObject* object, const char* name) {
 }
 
 // Control characters are replaced, because a terminal would interpret them.
-std::string stringMember(JsonObject* object, const char* name) {
-    std::string value = object ? json_object_get_string_member_with_default(object, name, "") : "";
+std::string printable(std::string value) {
     for (char& character : value) {
         if (static_cast<unsigned char>(character) < 0x20 || character == 0x7F) {
             character = '?';
         }
     }
     return value;
+}
+
+std::string stringMember(JsonObject* object, const char* name) {
+    return printable(object ? json_object_get_string_member_with_default(object, name, "") : "");
+}
+
+std::vector<std::string> stringsMember(JsonObject* object, const char* name) {
+    std::vector<std::string> strings;
+    JsonArray* array = arrayMember(object, name);
+    for (guint index = 0; array && index < json_array_get_length(array); ++index) {
+        const char* each = json_array_get_string_element(array, index);
+        strings.push_back(printable(each ? each : "?"));
+    }
+    return strings;
 }
 
 template <typename Function>
@@ -128,10 +142,8 @@ void printPlayer(JsonObject* player) {
 
 std::string keysOf(JsonObject* response) {
     std::string keys;
-    JsonArray* names = arrayMember(response, "keys");
-    for (guint index = 0; names && index < json_array_get_length(names); ++index) {
-        const char* name = json_array_get_string_element(names, index);
-        keys += std::string(keys.empty() ? "" : " ") + (name ? name : "?");
+    for (const std::string& name : stringsMember(response, "keys")) {
+        keys += (keys.empty() ? "" : " ") + name;
     }
     return keys;
 }
@@ -171,6 +183,23 @@ void printChannel(JsonObject* response) {
     std::printf("%s %s\n", numberMember(channel, "number").c_str(), stringMember(channel, "name").c_str());
 }
 
+void printApplications(JsonObject* response) {
+    JsonObject* channel = objectMember(response, "channel");
+    printRow("channel", channel ? numberMember(channel, "number") + " " + stringMember(channel, "name") +
+                                      ", signalling " + stringMember(response, "state")
+                                : "none");
+    forEachObject(response, "applications", [](JsonObject* application) {
+        const std::string name = stringMember(application, "name");
+        printRow(stringMember(application, "id"),
+                 stringMember(application, "controlCode") + " " + stringMember(application, "url") + ", " +
+                     (name.empty() ? "" : name + ", ") + "priority " + numberMember(application, "priority") +
+                     (booleanMember(application, "serviceBound") ? ", service-bound" : ""));
+    });
+    for (const std::string& each : stringsMember(response, "skipped")) {
+        printRow("skipped", each);
+    }
+}
+
 void printListenerCount(JsonObject* response) {
     std::printf("listeners: %s\n", numberMember(response, "listeners").c_str());
 }
@@ -191,6 +220,10 @@ void printState(JsonObject* response) {
     printProgramme("now", objectMember(programmes, "now"));
     printProgramme("next", objectMember(programmes, "next"));
     printPicture(objectMember(response, "picture"));
+    printRow("instant zap", booleanMember(response, "instantZap")
+                                ? "on, " + numberMember(response, "keptPackets") + " bytes kept"
+                                : "off");
+    printRow("zap delay", numberMember(response, "zapDelay") + " ms");
     forEachObject(response, "players", printPlayer);
     printRow("keys", orNone(keysOf(response)));
     printRow("free memory", numberMember(response, "freeMemory") + " bytes");

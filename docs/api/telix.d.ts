@@ -32,7 +32,7 @@ declare namespace telix {
         onApplicationHidden: ((application: Application) => void) | null;
         /** Has the browser start the application at the URL; `null` if it refuses. The second argument has no effect (quirk 18). */
         createApplication(uri: string, createChild: boolean): Application | null;
-        /** Has the browser end the application. The object goes on answering (quirk 20). */
+        /** Has the browser end the application. The object can still be used (quirk 20). */
         destroyApplication(): void;
         /** Has the browser show the application. */
         show(): void;

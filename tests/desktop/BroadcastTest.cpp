@@ -259,6 +259,91 @@ TEST_F(BroadcastTest, GoesFromConnectingToPresentingAndStopped) {
     tune(m_channels[1]); // a released object is good for another tune
 }
 
+// How late picture and sound are presented.
+ServicePresentation::Lateness latenessOf(Broadcast& broadcast) {
+    std::promise<ServicePresentation::Lateness> lateness;
+    Platform::instance().post([&] { lateness.set_value(broadcast.lateness()); });
+    return lateness.get_future().get();
+}
+
+// Waits until the last keyframe of the channels is some pictures old.
+bool waitForOldKeyframe(const std::function<void(bool isOld)>& onLook) {
+    size_t most = 0;
+    const uint64_t serial = takeShot().serial;
+    const auto kept = [] { return Broadcast::instance().state().keptPackets; };
+    const bool isMeasured = waitUntil([&] {
+        most = std::max(most, kept());
+        return takeShot().serial > serial + 50; // several keyframes
+    });
+    return isMeasured && waitUntil([&] {
+               const size_t now = kept();
+               const bool isOld = now > most * 6 / 10 && now < most * 9 / 10;
+               onLook(isOld);
+               return isOld;
+           });
+}
+
+TEST_F(BroadcastTest, ShowsAnotherChannelFromWhatItHasReceivedBefore) {
+    tune(m_channels[0]);
+    // A decoder keeps the first picture back until it has the second one.
+    ASSERT_TRUE(waitForOldKeyframe([](bool isOld) { testClock().freeze(isOld); }));
+    for (const TELIX_JS_CM_HANDLE channel : {m_channels[1], m_channels[2], m_channels[0]}) {
+        tune(channel); // not a single packet arrives meanwhile
+        EXPECT_TRUE(takeShot().visible);
+    }
+    testClock().freeze(false);
+    const uint64_t serial = takeShot().serial;
+    EXPECT_TRUE(waitUntil([&] { return takeShot().serial > serial + 20; }));
+}
+
+TEST_F(BroadcastTest, CatchesUpWithTheBroadcastAfterAChange) {
+    tune(m_channels[0]);
+    ASSERT_TRUE(waitUntil([] { return Broadcast::instance().state().keptPackets > 0; }));
+    for (const TELIX_JS_CM_HANDLE channel : {m_channels[1], m_channels[2]}) {
+        tune(channel);
+        EXPECT_TRUE(waitUntil([] {
+            const auto lateness = latenessOf(Broadcast::instance());
+            return lateness.video && lateness.audio && *lateness.video < SinkTiming::kTolerance &&
+                   *lateness.audio < SinkTiming::kTolerance;
+        }));
+    }
+}
+
+// The longest time that a picture waited before it was presented, of a second.
+std::chrono::milliseconds longestWait() {
+    const uint64_t serial = takeShot().serial;
+    std::chrono::milliseconds longest(0);
+    EXPECT_TRUE(waitUntil([&] {
+        longest = std::max(longest, -latenessOf(Broadcast::instance()).video.value_or(longest));
+        return takeShot().serial > serial + 25;
+    }));
+    return longest;
+}
+
+TEST_F(BroadcastTest, IsNoFurtherBehindTheBroadcastAfterAnInstantChange) {
+    tune(m_channels[0]);
+    Broadcast::instance().setInstantZap(false);
+    tune(m_channels[1]);
+    const auto ordinary = longestWait();
+    Broadcast::instance().setInstantZap(true);
+    tune(m_channels[0]);
+    ASSERT_TRUE(waitForOldKeyframe([](bool) {}));
+    tune(m_channels[1]);
+    // A pipeline that took the packets from the keyframe on for new would be behind by the age of these.
+    EXPECT_LT(longestWait(), ordinary + std::chrono::milliseconds(150));
+}
+
+TEST_F(BroadcastTest, KeepsNothingWhileInstantChangesAreOff) {
+    tune(m_channels[0]);
+    ASSERT_TRUE(waitUntil([] { return Broadcast::instance().state().keptPackets > 0; }));
+    Broadcast::instance().setInstantZap(false);
+    EXPECT_FALSE(Broadcast::instance().state().instantZap);
+    EXPECT_EQ(Broadcast::instance().state().keptPackets, 0U);
+    tune(m_channels[1]);
+    EXPECT_EQ(Broadcast::instance().state().keptPackets, 0U);
+    Broadcast::instance().setInstantZap(true);
+}
+
 TEST_F(BroadcastTest, TellsThatAChannelIsUnknown) {
     ASSERT_EQ(TELIX_JS_VB_SetChannelByTriplet(m_object, kTestOriginalNetworkId, kTestTransportStreamId, 999),
               0);

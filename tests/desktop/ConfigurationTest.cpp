@@ -95,6 +95,9 @@ TEST_F(ConfigurationTest, NamesFileLineAndReasonOfEveryFault) {
         {"[drm a]\nanswer=1\n", 2, "unknown key \"answer\""},
         {"[drm a]\n[drm  a]\n", 2, "given twice"},
         {"[set]\nkeys=red;pink\n", 2, "\"pink\" is not a group of keys"},
+        {"[test]\napplications=apps/\n", 2, "\"apps/\" is not an absolute URL"},
+        {"[set]\ninstant-zap=maybe\n", 2, "\"maybe\" is neither true nor false"},
+        {"[set]\nzap-delay=60001\n", 2, "zap-delay"},
         {"[set]\ncapabilities=missing.xml\n", 2, "missing.xml"},
     };
     for (const auto& fault : faults) {
@@ -180,6 +183,19 @@ TEST_F(ConfigurationTest, HasTheDefaultsOfTheTableWithoutAFile) {
     EXPECT_EQ(defaults.capabilitiesFile, "");
     EXPECT_EQ(defaults.extraSdVideoDecodes, 1U);
     EXPECT_EQ(defaults.extraHdVideoDecodes, 0U);
+    EXPECT_EQ(defaults.applicationsUrl, "");
+    EXPECT_TRUE(defaults.instantZap);
+    EXPECT_EQ(defaults.zapDelay, 0U);
+}
+
+TEST_F(ConfigurationTest, TakesTheFolderOfTheApplicationsFromTheEnvironmentToo) {
+    ASSERT_FALSE(load("[test]\napplications=http://a.example/apps\n"));
+    EXPECT_EQ(m_configuration.applicationsUrl, "http://a.example/apps/"); // paths are appended
+    setenv("TELIX_APPLICATIONS", "file:///apps/", 1);
+    EXPECT_EQ(Configuration::loadOrDefault().applicationsUrl, "file:///apps/");
+    setenv("TELIX_APPLICATIONS", "apps", 1);
+    EXPECT_EQ(Configuration::loadOrDefault().applicationsUrl, "http://127.0.0.1/apps/"); // that of the file
+    unsetenv("TELIX_APPLICATIONS");
 }
 
 TEST_F(ConfigurationTest, ReadsEverySettingOfTheTableFromItsSection) {

@@ -203,6 +203,56 @@ TEST_F(ControlTest, ListsTheChannelsAndTunesAsTheViewerWould) {
               "\"\\\"number\\\" is out of range: there are 3 channels\"");
 }
 
+TEST_F(ControlTest, ListsTheApplicationsOfTheChannelAndSignalsAnother) {
+    Client client(m_path);
+    const char list[] = R"({"command":"applications"})";
+    EXPECT_EQ(find(client.send(list), "$.state"), "\"no service\"");
+    tune(1);
+    std::string applications;
+    const auto hasUrls = [&](const std::string& urls) {
+        applications = client.send(list);
+        return find(applications, "$.applications[*].url") == urls;
+    };
+    const std::string own =
+        R"("http://127.0.0.1/apps/demo/index.html","http://127.0.0.1/apps/media/index.html")";
+    ASSERT_TRUE(waitUntil([&] { return hasUrls(own); })) << applications;
+    EXPECT_EQ(find(applications, "$.state"), "\"known\"");
+    EXPECT_EQ(find(applications, "$.channel.number"), "1");
+    EXPECT_EQ(find(applications, "$.applications[*].id"), R"("7e11.1","7e11.2")");
+    EXPECT_EQ(find(applications, "$.applications[*].controlCode"), R"("AUTOSTART","PRESENT")");
+    EXPECT_EQ(find(applications, "$.applications[*].serviceBound"), "false,true");
+    EXPECT_EQ(find(applications, "$.applications[*].boundaries"),
+              R"(["http://127.0.0.1/apps/"],["http://127.0.0.1/apps/"])");
+    EXPECT_EQ(find(applications, "$.skipped"), "[]");
+
+    EXPECT_EQ(client.send(R"({"command":"signal","url":"http://a.example/","control-code":"kill"})"), kDone);
+    ASSERT_TRUE(hasUrls(own + ",\"http://a.example/\""));
+    EXPECT_EQ(find(applications, "$.applications[2].controlCode"), "\"KILL\"");
+    EXPECT_EQ(client.send(R"({"command":"signal","url":"http://b.example/","service-bound":true})"), kDone);
+    ASSERT_TRUE(hasUrls(own + ",\"http://b.example/\""));
+    EXPECT_EQ(find(applications, "$.applications[2].serviceBound"), "true");
+    EXPECT_EQ(client.send(R"({"command":"signal"})"), kDone);
+    EXPECT_TRUE(hasUrls(own));
+    EXPECT_EQ(client.send(R"({"command":"signal","url":"http://c.example/","on":2})"), kDone);
+    EXPECT_TRUE(hasUrls(own)); // not on this channel
+    EXPECT_EQ(find(client.send(R"({"command":"signal","url":"c.html"})"), "$.error"),
+              "\"\\\"url\\\" is not an absolute URL\"");
+    EXPECT_THAT(client.send(R"({"command":"signal","url":"http://c.example/","on":4})"),
+                HasSubstr("there are 3 channels"));
+}
+
+TEST_F(ControlTest, SwitchesInstantChannelChanges) {
+    Client client(m_path);
+    tune(1);
+    ASSERT_TRUE(waitUntil([&] { return find(client.send(kState), "$.keptPackets") != "0"; }));
+    EXPECT_EQ(find(client.send(kState), "$.instantZap"), "true");
+    EXPECT_EQ(find(client.send(kState), "$.zapDelay"), "0");
+    EXPECT_EQ(client.send(R"({"command":"instant-zap","on":false})"), kDone);
+    EXPECT_EQ(find(client.send(kState), "$.instantZap"), "false");
+    EXPECT_EQ(find(client.send(kState), "$.keptPackets"), "0");
+    EXPECT_EQ(client.send(R"({"command":"instant-zap","on":true})"), kDone);
+}
+
 TEST_F(ControlTest, TellsWhatIsPresented) {
     Client client(m_path);
     const std::string before = client.send(kState);

@@ -165,7 +165,7 @@ TEST_F(PlayoutTest, StartsAgainAtTheEndWithPcrsThatRunOn) {
 TEST_F(PlayoutTest, InjectsTablesAtTheirIntervals) {
     const StreamFile file(makeStream(50, milliseconds(40)));
     std::string error;
-    ASSERT_TRUE(m_playout.play(file.name(), makeTestTableInjector(300, 0), error)) << error;
+    ASSERT_TRUE(m_playout.play(file.name(), makeTestTableInjector(300, 0, ""), error)) << error;
     ASSERT_TRUE(m_clock.settle());
     const std::set<uint16_t> pids{kPidPat, kPidNit, kPidSdt, kPidEit, kPidTdt};
     const size_t services = testServices().size();

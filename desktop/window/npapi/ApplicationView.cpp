@@ -216,6 +216,10 @@ void ApplicationView::updateVisibilityState() {
 }
 
 void ApplicationView::dispatchKeyEvent(const char* type, const RemoteKey& key, bool isRepeat) {
+    // Keys of the television do nothing in this window.
+    if (key.group == KeyGroupTelevision) {
+        return;
+    }
     callPageScript(*m_page->currentFrame(), "dispatchkey", {type, key.keyCode, isRepeat});
 }
 

@@ -31,7 +31,8 @@ Exit status: 0 if all steps are done; 1 after a timeout or if --eval throws; 2 f
 plug-in that cannot be loaded; 3 if the process of the page ends by itself, with the engine webkit.
 
 Keyboard: arrow keys, Enter (OK), Backspace or Escape (Back), F1 to F4 (red, green, yellow, blue), F5 to F10 or the
-media keys (play, pause, stop, rewind, fast forward, info), and the digits.)";
+media keys (play, pause, stop, rewind, fast forward, info), F11 and F12 (channel up and down), End (exit), and the
+digits. With the engine webkit, a page gets the keys of its key set; digits outside of it select a channel.)";
 
 constexpr int kMaxSide = 16384;
 constexpr double kMaxTimeoutSeconds = 24 * 60 * 60;

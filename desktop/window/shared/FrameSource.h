@@ -3,6 +3,7 @@
 #define TELIX_DESKTOP_WINDOW_SHARED_FRAMESOURCE_H
 
 #include "desktop/platform/telix_picture.h"
+#include "desktop/window/shared/PlatformLibrary.h"
 
 namespace desktop {
 
@@ -16,24 +17,25 @@ public:
     FrameSource(const FrameSource&) = delete;
     FrameSource& operator=(const FrameSource&) = delete;
 
-    // Searches the loaded libraries for the platform library, unless it is found already, and returns
-    // whether it is found. Returns early if no library has been loaded since the last call. A libtelix.so
-    // without the functions of telix_picture.h is ignored.
+    // Looks for the platform library, see PlatformLibrary::find(), and returns whether it is found. One
+    // without the functions of telix_picture.h has no frames.
     bool find();
 
     // Replaces the current frame by the newest one.
     void refresh();
     // Releases the current frame, whose buffer is free for the decoder again.
     void drop();
-    // The frame of the last refresh(), valid until the next one or drop(). Not visible if there is no library.
+    // The frame of the last refresh(), valid until the next one or drop(). Not visible if there is no
+    // library.
     const telix_desktop_frame& frame() const { return m_frame; }
 
 private:
-    bool bind(const char* file);
+    void bind();
 
     telix_desktop_wakeup m_wakeup;
     void* m_wakeupData;
-    unsigned long long m_knownLoads = 0;
+    PlatformLibrary m_library;
+    bool m_isFound = false;
     telix_desktop_set_wakeup_function m_setWakeup = nullptr;
     telix_desktop_acquire_frame_function m_acquire = nullptr;
     telix_desktop_release_frame_function m_release = nullptr;

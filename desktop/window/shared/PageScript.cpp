@@ -33,12 +33,7 @@ std::string literal(const std::string& text) {
 
 // The function expression of scripts/`name`.js.
 std::string functionOf(const std::string& name) {
-    g_autoptr(GBytes) file = g_resources_lookup_data(("/telix/window/scripts/" + name + ".js").c_str(),
-                                                     G_RESOURCE_LOOKUP_FLAGS_NONE, nullptr);
-    assert(file);
-    gsize size = 0;
-    const auto* text = static_cast<const char*>(g_bytes_get_data(file, &size));
-    std::string function(text, size);
+    std::string function = resourceText("scripts/" + name + ".js");
     function.erase(function.find_last_not_of(" \n") + 1);
     return function;
 }
@@ -46,6 +41,15 @@ std::string functionOf(const std::string& name) {
 } // namespace
 
 ScriptValue::ScriptValue(const std::string& text) : m_source(literal(text)) {}
+
+std::string resourceText(const std::string& name) {
+    g_autoptr(GBytes) file =
+        g_resources_lookup_data(("/telix/window/" + name).c_str(), G_RESOURCE_LOOKUP_FLAGS_NONE, nullptr);
+    assert(file);
+    gsize size = 0;
+    const auto* text = static_cast<const char*>(g_bytes_get_data(file, &size));
+    return {text, size};
+}
 
 std::string pageScriptCall(const std::string& name, const std::vector<ScriptValue>& arguments) {
     std::string list;
@@ -58,6 +62,9 @@ std::string pageScriptCall(const std::string& name, const std::vector<ScriptValu
 std::string pageFunctionsScript() {
     std::string codes;
     for (const auto& key : remoteKeys()) {
+        if (!key.constant) {
+            continue;
+        }
         codes += (codes.empty() ? "" : ",") + literal(key.constant) + ":" + std::to_string(key.keyCode);
     }
     return functionOf("pagefunctions") + ".call(null,{" + codes + "})";

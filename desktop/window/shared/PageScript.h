@@ -22,6 +22,9 @@ private:
     std::string m_source;
 };
 
+// The text of a file in the program: the name is relative to this folder.
+std::string resourceText(const std::string& name);
+
 // The source of an expression that calls the function of scripts/`name`.js.
 std::string pageScriptCall(const std::string& name, const std::vector<ScriptValue>& arguments);
 

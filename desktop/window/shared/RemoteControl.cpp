@@ -11,8 +11,10 @@ namespace desktop {
 
 namespace {
 
-// XF86XK_Info of newer headers.
+// XF86XK_Info, XF86XK_ChannelUp and XF86XK_ChannelDown of newer headers.
 constexpr uint32_t kInfoKeysym = 0x10081166;
+constexpr uint32_t kChannelUpKeysym = 0x10081192;
+constexpr uint32_t kChannelDownKeysym = 0x10081193;
 
 } // namespace
 
@@ -47,6 +49,9 @@ const std::vector<RemoteKey>& remoteKeys() {
         {"7", 55, "VK_7", true, KeyGroupNumeric, {XK_7, XK_KP_7}},
         {"8", 56, "VK_8", true, KeyGroupNumeric, {XK_8, XK_KP_8}},
         {"9", 57, "VK_9", true, KeyGroupNumeric, {XK_9, XK_KP_9}},
+        {"channel-up", 427, nullptr, false, KeyGroupTelevision, {XK_F11, kChannelUpKeysym}},
+        {"channel-down", 428, nullptr, false, KeyGroupTelevision, {XK_F12, kChannelDownKeysym}},
+        {"exit", 10009, nullptr, false, KeyGroupTelevision, {XK_End, XF86XK_Close}},
     };
     return kKeys;
 }

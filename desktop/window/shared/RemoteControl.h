@@ -18,7 +18,9 @@ enum KeyGroup : uint32_t {
     KeyGroupNavigation = 0x10,
     KeyGroupVcr = 0x20,
     KeyGroupInfo = 0x80,
-    KeyGroupNumeric = 0x100
+    KeyGroupNumeric = 0x100,
+    // No page can ask for these: they are always the television's.
+    KeyGroupTelevision = 0x80000000
 };
 
 struct RemoteKey {
@@ -26,7 +28,7 @@ struct RemoteKey {
     const char* name;
     // `keyCode` of key events.
     int keyCode;
-    // The constant of the window object that has the code.
+    // The constant of the window object that has the code; null if there is none.
     const char* constant;
     // Whether an engine itself produces this code for the first of `keyboardKeys`. Then the engine gets the
     // key event, and also performs the default action (moves the caret, follows a link). Otherwise the window

@@ -7,6 +7,7 @@
 #include "desktop/window/shared/Diagnostics.h"
 #include "desktop/window/shared/PageScript.h"
 #include "desktop/window/webkit/Engine.h"
+#include "desktop/window/webkit/Messages.h"
 #include "desktop/window/webkit/ScaledBin.h"
 
 namespace desktop {
@@ -14,6 +15,8 @@ namespace desktop {
 namespace {
 
 constexpr char kHbbtvType[] = "application/vnd.hbbtv.xhtml+xml";
+// Of a platform library without a key set.
+constexpr uint32_t kAllKeys = ~static_cast<uint32_t>(KeyGroupTelevision);
 constexpr char kEmptyPage[] = "about:blank";
 // A plug-in ends some of its objects on later turns of the web process's main loop.
 constexpr int kTurnsOfTeardown = 10;
@@ -111,6 +114,9 @@ Application::~Application() {
     }
     g_cancellable_cancel(m_calls);
     g_object_unref(m_calls);
+    for (const auto& onGone : m_onGone) {
+        onGone();
+    }
     g_signal_handlers_disconnect_by_data(m_view, this);
     gtk_widget_destroy(m_bin);
     g_object_unref(m_bin);
@@ -138,6 +144,7 @@ void Application::connectSignals() {
         m_view, "web-process-terminated",
         G_CALLBACK(+[](WebKitWebView*, WebKitWebProcessTerminationReason reason, gpointer application) {
             auto* self = static_cast<Application*>(application);
+            self->m_isLoaded = false;
             self->m_listener.onCrashed(*self, reason);
         }),
         this);
@@ -267,11 +274,52 @@ void Application::sendKeyEvent(GdkEventType type, const RemoteKey& key) {
     gdk_event_free(event);
 }
 
+void Application::readKeySet(std::function<void(Application*, uint32_t)> done) {
+    using Done = std::function<void(uint32_t)>;
+    const auto call = m_onGone.insert(m_onGone.end(), [done] { done(nullptr, 0); });
+    auto* onReply = new Done([this, call, done = std::move(done)](uint32_t keySet) {
+        m_onGone.erase(call);
+        done(this, keySet);
+    });
+    webkit_web_view_send_message_to_page(
+        m_view, webkit_user_message_new(kKeySetMessage, nullptr), m_calls,
+        [](GObject* view, GAsyncResult* result, gpointer data) {
+            const std::unique_ptr<Done> onReply(static_cast<Done*>(data));
+            g_autoptr(GError) error = nullptr;
+            WebKitUserMessage* reply =
+                webkit_web_view_send_message_to_page_finish(WEBKIT_WEB_VIEW(view), result, &error);
+            GVariant* keySet = reply ? webkit_user_message_get_parameters(reply) : nullptr;
+            if (!g_error_matches(error, G_IO_ERROR, G_IO_ERROR_CANCELLED)) {
+                (*onReply)(keySet ? g_variant_get_uint32(keySet) : kAllKeys);
+            }
+            g_clear_object(&reply);
+        },
+        onReply);
+}
+
+void Application::tune(uint32_t number) {
+    webkit_web_view_send_message_to_page(m_view,
+                                         webkit_user_message_new(kTuneMessage, g_variant_new_uint32(number)),
+                                         nullptr, nullptr, nullptr);
+}
+
+void Application::stepChannel(int positions) {
+    webkit_web_view_send_message_to_page(
+        m_view, webkit_user_message_new(kStepMessage, g_variant_new_int32(positions)), nullptr, nullptr,
+        nullptr);
+}
+
 // The engine sends a key to the page when the page has handled the one before. The first turn comes after the
 // press and the second after the release; the last exchange comes after the start of a navigation.
 void Application::waitForKeys(std::function<void()> done) {
-    runScript(m_view, m_calls, kNextTurn, [this, done = std::move(done)](JSCValue*, const GError*) {
-        runScript(m_view, m_calls, kNextTurn, [this, done](JSCValue*, const GError*) { passTurns(1, done); });
+    const auto call = m_onGone.insert(m_onGone.end(), done);
+    const auto onHandled = [this, call, done = std::move(done)] {
+        m_onGone.erase(call);
+        done();
+    };
+    runScript(m_view, m_calls, kNextTurn, [this, onHandled](JSCValue*, const GError*) {
+        runScript(m_view, m_calls, kNextTurn,
+                  [this, onHandled](JSCValue*, const GError*) { passTurns(1, onHandled); });
     });
 }
 
@@ -308,6 +356,11 @@ void Application::takeSnapshot(std::function<void(cairo_surface_t*)> done) {
             }
         },
         new Done(std::move(done)));
+}
+
+void Application::showNotice(const std::string& html) {
+    g_autofree char* url = g_strdup(webkit_web_view_get_uri(m_view));
+    webkit_web_view_load_alternate_html(m_view, html.c_str(), url ? url : kEmptyPage, nullptr);
 }
 
 void Application::unload(std::function<void()> done) {

@@ -5,6 +5,7 @@
 #include <webkit2/webkit2.h>
 
 #include <functional>
+#include <list>
 #include <string>
 
 #include "desktop/window/shared/ScriptedWindow.h"
@@ -13,7 +14,7 @@ namespace desktop {
 
 class Engine;
 
-// Main thread. Callbacks are not called after the destruction.
+// Main thread. Callbacks are not called after the destruction, and in it only where the function says so.
 class Application {
 public:
     class Listener {
@@ -52,19 +53,32 @@ public:
     // Whether the page is to be seen.
     bool isVisible() const { return m_isOnTop && m_isShown; }
 
+    // Reads the mask of the key groups that pages receive; all if the platform library has no key set. Called
+    // also if the application ends before, with null.
+    void readKeySet(std::function<void(Application*, uint32_t keySet)> done);
+    // Tunes to a channel by its number, or by its position after the one that is on.
+    void tune(uint32_t number);
+    void stepChannel(int positions);
     // Sends the press (`isRepeat`: a repeated one) or the release of a key to the page.
     void sendPress(const RemoteKey& key, bool isRepeat);
     void sendRelease(const RemoteKey& key);
     // Done when the page has handled all keys that have been sent, and has begun to load the page that it has
-    // gone to.
+    // gone to, or when the application has ended.
     void waitForKeys(std::function<void()> done);
     void evaluate(const std::string& expression, std::function<void(ScriptedWindow::Evaluation)> done);
     // An image of the page, transparent where it is; null if there is none. The caller owns it.
     void takeSnapshot(std::function<void(cairo_surface_t*)> done);
     // Ends the page, with its unload events. Done when its objects have ended, or after a time limit.
     void unload(std::function<void()> done);
+    // Shows a page of the window's own in place of the document, which reload() brings back.
+    void showNotice(const std::string& html);
+    void reload() { webkit_web_view_reload(m_view); }
+    // Calls no callback in the destructor.
+    void forgetCalls() { m_onGone.clear(); }
 
 private:
+    using OnGone = std::list<std::function<void()>>;
+
     void connectSignals();
     void onLoadChanged(WebKitLoadEvent event);
     bool onLoadFailed(const char* url, const GError& error);
@@ -79,6 +93,8 @@ private:
     WebKitWebView* m_view;
     // Cancelled in the destructor.
     GCancellable* m_calls;
+    // What the destructor calls.
+    OnGone m_onGone;
     bool m_isLoaded = false;
     bool m_hasDocument = false;
     bool m_isOnTop = false;

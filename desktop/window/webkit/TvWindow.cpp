@@ -6,14 +6,17 @@
 
 #include "desktop/window/shared/CommandLine.h"
 #include "desktop/window/shared/LoadCheck.h"
+#include "desktop/window/shared/Notice.h"
 #include "desktop/window/shared/PageGeometry.h"
 #include "desktop/window/webkit/Engine.h"
+#include "desktop/window/webkit/Messages.h"
 
 namespace desktop {
 
 namespace {
 
 constexpr char kTitle[] = "telix-tv";
+constexpr int kOkKeyCode = 13;
 
 GtkWidget* newBlackArea() {
     GtkWidget* area = gtk_drawing_area_new();
@@ -62,6 +65,7 @@ void checkLoad(const std::string& url, const std::string& userAgent, GCancellabl
 TvWindow::TvWindow(const Engine& engine, PageChannel& channel, const CommandLine& commandLine)
     : m_engine(engine), m_channel(channel), m_userAgent(commandLine.userAgent),
       m_window(gtk_window_new(GTK_WINDOW_TOPLEVEL)), m_overlay(gtk_overlay_new()),
+      m_keys({[this] { return m_stack.top(); }, [this](const RemoteKey& key) { onTelevisionKey(key); }}),
       m_calls(g_cancellable_new()) {
     m_channel.setHandler(
         [this](uint64_t page, const std::string& function, const std::string& argument,
@@ -92,6 +96,12 @@ TvWindow::TvWindow(const Engine& engine, PageChannel& channel, const CommandLine
                          return TRUE;
                      }),
                      this);
+    g_signal_connect(
+        engine.context(), "user-message-received",
+        G_CALLBACK(+[](WebKitWebContext*, WebKitUserMessage* message, gpointer window) -> gboolean {
+            return static_cast<TvWindow*>(window)->onMessage(*message);
+        }),
+        this);
     show(commandLine);
 }
 
@@ -100,10 +110,23 @@ TvWindow::~TvWindow() {
     g_object_unref(m_calls);
     m_channel.setHandler(nullptr);
     m_stack.clear();
+    for (const auto& application : m_applications) {
+        application->forgetCalls();
+    }
     m_applications.clear();
+    g_signal_handlers_disconnect_by_data(m_engine.context(), this);
     g_signal_handlers_disconnect_by_data(m_overlay, this);
     g_signal_handlers_disconnect_by_data(m_window, this);
     gtk_widget_destroy(m_window);
+}
+
+// Returns whether the message is the window's.
+bool TvWindow::onMessage(WebKitUserMessage& message) {
+    if (g_strcmp0(webkit_user_message_get_name(&message), kChannelMessage) != 0) {
+        return false;
+    }
+    m_lastChannel = g_variant_get_uint32(webkit_user_message_get_parameters(&message));
+    return true;
 }
 
 void TvWindow::show(const CommandLine& commandLine) {
@@ -206,7 +229,19 @@ void TvWindow::onCrashed(Application& application, WebKitWebProcessTerminationRe
     m_video.dropFrames();
     // Each application reports it.
     if (m_stack.top() == &application && m_reports.crashed) {
+        m_hasCrashed = true;
         m_reports.crashed(reason);
+    }
+}
+
+void TvWindow::showNotice(const std::string& reason) {
+    m_stack.top()->showNotice(noticePage(reason, m_lastChannel));
+}
+
+void TvWindow::restart() {
+    m_hasCrashed = false;
+    for (Application* application : m_stack.all()) {
+        application->reload();
     }
 }
 
@@ -236,6 +271,10 @@ void TvWindow::updateInspector() {
 
 void TvWindow::unload(std::function<void()> done) {
     m_stack.clear();
+    if (m_hasCrashed) {
+        done();
+        return;
+    }
     const auto left = std::make_shared<std::size_t>(m_applications.size());
     if (*left == 0) {
         done();
@@ -254,9 +293,8 @@ bool TvWindow::isTopLoaded() const {
 }
 
 void TvWindow::press(const RemoteKey& key, std::function<void()> done) {
-    m_stack.top()->sendPress(key, false);
-    m_stack.top()->sendRelease(key);
-    m_stack.top()->waitForKeys(std::move(done));
+    m_keys.route(key, KeyRouter::Stroke::Press, nullptr);
+    m_keys.route(key, KeyRouter::Stroke::Release, std::move(done));
 }
 
 // Returns whether the event is handled: a key of the remote control goes to the topmost application, all
@@ -264,19 +302,38 @@ void TvWindow::press(const RemoteKey& key, std::function<void()> done) {
 bool TvWindow::onKey(const GdkEventKey& event) {
     constexpr guint kShortcutModifiers = GDK_CONTROL_MASK | GDK_MOD1_MASK | GDK_SUPER_MASK | GDK_META_MASK;
     const RemoteKey* key = remoteKeyByKeyboardKey(event.keyval);
-    Application* top = m_stack.top();
     // An event that an application has sent itself comes here if its page does not handle it.
-    if (!key || !top || event.send_event || (event.state & kShortcutModifiers)) {
+    if (!key || m_applications.empty() || event.send_event || (event.state & kShortcutModifiers)) {
         return false;
     }
     if (event.type == GDK_KEY_PRESS) {
-        top->sendPress(*key, m_heldKey == key);
+        if (m_hasCrashed && key->keyCode == kOkKeyCode) {
+            restart();
+            return true;
+        }
+        m_keys.route(*key, m_heldKey == key ? KeyRouter::Stroke::Repeat : KeyRouter::Stroke::Press, nullptr);
         m_heldKey = key;
     } else {
         m_heldKey = nullptr;
-        top->sendRelease(*key);
+        m_keys.route(*key, KeyRouter::Stroke::Release, nullptr);
     }
     return true;
+}
+
+// Digits and channel keys select a channel; EXIT ends the applications.
+void TvWindow::onTelevisionKey(const RemoteKey& key) {
+    // The platform library can be reached as long as there is a page, also of an application that has ended.
+    Application& page = *m_applications.back();
+    const std::string name = key.name;
+    if (key.group == KeyGroupNumeric) {
+        page.tune(static_cast<uint32_t>(key.keyCode - '0'));
+    } else if (name == "channel-up" || name == "channel-down") {
+        page.stepChannel(name == "channel-up" ? 1 : -1);
+    } else if (name == "exit") {
+        while (m_stack.top()) {
+            remove(*m_stack.top());
+        }
+    }
 }
 
 void TvWindow::evaluate(const std::string& expression, std::function<void(Evaluation)> done) {

@@ -12,6 +12,7 @@
 #include "desktop/window/shared/ApplicationStack.h"
 #include "desktop/window/shared/ScriptedWindow.h"
 #include "desktop/window/webkit/Application.h"
+#include "desktop/window/webkit/KeyRouter.h"
 #include "desktop/window/webkit/PageChannel.h"
 #include "desktop/window/webkit/VideoWidget.h"
 
@@ -45,6 +46,9 @@ public:
 
     // Pushes a new application and starts to load its page.
     void openApplication(const std::string& url);
+    // Shows a notice in place of the applications, whose web process has ended by itself. OK loads them
+    // again.
+    void showNotice(const std::string& reason);
     // Opens the web inspector, which follows the topmost application.
     void inspect();
     // Ends all applications. Done when their pages have ended.
@@ -63,7 +67,10 @@ private:
     void onPageCall(uint64_t page, const std::string& function, const std::string& argument,
                     const PageChannel::Reply& reply);
     void createApplication(uint64_t caller, const std::string& url, const PageChannel::Reply& reply);
+    bool onMessage(WebKitUserMessage& message);
     bool onKey(const GdkEventKey& event);
+    void onTelevisionKey(const RemoteKey& key);
+    void restart();
     void place(GtkAllocation& area) const;
     void show(const CommandLine& commandLine);
     Application* applicationOf(uint64_t page) const;
@@ -84,8 +91,13 @@ private:
     bool m_isInspected = false;
     // The application whose inspector is open, or null.
     Application* m_inspected = nullptr;
+    KeyRouter m_keys;
     // The key that is held down, or null.
     const RemoteKey* m_heldKey = nullptr;
+    // The number of the channel that was on last; 0 if none was.
+    uint32_t m_lastChannel = 0;
+    // Whether the web process has ended by itself and the applications have not been loaded again.
+    bool m_hasCrashed = false;
     // Cancelled in the destructor.
     GCancellable* m_calls;
 };

@@ -71,7 +71,10 @@ int runWindow(const CommandLine& commandLine, const PluginFile& plugin, const Pr
          [&](const std::string& url, const std::string& reason) { automation.onLoadFailed(url, reason); },
          [&](WebKitWebProcessTerminationReason reason) {
              output.drain();
-             automation.onPageCrashed(crashReason(reason, output.failure()));
+             const std::string text = crashReason(reason, output.failure());
+             if (!automation.onPageCrashed(text)) {
+                 window.showNotice(text);
+             }
          }});
     g_unix_signal_add(SIGINT, onTermination<SIGINT>, &run);
     g_unix_signal_add(SIGTERM, onTermination<SIGTERM>, &run);

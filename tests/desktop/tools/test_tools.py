@@ -147,6 +147,24 @@ class Control(ToolTest):
             self.assertEqual(television.end(), 0)
         self.assertEqual(os.listdir(self.folder), [])  # the television has removed its socket
 
+    def test_lists_and_signals_applications(self):
+        with self.television() as television:
+            television.wait_for('change 1')
+            end = time.monotonic() + LIMIT
+            while 'signalling known' not in (listed := self.ctl('applications')):
+                self.assertLess(time.monotonic(), end, listed)
+                time.sleep(0.05)
+            self.assertRegex(listed, r'(?m)^channel +1 Telix One, signalling known$')
+            self.assertRegex(listed, r'(?m)^7e11\.1 +AUTOSTART http://127\.0\.0\.1/apps/demo/index\.html, '
+                                     r'Demonstration, priority 10$')
+            self.assertRegex(listed, r'(?m)^7e11\.2 +PRESENT .*, service-bound$')
+            self.ctl('signal', 'http://a.example/', '--control-code=present', '--service-bound=on')
+            self.assertRegex(self.ctl('applications'), r'(?m)PRESENT http://a\.example/.*, service-bound$')
+            self.ctl('signal')
+            self.assertNotIn('a.example', self.ctl('applications'))
+            self.assertIn('absolute URL', self.ctl('signal', 'a.html', status=1))
+            self.assertIn('control-code', self.ctl('signal', 'http://a/', '--control-code=go', status=2))
+
     def test_acts_on_the_player(self):
         with self.television('file://' + os.environ['TELIX_CLIP']) as television:
             television.wait_for('player-message 2')

@@ -5,6 +5,7 @@
 
 #include "desktop/window/webkit/extension/FrameSender.h"
 #include "desktop/window/webkit/extension/PageFunctions.h"
+#include "desktop/window/webkit/extension/ViewerMessages.h"
 
 namespace desktop {
 
@@ -37,4 +38,5 @@ webkit_web_extension_initialize_with_user_data(WebKitWebExtension* extension, co
     desktop::redirect(STDERR_FILENO, desktop::descriptorFrom(data, "errors"));
     desktop::addPageFunctions(desktop::descriptorFrom(data, "channel"));
     desktop::sendFrames(extension);
+    desktop::answerViewerMessages(extension);
 }

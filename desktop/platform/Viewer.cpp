@@ -1,0 +1,28 @@
+// What the viewer's remote control needs of the library.
+#include <algorithm>
+
+#include "desktop/platform/Broadcast.h"
+#include "desktop/platform/Device.h"
+#include "desktop/platform/telix_viewer.h"
+
+using desktop::Broadcast;
+
+uint32_t telix_desktop_key_set() {
+    return desktop::Device::instance().keySet();
+}
+
+uint32_t telix_desktop_channel() {
+    const auto& list = Broadcast::instance().channels().list();
+    const auto found = std::find(list.begin(), list.end(), Broadcast::instance().arbiter().currentChannel());
+    return found == list.end() ? 0 : static_cast<uint32_t>(found - list.begin() + 1);
+}
+
+uint32_t telix_desktop_channel_count() {
+    return static_cast<uint32_t>(Broadcast::instance().channels().list().size());
+}
+
+uint8_t telix_desktop_tune(uint32_t number) {
+    const auto& list = Broadcast::instance().channels().list();
+    return number > 0 && number <= list.size() && Broadcast::instance().arbiter().zap(list[number - 1]) ? 1
+                                                                                                        : 0;
+}

@@ -1,0 +1,42 @@
+/* What the viewer's remote control needs of the desktop's platform library, for the window.
+ *
+ * The window finds the functions as those of telix_picture.h. All functions may be called on any thread, also
+ * concurrently, and return without waiting. */
+#ifndef TELIX_DESKTOP_PLATFORM_TELIX_VIEWER_H
+#define TELIX_DESKTOP_PLATFORM_TELIX_VIEWER_H
+
+#include <stdint.h>
+
+#include "desktop/platform/telix_picture.h"
+
+#ifdef __cplusplus
+extern "C" {
+#endif
+
+/* NOLINTBEGIN(modernize-use-using): the header is C. */
+
+typedef uint32_t (*telix_desktop_key_set_function)(void);
+typedef uint32_t (*telix_desktop_channel_function)(void);
+typedef uint32_t (*telix_desktop_channel_count_function)(void);
+typedef uint8_t (*telix_desktop_tune_function)(uint32_t number);
+
+/* NOLINTEND(modernize-use-using) */
+
+/* The mask of the key groups that pages receive, with the bits of the key set object of OIPF. */
+TELIX_DESKTOP_API uint32_t telix_desktop_key_set(void);
+
+/* The position in the channel list, from 1, of the channel that is on; 0 if none is. */
+TELIX_DESKTOP_API uint32_t telix_desktop_channel(void);
+
+/* The number of channels. */
+TELIX_DESKTOP_API uint32_t telix_desktop_channel_count(void);
+
+/* Tunes to the channel at a position in the channel list, from 1, as the viewer would. Returns 1, or 0 if
+ * there is no such channel. */
+TELIX_DESKTOP_API uint8_t telix_desktop_tune(uint32_t number);
+
+#ifdef __cplusplus
+}
+#endif
+
+#endif

@@ -1,0 +1,19 @@
+// The names of the messages between the window and its extension in the web process.
+#ifndef TELIX_DESKTOP_WINDOW_WEBKIT_MESSAGES_H
+#define TELIX_DESKTOP_WINDOW_WEBKIT_MESSAGES_H
+
+namespace desktop {
+
+// To a page, without parameters. The reply has the mask of the key groups that pages receive (u), or none if
+// the platform library has no key set.
+constexpr char kKeySetMessage[] = "telix-key-set";
+// To a page: tune to the channel of that number (u).
+constexpr char kTuneMessage[] = "telix-tune";
+// To a page: tune to the channel so many positions after the one that is on (i).
+constexpr char kStepMessage[] = "telix-step";
+// To the window's context: the number of the channel that is on (u).
+constexpr char kChannelMessage[] = "telix-channel";
+
+} // namespace desktop
+
+#endif
