@@ -11,11 +11,12 @@ for purpose in "$@"; do
         packages+=(qtbase5-dev libqt5webkit5-dev fonts-dejavu-core xvfb xauth libgstreamer1.0-dev
             libgstreamer-plugins-base1.0-dev gstreamer1.0-plugins-base gstreamer1.0-plugins-good
             gstreamer1.0-plugins-bad gstreamer1.0-plugins-ugly gstreamer1.0-libav gstreamer1.0-x gstreamer1.0-alsa
-            ffmpeg libjson-glib-dev libcurl4-gnutls-dev libxml2-dev python3)
+            ffmpeg libjson-glib-dev libcurl4-gnutls-dev libxml2-dev libwebkit2gtk-4.1-dev
+            libsoup-3.0-dev libepoxy-dev python3)
         ;;
     test)
         packages+=(libgtest-dev libgmock-dev libbenchmark-dev libexpat1-dev clang-14 libclang-rt-14-dev
-            clang-format-14 clang-tidy-14 libjavascriptcoregtk-4.1-dev libwebkit2gtk-4.1-dev libwpewebkit-1.1-dev
+            clang-format-14 clang-tidy-14 libjavascriptcoregtk-4.1-dev libwpewebkit-1.1-dev
             cog python3 binutils util-linux dpkg-dev man-db openssl)
         programs+=(tsc=typescript@5.4.5)
         ;;
