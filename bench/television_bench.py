@@ -71,11 +71,11 @@ def start_seconds(television, page, environment):
 
 
 def main():
-    if len(sys.argv) != 2 or not os.path.isfile(os.path.join(sys.argv[1], 'desktop', 'telix-tv')):
+    if len(sys.argv) != 2 or not os.path.isfile(os.path.join(sys.argv[1], 'desktop', 'telix-tv-npapi')):
         print(__doc__, file=sys.stderr)
         sys.exit(2)
     build = sys.argv[1]
-    with temporary_folder() as folder, Television(os.path.join(build, 'desktop', 'telix-tv')) as television:
+    with temporary_folder() as folder, Television(os.path.join(build, 'desktop', 'telix-tv-npapi')) as television:
         stream, page = os.path.join(folder, 'stream.ts'), os.path.join(folder, 'page.html')
         make_stream(stream)
         with open(page, 'w', encoding='utf-8') as file:
