@@ -53,7 +53,7 @@ def best_of(runs):
 
 def main():
     build = sys.argv[1] if len(sys.argv) == 2 else ''
-    programs = {NPAPI: os.path.join(build, 'desktop', 'telix-tv'),
+    programs = {NPAPI: os.path.join(build, 'desktop', 'telix-tv-npapi'),
                 C_API: os.path.join(build, 'tests', 'browser', 'engines', 'webkit'),
                 GOBJECT: os.path.join(build, 'tests', 'browser', 'engines', 'webkit-gobject')}
     plugin = os.path.join(build, 'tests', 'browser', 'broadcast', 'nptelixjs.so')
