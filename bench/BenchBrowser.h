@@ -61,6 +61,13 @@ inline NPNetscapeFuncs& benchBrowserTable() {
             result->value.boolValue = true;
             return true;
         };
+        t.getproperty = [](NPP npp, NPObject*, NPIdentifier, NPVariant* result) {
+            result->type = NPVariantType_Object;
+            return benchBrowserTable().getvalue(npp, NPNVPluginElementNPObject, &result->value.objectValue) ==
+                   NPERR_NO_ERROR;
+        };
+        t.pluginthreadasynccall = [](NPP, void (*function)(void*), void* data) { function(data); };
+        t.setproperty = [](NPP, NPObject*, NPIdentifier, const NPVariant*) { return true; };
         t.invokeDefault = [](NPP, NPObject*, const NPVariant*, uint32_t, NPVariant* result) {
             result->type = NPVariantType_Void;
             return true;

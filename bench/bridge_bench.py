@@ -18,7 +18,7 @@ PAGES = os.path.join(TOP, 'bench', 'pages')
 GOAL = 1.5
 ROUNDS = 3
 WITH_OBJECTS, WITHOUT_OBJECTS = 'page load with all seven objects', 'page load without objects'
-ADDED = 'the former minus an empty page'
+ADDED = 'seven objects minus an empty page'
 NPAPI, ALONE, C_API, GOBJECT = 'NPAPI engine', 'WebKitGTK alone', 'bridge, C API', 'bridge, GObject API'
 
 
@@ -53,7 +53,7 @@ def best_of(runs):
 
 def main():
     build = sys.argv[1] if len(sys.argv) == 2 else ''
-    programs = {NPAPI: os.path.join(build, 'desktop', 'telix-tv'),
+    programs = {NPAPI: os.path.join(build, 'desktop', 'telix-tv-npapi'),
                 C_API: os.path.join(build, 'tests', 'browser', 'engines', 'webkit'),
                 GOBJECT: os.path.join(build, 'tests', 'browser', 'engines', 'webkit-gobject')}
     plugin = os.path.join(build, 'tests', 'browser', 'broadcast', 'nptelixjs.so')

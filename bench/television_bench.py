@@ -108,7 +108,7 @@ def start_seconds(television, engine, page, environment):
 
 
 def main():
-    if len(sys.argv) != 2 or not os.path.isfile(os.path.join(sys.argv[1], 'desktop', 'telix-tv')):
+    if len(sys.argv) != 2 or not os.path.isfile(os.path.join(sys.argv[1], 'desktop', 'telix-tv-npapi')):
         print(__doc__, file=sys.stderr)
         sys.exit(2)
     build = sys.argv[1]

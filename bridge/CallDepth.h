@@ -9,24 +9,24 @@ namespace bridge {
 // script.
 class CallDepth {
 public:
-    CallDepth() { s_depth++; }
+    CallDepth() { pluginDepth++; }
     CallDepth(const CallDepth&) = delete;
     CallDepth& operator=(const CallDepth&) = delete;
-    ~CallDepth() { s_depth--; }
+    ~CallDepth() { pluginDepth--; }
 
-    static bool isPluginOnStack() { return s_depth > 0; }
+    static bool isPluginOnStack() { return pluginDepth > 0; }
 
     // Lives during a call that looks like one into the plug-in and is one of the bridge's own objects.
     class Own {
     public:
-        Own() { s_depth--; }
+        Own() { pluginDepth--; }
         Own(const Own&) = delete;
         Own& operator=(const Own&) = delete;
-        ~Own() { s_depth++; }
+        ~Own() { pluginDepth++; }
     };
 
 private:
-    static inline int s_depth = 0;
+    static inline int pluginDepth = 0;
 };
 
 } // namespace bridge

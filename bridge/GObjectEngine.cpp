@@ -18,8 +18,6 @@ namespace bridge {
 
 namespace {
 
-constexpr char kNoPluginObjectText[] = "A plug-in method was called on something else.";
-
 // In place of the number of a proxy: a method finds none, and an object whose instance has ended has none.
 constexpr double kNoObject = 0;
 constexpr double kEndedObject = -1;
@@ -91,7 +89,7 @@ ValueRef callFunction(JSCValue* function, const std::vector<JSCValue*>& values) 
 class GObjectEngine::Registry {
 public:
     static std::shared_ptr<Registry> of(JSCContext* page) {
-        static auto* const all = new std::unordered_map<JSCVirtualMachine*, std::weak_ptr<Registry>>;
+        static auto* all = new std::unordered_map<JSCVirtualMachine*, std::weak_ptr<Registry>>;
         JSCVirtualMachine* const machine = jsc_context_get_virtual_machine(page);
         std::shared_ptr<Registry> registry = (*all)[machine].lock();
         if (!registry) {
@@ -197,7 +195,7 @@ GObjectEngine::GObjectEngine(JSCContext* context, Client& client)
 }
 
 GObjectEngine::~GObjectEngine() {
-    close();
+    GObjectEngine::close();
 }
 
 void GObjectEngine::runScript() {
@@ -367,7 +365,7 @@ JSCValue* GObjectEngine::methodFunction(NPIdentifier name) {
 }
 
 std::unordered_map<uint64_t, GObjectEngine::Wrapper*>& GObjectEngine::wrappers() {
-    static auto* const instance = new std::unordered_map<uint64_t, Wrapper*>;
+    static auto* instance = new std::unordered_map<uint64_t, Wrapper*>;
     return *instance;
 }
 
@@ -517,7 +515,7 @@ GObjectEngine::Target GObjectEngine::targetOf(GPtrArray* values) {
     const double number = values->len > kNumberIndex ? jsc_value_to_double(valueAt(values, kNumberIndex)) : 0;
     const auto wrapper = number > 0 ? wrappers().find(static_cast<uint64_t>(number)) : wrappers().end();
     if (wrapper == wrappers().end()) {
-        throwError(number == kNoObject ? kNoPluginObjectText : PluginObject::kEndedText);
+        throwError(number == kNoObject ? PluginObject::kNoObjectText : PluginObject::kEndedText);
         return {};
     }
     return {&wrapper->second->object(), &wrapper->second->engine()};

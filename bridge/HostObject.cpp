@@ -2,6 +2,7 @@
 #include "bridge/HostObject.h"
 
 #include <algorithm>
+#include <cmath>
 #include <vector>
 
 #include "bridge/CallDepth.h"
@@ -32,17 +33,24 @@ public:
         return std::string(index < m_count ? textOf(m_args[index]) : "");
     }
     double number(uint32_t index) const { return index < m_count ? numberOf(m_args[index]) : 0; }
-    uint32_t natural(uint32_t index) const {
-        return static_cast<uint32_t>(std::clamp(number(index), 0.0, static_cast<double>(UINT32_MAX)));
+    uint32_t natural(uint32_t index) const { return static_cast<uint32_t>(within(index, 0, UINT32_MAX)); }
+    // The same, but 0 for a number that is too large.
+    uint32_t naturalOrUnknown(uint32_t index) const {
+        return number(index) <= UINT32_MAX ? natural(index) : 0;
     }
+    // Half the range, so that the difference of two of them is an integer, too.
     int integer(uint32_t index) const {
-        return static_cast<int>(
-            std::clamp(number(index), static_cast<double>(INT32_MIN) / 2, INT32_MAX / 2.0));
+        return static_cast<int>(within(index, INT32_MIN / 2, INT32_MAX / 2));
     }
     NPVariant value(uint32_t index) const { return index < m_count ? m_args[index] : voidVariant(); }
     NPObject* object(uint32_t index) const { return index < m_count ? objectOf(m_args[index]) : nullptr; }
 
 private:
+    double within(uint32_t index, double least, double most) const {
+        const double value = number(index);
+        return std::isnan(value) ? 0 : std::clamp(value, least, most);
+    }
+
     const NPVariant* m_args;
     uint32_t m_count;
 };
@@ -129,7 +137,7 @@ NPVariant run(Page& page, const Parameters& parameters) {
 NPVariant response(Page& page, const Parameters& parameters) {
     page.streams().onResponse(parameters.natural(0),
                               {parameters.text(1), parameters.text(2), parameters.text(3),
-                               parameters.natural(4), parameters.natural(5)});
+                               parameters.naturalOrUnknown(4), parameters.naturalOrUnknown(5)});
     return voidVariant();
 }
 

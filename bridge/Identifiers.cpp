@@ -16,7 +16,7 @@ struct Names {
 };
 
 Names& names() {
-    static auto* const instance = new Names;
+    static auto* instance = new Names;
     return *instance;
 }
 

@@ -17,7 +17,7 @@ namespace bridge {
 namespace {
 
 std::unordered_map<NPP, Instance*>& instances() {
-    static auto* const all = new std::unordered_map<NPP, Instance*>;
+    static auto* all = new std::unordered_map<NPP, Instance*>;
     return *all;
 }
 

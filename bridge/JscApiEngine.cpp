@@ -14,8 +14,6 @@ namespace bridge {
 
 namespace {
 
-constexpr char kNoPluginObjectText[] = "A plug-in method was called on something else.";
-
 // How many prototypes a method looks through for the object that it is called on.
 constexpr int kLongestPrototypeChain = 32;
 
@@ -175,7 +173,7 @@ JscApiEngine::JscApiEngine(JSGlobalContextRef context, Client& client)
 }
 
 JscApiEngine::~JscApiEngine() {
-    close();
+    JscApiEngine::close();
 }
 
 void JscApiEngine::close() {
@@ -296,7 +294,7 @@ JSObjectRef JscApiEngine::methodFunction(NPIdentifier name) {
 }
 
 std::unordered_map<JSObjectRef, JscApiEngine::Method>& JscApiEngine::methods() {
-    static auto* const instance = new std::unordered_map<JSObjectRef, Method>;
+    static auto* instance = new std::unordered_map<JSObjectRef, Method>;
     return *instance;
 }
 
@@ -492,7 +490,7 @@ bool JscApiEngine::enumerate(ScriptHandle object, std::vector<NPIdentifier>& nam
 // Calls of script into plug-in objects.
 
 JSClassRef JscApiEngine::wrapperClass(bool isFunction) {
-    static const auto make = [](bool callable) {
+    const auto make = [](bool callable) {
         JSClassDefinition definition = kJSClassDefinitionEmpty;
         definition.attributes = kJSClassAttributeNoAutomaticPrototype;
         definition.className = "NPObject";
@@ -505,8 +503,8 @@ JSClassRef JscApiEngine::wrapperClass(bool isFunction) {
         definition.finalize = onFinalize;
         return JSClassCreate(&definition);
     };
-    static const JSClassRef object = make(false);
-    static const JSClassRef function = make(true);
+    static JSClassRef object = make(false);
+    static JSClassRef function = make(true);
     return isFunction ? function : object;
 }
 
@@ -640,7 +638,7 @@ JSValueRef JscApiEngine::onMethod(JSContextRef context, JSObjectRef function, JS
     }
     const Link* const link = findLinkBehind(context, self);
     if (!link) {
-        *exception = errorOf(context, kNoPluginObjectText);
+        *exception = errorOf(context, PluginObject::kNoObjectText);
         return nullptr;
     }
     const NPIdentifier name = method->second.name;

@@ -15,6 +15,7 @@
 namespace bridge {
 
 const char PluginObject::kEndedText[] = "The plug-in instance of this object has ended.";
+const char PluginObject::kNoObjectText[] = "A plug-in method was called on something else.";
 
 namespace {
 
@@ -25,13 +26,13 @@ constexpr uint32_t kVersionWithEnumerate = 2;
 constexpr uint32_t kVersionWithConstruct = 3;
 
 std::unordered_map<NPObject*, std::unique_ptr<PluginObject>>& pluginObjects() {
-    static auto* const objects = new std::unordered_map<NPObject*, std::unique_ptr<PluginObject>>;
+    static auto* objects = new std::unordered_map<NPObject*, std::unique_ptr<PluginObject>>;
     return *objects;
 }
 
 // The exception of the current call of script into the plug-in, and the text of the last that has failed.
-std::string s_pendingException;
-std::string s_error;
+std::string pendingException;
+std::string lastError;
 
 // Script objects that have been collected, until the main loop releases what they held.
 struct Collected {
@@ -41,7 +42,7 @@ struct Collected {
 };
 
 Collected& collected() {
-    static auto* const instance = new Collected;
+    static auto* instance = new Collected;
     return *instance;
 }
 
@@ -174,9 +175,9 @@ void releaseObject(NPObject* object) {
 }
 
 void setPendingException(const char* text) {
-    s_pendingException = text ? text : "";
-    if (s_pendingException.empty()) {
-        s_pendingException = kCallFailedText;
+    pendingException = text ? text : "";
+    if (pendingException.empty()) {
+        pendingException = kCallFailedText;
     }
 }
 
@@ -185,7 +186,7 @@ class PluginObject::Use {
 public:
     explicit Use(NPObject* object) : m_object(object) {
         m_object->referenceCount++;
-        s_pendingException.clear();
+        pendingException.clear();
     }
     Use(const Use&) = delete;
     Use& operator=(const Use&) = delete;
@@ -225,24 +226,24 @@ PluginObject::~PluginObject() {
 }
 
 std::string PluginObject::takeError() {
-    return std::exchange(s_error, {});
+    return std::exchange(lastError, {});
 }
 
 // Ends a call: its exception and its failure become the error of script, and a result that is none is void.
 bool PluginObject::finish(bool done, NPVariant* result) {
-    if (done && s_pendingException.empty()) {
+    if (done && pendingException.empty()) {
         return true;
     }
     // What a call that failed has left there belongs to nobody.
     *result = voidVariant();
-    s_error = s_pendingException.empty() ? kCallFailedText : std::exchange(s_pendingException, {});
+    lastError = pendingException.empty() ? kCallFailedText : std::exchange(pendingException, {});
     return false;
 }
 
 PluginObject::Read PluginObject::read(NPIdentifier name, NPVariant* result) {
     *result = voidVariant();
     if (!m_instance) {
-        s_error = kEndedText;
+        lastError = kEndedText;
         return Read::Failed;
     }
     const Use use(m_object);
@@ -252,7 +253,7 @@ PluginObject::Read PluginObject::read(NPIdentifier name, NPVariant* result) {
         if (!calls.getProperty || !calls.getProperty(m_object, name, result)) {
             *result = voidVariant();
         }
-        return s_pendingException.empty() || finish(false, result) ? Read::Value : Read::Failed;
+        return pendingException.empty() || finish(false, result) ? Read::Value : Read::Failed;
     }
     return calls.hasMethod && calls.hasMethod(m_object, name) ? Read::Method : Read::Missing;
 }
@@ -269,7 +270,7 @@ bool PluginObject::has(NPIdentifier name) {
 
 PluginObject::Write PluginObject::write(NPIdentifier name, const NPVariant& value) {
     if (!m_instance) {
-        s_error = kEndedText;
+        lastError = kEndedText;
         return Write::Failed;
     }
     const Use use(m_object);
@@ -278,7 +279,7 @@ PluginObject::Write PluginObject::write(NPIdentifier name, const NPVariant& valu
         // A property that refuses the value keeps its own, without an exception.
         NPVariant none = voidVariant();
         const bool isWritten = calls.setProperty && calls.setProperty(m_object, name, &value);
-        return s_pendingException.empty() || finish(isWritten, &none) ? Write::Done : Write::Failed;
+        return pendingException.empty() || finish(isWritten, &none) ? Write::Done : Write::Failed;
     }
     return calls.hasMethod && calls.hasMethod(m_object, name) ? Write::Done : Write::Missing;
 }
@@ -309,38 +310,36 @@ std::vector<NPIdentifier> PluginObject::names() {
     return names;
 }
 
-bool PluginObject::call(NPIdentifier method, const Arguments& arguments, NPVariant* result) {
+// Makes a call of script into the object.
+template <typename Call>
+bool PluginObject::run(NPVariant* result, Call call) {
     *result = voidVariant();
     if (!m_instance) {
-        s_error = kEndedText;
+        lastError = kEndedText;
         return false;
     }
     const Use use(m_object);
-    const auto invoke = m_object->_class->invoke;
-    return finish(invoke && invoke(m_object, method, arguments.data(), arguments.count(), result), result);
+    return finish(call(*m_object->_class), result);
+}
+
+bool PluginObject::call(NPIdentifier method, const Arguments& arguments, NPVariant* result) {
+    return run(result, [&](const NPClass& calls) {
+        return calls.invoke && calls.invoke(m_object, method, arguments.data(), arguments.count(), result);
+    });
 }
 
 bool PluginObject::callDefault(const Arguments& arguments, NPVariant* result) {
-    *result = voidVariant();
-    if (!m_instance) {
-        s_error = kEndedText;
-        return false;
-    }
-    const Use use(m_object);
-    const auto invoke = m_object->_class->invokeDefault;
-    return finish(invoke && invoke(m_object, arguments.data(), arguments.count(), result), result);
+    return run(result, [&](const NPClass& calls) {
+        return calls.invokeDefault &&
+               calls.invokeDefault(m_object, arguments.data(), arguments.count(), result);
+    });
 }
 
 bool PluginObject::construct(const Arguments& arguments, NPVariant* result) {
-    *result = voidVariant();
-    if (!m_instance) {
-        s_error = kEndedText;
-        return false;
-    }
-    const Use use(m_object);
-    const NPClass& calls = *m_object->_class;
-    const auto construct = calls.structVersion >= kVersionWithConstruct ? calls.construct : nullptr;
-    return finish(construct && construct(m_object, arguments.data(), arguments.count(), result), result);
+    return run(result, [&](const NPClass& calls) {
+        return calls.structVersion >= kVersionWithConstruct && calls.construct &&
+               calls.construct(m_object, arguments.data(), arguments.count(), result);
+    });
 }
 
 bool PluginObject::isFunction() const {

@@ -34,6 +34,8 @@ class PluginObject {
 public:
     // What script is told that uses the object after its instance.
     static const char kEndedText[];
+    // What script is told that calls a method on what is not, and does not inherit from, an object.
+    static const char kNoObjectText[];
 
     // The record of an object that is not a ScriptObject. The plug-in made it with NPN_CreateObject; one that
     // it made otherwise is treated as if it had ended.
@@ -95,6 +97,8 @@ private:
     class Use;
 
     void dropWrapper();
+    template <typename Call>
+    bool run(NPVariant* result, Call call);
     bool finish(bool done, NPVariant* result);
 
     NPObject* m_object;

@@ -14,7 +14,7 @@ namespace {
 
 // What posted calls belong to: grows with each plug-in that ends, so that calls from before find another
 // number.
-std::atomic<unsigned> s_generation{0};
+std::atomic<unsigned> currentGeneration{0};
 
 struct PostedCall {
     void (*function)(void*);
@@ -24,7 +24,7 @@ struct PostedCall {
 
 gboolean runPostedCall(gpointer data) {
     const auto* const call = static_cast<PostedCall*>(data);
-    if (call->generation == s_generation) {
+    if (call->generation == currentGeneration) {
         const CallDepth depth;
         call->function(call->data);
     }
@@ -107,7 +107,7 @@ std::unique_ptr<Plugin> Plugin::initialize(const PluginEntries& entries, std::st
 }
 
 Plugin::~Plugin() {
-    s_generation++;
+    currentGeneration++;
     if (m_entries.shutdown) {
         m_entries.shutdown();
     }
@@ -123,7 +123,7 @@ std::string Plugin::askForText(NPPVariable variable) const {
 
 void Plugin::postCall(void (*function)(void*), void* data) {
     if (function) {
-        g_idle_add_full(G_PRIORITY_DEFAULT, runPostedCall, new PostedCall{function, data, s_generation},
+        g_idle_add_full(G_PRIORITY_DEFAULT, runPostedCall, new PostedCall{function, data, currentGeneration},
                         [](gpointer call) { delete static_cast<PostedCall*>(call); });
     }
 }

@@ -33,7 +33,7 @@ using ScriptHandle = OpaqueScriptValue*;
 // reports its own garbage collection with PluginObject::scriptObjectCollected(), at most once.
 class ScriptWrapper {
 public:
-    ScriptWrapper() : m_serial(++s_lastSerial) {}
+    ScriptWrapper() : m_serial(++lastSerial) {}
     ScriptWrapper(const ScriptWrapper&) = delete;
     ScriptWrapper& operator=(const ScriptWrapper&) = delete;
     virtual ~ScriptWrapper() = default;
@@ -49,7 +49,7 @@ public:
     uint64_t serial() const { return m_serial; }
 
 private:
-    static inline uint64_t s_lastSerial = 0;
+    static inline uint64_t lastSerial = 0;
     uint64_t m_serial;
 };
 

@@ -196,8 +196,9 @@ bool Streams::deliverPiece(const StreamPointer& stream) {
     // A copy with a zero after it: the plug-in may read on to the end of a string.
     std::string piece = stream->queue.substr(0, static_cast<size_t>(accepted));
     const auto length = static_cast<int32_t>(piece.size());
-    const int32_t taken = stream->calls().write(npp, &stream->np, static_cast<int32_t>(stream->delivered),
-                                                length, piece.data());
+    // The offset is a number of 32 bits; of what follows only the order is told.
+    const auto offset = static_cast<int32_t>(std::min<size_t>(stream->delivered, INT32_MAX));
+    const int32_t taken = stream->calls().write(npp, &stream->np, offset, length, piece.data());
     if (stream->state != Stream::State::Open) {
         return true;
     }

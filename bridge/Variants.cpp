@@ -2,6 +2,7 @@
 #include "bridge/Variants.h"
 
 #include <algorithm>
+#include <cstdint>
 #include <cstdlib>
 
 #include "bridge/Objects.h"
@@ -29,7 +30,7 @@ NPVariant doubleVariant(double value) {
 }
 
 NPVariant stringVariant(std::string_view text) {
-    auto* const copy = static_cast<char*>(std::malloc(text.size() + 1));
+    auto* const copy = text.size() <= UINT32_MAX ? static_cast<char*>(std::malloc(text.size() + 1)) : nullptr;
     if (!copy) {
         return voidVariant();
     }

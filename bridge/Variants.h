@@ -22,7 +22,8 @@ inline NPVariant voidVariant() {
 NPVariant nullVariant();
 NPVariant boolVariant(bool value);
 NPVariant doubleVariant(double value);
-// A copy of the text, followed by a zero that does not count. Void when there is no memory.
+// A copy of the text, followed by a zero that does not count. Void when there is no memory or the text is
+// longer than 32 bits can say.
 NPVariant stringVariant(std::string_view text);
 // Takes over a reference of the caller's; null for a null pointer.
 NPVariant objectVariant(NPObject* object);

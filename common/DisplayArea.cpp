@@ -27,7 +27,7 @@ void DisplayArea::readRegion(PluginBase& model) {
                     &rectangle)) {
         return;
     }
-    if (m_result == RectangleResult::Trusted || rectangle.type == NPVariantType_Object) {
+    if (rectangle.type == NPVariantType_Object) {
         // An edge that can't be read leaves what depends on it as it was.
         const auto readEdge = [npp, &rectangle](const char* name, int32_t& value, int32_t origin) {
             NPVariant edge{};

@@ -21,22 +21,15 @@ struct Area {
     }
 };
 
-// What a page's getBoundingClientRect() may give, where the kinds of object differ.
-enum class RectangleResult {
-    Tested,  // anything but an object leaves the region as it is
-    Trusted, // taken as an object without a test of its type
-};
-
 class DisplayArea {
 public:
-    explicit DisplayArea(RectangleResult result) : m_result(result) {}
-
     // The element's rectangle as last read. Not constant: script may overwrite the sizes of one kind of
     // object until the next reading.
     Area& region() { return m_region; }
     const Area& region() const { return m_region; }
 
-    // Reads the rectangle of the model's element. What the page doesn't give stays as it was.
+    // Reads the rectangle of the model's element. What the page doesn't give stays as it was; so does the
+    // whole region if the page gives something else than an object. The model outlives this call.
     void readRegion(PluginBase& model);
 
     // The area to present: the whole screen in full screen, else the region, which is read once more if it is
@@ -64,7 +57,6 @@ public:
 private:
     static void invalidate(NPP npp, const Area& area);
 
-    const RectangleResult m_result;
     Area m_region;
     Area m_accepted;
 };

@@ -65,7 +65,9 @@ JSPluginBase* wrapperOf(NPObject* object) {
 } // namespace
 
 void JSPluginBase::_Deallocate(NPObject* object) {
-    delete wrapperOf(object);
+    if (object) {
+        deleteAfterCalls(*wrapperOf(object));
+    }
 }
 
 void JSPluginBase::_Invalidate(NPObject* object) {
@@ -78,12 +80,16 @@ bool JSPluginBase::_HasMethod(NPObject* object, NPIdentifier name) {
 
 bool JSPluginBase::_Invoke(NPObject* object, NPIdentifier name, const NPVariant* args, unsigned int argCount,
                            NPVariant* result) {
-    return wrapperOf(object)->Invoke(name, args, argCount, result);
+    JSPluginBase* wrapper = wrapperOf(object);
+    const CallGuard guard(*wrapper);
+    return wrapper->Invoke(name, args, argCount, result);
 }
 
 bool JSPluginBase::_InvokeDefault(NPObject* object, const NPVariant* args, unsigned int argCount,
                                   NPVariant* result) {
-    return wrapperOf(object)->InvokeDefault(args, argCount, result);
+    JSPluginBase* wrapper = wrapperOf(object);
+    const CallGuard guard(*wrapper);
+    return wrapper->InvokeDefault(args, argCount, result);
 }
 
 bool JSPluginBase::_HasProperty(NPObject* object, NPIdentifier name) {
@@ -91,11 +97,15 @@ bool JSPluginBase::_HasProperty(NPObject* object, NPIdentifier name) {
 }
 
 bool JSPluginBase::_GetProperty(NPObject* object, NPIdentifier name, NPVariant* result) {
-    return wrapperOf(object)->GetProperty(name, result);
+    JSPluginBase* wrapper = wrapperOf(object);
+    const CallGuard guard(*wrapper);
+    return wrapper->GetProperty(name, result);
 }
 
 bool JSPluginBase::_SetProperty(NPObject* object, NPIdentifier name, const NPVariant* value) {
-    return wrapperOf(object)->SetProperty(name, value);
+    JSPluginBase* wrapper = wrapperOf(object);
+    const CallGuard guard(*wrapper);
+    return wrapper->SetProperty(name, value);
 }
 
 bool JSPluginBase::_RemoveProperty(NPObject* object, NPIdentifier name) {

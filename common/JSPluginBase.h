@@ -3,9 +3,10 @@
 #ifndef TELIX_COMMON_JSPLUGINBASE_H
 #define TELIX_COMMON_JSPLUGINBASE_H
 
+#include "common/CallGuard.h"
 #include "npapi/npruntime.h"
 
-class JSPluginBase : public NPObject {
+class JSPluginBase : public NPObject, public CallGuarded {
 public:
     JSPluginBase(const JSPluginBase&) = delete;
     JSPluginBase& operator=(const JSPluginBase&) = delete;
@@ -24,7 +25,7 @@ public:
     virtual bool Construct(const NPVariant* args, unsigned int argCount, NPVariant* result);
 
     // The functions of the class record. Each makes the virtual call of its name; _Deallocate of null does
-    // nothing.
+    // nothing, and that of an object which a call is in waits for the call to return.
     static void _Deallocate(NPObject* object);
     static void _Invalidate(NPObject* object);
     static bool _HasMethod(NPObject* object, NPIdentifier name);

@@ -44,9 +44,11 @@ public:
     explicit LiveRegistration(Object& object) : m_ref(&object, LiveGenerations::begin()) {}
     LiveRegistration(const LiveRegistration&) = delete;
     LiveRegistration& operator=(const LiveRegistration&) = delete;
-    ~LiveRegistration() { LiveGenerations::end(m_ref.generation()); }
+    ~LiveRegistration() { end(); }
 
     LiveRef<Object> ref() const { return m_ref; }
+    // From here on the object counts as gone; it may go on for the call that is in it.
+    void end() const { LiveGenerations::end(m_ref.generation()); }
 
 private:
     const LiveRef<Object> m_ref;

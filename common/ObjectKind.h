@@ -30,7 +30,8 @@ struct ObjectKind {
     const char* destroyText;      // log line of NPP_Destroy, given the model's address; null for none
     const char* const* mimeTypes; // ends with null
     PluginBase* (*create)(NPP npp, unsigned short id);
-    // Deletes the model through its concrete class.
+    // Closes the model and deletes it through its concrete class, now or when the outermost call into it
+    // returns.
     void (*dispose)(PluginBase* model);
     NPError (*init)(PluginBase& model, const InstanceArguments& arguments); // PluginBase::init if null
     bool (*deferDestruction)(PluginBase& model); // true: the model sees to its own end, on a later turn
@@ -39,10 +40,14 @@ struct ObjectKind {
     const StreamOperations* streams;
 };
 
-// For ObjectKind::dispose.
+// For ObjectKind::dispose. What the end of the model means to platform and browser takes effect at once:
+// script that replaces an element sees the old object gone before the new one comes.
 template <class Model>
 void disposeOf(PluginBase* model) {
-    delete static_cast<Model*>(model);
+    auto* self = static_cast<Model*>(model);
+    self->markClosed();
+    self->close();
+    deleteAfterCalls(*self);
 }
 
 // All kinds, in the order in which NPP_New compares their MIME types; ends with null.

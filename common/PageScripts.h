@@ -6,9 +6,9 @@
 #include <string>
 #include <string_view>
 
-// The script with the arguments in the places marked "@@", one for each in order and unescaped, on one line:
-// the line ends of a script are layout. Every other byte of it reaches the page, tabs and doubled blanks
-// included.
+// The script with the arguments in the places marked "@@", one for each in order and as they are, on one
+// line: the line ends of a script are layout. Every other byte of it reaches the page, tabs and doubled
+// blanks included.
 std::string fillIn(std::string_view script, std::initializer_list<std::string_view> arguments);
 
 // Arguments: the description's URL, the event's name, the element's id, the name of the element's method that

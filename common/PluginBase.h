@@ -7,16 +7,15 @@
 #include <atomic>
 #include <string>
 
+#include "common/CallGuard.h"
 #include "npapi/npapi.h"
 #include "npapi/npruntime.h"
 
 enum plugin_state { PLUGIN_STATE_RUNNING = 0, PLUGIN_STATE_DESTROYING = 1, PLUGIN_STATE_NOT_INITIALISED = 3 };
 
-class PluginBase {
+class PluginBase : public CallGuarded {
 public:
     explicit PluginBase(NPP npp, unsigned short objectId = 0);
-    PluginBase(const PluginBase&) = delete;
-    PluginBase& operator=(const PluginBase&) = delete;
 
     // The script wrapper with one reference added for the caller. Only the models of embedded objects have
     // one.
@@ -60,6 +59,11 @@ public:
     void setPluginState(plugin_state state) { m_pluginState = state; }
     void setAutoStart(bool autoStart) { m_autoStart = autoStart; }
 
+    // Whether the instance has been destroyed. A model that a call is in stays until the call returns, and
+    // has no further business with the platform.
+    bool isClosed() const { return m_isClosed; }
+    void markClosed() { m_isClosed = true; }
+
 protected:
     // Not virtual: a model is deleted through its concrete class only.
     ~PluginBase();
@@ -74,6 +78,7 @@ protected:
     int m_pluginMode = 0;
     std::atomic<plugin_state> m_pluginState{PLUGIN_STATE_NOT_INITIALISED};
     bool m_fullScreen = false;
+    bool m_isClosed = false;
     bool m_autoStart = true;
     int m_width = 0;  // of the attribute
     int m_height = 0; // of the attribute

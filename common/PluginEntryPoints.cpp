@@ -53,6 +53,45 @@ bool makes(const ObjectKind& kind, const char* mimeType) {
     return false;
 }
 
+// An instance whose model is being made. Script that this runs may take the element out of the page, and
+// NPP_Destroy finds no model yet.
+class Construction {
+public:
+    explicit Construction(NPP instance) : m_instance(instance), m_outer(s_innermost) { s_innermost = this; }
+    Construction(const Construction&) = delete;
+    Construction& operator=(const Construction&) = delete;
+    ~Construction() { s_innermost = m_outer; }
+
+    bool isCancelled() const { return m_isCancelled; }
+
+    static void cancel(NPP instance) {
+        for (Construction* running = s_innermost; running; running = running->m_outer) {
+            running->m_isCancelled |= running->m_instance == instance;
+        }
+    }
+
+private:
+    static Construction* s_innermost;
+
+    const NPP m_instance;
+    Construction* const m_outer;
+    bool m_isCancelled = false;
+};
+
+Construction* Construction::s_innermost = nullptr;
+
+// The result of the model's own initialisation, or NPERR_INVALID_INSTANCE_ERROR if the instance has gone
+// meanwhile.
+NPError initialise(const ObjectKind& kind, PluginBase& model, const InstanceArguments& arguments,
+                   const Construction& construction) {
+    const NPError rv = kind.init ? kind.init(model, arguments)
+                                 : model.init(arguments.mode, arguments.argc, arguments.argn, arguments.argv);
+    if (construction.isCancelled()) {
+        return NPERR_INVALID_INSTANCE_ERROR;
+    }
+    return rv;
+}
+
 } // namespace
 
 PluginEntryPoints* PluginEntryPoints::m_instance = nullptr;
@@ -153,14 +192,18 @@ NPError PluginEntryPoints::newInstance(NPMIMEType mimeType, NPP instance, uint16
         if (!makes(kind, mimeType)) {
             continue;
         }
+        const Construction construction(instance);
         PluginBase* model = kind.create(instance, kind.id);
         if (!model) {
             return NPERR_NO_ERROR;
         }
-        const NPError rv = kind.init ? kind.init(*model, arguments) : model->init(mode, argc, argn, argv);
+        const NPError rv = initialise(kind, *model, arguments, construction);
         if (rv == NPERR_NO_ERROR) {
             instance->pdata = model;
         } else {
+            if (construction.isCancelled() && kind.deferDestruction) {
+                kind.deferDestruction(*model); // gives the player back; nothing of the model is on its way
+            }
             kind.dispose(model);
         }
         return rv;
@@ -174,6 +217,7 @@ NPError PluginEntryPoints::destroyInst(NPP instance, NPSavedData**) {
     if (isInvalid(instance)) {
         return NPERR_INVALID_INSTANCE_ERROR;
     }
+    Construction::cancel(instance);
     if (const ObjectKind* kind = kindOf(instance)) {
         PluginBase* model = modelOf(instance);
         if (kind->destroyText) {
@@ -200,6 +244,7 @@ NPError PluginEntryPoints::setWindow(NPP instance, NPWindow* window) {
         return NPERR_NO_ERROR;
     }
     PLUGIN_LOG(COMMON, "NPWindow* Value:( %p )\n", static_cast<void*>(window));
+    const CallGuard guard(*modelOf(instance));
     return kind->setWindow(*modelOf(instance), window);
 }
 
@@ -209,6 +254,7 @@ NPError PluginEntryPoints::newStream(NPP instance, NPMIMEType type, NPStream* st
         return NPERR_INVALID_INSTANCE_ERROR;
     }
     if (const StreamOperations* streams = streamsOf(instance)) {
+        const CallGuard guard(*modelOf(instance));
         return streams->newStream(*modelOf(instance), type, stream, seekable, stype);
     }
     NPN_DestroyStream(instance, stream, NPRES_DONE);
@@ -220,6 +266,7 @@ NPError PluginEntryPoints::destroyStream(NPP instance, NPStream* stream, NPReaso
         return NPERR_INVALID_INSTANCE_ERROR;
     }
     if (const StreamOperations* streams = streamsOf(instance)) {
+        const CallGuard guard(*modelOf(instance));
         return streams->destroyStream(*modelOf(instance), stream, reason);
     }
     NPN_DestroyStream(instance, stream, NPRES_DONE);
@@ -231,7 +278,11 @@ int32_t PluginEntryPoints::writeReady(NPP instance, NPStream* stream) {
         return NPERR_INVALID_INSTANCE_ERROR;
     }
     const StreamOperations* streams = streamsOf(instance);
-    return streams ? streams->writeReady(*modelOf(instance), stream) : kUnreadStreamChunk;
+    if (!streams) {
+        return kUnreadStreamChunk;
+    }
+    const CallGuard guard(*modelOf(instance));
+    return streams->writeReady(*modelOf(instance), stream);
 }
 
 int32_t PluginEntryPoints::write(NPP instance, NPStream* stream, int32_t offset, int32_t length,
@@ -240,7 +291,11 @@ int32_t PluginEntryPoints::write(NPP instance, NPStream* stream, int32_t offset,
         return NPERR_INVALID_INSTANCE_ERROR;
     }
     const StreamOperations* streams = streamsOf(instance);
-    return streams ? streams->write(*modelOf(instance), stream, offset, length, buffer) : kUnreadStreamChunk;
+    if (!streams) {
+        return kUnreadStreamChunk;
+    }
+    const CallGuard guard(*modelOf(instance));
+    return streams->write(*modelOf(instance), stream, offset, length, buffer);
 }
 
 void PluginEntryPoints::streamAsFile(NPP, NPStream*, const char*) {
@@ -264,6 +319,7 @@ void PluginEntryPoints::urlNotify(NPP instance, const char* url, NPReason reason
         return;
     }
     if (const StreamOperations* streams = streamsOf(instance)) {
+        const CallGuard guard(*modelOf(instance));
         streams->urlNotify(*modelOf(instance), url, reason, notifyData);
     }
 }

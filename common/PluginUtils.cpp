@@ -5,9 +5,12 @@
 
 #include <algorithm>
 #include <cmath>
+#include <cstdio>
 #include <cstdlib>
 #include <cstring>
 #include <limits>
+
+#include <glib.h>
 
 #include "common/BrowserGates.h"
 #include "common/Log.h"
@@ -221,7 +224,11 @@ ConversionResult convUTF8ToUTF16(const char** sourceStart, const char* sourceEnd
 unsigned char* utf8ToUtf16Converter(const NPString& text, unsigned int* length) {
     PLUGIN_LOG(COMMON, " called \n");
     // A UTF-8 sequence never gives more units than it has bytes, and never more bytes than it had.
-    auto* units = static_cast<unsigned short*>(std::malloc(2 * static_cast<size_t>(text.UTF8Length) + 1));
+    const size_t longest = text.UTF8Length;
+    if (longest > (SIZE_MAX - 1) / 2) {
+        return nullptr;
+    }
+    auto* units = static_cast<unsigned short*>(std::malloc(2 * longest + 1));
     if (!units) {
         return nullptr;
     }
@@ -257,6 +264,60 @@ unsigned char* utf8ToUtf16Converter(const NPString& text, unsigned int* length) 
     return bytes;
 }
 
+namespace {
+
+bool escapesEvents() {
+    const char* value = std::getenv("PLUGIN_ESCAPE_EVENTS");
+    return value && *value && std::strcmp(value, "0") != 0;
+}
+
+// With U+FFFD for every byte that is not part of a UTF-8 sequence.
+std::string validUTF8(const std::string& text) {
+    std::string result;
+    const char* from = text.data();
+    const char* const end = from + text.size();
+    while (from < end) {
+        const char* invalid = nullptr;
+        g_utf8_validate(from, end - from, &invalid);
+        result.append(from, invalid);
+        from = invalid;
+        if (from < end) {
+            result += "\xEF\xBF\xBD";
+            ++from;
+        }
+    }
+    return result;
+}
+
+std::string escapedForLiteral(const std::string& text) {
+    std::string result;
+    const std::string valid = validUTF8(text);
+    for (size_t i = 0; i < valid.size(); ++i) {
+        const auto c = static_cast<unsigned char>(valid[i]);
+        const bool isSeparator =
+            valid.compare(i, 3, "\xE2\x80\xA8") == 0 || valid.compare(i, 3, "\xE2\x80\xA9") == 0;
+        if (c == '\\' || c == '"' || c == '\'') {
+            result += {'\\', static_cast<char>(c)};
+        } else if (c < 0x20 || c == 0x7F) {
+            char escape[sizeof("\\x00")];
+            std::snprintf(escape, sizeof(escape), "\\x%02x", c);
+            result += escape;
+        } else if (isSeparator) {
+            i += 2;
+            result += valid[i] == '\xA8' ? "\\u2028" : "\\u2029";
+        } else {
+            result += static_cast<char>(c);
+        }
+    }
+    return result;
+}
+
+} // namespace
+
+std::string literalText(const std::string& text) {
+    return escapesEvents() ? escapedForLiteral(text) : text;
+}
+
 // quirk 10: the event gets no properties.
 // quirk 12: `objElement` and `newEvent` become globals of the page.
 std::string domEventScript(const std::string& id, const std::string& event, bool bubbles, bool cancelable) {
@@ -264,10 +325,10 @@ std::string domEventScript(const std::string& id, const std::string& event, bool
     assert(!id.empty());
     assert(!event.empty());
     std::string script = "var objElement=document.getElementById(\"";
-    script += id;
+    script += literalText(id);
     script += "\"); newEvent=document.createEvent(\"Event\");"
               "newEvent.initEvent(\"";
-    script += event;
+    script += literalText(event);
     script += "\", ";
     script += bubbles ? "true" : "false";
     script += ",";
@@ -276,8 +337,11 @@ std::string domEventScript(const std::string& id, const std::string& event, bool
     return script;
 }
 
-std::string parseDataAsUTF8(const std::string& data) {
-    PLUGIN_LOG(COMMON, "Data val is: %s \n", data.c_str());
+namespace {
+
+// The bytes that a hexadecimal string stands for, but those of value zero.
+std::string payloadBytes(const std::string& data) {
+    PLUGIN_LOG_FOR(LogModule::COMMON, "parseDataAsUTF8", "Data val is: %s \n", data.c_str());
     std::string result;
     for (size_t index = 0; index < data.size(); index += 2) {
         unsigned int value = 0;
@@ -285,38 +349,52 @@ std::string parseDataAsUTF8(const std::string& data) {
         for (size_t taken = 0; taken < 2 && isASCIIHexDigit(data.c_str()[index + taken]); ++taken) {
             value = value << 4 | static_cast<unsigned int>(toASCIIHexValue(data[index + taken]));
         }
-        if (isEscapeCharacter(value)) {
-            result += getEscapeChar(static_cast<ESC_CHAR_ENUM_T>(value));
-        } else if (value != 0) {
+        if (value != 0) {
             result += static_cast<char>(value);
         }
     }
     return result;
 }
 
-// quirk 11: a quote in an argument or in the payload ends the string literal, and the script fails.
+} // namespace
+
+std::string parseDataAsUTF8(const std::string& data) {
+    std::string result;
+    for (const char c : payloadBytes(data)) {
+        const auto value = static_cast<unsigned char>(c);
+        if (isEscapeCharacter(value)) {
+            result += getEscapeChar(static_cast<ESC_CHAR_ENUM_T>(value));
+        } else {
+            result += c;
+        }
+    }
+    return result;
+}
+
+// quirk 11: unless PLUGIN_ESCAPE_EVENTS is set, a quote in an argument or in the payload ends the string
+// literal, and the script fails.
 std::string streamEventScript(const std::string& name, const std::string& data, const std::string& status,
                               const std::string& id) {
     PLUGIN_LOG(COMMON, "is called. Name: %s , Data: %s , Status: %s , Id:  %s \n", name.c_str(), data.c_str(),
                status.c_str(), id.c_str());
     std::string script = "var objElement = document.getElementById(\"";
-    script += id;
+    script += literalText(id);
     script += "\"); "
               "var strEvent = document.createEvent('Event'); "
               "strEvent.initEvent('StreamEvent', false, false); "
               "strEvent.name = \"";
-    script += name;
+    script += literalText(name);
     script += "\"; strEvent.data = \"";
-    script += data;
+    script += literalText(data);
     script += "\"; ";
-    const std::string text = parseDataAsUTF8(data);
+    const std::string text = escapesEvents() ? escapedForLiteral(payloadBytes(data)) : parseDataAsUTF8(data);
     if (!text.empty()) {
         script += " strEvent.text = \"";
         script += text;
         script += "\"; ";
     }
     script += " strEvent.status = \"";
-    script += status;
+    script += literalText(status);
     script += "\"; "
               "objElement.dispatchEvent(strEvent);";
     PLUGIN_LOG(COMMON, "Script: %s \n", script.c_str());
@@ -326,20 +404,20 @@ std::string streamEventScript(const std::string& name, const std::string& data, 
 std::string parseStreamEventXMLScript(const std::string& url, const std::string& eventName,
                                       const std::string& id, bool isAdd) {
     std::string script =
-        fillIn(kStreamEventRequestScript,
-               {url, eventName, id, isAdd ? "addStreamEventListener" : "removeStreamEventListener"});
+        fillIn(kStreamEventRequestScript, {literalText(url), literalText(eventName), literalText(id),
+                                           isAdd ? "addStreamEventListener" : "removeStreamEventListener"});
     PLUGIN_LOG(COMMON, "Script: %s \n", script.c_str());
     return script;
 }
 
 std::string getPlayCountVal(const std::string& id) {
-    std::string script = fillIn(kPlayCountScript, {id});
+    std::string script = fillIn(kPlayCountScript, {literalText(id)});
     PLUGIN_LOG(COMMON, "Script:--  %s ----\n", script.c_str());
     return script;
 }
 
 std::string getEncodedURL(const std::string& url) {
-    std::string script = fillIn(kEncodedUrlScript, {url});
+    std::string script = fillIn(kEncodedUrlScript, {literalText(url)});
     PLUGIN_LOG(COMMON, "Script:--  %s ----\n", script.c_str());
     return script;
 }

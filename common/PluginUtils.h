@@ -74,7 +74,13 @@ ConversionResult convUTF8ToUTF16(const char** sourceStart, const char* sourceEnd
 // without the zero; or null, with `length` untouched, if the string isn't UTF-8 or memory ran out.
 unsigned char* utf8ToUtf16Converter(const NPString& text, unsigned int* length);
 
-// Page scripts. Arguments go in as they are, with nothing escaped.
+// What stands for a string of platform or page in a literal of a page script, single or double quoted.
+// Without the environment variable PLUGIN_ESCAPE_EVENTS, or if it is empty or "0": the string as it is, so
+// that a quote in it ends the literal. Else: escaped for ECMAScript, U+2028 and U+2029 too, and every byte
+// that is not part of a UTF-8 sequence replaced by U+FFFD. Browser thread.
+std::string literalText(const std::string& text);
+
+// Page scripts. Strings go in as literalText() gives them.
 
 // Dispatches a plain DOM event at the element; yields the boolean result of dispatchEvent. Neither string may
 // be empty.

@@ -5,6 +5,7 @@
 
 #include "common/BrowserGates.h"
 #include "common/JSPluginBase.h"
+#include "common/ScriptValues.h"
 
 // A new script object of the class `Wrapper`; the caller owns its one reference. Null if the browser refuses.
 template <class Wrapper>
@@ -12,11 +13,22 @@ NPObject* createScriptObject(NPP npp) {
     return NPN_CreateObject(npp, JSPluginBase::classOf<Wrapper>());
 }
 
-// The wrapper behind a script object of ours; null stays null. The object's class is not tested.
+// The wrapper behind a script object of the class `Wrapper`; null for any other object, which script may hand
+// over just as well, and for null.
 template <class Wrapper>
 Wrapper* wrapperOf(NPObject* object) {
-    return static_cast<Wrapper*>(object);
+    const bool isOurs = object && object->_class == JSPluginBase::classOf<Wrapper>();
+    return isOurs ? static_cast<Wrapper*>(object) : nullptr;
 }
+
+// How script hands over an object of one of our classes; it stays the browser's.
+template <class Wrapper>
+struct ScriptArgument<Wrapper*> {
+    static bool fits(const NPVariant& value) {
+        return value.type == NPVariantType_Object && wrapperOf<Wrapper>(value.value.objectValue);
+    }
+    static Wrapper* read(const NPVariant& value) { return wrapperOf<Wrapper>(value.value.objectValue); }
+};
 
 // The held object with one reference added for the caller; null stays null.
 inline NPObject* handOut(NPObject* held) {

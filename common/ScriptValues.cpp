@@ -1,11 +1,15 @@
 // Strings for script.
 #include "common/ScriptValues.h"
 
+#include <cstdint>
 #include <cstring>
 
 #include "common/BrowserGates.h"
 
 bool setText(NPVariant& result, const char* text, size_t length) {
+    if (length > UINT32_MAX) {
+        return false; // the browser counts in 32 bits
+    }
     auto* copy = static_cast<char*>(NPN_MemAlloc(static_cast<uint32_t>(length)));
     if (!copy) {
         return false;
@@ -30,5 +34,5 @@ void setDuplicatedText(NPVariant& result, const std::string& text) {
         return;
     }
     result.type = NPVariantType_String;
-    result.value.stringValue = {copy, static_cast<uint32_t>(text.size())};
+    result.value.stringValue = {copy, static_cast<uint32_t>(std::strlen(copy))};
 }

@@ -52,6 +52,7 @@ bool ScriptWrapper::invokeMember(const ScriptMember* member, PluginBase* model, 
     }
     if (member && member->isMethod()) {
         logMember(m_class, "Invoke", *member);
+        const CallGuard guard(*model);
         return member->invoke(*model, args, argCount, *result);
     }
     logRefusal(m_class, "Invoke", m_class.invokeRefusal);
@@ -80,6 +81,7 @@ bool ScriptWrapper::readMember(const ScriptMember* member, PluginBase* model, NP
         }
         logMember(m_class, "GetProperty", *member);
         if (member->read) {
+            const CallGuard guard(*model);
             return member->read(*model, *result);
         }
         setResult(*result, member->constantValue);
@@ -99,6 +101,7 @@ bool ScriptWrapper::readMember(const ScriptMember* member, PluginBase* model, NP
 bool ScriptWrapper::writeMember(const ScriptMember* member, PluginBase* model, const NPVariant* value) const {
     if (model && member && member->write) {
         logMember(m_class, "SetProperty", *member);
+        const CallGuard guard(*model);
         return member->write(*model, *value);
     }
     logRefusal(m_class, "SetProperty", m_class.setPropertyRefusal);

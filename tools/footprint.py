@@ -102,7 +102,7 @@ class Build:
     def load_costs(self):
         """What load_bench prints, by name; empty without load_bench or without what runs it."""
         program = os.path.join(self.folder, 'bench', 'load_bench')
-        command = [program, os.path.join(self.folder, 'bench', 'platform', 'nptelixjs.so')]
+        command = [program, os.path.join(self.folder, 'bench', 'load', 'nptelixjs.so')]
         if self.cache.get('TELIX_MACHINE'):
             if not self.cache.get('TELIX_EMULATOR'):
                 return {}

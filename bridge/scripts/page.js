@@ -179,16 +179,17 @@
         return true;
     }
 
-    // What NPP_New gets: the attributes in their order, then the param children.
+    // What NPP_New gets: the attributes in their order, then the param children. No more than a function can be called with.
+    const mostParameters = 10000;
     function parametersOf(element) {
         const list = [];
         const all = attributes(element);
-        for (let i = 0; i < attributeCount(all); i++) {
+        for (let i = 0; i < attributeCount(all) && list.length < 2 * mostParameters; i++) {
             const attribute = attributeAt(all, i);
             list[list.length] = attributeName(attribute);
             list[list.length] = attributeValue(attribute);
         }
-        for (let child = firstChild(element); child; child = nextSibling(child)) {
+        for (let child = firstChild(element); child && list.length < 2 * mostParameters; child = nextSibling(child)) {
             if (nodeType(child) === elementNode && localName(child) === 'param' && getAttribute(child, 'name') !== null) {
                 list[list.length] = getAttribute(child, 'name');
                 list[list.length] = getAttribute(child, 'value') || '';
@@ -1007,9 +1008,15 @@
 
     // javascript: URLs: the value is the response, if it is a string.
     function runScript(number, source) {
-        const value = hostRun(decode(source));
-        if (typeof value === 'string') {
-            const text = bytesAsText(encode(value));
+        let program = '';
+        try {
+            program = decode(source);
+        } catch (error) {
+            // a malformed escape sequence
+        }
+        const value = hostRun(program);
+        const text = typeof value === 'string' ? bytesAsText(encode(value)) : null;
+        if (text !== null && requests[number]) {
             requests[number].text = text;
             hostResponse(number, requests[number].url, 'text/plain', '', text.length, 0);
         } else {

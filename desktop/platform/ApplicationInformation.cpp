@@ -97,7 +97,7 @@ bool readBoundaries(ByteReader body, std::vector<std::string>& boundaries) {
     return body.good();
 }
 
-// False if the descriptor is malformed. Unknown ones are none of our business.
+// False if the descriptor is malformed. Unknown ones are ignored.
 bool readDescriptor(uint8_t tag, ByteReader body, Descriptors& read, Transports& transports) {
     switch (tag) {
     case kTagApplication:

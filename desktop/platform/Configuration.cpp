@@ -271,8 +271,8 @@ Configuration Configuration::loadOrDefault() {
             std::fprintf(stderr, "libtelix: %s; the defaults apply\n", error->message().c_str());
         }
     }
-    for (const auto& [variable, read] :
-         {std::pair("TELIX_CHANNELS", readSources), std::pair("TELIX_APPLICATIONS", readApplicationsUrl)}) {
+    for (const auto& [variable, read] : {std::make_pair("TELIX_CHANNELS", readSources),
+                                         std::make_pair("TELIX_APPLICATIONS", readApplicationsUrl)}) {
         applyVariable(configuration, variable, read);
     }
     return configuration;

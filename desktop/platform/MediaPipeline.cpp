@@ -3,6 +3,7 @@
 
 #include <unistd.h>
 
+#include <algorithm>
 #include <cassert>
 #include <cstring>
 #include <utility>
@@ -19,8 +20,6 @@ namespace {
 constexpr const char* kPlaybinFlags = "video+audio+text+soft-volume+download";
 
 constexpr const char* kDownloadBufferElement = "downloadbuffer";
-
-constexpr gint64 kBufferDuration = 2 * GST_SECOND; // buffered before playback starts
 
 void dropElement(GstElement* element) {
     if (element) {
@@ -87,7 +86,7 @@ bool MediaPipeline::createPlaybin(Picture& picture, Picture::Token token, std::s
     }
     gst_util_set_object_arg(G_OBJECT(m_playbin), "flags", kPlaybinFlags);
     g_object_set(m_playbin, "video-sink", videoSink, "audio-sink", audioSink, "buffer-duration",
-                 kBufferDuration, nullptr);
+                 static_cast<gint64>(kBufferDuration), nullptr);
     return true;
 }
 
@@ -204,6 +203,7 @@ void MediaPipeline::onStateChanged(GstMessage* message) {
 
 void MediaPipeline::onBuffering(int percent) {
     const bool isBuffering = percent < 100 && !m_source.isLive;
+    m_bufferingReported = std::chrono::steady_clock::now();
     if (isBuffering != m_isBuffering) {
         m_isBuffering = isBuffering;
         m_listener.onBuffering(isBuffering);
@@ -260,6 +260,8 @@ void MediaPipeline::settle() {
 void MediaPipeline::onPrerolled() {
     Media media;
     media.streams = readStreams();
+    m_hasVideo = std::any_of(media.streams.begin(), media.streams.end(),
+                             [](const Stream& stream) { return stream.type == TELIX_JS_AVCOMPTYPE_VIDEO; });
     GstQuery* query = gst_query_new_seeking(GST_FORMAT_TIME);
     if (gst_element_query(m_playbin, query)) {
         gboolean canSeek = FALSE;
@@ -286,7 +288,7 @@ bool MediaPipeline::usesDownloadBuffer() const {
 }
 
 void MediaPipeline::applyTargetState() {
-    if (!isAtStart() && !m_source.isLive) {
+    if (isSeeking() && !m_source.isLive) {
         return; // nobody sees the media before it is at its position and speed
     }
     const GstState state = m_isPaused || m_isBuffering ? GST_STATE_PAUSED : GST_STATE_PLAYING;

@@ -15,6 +15,7 @@
 #include <gst/gst.h>
 
 #include <atomic>
+#include <chrono>
 #include <cstdint>
 #include <functional>
 #include <memory>
@@ -145,6 +146,8 @@ private:
 
     using SharedPointer = std::shared_ptr<Shared>;
 
+    static constexpr GstClockTime kBufferDuration = 2 * GST_SECOND; // buffered before playback goes on
+
     static constexpr const char* kSubtitleElement = "subtitleoverlay"; // draws subtitles into the video
 
     // MediaPipeline.cpp
@@ -166,6 +169,7 @@ private:
 
     // MediaPipelineSeek.cpp
     bool isSeeking() const;
+    bool isBuffered(uint32_t milliseconds);
     bool isReachable(uint32_t milliseconds);
     bool sendSeek(double speed, uint32_t milliseconds);
     bool sendPendingSeek();
@@ -176,7 +180,9 @@ private:
     void applySubtitle();
 
     // MediaPipelineProgress.cpp
+    bool isPositionKnown() const;
     void readBufferedRanges(Progress& progress);
+    void endStaleBuffering(const Progress& progress);
 
     // MediaPipelineErrors.cpp
     void onError(GstMessage* message);
@@ -187,9 +193,11 @@ private:
     State m_state = State::Null;
     Source m_source;
     PendingSeek m_pendingSeek;
-    bool m_isSeeking = false;   // a flushing seek is in progress
-    bool m_isPaused = false;    // by the user, not for buffering
-    bool m_isBuffering = false; // paused until enough data is there
+    bool m_isSeeking = false;                                  // a flushing seek is in progress
+    bool m_isPaused = false;                                   // by the user, not for buffering
+    bool m_isBuffering = false;                                // paused until enough data is there
+    std::chrono::steady_clock::time_point m_bufferingReported; // when the level was reported last
+    bool m_hasVideo = false;                                   // after preroll
     bool m_isAudioSelected = true;
     double m_speed = 1;
     double m_volume = 1;                     // 0 to 1

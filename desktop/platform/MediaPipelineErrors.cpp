@@ -19,7 +19,8 @@ void MediaPipeline::onError(GstMessage* message) {
     gst_message_parse_error(message, &error, nullptr);
     const TELIX_AV_CB_MSG kind = classifyError(message, *error);
     changeState(State::Failed);
-    m_listener.onError(kind, error->message);
+    const std::string reason = error->message; // some elements append lines about themselves
+    m_listener.onError(kind, reason.substr(0, reason.find('\n')));
     g_error_free(error);
 }
 

@@ -11,11 +11,13 @@ namespace {
 constexpr double kRangeDistance = 0.05;      // of the duration
 constexpr double kMinRangeDistance = 2000.0; // milliseconds
 
+constexpr auto kStaleBuffering = std::chrono::seconds(1); // without a new report of the level
+
 } // namespace
 
 MediaPipeline::Progress MediaPipeline::progress() {
     gint64 value = 0;
-    if (!isSeeking() && gst_element_query_position(m_playbin, GST_FORMAT_TIME, &value) && value >= 0) {
+    if (isPositionKnown() && gst_element_query_position(m_playbin, GST_FORMAT_TIME, &value) && value >= 0) {
         m_position = static_cast<uint32_t>(value / GST_MSECOND);
     }
     if (gst_element_query_duration(m_playbin, GST_FORMAT_TIME, &value) && value > 0) {
@@ -27,8 +29,27 @@ MediaPipeline::Progress MediaPipeline::progress() {
     progress.duration = m_duration;
     if (m_source.isNetwork && m_duration > 0) {
         readBufferedRanges(progress);
+        endStaleBuffering(progress);
     }
     return progress;
+}
+
+// After a seek, the sinks count from the running time before it until they have changed their state.
+bool MediaPipeline::isPositionKnown() const {
+    return !isSeeking() && gst_element_get_state(m_playbin, nullptr, nullptr, 0) != GST_STATE_CHANGE_ASYNC;
+}
+
+// downloadbuffer does not always update the level that it reports while nothing reads from it, and nothing
+// does while playback waits for that level.
+void MediaPipeline::endStaleBuffering(const Progress& progress) {
+    const bool isStale =
+        m_isBuffering && std::chrono::steady_clock::now() - m_bufferingReported >= kStaleBuffering;
+    const bool hasEnough =
+        progress.buffered != kNoBufferReport &&
+        (progress.buffered * GST_SECOND >= kBufferDuration || progress.bufferedEnd == m_duration / 1000);
+    if (isStale && hasEnough) {
+        onBuffering(100);
+    }
 }
 
 // Reports the buffered range around the position. Ranges are known in bytes, and their times are estimated

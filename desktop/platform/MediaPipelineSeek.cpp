@@ -30,18 +30,30 @@ bool MediaPipeline::isSeeking() const {
     return m_isSeeking || !isAtStart();
 }
 
+bool MediaPipeline::isBuffered(uint32_t milliseconds) {
+    return !m_source.hasDownloadBuffer || milliseconds / 1000 <= progress().bufferedEnd;
+}
+
 // A server that does not accept byte ranges is not asked for one: it would end the response early, or never.
 bool MediaPipeline::isReachable(uint32_t milliseconds) {
-    return !m_source.hasDownloadBuffer || m_source.acceptsByteRanges ||
-           milliseconds / 1000 <= progress().bufferedEnd;
+    return m_source.acceptsByteRanges || isBuffered(milliseconds);
 }
 
 bool MediaPipeline::sendSeek(double speed, uint32_t milliseconds) {
     if (!isReachable(milliseconds)) {
         return false;
     }
+    if (m_targetState == GST_STATE_PLAYING && !m_source.isLive) {
+        // A change to PAUSED while the pipeline returns to PLAYING after a seek, as for buffering, would add
+        // the running time before the seek to the position.
+        m_targetState = GST_STATE_PAUSED;
+        gst_element_set_state(m_playbin, m_targetState);
+    }
     const auto position = static_cast<gint64>(milliseconds) * GST_MSECOND;
-    const auto flags = static_cast<GstSeekFlags>(GST_SEEK_FLAG_FLUSH | GST_SEEK_FLAG_ACCURATE);
+    // To find a position accurately in audio without an index, all of the audio before it is read.
+    const bool isAccurate = m_hasVideo || isBuffered(milliseconds);
+    const GstSeekFlags accuracy = isAccurate ? GST_SEEK_FLAG_ACCURATE : GST_SEEK_FLAG_NONE;
+    const auto flags = static_cast<GstSeekFlags>(GST_SEEK_FLAG_FLUSH | accuracy);
     const bool isForward = speed > 0;
     // A segment with a negative rate is played from its stop position.
     const bool isAccepted =
@@ -52,6 +64,8 @@ bool MediaPipeline::sendSeek(double speed, uint32_t milliseconds) {
         m_speed = speed;
         m_position = milliseconds;
         applyAudio();
+    } else {
+        applyTargetState();
     }
     return isAccepted;
 }

@@ -2,6 +2,7 @@
 #include "src/application/Application.h"
 
 #include "common/Log.h"
+#include "common/PluginUtils.h"
 #include "common/ScriptReferences.h"
 #include "src/application/JSApplication.h"
 #include "src/application/JSApplicationPrivateData.h"
@@ -23,8 +24,8 @@ NPObject* Application::privateData() {
 
 // quirk 18: the flag reaches neither the script nor the new object.
 NPObject* Application::createApplication(const std::string& uri, bool) {
-    // quirk 19: the URL goes in unescaped; one with a quote makes a script that fails.
-    if (!invokeJScript("window.createHbbTVApplication('" + uri + "');")) {
+    // quirk 19: unless PLUGIN_ESCAPE_EVENTS is set, a URL with a quote makes a script that fails.
+    if (!invokeJScript("window.createHbbTVApplication('" + literalText(uri) + "');")) {
         PLUGIN_LOG(APP_MGR, " Application class:: invokeJScript returned FAIL.\n");
         return nullptr;
     }

@@ -105,7 +105,7 @@ int ApplicationManager::handleOnLowMemory(void*) {
 
 ApplicationManager::ApplicationManager(NPP npp, unsigned short objectId) : PluginBase(npp, objectId) {}
 
-ApplicationManager::~ApplicationManager() {
+void ApplicationManager::close() {
     releaseHeld(m_jsObject);
     releaseHeld(m_onLowmemory);
     releaseHeld(m_onApplicationLoaded);
@@ -203,6 +203,7 @@ bool ApplicationManager::handleApplicationLoadError() {
     if (!m_onApplicationLoadError) {
         return false;
     }
+    const CallGuard guard(*this);
     invokeJScriptFunc(m_onApplicationLoadError, nullptr, 0);
     return true;
 }
@@ -220,6 +221,7 @@ int ApplicationManager::handleKeyDownEvent() {
 }
 
 int ApplicationManager::callKeyHandlers(NPObject* (Application::*handler)()) {
+    const CallGuard guard(*this);
     if (!m_applications.empty() && sharedInstance(m_npp)) {
         // A copy, looked up again: a handler may make or drop applications.
         for (Application* application : applicationList()) {

@@ -34,7 +34,8 @@ public:
     static int onLowMemoryCb();
     static int handleOnLowMemory(void*);
 
-    ~ApplicationManager();
+    // The end of the object but for its memory, which a call that is in it may still need.
+    void close();
 
     NPObject* getJSObject() override;
 

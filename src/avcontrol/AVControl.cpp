@@ -80,7 +80,7 @@ const ObjectKind kAvControlKind = [] {
     kind.destroyText = "AVCONTROL_OBJ_ID delete :: %p \n";
     kind.mimeTypes = kMimeTypes;
     kind.create = [](NPP npp, unsigned short id) -> PluginBase* { return new AVControl(npp, id); };
-    kind.dispose = disposeOf<AVControl>;
+    kind.dispose = [](PluginBase* model) { deleteAfterCalls(controlOf(*model)); };
     kind.init = [](PluginBase& model, const InstanceArguments& given) {
         return controlOf(model).initAV(given.mode, given.argc, given.argn, given.argv, given.mimeType);
     };
@@ -129,7 +129,6 @@ AVControl::~AVControl() {
     releaseHeld(m_audioComponents);
     releaseHeld(m_subtitleComponents);
     releaseHeld(m_onDRMRightsError);
-    std::free(m_bodyData);
 }
 
 NPError AVControl::initAV(unsigned short mode, int argc, char** argn, char** argv, char* mimeType) {
@@ -226,7 +225,7 @@ int AVControl::destroyAV() {
 }
 
 void AVControl::destroyMediaCB(void* object) {
-    delete static_cast<AVControl*>(object);
+    deleteAfterCalls(*static_cast<AVControl*>(object));
 }
 
 bool AVControl::isBrowserThread() const {
@@ -243,7 +242,8 @@ NPError AVControl::setWindow(const NPWindow*, bool forceReset) {
         return NPERR_NO_ERROR;
     }
     const Area area = m_displayArea.choose(*this, isFullScreen());
-    if (m_playerHandle && (forceReset || !m_displayArea.isAccepted(area))) {
+    const bool isEnding = getPluginState() == PLUGIN_STATE_DESTROYING; // by script, since this call began
+    if (m_playerHandle && !isEnding && (forceReset || !m_displayArea.isAccepted(area))) {
         m_displayArea.present(m_npp, area, m_playerHandle, TELIX_JS_AV_SetDisplayArea);
     }
     return NPERR_NO_ERROR;

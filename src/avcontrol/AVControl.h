@@ -22,10 +22,12 @@
 #include <mutex>
 #include <queue>
 #include <string>
+#include <string_view>
 
 #include "common/DisplayArea.h"
 #include "common/LiveRef.h"
 #include "common/PluginBase.h"
+#include "src/avcontrol/StreamBody.h"
 #include "telix/telix_platform.h"
 
 struct ObjectKind;
@@ -61,6 +63,7 @@ enum avcontrol_ce_error {
 };
 
 class AVControl;
+class JSAVcomponent;
 
 // The object that last handed a URL to the platform; null if there is none. The platform has one media
 // pipeline: its messages go to this object, and no other may stop it. Any thread.
@@ -168,8 +171,8 @@ public:
     // Components. Lists carry one reference for the caller; null if there is none.
     NPObject* getComponents(int32_t type);
     NPObject* getCurrentActiveComponents(int32_t type);
-    void selectComponent(NPObject* component);
-    void unSelectComponent(NPObject* component);
+    void selectComponent(JSAVcomponent* component);
+    void unSelectComponent(JSAVcomponent* component);
 
     // Listeners. A setter keeps one reference and takes null too; a getter hands out one more.
     void setOnPlayStateChange(NPObject* listener);
@@ -210,6 +213,7 @@ private:
 
     void readAttribute(const char* name, const char* value);
     void openPlayerPage();
+    void beginBody(std::string_view chunk);
     void lookAtMedia(const std::string& mimeType);
     void encodeURL();
 
@@ -241,7 +245,6 @@ private:
     NPObject* getComponentList(int32_t type, bool active);
 
     uint32_t m_playerHandle = 0; // 0: no player, and nearly every operation does nothing
-    uint32_t m_bodySize = 0;
     uint8_t m_persist = 0;
     NPObject* m_jsObject = nullptr;
     NPObject* m_onPlayStateChange = nullptr;
@@ -272,8 +275,8 @@ private:
     std::atomic<double> m_playSpeed{1.0}; // in force
     double m_requestedSpeed = 1.0;        // the last one asked for but 0
     std::atomic<bool> m_isPlayList{false};
-    std::string m_asxText;
-    char* m_bodyData = nullptr; // of the C heap; nothing reads it
+    StreamBody m_body;             // read only if it is a playlist
+    bool m_bodyIsPlaylist = false; // the one that is being gathered
     int32_t m_error = -1;
     std::atomic<pthread_t> m_bufferingThread{0};
     const pthread_t m_mainThread; // the browser thread
@@ -284,7 +287,7 @@ private:
     bool m_streamFlag = false; // nothing reads it
     bool m_memoryAudio = false;
     // Its sizes are apart from the attributes that the base class keeps.
-    DisplayArea m_displayArea{RectangleResult::Tested};
+    DisplayArea m_displayArea;
     mutable std::mutex m_currentMediaMutex;
     std::string m_currentMedia;               // the URL in play; the monitor reports it
     NPObject* m_onFullScreenChange = nullptr; // never released at the end

@@ -53,16 +53,16 @@ NPObject* AVControl::getComponentList(int32_t type, bool active) {
     return list;
 }
 
-void AVControl::selectComponent(NPObject* component) {
+void AVControl::selectComponent(JSAVcomponent* component) {
     if (m_playerHandle) {
-        const AVcomponent* model = wrapperOf<JSAVcomponent>(component)->impl();
+        const AVcomponent* model = component->impl();
         TELIX_JS_AV_SelectComponent(m_playerHandle, model->getHandle(), model->getType());
     }
 }
 
-void AVControl::unSelectComponent(NPObject* component) {
+void AVControl::unSelectComponent(JSAVcomponent* component) {
     if (m_playerHandle) {
-        const AVcomponent* model = wrapperOf<JSAVcomponent>(component)->impl();
+        const AVcomponent* model = component->impl();
         TELIX_JS_AV_UnselectComponent(m_playerHandle, model->getHandle(), model->getType());
     }
 }

@@ -51,6 +51,7 @@ int handleDRMRightsErrorEvent(void* record) {
     if (!instance || !event) {
         return 0; // the record is not freed
     }
+    const CallGuard guard(*instance);
     // quirk 75: an element without an id stops the process here.
     instance->invokeJScript(domEventScript(instance->getId(), "DRMRightsError", false, false));
     // The getter's reference is never released, and the strings stay with whoever took the arguments.
@@ -146,5 +147,7 @@ void AVControl::handlePlayPositionChanged() {
 }
 
 void AVControl::playPositionChangedCb(void* object) {
-    static_cast<AVControl*>(object)->handlePlayPositionChanged();
+    auto* control = static_cast<AVControl*>(object);
+    const CallGuard guard(*control);
+    control->handlePlayPositionChanged();
 }

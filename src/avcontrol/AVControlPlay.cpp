@@ -43,6 +43,21 @@ bool parseSpeed(const std::string& text, PlatformSpeed& speed) {
     return true;
 }
 
+// Whether script that a call has run has ended the object. A clip change that was posted before the end plays
+// once more, so an object that was ending when the call began goes on.
+class EndWatch {
+public:
+    explicit EndWatch(const AVControl& control) : m_control(control), m_wasEnding(isEnding()) {}
+
+    bool hasEnded() const { return isEnding() && !m_wasEnding; }
+
+private:
+    bool isEnding() const { return m_control.getPluginState() == PLUGIN_STATE_DESTROYING; }
+
+    const AVControl& m_control;
+    const bool m_wasEnding;
+};
+
 std::string withOneDecimal(double number) {
     char text[400]; // the longest double has 309 digits before the point
     std::snprintf(text, sizeof(text), "%.1f", number);
@@ -74,8 +89,12 @@ bool AVControl::play(double speed) {
         pause();
         return true;
     }
+    const EndWatch watch(*this);
     if (speed != 1.0 || m_requestedSpeed != 1.0) {
         setPlaySpeed(speed);
+    }
+    if (watch.hasEnded()) {
+        return false;
     }
     if (m_memoryAudio) {
         playSound();
@@ -129,15 +148,21 @@ bool AVControl::beginMedia() {
     if (currentMedia().empty()) {
         return false;
     }
+    const EndWatch watch(*this);
     m_playStartCounter = 0;
     changePlayState(PLAY_STATE_CONNECTING);
     changePlayState(PLAY_STATE_BUFFERING);
+    if (watch.hasEnded()) {
+        return false;
+    }
     const bool taken = handOverMedia();
     g_lastPlayedInstance = this; // also if the platform refused
     if (m_isPlayList && asxGetStartTime() != 0) {
         seek(1000 * asxGetStartTime());
     }
-    startBufferingThread();
+    if (!watch.hasEnded()) {
+        startBufferingThread();
+    }
     return taken;
 }
 
@@ -187,11 +212,15 @@ bool AVControl::seek(unsigned int ms) {
     if (!m_playerHandle || currentMedia().empty()) {
         return false;
     }
+    const EndWatch watch(*this);
     // quirk 58: a stream of these kinds starts again at the seek target; the page stands still meanwhile.
     const bool restart = m_containerCode == kContainerMp3 || startsWith(currentMedia(), "mms://");
     if (restart) {
         changePlayState(PLAY_STATE_BUFFERING);
         destroyBufferingThread();
+        if (watch.hasEnded()) {
+            return false;
+        }
         if (TELIX_JS_AV_Stop(m_playerHandle) == 0) {
             sleep(1); // also on the browser thread: lets the pipeline settle
         }
@@ -200,7 +229,7 @@ bool AVControl::seek(unsigned int ms) {
     if (taken) {
         m_currentPositionLast = ms;
         handlePlayPositionChanged();
-        if (restart && handOverMedia()) {
+        if (restart && !watch.hasEnded() && handOverMedia()) {
             createBufferingThread();
         }
     }
@@ -237,6 +266,7 @@ void AVControl::setPlaySpeed(double speed) {
 
 // quirk 65: short sounds change no state, have no monitor and don't take the pipeline over.
 void AVControl::playSound() {
+    const EndWatch watch(*this);
     invokeJScript(getPlayCountVal(getId()));
     NPVariant count{};
     if (NPN_Invoke(m_npp, getNPWindowObj(), NPN_GetStringIdentifier("getPlayCountVal"), nullptr, 0, &count)) {
@@ -248,7 +278,7 @@ void AVControl::playSound() {
     selectMedia();
     PLUGIN_LOG(AVCONTROL, "Media File URL:: %s, PlayCount:: %d \n", currentMedia().c_str(), m_playCount);
     // Not the platform's function for sounds, whatever the log says.
-    if (!currentMedia().empty() && handOverMedia()) {
+    if (!currentMedia().empty() && !watch.hasEnded() && handOverMedia()) {
         PLUGIN_LOG(AVCONTROL, " Called:: IF API TELIX_JS_AV_PlaySound returned success \n");
     }
 }

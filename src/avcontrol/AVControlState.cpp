@@ -85,6 +85,7 @@ int AVControl::onPlayStateChangeCb(void* record) {
         // The small record of a message after the last player has gone is not freed.
         return 0;
     }
+    const CallGuard guard(*instance);
     instance->handlePlayStateChange(event->playerHandle, event->message);
     delete event;
     return 0;
@@ -228,6 +229,7 @@ void AVControl::changePlayState(play_state from, play_state to) {
 void AVControl::changePlayStateCb(void* record) {
     auto* change = static_cast<PlayStateChange*>(record);
     if (AVControl* object = change->object.get()) {
+        const CallGuard guard(*object);
         object->changePlayState(change->from, change->to);
         object->decrementWorkingAsyncCall();
     }
@@ -248,6 +250,7 @@ void AVControl::changeReadyState(int value) {
 
 void AVControl::changeReadyStateCb(void* object) {
     auto* control = static_cast<AVControl*>(object);
+    const CallGuard guard(*control);
     control->changeReadyState(control->getReadyState());
 }
 

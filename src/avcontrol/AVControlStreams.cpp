@@ -1,7 +1,7 @@
 // What the browser streams: the media itself plays from its URL, so a stream serves only to learn the
 // media's type from its headers and to gather a playlist.
-#include <cstdlib>
-#include <cstring>
+#include <string_view>
+#include <utility>
 
 #include "common/BrowserGates.h"
 #include "common/PluginUtils.h"
@@ -45,29 +45,33 @@ int32_t AVControl::write(NPStream* stream, int32_t offset, int32_t length, void*
         m_mimeType = headers;
         detectMediaType("");
     }
-    if (buffer) {
-        // Without memory the bytes before are given up as well, and the stream goes on.
-        m_bodyData = static_cast<char*>(std::realloc(m_bodyData, m_bodySize + length)); // NOLINT
-        if (m_bodyData) {
-            std::memcpy(m_bodyData + m_bodySize, buffer, length);
-            m_bodySize += length;
-        }
-    }
-    const std::string chunk = buffer ? std::string(static_cast<const char*>(buffer), length) : std::string();
+    // The browser's length is signed.
+    const std::string_view chunk = buffer && length > 0
+                                       ? std::string_view(static_cast<const char*>(buffer), length)
+                                       : std::string_view();
     if (offset == 0) {
-        // A terminated copy: a playlist is read to its first zero byte.
-        const std::string playlist = asxIsAsxfile(chunk.c_str(), length);
-        if (!playlist.empty()) {
-            m_asxText = playlist;
-            m_isPlayList = true;
-        }
+        beginBody(chunk);
         if (!m_isPlayList && !m_memoryAudio) {
             NPN_DestroyStream(m_npp, stream, NPRES_DONE);
         }
-    } else if (!m_asxText.empty()) {
-        m_asxText += chunk;
+    } else {
+        m_body.append(chunk);
     }
     return length;
+}
+
+// The first chunk says whether the stream is a playlist. A playlist is read to its first zero byte.
+void AVControl::beginBody(std::string_view chunk) {
+    const std::string playlist =
+        asxIsAsxfile(std::string(chunk).c_str(), static_cast<unsigned>(chunk.size()));
+    if (!playlist.empty()) {
+        m_body.take();
+        m_body.append(playlist);
+        m_bodyIsPlaylist = true;
+        m_isPlayList = true;
+    } else if (!m_bodyIsPlaylist) {
+        m_body.append(chunk);
+    }
 }
 
 // quirk 67: a playlist plays as soon as it has been read.
@@ -76,13 +80,13 @@ NPError AVControl::destroyStream(NPStream*, NPReason) {
     if (!m_isPlayList) {
         return NPERR_NO_ERROR;
     }
-    if (asxParseAsx(m_asxText.c_str(), getURL()) == 0) {
+    const bool hasText = std::exchange(m_bodyIsPlaylist, false);
+    if (asxParseAsx(hasText ? m_body.take() : AsxText(), getURL()) == 0) {
         asxPrintAsxData();
         play(m_playSpeed);
     } else {
         processError(AVCONTROL_ERROR_PLAYLIST);
     }
-    m_asxText.clear();
     return NPERR_NO_ERROR;
 }
 

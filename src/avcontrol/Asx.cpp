@@ -5,16 +5,19 @@
 
 #include <algorithm>
 #include <cstdint>
+#include <cstring>
 #include <deque>
 #include <string_view>
+#include <utility>
 #include <vector>
 
 #include "common/Log.h"
 
 namespace {
 
-// The strings of parameters and clips are views of the playlist, which the list keeps, or of its joined
-// URLs: a clip is read without an allocation for each of its strings.
+// The strings of parameters and clips are views of the playlist, which the list keeps: a clip is read without
+// an allocation for each of its strings. A URL is joined with its base when it is asked for, since a long
+// base before many URLs would take memory by the square of the playlist.
 struct AsxParam {
     std::string_view name;
     std::string_view value;
@@ -26,6 +29,7 @@ struct AsxEntry {
     uint32_t startTime = 0;
     uint32_t duration = 0;
     std::string_view baseUrl;
+    std::string_view joinedBase; // goes before the URL
     std::string_view fileName;
     std::string_view title;
     std::string_view author;
@@ -37,7 +41,8 @@ struct AsxEntry {
 
 struct AsxData {
     uint32_t clipCount = 0;
-    std::string baseUrl;
+    std::string inheritedBase; // of the list before
+    std::string_view baseUrl;  // of this list, or the inherited one
     std::string fileName;
     std::string title;
     std::string author;
@@ -51,8 +56,7 @@ struct AsxData {
     AsxEntry* currentClip = nullptr;
     std::vector<AsxParam> params;
     std::deque<AsxEntry> entries; // the clip with the index i stands at i - 1
-    std::string text;
-    std::deque<std::string> joinedUrls;
+    AsxText text;
 };
 
 // quirk 70: one record for the process.
@@ -197,7 +201,8 @@ private:
     int32_t m_pendingRepeat = 0;
     bool m_repeatOpened = false;
     std::string_view m_lastHref;
-    std::string_view m_joinedUrl;
+    std::string_view m_joinedBase;
+    std::string_view m_joinedHref;
     ColonSearch m_firstColon;
     ColonSearch m_secondColon;
 };
@@ -372,11 +377,12 @@ void AsxScanner::readRef() {
         // again.
         const std::string_view base = m_entry->baseUrl.empty() ? s_asxData.baseUrl : m_entry->baseUrl;
         if (!base.empty()) {
-            m_joinedUrl =
-                s_asxData.joinedUrls.emplace_back(asxAppendBaseUrl(std::string(base), std::string(href)));
+            m_joinedBase = base;
+            m_joinedHref = href;
         }
-        if (!m_joinedUrl.empty()) {
-            m_entry->fileName = m_joinedUrl;
+        if (!m_joinedHref.empty()) {
+            m_entry->joinedBase = m_joinedBase;
+            m_entry->fileName = m_joinedHref;
         }
     }
     pass(">");
@@ -432,10 +438,15 @@ uint32_t AsxScanner::parseTime(std::string_view value) {
 
 #define ASX_PRINT_LOG(...) PLUGIN_LOG_FOR(LogModule::AVCONTROL, "asxPrintAsxData", __VA_ARGS__)
 
+std::string urlOf(const AsxEntry& clip) {
+    const std::string path(clip.fileName);
+    return clip.joinedBase.empty() ? path : asxAppendBaseUrl(std::string(clip.joinedBase), path);
+}
+
 // The strings that the list as a whole and a clip have in common.
 template <class Record>
-void logTexts(const Record& record) {
-    ASX_PRINT_LOG("ASX File Name: %s", std::string(record.fileName).c_str());
+void logTexts(const Record& record, const std::string& fileName) {
+    ASX_PRINT_LOG("ASX File Name: %s", fileName.c_str());
     ASX_PRINT_LOG("ASX Title: %s", std::string(record.title).c_str());
     ASX_PRINT_LOG("ASX Author: %s", std::string(record.author).c_str());
     ASX_PRINT_LOG("ASX CopyRight: %s", std::string(record.copyright).c_str());
@@ -452,7 +463,7 @@ void logParams(const std::vector<AsxParam>& params) {
 
 void logClip(const AsxEntry& clip) {
     ASX_PRINT_LOG("ASX Clip - %d", clip.index);
-    logTexts(clip);
+    logTexts(clip, urlOf(clip));
     ASX_PRINT_LOG("ASX ClientSkip: %d", clip.clientSkip);
     ASX_PRINT_LOG("ASX Start time: %d", clip.startTime);
     ASX_PRINT_LOG("ASX Duration: %d", clip.duration);
@@ -471,10 +482,14 @@ std::string asxIsAsxfile(const void* data, unsigned /*size*/) {
 }
 
 int asxParseAsx(const char* text, const std::string& url) {
+    return asxParseAsx(AsxText(strdup(text)), url);
+}
+
+int asxParseAsx(AsxText text, const std::string& url) {
     asxClear();
     s_asxData.fileName = url;
-    s_asxData.text = text;
-    AsxScanner scanner(s_asxData.text);
+    s_asxData.text = std::move(text);
+    AsxScanner scanner(s_asxData.text ? s_asxData.text.get() : "");
     if (scanner.findStart()) {
         s_asxData.clipCount = scanner.scan();
         asxSetCurrentClipIndex(1);
@@ -490,8 +505,9 @@ void asxClear() {
     s_asxData.clipCount = 0;
     s_asxData.entries.clear();
     s_asxData.params.clear();
-    s_asxData.joinedUrls.clear();
-    s_asxData.text = std::string();
+    s_asxData.inheritedBase = std::string(s_asxData.baseUrl); // it outlives the text that it may stand in
+    s_asxData.baseUrl = s_asxData.inheritedBase;
+    s_asxData.text.reset();
     s_asxData.repeatStart = 0;
     s_asxData.repeatEnd = 0;
     s_asxData.repeatCount = 0;
@@ -499,7 +515,7 @@ void asxClear() {
 }
 
 void asxPrintAsxData() {
-    logTexts(s_asxData);
+    logTexts(s_asxData, s_asxData.fileName);
     logParams(s_asxData.params);
     ASX_PRINT_LOG("ASX Repeat: (%d)%d-%d", s_asxData.repeatCount, s_asxData.repeatStart, s_asxData.repeatEnd);
     if (!s_asxData.entries.empty()) {
@@ -537,7 +553,7 @@ std::string asxShowDescription() {
 }
 
 std::string asxShowClipFileName() {
-    return ofCurrentClip(&AsxEntry::fileName);
+    return s_asxData.currentClip ? urlOf(*s_asxData.currentClip) : std::string();
 }
 
 std::string asxShowClipTitle() {

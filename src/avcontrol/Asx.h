@@ -7,6 +7,8 @@
 #ifndef TELIX_AVCONTROL_ASX_H
 #define TELIX_AVCONTROL_ASX_H
 
+#include <cstdlib>
+#include <memory>
 #include <string>
 
 // The playlist if `data` is one, else an empty string. `data` is read as a zero-terminated string whatever
@@ -17,6 +19,14 @@ std::string asxIsAsxfile(const void* data, unsigned size);
 // the current one. A playlist without clips leaves the list empty. Takes time proportional to the length.
 // Always 0.
 int asxParseAsx(const char* text, const std::string& url);
+
+// The same for a playlist that the list takes over, so that it is not copied; null is an empty one. The list
+// takes one byte for each of the playlist, and a record of fixed size for each clip and each parameter.
+struct FreeBlock {
+    void operator()(char* block) const { std::free(block); }
+};
+using AsxText = std::unique_ptr<char, FreeBlock>; // zero-terminated, of the C heap
+int asxParseAsx(AsxText text, const std::string& url);
 
 // Empties the list. The strings of the list as a whole and its base URL stay until a parse sets others.
 void asxClear();

@@ -1,6 +1,8 @@
 // The script interface of the A/V control object.
 #include "src/avcontrol/JSAVControl.h"
 
+#include "common/ScriptReferences.h"
+#include "src/avcomponent/JSAVcomponent.h"
 #include "src/avcontrol/AVControl.h"
 
 namespace {

@@ -51,6 +51,10 @@ Capabilities::Capabilities(NPP npp, unsigned short objectId) : PluginBase(npp, o
 }
 
 Capabilities::~Capabilities() {
+    releaseHeld(m_xmlCapabilities); // of a call that was under way when the object closed
+}
+
+void Capabilities::close() {
     releaseHeld(m_jsObject);
     releaseHeld(m_xmlCapabilities);
 }
@@ -70,9 +74,13 @@ NPObject* Capabilities::getxmlCapabilities() {
         if (NPN_Invoke(m_npp, getNPWindowObj(), NPN_GetStringIdentifier("parseCapabilityDescString"),
                        &argument, 1, &result)) {
             PLUGIN_LOG(CAPABILITIES, " NPN_Invoke Result Type = %d \n", result.type);
-            // quirk 26: the type of what the page's function gives is not tested.
-            // The result is not released: its reference stays with the field.
-            m_xmlCapabilities = result.value.objectValue;
+            // quirk 26: any object will do. Whatever else the page's function gives is no description.
+            if (result.type == NPVariantType_Object) {
+                releaseHeld(m_xmlCapabilities); // the page's function may have read this property itself
+                m_xmlCapabilities = result.value.objectValue; // the reference stays with the field
+            } else {
+                NPN_ReleaseVariantValue(&result);
+            }
         }
         std::free(xml);
     }

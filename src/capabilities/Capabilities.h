@@ -13,6 +13,8 @@ class Capabilities final : public PluginBase {
 public:
     // Gives the page the function with which the description is parsed: there is no XML parser in here.
     Capabilities(NPP npp, unsigned short objectId);
+    // The end of the object but for its memory, which a call that is in it may still need.
+    void close();
     ~Capabilities();
 
     NPObject* getJSObject() override;

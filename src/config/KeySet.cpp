@@ -24,7 +24,7 @@ uint32_t KeySet::setValue(uint32_t value, uint32_t other) {
     // quirk 24: `other` goes no further than the log.
     if (ApplicationManager::sharedInstance(m_npp)) {
         PLUGIN_LOG(APP_MGR, " Value_typecast: %d, Other: %d \n", value, other);
-        uint32_t granted; // the platform writes it if it accepts the mask
+        uint32_t granted = 0; // the platform writes it if it accepts the mask
         if (TELIX_JS_APP_SetKeySetValue(value, &granted) == 0) {
             // quirk 23: what script asked for is kept, what the platform granted is returned.
             m_value = value;

@@ -25,7 +25,7 @@ const ObjectKind kOipfConfigurationKind = [] {
 
 OipfConfiguration::OipfConfiguration(NPP npp, unsigned short objectId) : PluginBase(npp, objectId) {}
 
-OipfConfiguration::~OipfConfiguration() {
+void OipfConfiguration::close() {
     releaseHeld(m_jsObject);
     releaseHeld(m_keySetObject);
     releaseHeld(m_configurationObject);

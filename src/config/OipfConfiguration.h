@@ -12,7 +12,8 @@ extern const ObjectKind kOipfConfigurationKind;
 class OipfConfiguration final : public PluginBase {
 public:
     OipfConfiguration(NPP npp, unsigned short objectId);
-    ~OipfConfiguration();
+    // The end of the object but for its memory, which a call that is in it may still need.
+    void close();
 
     NPObject* getJSObject() override;
 

@@ -67,6 +67,7 @@ int handleDRMMessageResultEvent(void* data) {
     auto* result = static_cast<DRMMsgEventData*>(data);
     const LiveRef<DRMAgent> receiver = drmAgentInst;
     if (DRMAgent* agent = receiver.get()) {
+        const CallGuard guard(*agent);
         // quirk 44: an element without an id stops the process here.
         agent->invokeJScript(domEventScript(agent->getId(), "DRMMessageResult", false, false));
         // A listener of the event may have taken the element out of the page, and put another one in.
@@ -88,7 +89,8 @@ DRMAgent::DRMAgent(NPP npp, unsigned short objectId) : PluginBase(npp, objectId)
     TELIX_JS_DRM_RegisterOnDRMMessageResult(onDRMMessageResultCb);
 }
 
-DRMAgent::~DRMAgent() {
+void DRMAgent::close() {
+    m_live.end();
     // quirk 46: once for each agent, also while others live on.
     TELIX_JS_DRM_UnregisterOnDRMMessageResult(onDRMMessageResultCb);
     releaseHeld(m_jsObject);

@@ -38,7 +38,8 @@ class DRMAgent final : public PluginBase {
 public:
     // Becomes the agent that results go to.
     DRMAgent(NPP npp, unsigned short objectId);
-    ~DRMAgent();
+    // The end of the object but for its memory, which a call that is in it may still need.
+    void close();
 
     NPObject* getJSObject() override;
 

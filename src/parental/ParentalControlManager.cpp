@@ -27,7 +27,7 @@ const ObjectKind kParentalControlManagerKind = [] {
 ParentalControlManager::ParentalControlManager(NPP npp, unsigned short objectId)
     : PluginBase(npp, objectId) {}
 
-ParentalControlManager::~ParentalControlManager() {
+void ParentalControlManager::close() {
     releaseHeld(m_jsObject);
     releaseHeld(m_parentalRatingSchemes);
 }

@@ -12,7 +12,8 @@ extern const ObjectKind kParentalControlManagerKind;
 class ParentalControlManager final : public PluginBase {
 public:
     ParentalControlManager(NPP npp, unsigned short objectId);
-    ~ParentalControlManager();
+    // The end of the object but for its memory, which a call that is in it may still need.
+    void close();
 
     NPObject* getJSObject() override;
 

@@ -8,6 +8,9 @@ ParentalRatingCollection::ParentalRatingCollection(NPP npp) : PluginBase(npp) {}
 
 void ParentalRatingCollection::initializeParentalRatting(unsigned int count, const uint32_t* handles) {
     PLUGIN_LOG(PARENTAL, " addParentalRattingObject \n");
+    if (!handles) {
+        return;
+    }
     // Unlike the other lists this one has its full length before its entries are there.
     m_ratings.setLength(count);
     for (unsigned int index = 0; index < count; ++index) {

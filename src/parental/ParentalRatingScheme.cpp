@@ -13,12 +13,12 @@ void ParentalRatingScheme::setHandle(PARENTALRATTINGSCHEME_STRUCT_T_TAG record) 
     if (!record.szName) {
         return;
     }
-    m_count = record.count;
+    m_count = record.ratingNames && record.iconUris ? record.count : 0;
     PLUGIN_LOG(PARENTAL, " parentalRatingScheme.szName is:: ( %s )\n", record.szName);
     m_name = record.szName;
     m_handle = record.handle;
-    m_ratingNames.insert(m_ratingNames.end(), record.ratingNames, record.ratingNames + record.count);
-    m_iconUris.insert(m_iconUris.end(), record.iconUris, record.iconUris + record.count);
+    m_ratingNames.insert(m_ratingNames.end(), record.ratingNames, record.ratingNames + m_count);
+    m_iconUris.insert(m_iconUris.end(), record.iconUris, record.iconUris + m_count);
 }
 
 uint32_t ParentalRatingScheme::getLength() const {

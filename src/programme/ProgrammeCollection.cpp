@@ -9,6 +9,9 @@ ProgrammeCollection::ProgrammeCollection(NPP npp) : PluginBase(npp) {}
 
 void ProgrammeCollection::initialize(unsigned int count, const uint32_t* handles) {
     m_programmes.setLength(0);
+    if (!handles) {
+        return;
+    }
     m_programmes.fillUpTo(count, m_npp, [handles](JSProgramme& wrapper, uint32_t index) {
         wrapper.impl()->setProgrammeHandle(handles[index]);
     });

@@ -3,6 +3,9 @@
 
 #include <cstdlib>
 
+#include "common/ScriptReferences.h"
+#include "src/avcomponent/JSAVcomponent.h"
+#include "src/channel/JSChannel.h"
 #include "src/videobroadcast/VideoBroadcast.h"
 
 namespace {
@@ -78,7 +81,7 @@ bool setChannelByTriplet(PluginBase& model, const NPVariant* args, unsigned int 
 
 // Takes a channel or null; a second argument that is not a boolean counts as false.
 bool setChannel(PluginBase& model, const NPVariant* args, unsigned int argCount, NPVariant&) {
-    if (argCount < 1 || !(fits<NPObject*>(args[0]) || args[0].type == NPVariantType_Null)) {
+    if (argCount < 1 || !(fits<JSChannel*>(args[0]) || args[0].type == NPVariantType_Null)) {
         return false;
     }
     bool trickPlay = false;
@@ -86,8 +89,8 @@ bool setChannel(PluginBase& model, const NPVariant* args, unsigned int argCount,
         PLUGIN_LOG_FOR(LogModule::VIDEOBCAST, "Invoke", "mId_setChannel is called With 2 Parameters\n");
         trickPlay = valueOf<bool>(args[1]);
     }
-    videoBroadcast(model).setChannel(fits<NPObject*>(args[0]) ? args[0].value.objectValue : nullptr,
-                                     trickPlay);
+    videoBroadcast(model).setChannel(
+        args[0].type == NPVariantType_Null ? nullptr : valueOf<JSChannel*>(args[0]), trickPlay);
     return true;
 }
 
@@ -114,20 +117,22 @@ bool addStreamEventListener(PluginBase& model, const NPVariant* args, unsigned i
            countAndInvoke<registeringForm>(model, args, argCount, result);
 }
 
-// quirk 89: any argument with a value is accepted, of whatever type.
-// Only an object has a component to unselect; any other value is logged as the operation logs its object, and
+// quirk 89: any argument with a value is accepted, of whatever type, but for an object that is no component.
+// Only a component can be unselected; a value of another type is logged as the operation logs its object, and
 // that is all.
 bool unselectComponent(PluginBase& model, const NPVariant* args, unsigned int argCount, NPVariant&) {
     if (argCount < 1 || !args[0].value.objectValue) {
         return false;
     }
-    NPObject* component = args[0].value.objectValue;
-    if (fits<NPObject*>(args[0])) {
-        videoBroadcast(model).unSelectComponent(component);
-    } else {
+    if (!fits<NPObject*>(args[0])) {
         PLUGIN_LOG_FOR(LogModule::VIDEOBCAST, "unSelectComponent", "AVCompObj: %p \n",
-                       static_cast<void*>(component));
+                       static_cast<void*>(args[0].value.objectValue));
+        return true;
     }
+    if (!fits<JSAVcomponent*>(args[0])) {
+        return false;
+    }
+    videoBroadcast(model).unSelectComponent(valueOf<JSAVcomponent*>(args[0]));
     return true;
 }
 

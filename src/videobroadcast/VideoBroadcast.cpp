@@ -103,7 +103,7 @@ VideoBroadcast::VideoBroadcast(NPP npp, unsigned short objectId) : PluginBase(np
     PLUGIN_LOG(VIDEOBCAST, "Constructor called, NPP instance: %p \n", static_cast<void*>(npp));
 }
 
-VideoBroadcast::~VideoBroadcast() {
+void VideoBroadcast::close() {
     PLUGIN_LOG(VIDEOBCAST, "Destructor is called, VB Handle:%d \n", m_vbHandle);
     releaseHeld(m_configObj);
     releaseHeld(m_programmesObj);
@@ -123,6 +123,7 @@ VideoBroadcast::~VideoBroadcast() {
     release();
     deleteInstance(this);
     deleteStreamEventInfo();
+    m_live.end();
     PLUGIN_LOG(VIDEOBCAST, "Destructor call Ended \n");
 }
 

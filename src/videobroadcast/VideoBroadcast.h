@@ -23,6 +23,8 @@
 #include "src/videobroadcast/InstanceList.h"
 #include "telix/telix_platform.h"
 
+class JSAVcomponent;
+class JSChannel;
 struct ObjectKind;
 
 extern const ObjectKind kVideoBroadcastKind;
@@ -54,7 +56,8 @@ public:
     // Whether the platform has the callbacks. Any thread.
     static bool callbacksRegistered() { return bCallbacksRegistered; }
 
-    ~VideoBroadcast();
+    // The end of the object but for its memory, which a call that is in it may still need.
+    void close();
 
     // This object, for steps that are posted and for whatever returns from the page.
     LiveRef<VideoBroadcast> ref() const { return m_live.ref(); }
@@ -126,7 +129,7 @@ public:
 
     // Tuning. A request returns as soon as the platform has taken it; the outcome comes as an event.
     void bindToCurrentChannel();
-    void setChannel(NPObject* channel, bool trickPlay); // null for no channel; the object is not kept
+    void setChannel(JSChannel* channel, bool trickPlay); // null for no channel; the object is not kept
     void setChannelByTriplet(int onid, int tsid, int sid);
     void prevChannel();
     void nextChannel();
@@ -148,8 +151,8 @@ public:
     NPObject* getComponentList(unsigned int type, bool active);
     NPObject* getComponents(unsigned int type);
     NPObject* getCurrentActiveComponents(unsigned int type); // the caller owns two references
-    void selectComponent(NPObject* component);
-    void unSelectComponent(NPObject* component);
+    void selectComponent(JSAVcomponent* component);
+    void unSelectComponent(JSAVcomponent* component);
 
 private:
     using SetSize = TELIX_RETCODE_ENUM_T (*)(TELIX_JS_VB_HANDLE object, int32_t size);
@@ -188,7 +191,7 @@ private:
     int m_nWidth = 0;            // as last requested by script
     int m_nHeight = 0;           // likewise
     bool m_isFullScreen = false; // as last known
-    DisplayArea m_displayArea{RectangleResult::Trusted};
+    DisplayArea m_displayArea;
     int m_playState = 0; // as last known
     unsigned int m_vbHandle = 0;
     std::vector<StreamEventInfo> m_StreamEventList; // in order of subscription

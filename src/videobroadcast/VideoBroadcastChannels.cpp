@@ -24,6 +24,11 @@ Channel* channelOf(NPObject* object) {
     return wrapperOf<JSChannel>(object)->impl();
 }
 
+// The script object's address, as the log says it.
+void* addressOf(NPObject* object) {
+    return object;
+}
+
 // The page's object with an empty channel of its own, or null if the browser refuses.
 NPObject* createChannel(NPP npp, unsigned int channelHandle) {
     NPObject* object = createScriptObject<JSChannel>(npp);
@@ -44,8 +49,8 @@ void VideoBroadcast::bindToCurrentChannel() {
     }
 }
 
-void VideoBroadcast::setChannel(NPObject* channel, bool trickPlay) {
-    const unsigned int channelHandle = channel ? channelOf(channel)->getChannelHandle() : 0;
+void VideoBroadcast::setChannel(JSChannel* channel, bool trickPlay) {
+    const unsigned int channelHandle = channel ? channel->impl()->getChannelHandle() : 0;
     if (m_vbHandle && TELIX_JS_VB_SetChannel(m_vbHandle, channelHandle, trickPlay) == 0) {
         PLUGIN_LOG(VIDEOBCAST, "TELIX_JS_VB_SetChannel call succeeded \n");
         // No channel marks the object active too.
@@ -229,19 +234,19 @@ NPObject* VideoBroadcast::getCurrentActiveComponents(unsigned int type) {
     return handOut(getComponentList(type, true)); // the reference of the creation is never released
 }
 
-void VideoBroadcast::selectComponent(NPObject* component) {
-    PLUGIN_LOG(VIDEOBCAST, "AVCompObj: %p \n", static_cast<void*>(component));
+void VideoBroadcast::selectComponent(JSAVcomponent* component) {
+    PLUGIN_LOG(VIDEOBCAST, "AVCompObj: %p \n", addressOf(component));
     if (m_vbHandle) {
-        const AVcomponent* model = wrapperOf<JSAVcomponent>(component)->impl();
+        const AVcomponent* model = component->impl();
         TELIX_JS_VB_SelectComponent(m_vbHandle, model->getHandle(),
                                     static_cast<TELIX_JS_AVCOMPTYPE>(model->getType()));
     }
 }
 
-void VideoBroadcast::unSelectComponent(NPObject* component) {
-    PLUGIN_LOG(VIDEOBCAST, "AVCompObj: %p \n", static_cast<void*>(component));
+void VideoBroadcast::unSelectComponent(JSAVcomponent* component) {
+    PLUGIN_LOG(VIDEOBCAST, "AVCompObj: %p \n", addressOf(component));
     if (m_vbHandle) {
-        const AVcomponent* model = wrapperOf<JSAVcomponent>(component)->impl();
+        const AVcomponent* model = component->impl();
         TELIX_JS_VB_UnselectComponent(m_vbHandle, model->getHandle(),
                                       static_cast<TELIX_JS_AVCOMPTYPE>(model->getType()));
     }

@@ -75,6 +75,9 @@ void VideoBroadcast::setPluginRegionFromDOM() {
 void VideoBroadcast::setWindow(const NPWindow*, bool bForceReset) {
     setPluginRegionFromDOM();
     const Area area = m_displayArea.choose(*this, m_isFullScreen);
+    if (isClosed()) {
+        return;
+    }
     PLUGIN_LOG(VIDEOBCAST, "Window Values:: m_X: %d, m_Y: %d, m_width: %d, m_height: %d, bForceReset: %d \n",
                area.x, area.y, area.width, area.height, bForceReset);
     if (!m_vbHandle || (!bForceReset && m_displayArea.isAccepted(area))) {

@@ -53,7 +53,7 @@ void VideoBroadcast::addStreamEventListener(const std::string& targetUrl, const 
     }
     NPN_ReleaseVariantValue(&result);
     NPObject* element = getNPPluginObj();
-    if (!element) {
+    if (!element || isClosed()) {
         return;
     }
     PLUGIN_LOG(VIDEOBCAST, "::PluginObject:-- %p -- , StreamEvent Listener: %p \n",
@@ -68,6 +68,9 @@ void VideoBroadcast::addStreamEventListener(const std::string& targetUrl, const 
     std::string tag = componentTag;
     if (!targetUrl.empty()) {
         const std::string urlPath = getBaseURL(targetUrl);
+        if (isClosed()) {
+            return;
+        }
         PLUGIN_LOG(VIDEOBCAST, "urlPath:-- %s \n", urlPath.c_str());
         if (startsWithIgnoringCase(urlPath, "http")) {
             const std::string targetUrlSubStr = targetUrl.substr(0, 6);

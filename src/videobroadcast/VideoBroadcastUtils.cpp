@@ -5,6 +5,7 @@
 #include <glib.h>
 
 #include <cassert>
+#include <cstdint>
 #include <cstdlib>
 #include <cstring>
 #include <iterator>
@@ -93,7 +94,7 @@ struct StreamEventData {
     }
 
     static char* copyOf(const void* bytes, size_t length) {
-        auto* copy = static_cast<char*>(std::malloc(length + 1));
+        auto* copy = static_cast<char*>(length < SIZE_MAX ? std::malloc(length + 1) : nullptr);
         if (copy) {
             if (length != 0) {
                 std::memcpy(copy, bytes, length);
@@ -312,7 +313,6 @@ void deliverPlayState(VideoBroadcast& videoBroadcast, const std::string&, void* 
         return;
     }
     HANDLER_LOG("VBEvent_PlayStateChange:: Case. State: %d \n", event->state);
-    const LiveRef<VideoBroadcast> self = videoBroadcast.ref();
     NPVariant args[2]{};
     setResult(args[0], event->state);
     if (event->error == TELIX_ERR_STATE_NONE) {
@@ -323,8 +323,7 @@ void deliverPlayState(VideoBroadcast& videoBroadcast, const std::string&, void* 
     videoBroadcast.invokeJScriptFunc(handler, args, 2);
     const bool ended = event->state == TELIX_PLAYSTATE_UNREALIZED ||
                        event->state == TELIX_PLAYSTATE_CONNECTING || event->state == TELIX_PLAYSTATE_STOPPED;
-    // The handler may have taken the object out of the page.
-    if (ended && self.get()) {
+    if (ended) {
         videoBroadcast.setActive(false);
     }
 }
@@ -394,6 +393,7 @@ void deliverEvent(VideoBroadcast& instance, const std::string& id, const VideoBc
     if (event.eventType >= std::size(kEvents)) {
         return;
     }
+    const CallGuard guard(instance);
     const EventClass& eventClass = kEvents[event.eventType];
     if (eventClass.domEvent) {
         instance.invokeJScript(domEventScript(id, eventClass.domEvent, false, false));

@@ -309,30 +309,6 @@ TEST_F(BroadcastTest, CatchesUpWithTheBroadcastAfterAChange) {
     }
 }
 
-// The longest time that a picture waited before it was presented, of a second.
-std::chrono::milliseconds longestWait() {
-    const uint64_t serial = takeShot().serial;
-    std::chrono::milliseconds longest(0);
-    EXPECT_TRUE(waitUntil([&] {
-        longest = std::max(longest, -latenessOf(Broadcast::instance()).video.value_or(longest));
-        return takeShot().serial > serial + 25;
-    }));
-    return longest;
-}
-
-TEST_F(BroadcastTest, IsNoFurtherBehindTheBroadcastAfterAnInstantChange) {
-    tune(m_channels[0]);
-    Broadcast::instance().setInstantZap(false);
-    tune(m_channels[1]);
-    const auto ordinary = longestWait();
-    Broadcast::instance().setInstantZap(true);
-    tune(m_channels[0]);
-    ASSERT_TRUE(waitForOldKeyframe([](bool) {}));
-    tune(m_channels[1]);
-    // A pipeline that took the packets from the keyframe on for new would be behind by the age of these.
-    EXPECT_LT(longestWait(), ordinary + std::chrono::milliseconds(150));
-}
-
 TEST_F(BroadcastTest, KeepsNothingWhileInstantChangesAreOff) {
     tune(m_channels[0]);
     ASSERT_TRUE(waitUntil([] { return Broadcast::instance().state().keptPackets > 0; }));

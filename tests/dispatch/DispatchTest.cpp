@@ -29,6 +29,7 @@ public:
     Model(NPP npp, unsigned short id) : PluginBase(npp, id) {
         g_reached.push_back("created " + std::to_string(id));
     }
+    void close() { g_reached.push_back("closed " + std::to_string(getObjectId())); }
     ~Model() { g_reached.push_back("deleted " + std::to_string(getObjectId())); }
     NPObject* getJSObject() override {
         g_reached.push_back("getJSObject " + std::to_string(getObjectId()));
@@ -157,7 +158,7 @@ TEST_F(DispatchTest, AFailedInitIsTheResultAndDeletesTheModel) {
     const EmbeddedObject object = browser.embed("test/taking");
     EXPECT_EQ(object.error(), NPERR_OUT_OF_MEMORY_ERROR);
     EXPECT_EQ(object.model(), nullptr);
-    EXPECT_THAT(g_reached, ElementsAre("created 300", "init test/taking 1 0", "deleted 300"));
+    EXPECT_THAT(g_reached, ElementsAre("created 300", "init test/taking 1 0", "closed 300", "deleted 300"));
 }
 
 TEST_F(DispatchTest, AFailedInitLeavesTheInstanceAsItWas) {
@@ -263,7 +264,7 @@ TEST_F(DispatchTest, EventsReachTheKindThatTakesThem) {
 TEST_F(DispatchTest, DestroyDeletesTheModelAndClearsTheInstance) {
     const EmbeddedObject object = embedAndForget("test/plain");
     EXPECT_EQ(object.destroy(), NPERR_NO_ERROR);
-    EXPECT_THAT(g_reached, ElementsAre("deleted 500"));
+    EXPECT_THAT(g_reached, ElementsAre("closed 500", "deleted 500"));
     EXPECT_EQ(object.model(), nullptr);
 }
 
@@ -280,7 +281,7 @@ TEST_F(DispatchTest, AKindMaySeeToItsOwnEnd) {
 TEST_F(DispatchTest, AKindThatDeclinesToDeferIsDeletedAtOnce) {
     const EmbeddedObject object = embedAndForget("test/taking");
     object.destroy();
-    EXPECT_THAT(g_reached, ElementsAre("deferDestruction", "deleted 300"));
+    EXPECT_THAT(g_reached, ElementsAre("deferDestruction", "closed 300", "deleted 300"));
 }
 
 TEST_F(DispatchTest, EachKindHasItsOwnLineInTheLogOrNone) {

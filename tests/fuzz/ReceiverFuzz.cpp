@@ -20,19 +20,39 @@ constexpr uint16_t kPids = 32;
 // Without its CRC.
 constexpr size_t kMaxSection = 1020;
 
+// Each step takes 10 ms.
+class StepClock : public desktop::Clock {
+public:
+    void step() { m_now += std::chrono::milliseconds(10); }
+
+    Instant now() const override { return m_now; }
+    int64_t utcSeconds() const override { return 0; }
+    bool waitUntil(std::unique_lock<std::mutex>&, std::condition_variable&, Instant,
+                   const std::function<bool()>& isDone) override {
+        return isDone();
+    }
+    void callAfter(std::chrono::milliseconds, std::function<void()>) override {}
+
+private:
+    Instant m_now;
+};
+
 // A step is a byte that tells which, followed by its parameters:
 //   0 service             select
 //   1                     deselect
 //   2                     reset
 //   3 packet              push a packet, filled up at the end of the input
-//   4 PID length section  push a section, which gets its length and CRC here; its length has two bytes
+//   4 service             follow the applications of a service
+//   5 on                  keep packets, or do not
+//   6 PID length section  push a section, which gets its length and CRC here; its length has two bytes
 class Steps {
 public:
     Steps(const uint8_t* data, size_t size) : m_at(data), m_left(size) {}
 
     void run() {
         while (m_left > 0) {
-            switch (take8() % 5) {
+            m_clock.step();
+            switch (take8() % 7) {
             case 0:
                 select();
                 break;
@@ -44,6 +64,12 @@ public:
                 break;
             case 3:
                 pushPacket();
+                break;
+            case 4:
+                followApplications();
+                break;
+            case 5:
+                m_receiver.keepPackets(take8() % 2 != 0);
                 break;
             default:
                 pushSection();
@@ -79,12 +105,23 @@ private:
             assert(!m_isMissing);
             m_isMissing = true;
         };
-        service.feed = [this](const Bytes& packets) {
+        service.feed = [this](const Bytes& packets, desktop::Clock::Duration age) {
+            assert(age >= desktop::Clock::Duration::zero());
             assert(m_hasPmt && !packets.empty() && packets.size() % desktop::kPacketSize == 0);
         };
         service.onEit = [this](const desktop::Eit& eit) { assert(eit.serviceId == m_service); };
         service.onStreamEvent = [this](uint8_t, const desktop::StreamEvent&) { assert(m_hasPmt); };
         m_receiver.select(service);
+    }
+
+    void followApplications() {
+        const auto service = static_cast<uint16_t>(1 + take8() % kServices);
+        m_receiver.followApplications(service, [](const desktop::ApplicationList& list) {
+            assert(list.applications.size() <= desktop::kMaxSignalledApplications);
+            for (const desktop::SignalledApplication& application : list.applications) {
+                assert(desktop::findFault(application).empty());
+            }
+        });
     }
 
     void pushPacket() {
@@ -116,7 +153,8 @@ private:
     bool m_hasPmt = false;
     bool m_isMissing = false;
     uint8_t m_continuity[kPids + 1] = {};
-    desktop::Receiver m_receiver;
+    StepClock m_clock;
+    desktop::Receiver m_receiver{m_clock};
 };
 
 } // namespace

@@ -82,6 +82,7 @@ std::string printedBy(const char* level, const std::function<void()>& body) {
 
 BorderTest::BorderTest() {
     unsetenv("LOG_MODULE");
+    unsetenv("PLUGIN_ESCAPE_EVENTS");
     platform.reset();
     platform.onCall = [this](const std::string& call) { log.add(call); };
     EXPECT_EQ(browser.initialize(), NPERR_NO_ERROR);

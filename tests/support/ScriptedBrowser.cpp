@@ -7,6 +7,7 @@
 #include <cxxabi.h>
 #include <sstream>
 #include <typeinfo>
+#include <utility>
 
 #include <glib.h>
 #include <gtest/gtest.h>
@@ -370,6 +371,7 @@ struct BrowserTable {
             return false;
         }
         const ObjectRef kept = ObjectRef::share(object);
+        browser().enterPage();
         return object->_class->invoke(object, method, args, argCount, result);
     }
 
@@ -383,6 +385,7 @@ struct BrowserTable {
             return false;
         }
         const ObjectRef kept = ObjectRef::share(object);
+        browser().enterPage();
         return object->_class->invokeDefault(object, args, argCount, result);
     }
 
@@ -392,7 +395,12 @@ struct BrowserTable {
         if (!browser().enter("NPN_Evaluate", [&] { return name(scope) + " \"" + text + "\""; })) {
             return false;
         }
-        return scope && browser().isLive(scope, "NPN_Evaluate") && browser().evaluate(scope, text, result);
+        if (!scope || !browser().isLive(scope, "NPN_Evaluate")) {
+            return false;
+        }
+        const ObjectRef kept = ObjectRef::share(scope);
+        browser().enterPage();
+        return browser().evaluate(scope, text, result);
     }
 
     static bool getProperty(NPP, NPObject* object, NPIdentifier property, NPVariant* result) {
@@ -401,8 +409,12 @@ struct BrowserTable {
                              [&] { return name(object) + "." + ScriptedBrowser::textOf(property); })) {
             return false;
         }
-        return browser().isLive(object, "NPN_GetProperty") && object->_class->getProperty &&
-               object->_class->getProperty(object, property, result);
+        if (!browser().isLive(object, "NPN_GetProperty") || !object->_class->getProperty) {
+            return false;
+        }
+        const ObjectRef kept = ObjectRef::share(object);
+        browser().enterPage();
+        return object->_class->getProperty(object, property, result);
     }
 
     static bool setProperty(NPP, NPObject* object, NPIdentifier property, const NPVariant* value) {
@@ -412,8 +424,12 @@ struct BrowserTable {
             })) {
             return false;
         }
-        return browser().isLive(object, "NPN_SetProperty") && object->_class->setProperty &&
-               object->_class->setProperty(object, property, value);
+        if (!browser().isLive(object, "NPN_SetProperty") || !object->_class->setProperty) {
+            return false;
+        }
+        const ObjectRef kept = ObjectRef::share(object);
+        browser().enterPage();
+        return object->_class->setProperty(object, property, value);
     }
 
     static bool removeProperty(NPP, NPObject* object, NPIdentifier property) {
@@ -806,13 +822,28 @@ size_t ScriptedBrowser::liveCount(const std::string& className) const {
     }));
 }
 
-void ScriptedBrowser::closePage() {
-    if (m_initialized) {
-        for (const auto& record : m_instances) {
-            if (!record->destroyed && record->error == NPERR_NO_ERROR) {
-                EmbeddedObject(record).destroy();
-            }
+void ScriptedBrowser::enterPage() {
+    if (const auto action = std::exchange(m_onEnteringPage, nullptr)) {
+        action();
+        if (!m_onEnteringPage) {
+            m_onEnteringPage = action;
         }
+    }
+}
+
+void ScriptedBrowser::removeElements() {
+    const auto instances = m_instances;
+    for (const auto& record : instances) {
+        if (!record->destroyed && record->error == NPERR_NO_ERROR) {
+            EmbeddedObject(record).destroy();
+        }
+    }
+}
+
+void ScriptedBrowser::closePage() {
+    m_onEnteringPage = nullptr;
+    if (m_initialized) {
+        removeElements();
         pump();
     }
     m_rules.clear();

@@ -112,6 +112,12 @@ public:
     std::vector<std::string> eventTypes() const;
     void onEvent(const std::string& type, std::function<void(const DomEvent&)> listener);
 
+    // What the page does whenever the plug-in runs script of it or touches one of its objects, before
+    // anything else; not while it is doing just that. Null for nothing.
+    void onEnteringPage(std::function<void()> action) { m_onEnteringPage = std::move(action); }
+    // NPP_Destroy for every element that is left. The page keeps its references.
+    void removeElements();
+
     // Has the browser refuse calls of an entry ("NPN_MemAlloc"): the first `after` calls pass, the next
     // `times` fail.
     void refuse(const std::string& entry, unsigned times = ~0U, unsigned after = 0);
@@ -179,6 +185,7 @@ private:
     bool enter(const char* entry, Text text);
     bool enter(const char* entry);
     bool isLive(NPObject* object, const char* entry) const;
+    void enterPage();
     Account& account(NPObject* object, const std::string& className);
     void dropReference(NPObject* object);
     bool evaluate(NPObject* scope, const std::string& text, NPVariant* result);
@@ -209,6 +216,7 @@ private:
     std::vector<std::string> m_scripts;
     std::vector<DomEvent> m_events;
     std::vector<std::pair<std::string, std::function<void(const DomEvent&)>>> m_listeners;
+    std::function<void()> m_onEnteringPage;
 
     mutable std::mutex m_asyncMutex;
     std::deque<AsyncCall> m_asyncCalls;

@@ -13,6 +13,7 @@
 #include "desktop/window/shared/PluginFile.h"
 #include "desktop/window/webkit/ChildProcesses.h"
 #include "desktop/window/webkit/Engine.h"
+#include "desktop/window/webkit/InspectorServer.h"
 #include "desktop/window/webkit/PageChannel.h"
 #include "desktop/window/webkit/Profile.h"
 #include "desktop/window/webkit/TvWindow.h"
@@ -102,6 +103,13 @@ int runBrowser(const CommandLine& commandLine) {
     if (!error.empty()) {
         printError("cannot load " + commandLine.page + ": " + error);
         return kExitBadInput;
+    }
+    if (!commandLine.inspectorServer.empty()) {
+        const std::string serverError = serveInspector(commandLine.inspectorServer);
+        if (!serverError.empty()) {
+            printError("--inspector-server " + commandLine.inspectorServer + ": " + serverError);
+            return kExitBadInput;
+        }
     }
     const Profile profile;
     if (!profile.failure().empty()) {

@@ -378,6 +378,17 @@ TEST_F(AVControlComponents, AreSelectedByHandleAndType) {
                                            "TELIX_JS_AV_UnselectComponent(7, 12, 2)"));
 }
 
+TEST_F(AVControlComponents, AreToldFromObjectsOfOtherClasses) {
+    leftBehind("JSAVcomponent", 2);
+    const ObjectRef list = object.call("getComponents", 2).object();
+    log.clear();
+    for (const ObjectRef& other : {ObjectRef(browser.scriptObject("plain")), list, object.scriptObject()}) {
+        EXPECT_FALSE(object.call("selectComponent", other).succeeded) << other;
+        EXPECT_FALSE(object.call("unselectComponent", other).succeeded) << other;
+    }
+    EXPECT_THAT(playerCalls(), IsEmpty());
+}
+
 TEST_F(AVControlComponents, AskTheAVFamilyForTheirProperties) {
     leftBehind("JSAVcomponent", 2);
     const ObjectRef component = object.call("getComponents", 1).object().call("item", 0).object();

@@ -1,5 +1,6 @@
 // Streams of the browser: what is kept of them, what they say about the media, and playlists that play as
 // soon as they are read.
+#include "src/avcontrol/StreamBody.h"
 #include "tests/unit/avcontrol/AVControlTest.h"
 
 using ::testing::ElementsAre;
@@ -249,6 +250,66 @@ TEST_F(AVControlStreams, AClipOfAnotherSchemeDoesNotWait) {
     log.clear();
     stream.destroy();
     EXPECT_THAT(playerCalls(), ElementsAre(playOf("mms://media.example/1")));
+}
+
+TEST_F(AVControlStreams, ALengthBelowZeroIsNoChunk) {
+    const EmbeddedObject object = fetching();
+    BrowserStream& stream = object.newStream(kList);
+    stream.write("<ASX>" + entry("http://media.example/1"));
+    char byte = 0;
+    EXPECT_EQ(browser.plugin().write(object.npp(), &stream.record(), 100, -1, &byte), -1);
+    EXPECT_EQ(browser.plugin().write(object.npp(), &stream.record(), 100, INT32_MIN, &byte), INT32_MIN);
+    stream.destroy();
+    EXPECT_EQ(object.get("nrTracks"), 1);
+}
+
+// The body of a stream
+
+using Body = ::testing::Test;
+
+std::string textOf(StreamBody& body) {
+    const AsxText text = body.take();
+    return text ? text.get() : "none";
+}
+
+TEST_F(Body, IsWhatWasAppendedInOrder) {
+    StreamBody body;
+    EXPECT_EQ(textOf(body), "none");
+    body.append("one ");
+    body.append("");
+    body.append("two");
+    EXPECT_EQ(body.size(), 7u);
+    EXPECT_EQ(textOf(body), "one two");
+    EXPECT_EQ(body.size(), 0u);
+    body.append("three");
+    EXPECT_EQ(textOf(body), "three");
+}
+
+TEST_F(Body, ThatGrowsTooLongIsGivenUpWithAllThatFollows) {
+    StreamBody body(8);
+    body.append("12345678");
+    EXPECT_EQ(body.size(), 8u);
+    body.append("9");
+    EXPECT_EQ(body.size(), 0u);
+    body.append("10");
+    EXPECT_EQ(textOf(body), "none");
+    body.append("next");
+    EXPECT_EQ(textOf(body), "next");
+}
+
+TEST_F(Body, ChunkThatIsTooLongByItselfIsGivenUpToo) {
+    StreamBody body(8);
+    body.append("123456789");
+    EXPECT_EQ(textOf(body), "none");
+}
+
+TEST_F(Body, IsCountedIn32BitsWithItsTerminatingZero) {
+    static_assert(StreamBody::kLongest + uint64_t{1} <= UINT32_MAX);
+    // Memory for this much can be had, and is never touched. What is too long by one byte asks for none.
+    StreamBody body;
+    const std::string_view beyond("x", static_cast<size_t>(StreamBody::kLongest) + 1);
+    body.append(beyond); // would be read if it were taken
+    EXPECT_EQ(textOf(body), "none");
 }
 
 // Notices

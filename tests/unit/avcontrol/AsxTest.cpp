@@ -2,6 +2,7 @@
 #include "src/avcontrol/Asx.h"
 
 #include <gtest/gtest.h>
+#include <malloc.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -531,6 +532,32 @@ TEST_F(Asx, JoinedAddressOutlivesItsEntryWhereNoBaseFollows) {
     EXPECT_EQ(fileNames(), (Lines{"a", "own/b", "own/b", "two/d", "two/d"}));
     parseBody("<Entry><Ref HREF=\"f\"/></Entry>");
     EXPECT_EQ(fileNames(), (Lines{"f"}));
+}
+
+TEST_F(Asx, BaseOfTheListHoldsAlsoForTheNextListWhichReplacesItsText) {
+    parseBody("<BASE HREF=\"first\"/><Entry><Ref HREF=\"a\"/></Entry>");
+    parseBody("<Entry><Ref HREF=\"b\"/></Entry><BASE HREF=\"second\"/><Entry><Ref HREF=\"c\"/></Entry>");
+    EXPECT_EQ(fileNames(), (Lines{"first/b", "second/c"}));
+    asxClear();
+    parseBody("<Entry><Ref HREF=\"d\"/></Entry>");
+    EXPECT_EQ(fileNames(), (Lines{"second/d"}));
+}
+
+TEST_F(Asx, LongBaseBeforeManyAddressesTakesMemoryOnce) {
+    const std::string base(100000, 'b');
+    std::string body = "<BASE HREF=\"" + base + "\"/>";
+    for (int i = 0; i < 1000; ++i) {
+        body += "<Entry><Ref HREF=\"a\"/></Entry>";
+    }
+    const auto inUse = [] {
+        const struct mallinfo2 info = mallinfo2();
+        return info.uordblks + info.hblkhd;
+    };
+    const size_t before = inUse();
+    parseBody(body);
+    EXPECT_EQ(asxGetClipCount(), 1000u);
+    EXPECT_EQ(asxShowClipFileName(), base + "/a");
+    EXPECT_LT(inUse() - before, 10 * body.size()); // joined with each address it would be 100 MB
 }
 
 TEST_F(Asx, BaseWithoutAnAddressIsPassed) {

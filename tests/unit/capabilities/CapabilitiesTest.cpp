@@ -1,5 +1,6 @@
 // The capabilities object: the parser that it puts into the page, the description, the query by name and the
 // counts.
+#include <cstdlib>
 #include <cstring>
 #include <limits>
 
@@ -194,6 +195,19 @@ TEST_F(CapabilitiesTest, ARefusedDescriptionIsNullAndAskedForAgain) {
     EXPECT_EQ(platform.TELIX_JS_CAP_GetXmlCapabilities.count(), 2U);
 }
 
+TEST_F(CapabilitiesTest, ATextThatThePlatformWritesAlthoughItRefusesIsNeitherUsedNorFreed) {
+    pageParses();
+    char* const written = strdup("<x/>");
+    platform.TELIX_JS_CAP_GetXmlCapabilities = [written](char** out) {
+        *out = written;
+        return 1;
+    };
+    EXPECT_EQ(object.get("xmlCapabilities"), Value(nullptr));
+    EXPECT_THAT(parses(), IsEmpty());
+    EXPECT_STREQ(written, "<x/>");
+    std::free(written);
+}
+
 TEST_F(CapabilitiesTest, SuccessWithoutATextIsAnEmptyText) {
     pageParses();
     descriptionIs(nullptr);
@@ -217,6 +231,36 @@ TEST_F(CapabilitiesTest, AParserThatGivesNullIsTriedAgain) {
     EXPECT_EQ(object.get("xmlCapabilities"), Value(nullptr));
     pageParses();
     EXPECT_TRUE(object.get("xmlCapabilities").value.isObject());
+}
+
+TEST_F(CapabilitiesTest, AParserThatGivesSomethingElseThanAnObjectGivesNoDescription) {
+    descriptionIs("<x/>");
+    Value result;
+    browser.window().method("parseCapabilityDescString", [&](const Values&) { return result; });
+    for (const Value& other :
+         {Value(undefined), Value(true), Value(7), Value(5e-310), Value("text"), Value("")}) {
+        result = other;
+        EXPECT_EQ(object.get("xmlCapabilities"), Value(nullptr)) << other;
+    }
+    pageParses();
+    EXPECT_TRUE(object.get("xmlCapabilities").value.isObject());
+}
+
+TEST_F(CapabilitiesTest, AParserThatReadsTheDescriptionItselfLeavesOneDocument) {
+    descriptionIs("<x/>");
+    const ScriptObject inner = browser.scriptObject("inner");
+    const ScriptObject outer = browser.scriptObject("outer");
+    int depth = 0;
+    browser.window().method("parseCapabilityDescString", [&](const Values&) {
+        if (++depth == 1) {
+            EXPECT_EQ(object.get("xmlCapabilities"), Value(inner));
+            return Value(outer);
+        }
+        return Value(inner);
+    });
+    EXPECT_EQ(object.get("xmlCapabilities"), Value(outer));
+    EXPECT_EQ(inner.pluginReferences(), 0);
+    EXPECT_EQ(outer.pluginReferences(), 1);
 }
 
 TEST_F(CapabilitiesTest, LogsTheTypeOfTheParsersResult) {

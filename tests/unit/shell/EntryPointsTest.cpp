@@ -134,6 +134,13 @@ TEST_F(EntryPointsTest, InitialisePrintsTheStartBanner) {
             kBannerRule);
 }
 
+TEST_F(EntryPointsTest, InitialiseOfThePluginPrintsTheBannerOnceItHasTheTables) {
+    pluginFuncs.size = sizeof pluginFuncs;
+    EXPECT_THAT(outputOf([this] { initialize(&browserFuncs, &pluginFuncs); }),
+                AllOf(StartsWith(kBannerRule), HasSubstr(":: ORDA :: PLUGIN :: START ::")));
+    EXPECT_EQ(outputOf([this] { initialize(nullptr, &pluginFuncs); }), "");
+}
+
 TEST_F(EntryPointsTest, ShutdownPrintsTheEndBannerAndReturnsNoError) {
     EXPECT_EQ(
         outputOf([] { EXPECT_EQ(NP_Shutdown(), NPERR_NO_ERROR); }),
@@ -218,6 +225,20 @@ TEST_F(EntryPointsTest, TellsNameDescriptionAndFlagsWithoutAnInstance) {
     flag = 0xFFFFFFFF;
     EXPECT_EQ(NP_GetValue(nullptr, NPPVpluginNeedsXEmbed, &flag), NPERR_NO_ERROR);
     EXPECT_EQ(flag, 0U);
+}
+
+TEST_F(EntryPointsTest, TheExportTakesItsFirstArgumentAsTheInstance) {
+    const EmbeddedObject manager = browser.embed(kManagerType);
+    NPObject* object = nullptr;
+    EXPECT_EQ(NP_GetValue(manager.npp(), NPPVpluginScriptableNPObject, &object), NPERR_NO_ERROR);
+    EXPECT_EQ(ObjectRef::adopt(object), manager.scriptObject());
+    const char* text = nullptr;
+    EXPECT_EQ(NP_GetValue(manager.npp(), NPPVpluginNameString, &text), NPERR_NO_ERROR);
+    EXPECT_STREQ(text, "TELIX Scriptable Plugin");
+    manager.destroy();
+    text = nullptr;
+    EXPECT_EQ(NP_GetValue(manager.npp(), NPPVpluginNameString, &text), NPERR_GENERIC_ERROR);
+    EXPECT_EQ(text, nullptr);
 }
 
 TEST_F(EntryPointsTest, RefusesEveryOtherVariableAndWritesNothing) {
@@ -345,6 +366,31 @@ TEST_F(EntryPointsTest, AnUnknownTypeIsNoErrorAndGivesNoModel) {
         const EmbeddedObject object = browser.embed(type);
         EXPECT_EQ(object.error(), NPERR_NO_ERROR) << type;
         EXPECT_EQ(object.model(), nullptr) << type;
+    }
+}
+
+TEST_F(EntryPointsTest, ANullNameOrValueOfAnAttributeIsPassedOver) {
+    for (const char* type : {"application/oipfcapabilities", "application/oipfdrmagent"}) {
+        NPP_t npp{};
+        std::string mime = type;
+        std::string id = "id";
+        std::string last = "last";
+        char* names[] = {nullptr, id.data(), id.data()};
+        char* values[] = {id.data(), nullptr, last.data()};
+        EXPECT_EQ(browser.plugin().newp(mime.data(), &npp, NP_EMBED, 3, names, values, nullptr),
+                  NPERR_NO_ERROR);
+        ASSERT_NE(npp.pdata, nullptr) << type;
+        EXPECT_EQ(static_cast<PluginBase*>(npp.pdata)->getId(), "last") << type;
+        EXPECT_EQ(browser.plugin().destroy(&npp, nullptr), NPERR_NO_ERROR);
+        browser.pump();
+    }
+}
+
+TEST_F(EntryPointsTest, ARelativeAddressIsResolvedWhileTheInstanceIsMade) {
+    for (const char* name : {"src", "src1", "data", "SRC"}) {
+        const EmbeddedObject object = browser.embed("application/oipfcapabilities", {{name, "clip.mp4"}});
+        EXPECT_EQ(static_cast<PluginBase*>(object.model())->getURL(), "http://page.example/app/clip.mp4")
+            << name;
     }
 }
 

@@ -206,4 +206,135 @@ TEST_F(PageScriptsTest, LogsUnderCommon) {
               logLine("COMMON", "getEncodedURL", "Script:--  " + getEncodedURL("u") + " ----\n"));
 }
 
+// With PLUGIN_ESCAPE_EVENTS
+
+class EscapedPageScripts : public BorderTest {
+protected:
+    EscapedPageScripts() { setenv("PLUGIN_ESCAPE_EVENTS", "1", 1); }
+    ~EscapedPageScripts() override { unsetenv("PLUGIN_ESCAPE_EVENTS"); }
+
+    // What a page reads in a literal, by ECMAScript 5.1, section 7.8.4; "unterminated" if it is none.
+    static std::string readBack(const std::string& literal) {
+        std::string result;
+        for (size_t i = 0; i < literal.size(); ++i) {
+            const auto c = static_cast<unsigned char>(literal[i]);
+            if (c == '"' || c == '\'' || c == '\n' || c == '\r') {
+                return "unterminated";
+            }
+            if (c != '\\') {
+                result += static_cast<char>(c);
+                continue;
+            }
+            const char escape = literal.at(++i);
+            if (escape == 'x') {
+                result += static_cast<char>(std::stoi(literal.substr(i + 1, 2), nullptr, 16));
+                i += 2;
+            } else if (escape == 'u') {
+                const int value = std::stoi(literal.substr(i + 1, 4), nullptr, 16);
+                result +=
+                    {static_cast<char>(0xE0 | value >> 12), static_cast<char>(0x80 | (value >> 6 & 0x3F)),
+                     static_cast<char>(0x80 | (value & 0x3F))};
+                i += 4;
+            } else {
+                result += escape;
+            }
+        }
+        return result;
+    }
+};
+
+TEST_F(EscapedPageScripts, EveryCharacterIsReadBackAsItWas) {
+    std::string all;
+    for (int c = 1; c < 128; ++c) {
+        all += static_cast<char>(c);
+    }
+    all += "\xC3\xA4\xE2\x82\xAC\xE2\x80\xA7\xE2\x80\xA8\xE2\x80\xA9\xE2\x80\xAA\xF0\x9F\x93\xBA";
+    const std::string literal = literalText(all);
+    EXPECT_EQ(readBack(literal), all);
+    // Neither line separator stands in the script as it is: they end a literal too.
+    EXPECT_THAT(literal, AllOf(HasSubstr("\\u2028\\u2029"), Not(HasSubstr("\xE2\x80\xA8")),
+                               Not(HasSubstr("\xE2\x80\xA9"))));
+}
+
+TEST_F(EscapedPageScripts, AByteThatIsNotUTF8BecomesAReplacementCharacter) {
+    const std::string replacement = "\xEF\xBF\xBD";
+    EXPECT_EQ(literalText("a\xFF"
+                          "b"),
+              "a" + replacement + "b");
+    EXPECT_EQ(literalText("\xC3"), replacement);
+    EXPECT_EQ(literalText("\x80z"), replacement + "z");
+    EXPECT_EQ(literalText("\xC0\x80"), replacement + replacement);                   // overlong
+    EXPECT_EQ(literalText("\xED\xA0\x80"), replacement + replacement + replacement); // a surrogate
+    EXPECT_EQ(literalText("\xC3\xA4\xC3"), "\xC3\xA4" + replacement);
+}
+
+TEST_F(EscapedPageScripts, HoldsInEveryScriptAndForEveryArgument) {
+    const std::string quoted = "a\"b'c\\d";
+    const std::string escaped = "a\\\"b\\'c\\\\d";
+    EXPECT_EQ(domEventScript(quoted, quoted, true, false),
+              "var objElement=document.getElementById(\"" + escaped +
+                  "\"); newEvent=document.createEvent(\"Event\");newEvent.initEvent(\"" + escaped +
+                  "\", true,false); objElement.dispatchEvent(newEvent);");
+    EXPECT_EQ(
+        streamEventScript(quoted, "22275C0A07E2", quoted, quoted),
+        "var objElement = document.getElementById(\"" + escaped +
+            "\"); var strEvent = document.createEvent('Event'); "
+            "strEvent.initEvent('StreamEvent', false, false); strEvent.name = \"" +
+            escaped +
+            "\"; strEvent.data = \"22275C0A07E2\";  strEvent.text = \"\\\"\\'\\\\\\x0a\\x07\xEF\xBF\xBD\";  "
+            "strEvent.status = \"" +
+            escaped + "\"; objElement.dispatchEvent(strEvent);");
+    EXPECT_THAT(streamEventScript("n", quoted, "s", "tv"),
+                HasSubstr("strEvent.data = \"" + escaped + "\"; "));
+    EXPECT_THAT(parseStreamEventXMLScript(quoted, quoted, quoted, true),
+                AllOf(StartsWith("var requestURL = '" + escaped + "'; var eventName = '" + escaped + "';"),
+                      HasSubstr("document.getElementById('" + escaped + "');")));
+    EXPECT_THAT(getPlayCountVal(quoted), HasSubstr("getElementById(\"" + escaped + "\");"));
+    EXPECT_THAT(getEncodedURL(quoted), HasSubstr("encodeURI(\"" + escaped + "\");"));
+}
+
+TEST_F(EscapedPageScripts, StringsThatNeedNoEscapeLeaveTheScriptsAsTheyAre) {
+    const std::string escaped = streamEventScript("name", "4142", "trigger", "tv");
+    unsetenv("PLUGIN_ESCAPE_EVENTS");
+    EXPECT_EQ(escaped, streamEventScript("name", "4142", "trigger", "tv"));
+}
+
+TEST_F(EscapedPageScripts, AnEmptyValueAndZeroAreAsNoneAtAll) {
+    for (const char* value : {"", "0"}) {
+        setenv("PLUGIN_ESCAPE_EVENTS", value, 1);
+        EXPECT_EQ(literalText("\"\xFF"), "\"\xFF") << '"' << value << '"';
+    }
+    for (const char* value : {"1", "00", "no"}) {
+        setenv("PLUGIN_ESCAPE_EVENTS", value, 1);
+        EXPECT_EQ(literalText("\""), "\\\"") << value;
+    }
+}
+
+TEST_F(EscapedPageScripts, AnApplicationsURLIsEscapedToo) {
+    const EmbeddedObject manager = browser.embed("application/oipfapplicationmanager");
+    const ObjectRef application = manager.call("getOwnerApplication", browser.document()).object();
+    browser.whenEvaluating("window.createHbbTVApplication('http://a.example/?q=\\'x\\'');").gives(true);
+    EXPECT_TRUE(application.call("createApplication", "http://a.example/?q='x'", false).value.isObject());
+}
+
+TEST_F(EscapedPageScripts, AStreamEventWithQuotesReachesThePage) {
+    TELIX_JS_VB_STREAM_EVENT_CB callback = nullptr;
+    platform.TELIX_JS_VB_GetHandle = [](TELIX_JS_VB_HANDLE* handle) {
+        *handle = 7;
+        return 0;
+    };
+    platform.TELIX_JS_VB_RegisterStreamEvent = [&](TELIX_JS_VB_HANDLE, TELIX_JS_VB_STREAM_EVENT_CB given,
+                                                   const char*, const char*, const char*) {
+        callback = given;
+        return 0;
+    };
+    const EmbeddedObject object = browser.embed("video/broadcast", {{"id", "tv"}});
+    object.call("addStreamEventListener", "dvb://1", "goal", "5", "7");
+    const auto bytes = [](const char* text) { return reinterpret_cast<___UINT8*>(const_cast<char*>(text)); };
+    callback(7, nullptr, nullptr, bytes("\"; alert(1); \""), bytes("22"), 2, bytes("trigger"));
+    browser.pump();
+    EXPECT_THAT(browser.eventTypes(), ::testing::ElementsAre("StreamEvent"));
+    EXPECT_THAT(browser.lastScript(), HasSubstr("strEvent.name = \"\\\"; alert(1); \\\"\"; "));
+}
+
 } // namespace

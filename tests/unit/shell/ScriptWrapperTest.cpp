@@ -31,7 +31,12 @@ public:
     uint32_t highNumber() { return 0x80000000U; }
     double weight() { return 2.5; }
     std::string label() { return m_label; }
-    void setLabel(const std::string& label) { m_label = label; }
+    void setLabel(const std::string& label) {
+        m_label = label;
+        if (onLabel) {
+            onLabel();
+        }
+    }
     NPObject* listener() { return handOut(m_listener); }
     void setListener(NPObject* listener) { replaceListener(m_listener, listener); }
     uint32_t length() { return static_cast<uint32_t>(items.size()); }
@@ -44,6 +49,7 @@ public:
     NPObject* echo(NPObject* object) { return handOut(object); }
 
     static inline int alive = 0;
+    static inline std::function<void()> onLabel;
     static inline std::vector<NPObject*> items;
 
 private:
@@ -142,6 +148,41 @@ TEST_F(ScriptWrapperTest, TheWrapperOfAnEmbeddedObjectLogsItsDestructorToo) {
 
 TEST_F(ScriptWrapperTest, TheWrapperOfNullIsNull) {
     EXPECT_EQ(wrapperOf<JSShelf>(nullptr), nullptr);
+}
+
+TEST_F(ScriptWrapperTest, TheWrapperOfAnObjectOfAnotherClassIsNull) {
+    const ScriptObject plain = browser.scriptObject("plain");
+    const EmbeddedObject manager = browser.embed("application/oipfparentalcontrolmanager");
+    EXPECT_EQ(wrapperOf<JSShelf>(plain.object()), nullptr);
+    EXPECT_EQ(wrapperOf<JSShelf>(manager.scriptObject().object()), nullptr);
+    EXPECT_NE(wrapperOf<JSShelf>(shelf.object()), nullptr);
+}
+
+// A browser that frees an object while a call into it is under way: the object stays until the outermost call
+// returns.
+TEST_F(ScriptWrapperTest, AWrapperOutlivesTheCallsIntoIt) {
+    NPClass* record = JSPluginBase::classOf<JSShelf>();
+    NPObject* object = record->allocate(tv.npp(), record);
+    object->_class = record;
+    object->referenceCount = 1;
+    const int before = Shelf::alive;
+    const ArgumentArray label({Value("text")});
+    NPVariant result{};
+    int calls = 0;
+    Shelf::onLabel = [&] {
+        if (++calls == 1) {
+            record->setProperty(object, Name("label").identifier(), label.data());
+            record->invoke(object, Name("clear").identifier(), label.data(), 0, &result);
+            EXPECT_EQ(Shelf::alive, before) << "an inner call has ended it";
+        } else {
+            record->deallocate(object);
+            EXPECT_EQ(Shelf::alive, before);
+        }
+    };
+    EXPECT_TRUE(record->setProperty(object, Name("label").identifier(), label.data()));
+    Shelf::onLabel = nullptr;
+    EXPECT_EQ(calls, 2);
+    EXPECT_EQ(Shelf::alive, before - 1);
 }
 
 TEST_F(ScriptWrapperTest, NamesAreInternedOnceInTheOrderOfTheTable) {

@@ -253,7 +253,7 @@ TEST_F(BroadcastEventTest, AnEventForAReplacedObjectIsLoggedAsOneForAnInvalidIns
                                       "object. isValidInst: 0\n")));
 }
 
-TEST_F(BroadcastEventTest, ADomListenerMayPutAnotherObjectAtTheSameAddress) {
+TEST_F(BroadcastEventTest, ADomListenerMayPutAnotherObjectInItsPlace) {
     const EmbeddedObject other = embed("other");
     const SameAddress place(sizeof(VideoBroadcast));
     const EmbeddedObject first = ready("onFullScreenChange");
@@ -261,13 +261,13 @@ TEST_F(BroadcastEventTest, ADomListenerMayPutAnotherObjectAtTheSameAddress) {
     browser.onEvent("FullScreenChange", [&](const DomEvent&) {
         first.destroy();
         second = std::make_unique<EmbeddedObject>(ready("onFullScreenChange"));
-        ASSERT_EQ(second->model(), place.address());
+        ASSERT_NE(second->model(), place.address()); // where the first one still stands for its event
     });
     fire([&] { callbacks.fullScreenChange(8); });
     EXPECT_EQ(handler.count(), 0U);
 }
 
-TEST_F(BroadcastEventTest, AHandlerMayPutAnotherObjectAtTheSameAddress) {
+TEST_F(BroadcastEventTest, AHandlerMayPutAnotherObjectInItsPlace) {
     const EmbeddedObject other = embed("other");
     const SameAddress place(sizeof(VideoBroadcast));
     const EmbeddedObject first = ready("onPlayStateChange");
@@ -275,7 +275,7 @@ TEST_F(BroadcastEventTest, AHandlerMayPutAnotherObjectAtTheSameAddress) {
     handler.does([&](const Values&) {
         first.destroy();
         second = std::make_unique<EmbeddedObject>(embed());
-        EXPECT_EQ(second->model(), place.address());
+        EXPECT_NE(second->model(), place.address());
         modelOf(*second).setActive(true);
         return undefined;
     });
@@ -460,6 +460,32 @@ TEST_F(BroadcastEventTest, AFailedChangeOfChannelBringsChannelAndError) {
     leftBehind("JSChannel");
 }
 
+TEST_F(BroadcastEventTest, AFailedChangeOfChannelBringsAnyErrorAsANumber) {
+    const EmbeddedObject vb = ready("onChannelChangeError");
+    fire([&] { callbacks.channelChangeError(7, 11, TELIX_ERR_STATE_NONE); });
+    ASSERT_EQ(handler.count(), 1U);
+    EXPECT_EQ(handler.last()[1],
+              Value(static_cast<int>(TELIX_ERR_STATE_NONE))); // unlike that of a play state
+    anythingMayBeLeft();
+}
+
+TEST_F(BroadcastEventTest, AHandlerThatADomListenerClearsIsNotCalled) {
+    const EmbeddedObject vb = ready("onFullScreenChange");
+    browser.onEvent("FullScreenChange", [&](const DomEvent&) { vb.set("onFullScreenChange", nullptr); });
+    fire([&] { callbacks.fullScreenChange(7); });
+    EXPECT_EQ(browser.eventTypes(), std::vector<std::string>{"FullScreenChange"});
+    EXPECT_EQ(handler.count(), 0U);
+}
+
+TEST_F(BroadcastEventTest, AHandlerIsCalledAlsoIfTheDomEventCouldNotBeDispatched) {
+    const EmbeddedObject vb = ready("onFullScreenChange");
+    browser.whenEvaluatingTextFrom("var objElement=").throws();
+    fire([&] { callbacks.fullScreenChange(7); });
+    EXPECT_THAT(browser.eventTypes(), IsEmpty());
+    EXPECT_EQ(handler.count(), 1U);
+    leftBehind(handler);
+}
+
 TEST_F(BroadcastEventTest, EventsChangeNoneOfWhatTheObjectHolds) {
     const EmbeddedObject vb = ready();
     platform.TELIX_JS_VB_GetCurrentChannel = [](TELIX_JS_VB_HANDLE, TELIX_JS_CM_HANDLE* channel) {
@@ -622,6 +648,16 @@ TEST_F(BroadcastEventTest, ARatingErrorCallsTheHandlerOfTheChange) {
     EXPECT_EQ(handler.last()[2], Value("drm"));
     EXPECT_EQ(error.count(), 0U);
     EXPECT_EQ(error.pluginReferences(), 1);
+    anythingMayBeLeft();
+}
+
+TEST_F(BroadcastEventTest, MissingTextsOfARatingErrorAreNull) {
+    programmesHaveRatings();
+    const EmbeddedObject vb = ready("onParentalRatingChange");
+    fire([&] { callbacks.parentalRatingError(7, nullptr, 61, nullptr); });
+    ASSERT_EQ(handler.count(), 1U);
+    EXPECT_EQ(handler.last()[0], Value(nullptr));
+    EXPECT_EQ(handler.last()[2], Value(nullptr));
     anythingMayBeLeft();
 }
 

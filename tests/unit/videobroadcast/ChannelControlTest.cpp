@@ -268,6 +268,16 @@ TEST_F(ChannelControlTest, ARefusedStepChangesNothing) {
     EXPECT_EQ(ccid(channel), "11");
 }
 
+TEST_F(ChannelControlTest, AStepThatSucceedsWithoutAChannelEmptiesTheObjectThatThePageHolds) {
+    const EmbeddedObject vb = embed();
+    const ObjectRef channel = vb.get("currentChannel").object();
+    EXPECT_EQ(ccid(channel), "11");
+    platform.TELIX_JS_VB_NextChannel = [](TELIX_JS_VB_HANDLE, TELIX_JS_CM_HANDLE*) { return 0; };
+    EXPECT_TRUE(vb.call("nextChannel"));
+    EXPECT_EQ(channel.get("ccid"), Value(nullptr));
+    EXPECT_EQ(channel.get("channelType"), 3);
+}
+
 TEST_F(ChannelControlTest, AStepWithNoObjectToResetDoesNothingFurther) {
     const EmbeddedObject vb = embed();
     platform.TELIX_JS_VB_GetCurrentChannel = [](TELIX_JS_VB_HANDLE, TELIX_JS_CM_HANDLE*) { return 1; };

@@ -474,6 +474,29 @@ TEST_F(JSVideoBroadcastTest, AnyArgumentWithAValueIsTakenAsUnselectedAndOnlyAnOb
     EXPECT_THAT(platformCalls(), IsEmpty());
 }
 
+TEST_F(JSVideoBroadcastTest, AnObjectOfAnotherClassIsRefusedWhereAChannelOrAComponentIsTaken) {
+    const EmbeddedObject vb = ready();
+    const ObjectRef component = this->component(vb, 55, 1);
+    const ObjectRef channel = this->channel(vb, 3);
+    const ScriptObject plain = browser.scriptObject("plain");
+    const EmbeddedObject capabilities = browser.embed("application/oipfcapabilities");
+    for (const ObjectRef& other :
+         {ObjectRef(plain), component, vb.scriptObject(), capabilities.scriptObject()}) {
+        EXPECT_FALSE(vb.call("setChannel", other).succeeded) << other;
+        EXPECT_FALSE(vb.call("setChannel", other, true).succeeded) << other;
+    }
+    for (const ObjectRef& other :
+         {ObjectRef(plain), channel, vb.scriptObject(), capabilities.scriptObject()}) {
+        EXPECT_FALSE(vb.call("selectComponent", other).succeeded) << other;
+        EXPECT_FALSE(vb.call("unselectComponent", other).succeeded) << other;
+    }
+    EXPECT_EQ(platform.TELIX_JS_VB_SetChannel.count(), 0U);
+    EXPECT_EQ(platform.TELIX_JS_VB_SelectComponent.count(), 0U);
+    EXPECT_EQ(platform.TELIX_JS_VB_UnselectComponent.count(), 0U);
+    EXPECT_TRUE(vb.call("setChannel", channel));
+    EXPECT_TRUE(vb.call("selectComponent", component));
+}
+
 TEST_F(JSVideoBroadcastTest, WhatIsNoObjectToUnselectIsLoggedAndNothingElse) {
     const std::string text = logOf(6, [&] { ready().call("unselectComponent", 5); });
     EXPECT_THAT(text, HasSubstr(logLine("VIDEOBCAST", "unSelectComponent", "AVCompObj: 0x5 \n")));

@@ -136,6 +136,11 @@ TEST_F(StreamEventTest, ATagOfAPageThatIsNotHttpStaysAsItCame) {
     EXPECT_EQ(tagFor("events.xml", "31"), "31");
 }
 
+TEST_F(StreamEventTest, ATagStaysAsItCameIfThePagesAddressCannotBeHad) {
+    browser.whenEvaluating("document.location.href").throws();
+    EXPECT_EQ(tagFor("events.xml", "31"), "31");
+}
+
 TEST_F(StreamEventTest, AnEmptyAddressLeavesTheTagAloneWithoutAskingThePage) {
     EXPECT_EQ(tagFor("", "31"), "31");
     EXPECT_EQ(log.count("NPN_Evaluate"), 0U);

@@ -163,6 +163,38 @@ TEST_F(VideoBroadcastTest, TheFirstObjectRegistersForAllAndTheLastOneUnregisters
     EXPECT_FALSE(VideoBroadcast::callbacksRegistered());
 }
 
+TEST_F(VideoBroadcastTest, RefusedRegistrationsCountAsMadeAndAreTakenBackAtTheEnd) {
+    const auto refuse = [](auto...) { return 1; };
+    platform.TELIX_JS_VB_RegisterOnFullScreenChange = refuse;
+    platform.TELIX_JS_VB_RegisterOnChannelChangeSucceeded = refuse;
+    platform.TELIX_JS_VB_RegisterOnProgrammesChanged = refuse;
+    const EmbeddedObject first = embed();
+    EXPECT_TRUE(VideoBroadcast::callbacksRegistered());
+    EXPECT_EQ(platform.TELIX_JS_VB_RegisterOnParentalRatingError.count(), 1U);
+    const EmbeddedObject second = embed("second");
+    EXPECT_EQ(platform.TELIX_JS_VB_RegisterOnFullScreenChange.count(), 1U);
+    first.destroy();
+    second.destroy();
+    EXPECT_EQ(platform.TELIX_JS_VB_UnRegisterOnFullScreenChange.count(), 1U);
+    EXPECT_EQ(platform.TELIX_JS_VB_UnRegisterOnParentalRatingError.count(), 1U);
+}
+
+TEST_F(VideoBroadcastTest, AnObjectWithHandleRegistersAlsoAfterAFirstOneWithout) {
+    const EmbeddedObject first = embedWithoutHandle();
+    EXPECT_FALSE(VideoBroadcast::callbacksRegistered());
+    platform.TELIX_JS_VB_GetHandle = [](TELIX_JS_VB_HANDLE* handle) {
+        *handle = 9;
+        return 0;
+    };
+    log.clear();
+    const EmbeddedObject second = embed("second");
+    EXPECT_TRUE(log.contains("TELIX_JS_VB_RegisterOnProgrammesChanged(9, callback)")) << log.text();
+    second.destroy();
+    EXPECT_TRUE(VideoBroadcast::callbacksRegistered()); // the first is still listed
+    first.destroy();
+    EXPECT_FALSE(VideoBroadcast::callbacksRegistered());
+}
+
 TEST_F(VideoBroadcastTest, AnObjectAfterTheLastOneRegistersAnewWithItsOwnHandle) {
     embed().destroy();
     log.clear();
@@ -356,6 +388,18 @@ TEST_F(VideoBroadcastTest, TwoWritesInARowMakeOnePlatformCallWithTheLast) {
     EXPECT_THAT(platformCalls(), ElementsAre("TELIX_JS_VB_SetWidth(7, 800)", "TELIX_JS_VB_SetHeight(7, 2)"));
 }
 
+TEST_F(VideoBroadcastTest, ASizeThatIsWrittenAndWrittenBackInOneTurnIsNotApplied) {
+    const EmbeddedObject vb = embed();
+    vb.set("width", 640);
+    browser.pump();
+    log.clear();
+    vb.set("width", 800);
+    vb.set("width", 640);
+    browser.pump();
+    EXPECT_THAT(platformCalls(), IsEmpty());
+    EXPECT_EQ(vb.get("width"), 640);
+}
+
 TEST_F(VideoBroadcastTest, AWidthOfZeroOnAnUnknownWidthIsNotAppliedAndIsAskedForLater) {
     const EmbeddedObject vb = embed();
     log.clear();
@@ -451,6 +495,21 @@ TEST_F(VideoBroadcastTest, FullScreenIsAskedForAtEachRead) {
     };
     EXPECT_EQ(vb.get("fullScreen"), true);
     EXPECT_EQ(platform.TELIX_JS_VB_IsFullScreen.count(), 2U);
+}
+
+TEST_F(VideoBroadcastTest, AStateOfFullScreenThatWasReadNeedsNoChangeAndPlacesThePicture) {
+    const EmbeddedObject vb = embed();
+    platform.TELIX_JS_VB_IsFullScreen = [](TELIX_JS_VB_HANDLE, ___UINT8* on) {
+        *on = 1;
+        return 0;
+    };
+    EXPECT_EQ(vb.get("fullScreen"), true);
+    log.clear();
+    EXPECT_TRUE(vb.call("setFullScreen", true));
+    EXPECT_THAT(platformCalls(), IsEmpty());
+    vb.setRectangle(10, 20, 110, 220);
+    vb.setWindow(0, 0, 0, 0);
+    EXPECT_TRUE(log.contains("TELIX_JS_VB_SetDisplayArea(7, {0,0,1280,720})")) << log.text();
 }
 
 TEST_F(VideoBroadcastTest, AReadOfFullScreenIsLogged) {
@@ -671,6 +730,20 @@ TEST_F(VideoBroadcastTest, AnElementThatTellsNoRectangleKeepsTheFormerOne) {
     log.clear();
     vb.setWindow(0, 0, 0, 0);
     EXPECT_THAT(platformCalls(), IsEmpty());
+}
+
+TEST_F(VideoBroadcastTest, AnElementWhoseRectangleIsNoObjectKeepsTheFormerOne) {
+    const EmbeddedObject vb = embed();
+    vb.setRectangle(10, 20, 110, 220);
+    vb.setWindow(0, 0, 0, 0);
+    log.clear();
+    for (const Value& other :
+         {Value(undefined), Value(nullptr), Value(true), Value(7), Value(5e-310), Value("text")}) {
+        vb.element().method("getBoundingClientRect", [other](const Values&) { return other; });
+        vb.setWindow(0, 0, 0, 0);
+    }
+    EXPECT_THAT(platformCalls(), IsEmpty());
+    EXPECT_THAT(log.startingWith("NPN_GetProperty"), IsEmpty());
 }
 
 TEST_F(VideoBroadcastTest, AnEdgeThatCannotBeReadKeepsItsFormerValue) {

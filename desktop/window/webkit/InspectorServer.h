@@ -1,0 +1,15 @@
+// The server of the engine's remote inspector.
+#ifndef TELIX_DESKTOP_WINDOW_WEBKIT_INSPECTORSERVER_H
+#define TELIX_DESKTOP_WINDOW_WEBKIT_INSPECTORSERVER_H
+
+#include <string>
+
+namespace desktop {
+
+// Lets the engine serve its inspector at `hostAndPort`, HOST:PORT. Returns the reason why it cannot; empty if
+// it can. Must be called before the first context of the engine is made. Blocks while the name is resolved.
+std::string serveInspector(const std::string& hostAndPort);
+
+} // namespace desktop
+
+#endif
