@@ -89,7 +89,7 @@ std::shared_ptr<FrameRingMemory> FrameRingMemory::map(int descriptor, const char
         reason = "cannot be mapped";
         return nullptr;
     }
-    const std::shared_ptr<FrameRingMemory> memory(new FrameRingMemory(address, slotSize));
+    std::shared_ptr<FrameRingMemory> memory(new FrameRingMemory(address, slotSize));
     if (memory->header().magic != FrameRingHeader::kMagic) {
         reason = "not a frame ring";
         return nullptr;

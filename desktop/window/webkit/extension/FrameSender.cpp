@@ -4,8 +4,8 @@
 #include <gio/gunixfdlist.h>
 #include <webkit2/webkit-web-extension.h>
 
-#include "desktop/window/frames/FrameRing.h"
 #include "desktop/window/frames/FramePublisher.h"
+#include "desktop/window/frames/FrameRing.h"
 
 namespace desktop {
 
