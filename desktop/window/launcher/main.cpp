@@ -48,7 +48,7 @@ std::string selectEngine(const std::string& wanted) {
 
 int main(int argc, char* argv[]) {
     std::setlocale(LC_ALL, "");
-    const auto wanted = desktop::engineOption({argv, argv + argc});
+    const auto wanted = desktop::earlyOptions({argv, argv + argc}).engine;
     const std::string engine = desktop::selectEngine(wanted);
     if (engine.empty()) {
         return desktop::kExitBadInput;

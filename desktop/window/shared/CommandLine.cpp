@@ -312,10 +312,13 @@ std::optional<int> readCommandLine(const std::vector<std::string>& arguments, co
     return std::nullopt;
 }
 
-std::string engineOption(const std::vector<std::string>& arguments) {
+EarlyOptions earlyOptions(const std::vector<std::string>& arguments) {
     Values values;
     Parser parser(values, "");
-    return parser.parse(arguments).empty() && values.engine ? values.engine : "";
+    if (!parser.parse(arguments).empty()) {
+        return {};
+    }
+    return {values.engine ? values.engine : "", values.inspectorServer ? values.inspectorServer : ""};
 }
 
 } // namespace desktop

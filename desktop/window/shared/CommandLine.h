@@ -48,9 +48,13 @@ struct CommandLine {
 std::optional<int> readCommandLine(const std::vector<std::string>& arguments, const EngineInformation& engine,
                                    CommandLine& commandLine);
 
-// The value of --engine; empty if it is not given, or if the arguments cannot be parsed, which
-// readCommandLine() reports.
-std::string engineOption(const std::vector<std::string>& arguments);
+// What must be known before an engine is there. Empty strings if the options are not given, or if the
+// arguments cannot be parsed, which readCommandLine() reports.
+struct EarlyOptions {
+    std::string engine;
+    std::string inspectorServer;
+};
+EarlyOptions earlyOptions(const std::vector<std::string>& arguments);
 
 } // namespace desktop
 

@@ -7,7 +7,7 @@
 namespace desktop {
 
 // Lets the engine serve its inspector at `hostAndPort`, HOST:PORT. Returns the reason why it cannot; empty if
-// it can. Must be called before the first context of the engine is made. Blocks while the name is resolved.
+// it can. Must be called before any function of the engine is called. Blocks while the name is resolved.
 std::string serveInspector(const std::string& hostAndPort);
 
 } // namespace desktop

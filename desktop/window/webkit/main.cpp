@@ -104,13 +104,6 @@ int runBrowser(const CommandLine& commandLine) {
         printError("cannot load " + commandLine.page + ": " + error);
         return kExitBadInput;
     }
-    if (!commandLine.inspectorServer.empty()) {
-        const std::string serverError = serveInspector(commandLine.inspectorServer);
-        if (!serverError.empty()) {
-            printError("--inspector-server " + commandLine.inspectorServer + ": " + serverError);
-            return kExitBadInput;
-        }
-    }
     const Profile profile;
     if (!profile.failure().empty()) {
         printError(profile.failure());
@@ -135,11 +128,18 @@ int main(int argc, char* argv[]) {
     // The settings of the desktop are not the television's, and their service leaves a folder.
     g_setenv("GSETTINGS_BACKEND", "memory", TRUE);
     g_set_prgname("telix-tv");
+    // Before the engine's first function, which reads the settings of the server.
+    const std::string server = desktop::earlyOptions({argv, argv + argc}).inspectorServer;
+    const std::string serverError = server.empty() ? "" : desktop::serveInspector(server);
     desktop::CommandLine commandLine;
     // --help and usage errors need no display.
     if (const auto exitStatus =
             desktop::readCommandLine({argv, argv + argc}, desktop::engineInformation(), commandLine)) {
         return *exitStatus;
+    }
+    if (!serverError.empty()) {
+        desktop::printError("--inspector-server " + server + ": " + serverError);
+        return desktop::kExitBadInput;
     }
     return desktop::runBrowser(commandLine);
 }
