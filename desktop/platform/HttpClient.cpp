@@ -105,6 +105,9 @@ bool HttpClient::begin(const Request& request) {
     transfer.setString(CURLOPT_REFERER, identity.referer);
     transfer.setString(CURLOPT_COOKIE, identity.cookies);
     transfer.setString(CURLOPT_CAINFO, identity.certificates);
+    if (!identity.certificates.empty() || identity.acceptsAnyCertificate) {
+        transfer.set(CURLOPT_CAPATH, static_cast<const char*>(nullptr)); // not the system's as well
+    }
     transfer.set(CURLOPT_SSL_VERIFYPEER, identity.acceptsAnyCertificate ? 0L : 1L);
     transfer.set(CURLOPT_SSL_VERIFYHOST, identity.acceptsAnyCertificate ? 0L : 2L);
     if (request.begin > 0 || request.end) {
