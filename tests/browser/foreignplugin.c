@@ -15,10 +15,16 @@ static NPError rejectInstance(NPMIMEType type, NPP instance, uint16_t mode, int1
     return NPERR_GENERIC_ERROR;
 }
 
+static NPError destroyInstance(NPP instance, NPSavedData** saved) {
+    (void)instance, (void)saved;
+    return NPERR_NO_ERROR;
+}
+
 NPError NP_Initialize(NPNetscapeFuncs* browser, NPPluginFuncs* plugin) {
     (void)browser;
     plugin->version = NP_VERSION_MINOR;
     plugin->newp = rejectInstance;
+    plugin->destroy = destroyInstance;
     return NPERR_NO_ERROR;
 }
 

@@ -97,7 +97,7 @@ class Server(http.server.BaseHTTPRequestHandler):
         self.send_response(200 if self.path == '/page' else 404)
         self.send_header('Content-Type', 'text/html')
         self.end_headers()
-        self.wfile.write(b'<title>served</title><script>console.log("served")</script>')
+        self.wfile.write(b'<title>served</title><script>function say() { console.log("served"); } say();</script>')
 
     def log_message(self, *_):
         pass

@@ -85,6 +85,12 @@ class Pages(TelixTv):
         self.assertEqual(run.errors.splitlines(), [
             f'{page}:3: one', f"{page}:7: ReferenceError: Can't find variable: missing"], run)
 
+    def test_console_messages_outside_of_functions_have_the_place_that_the_engine_knows(self):
+        page = self.write('<script>console.log("one")</script>')
+        run = self.run_tv(page, '--eval', '1')
+        place = f'{page}:1' if os.environ.get('TELIX_ENGINE') == 'npapi' else 'page'
+        self.assertEqual(run.errors, f'{place}: one\n', run)
+
     def test_console_messages_of_a_served_page_come_with_its_address(self):
         with server() as url:
             run = self.run_tv(url + '/page', '--eval', '1')

@@ -26,10 +26,11 @@ namespace desktop {
 namespace {
 
 EngineInformation engineInformation() {
-    return {std::string("QtWebKit " QTWEBKIT_VERSION_STR ", Qt ") + qVersion(),
-            QStringLiteral("Mozilla/5.0 (X11; Linux) AppleWebKit/%1 (KHTML, like Gecko) Safari/%1")
-                .arg(qWebKitVersion())
-                .toStdString()};
+    return {std::string("QtWebKit " QTWEBKIT_VERSION_STR ", Qt ") + qVersion(), [] {
+                return QStringLiteral("Mozilla/5.0 (X11; Linux) AppleWebKit/%1 (KHTML, like Gecko) Safari/%1")
+                    .arg(qWebKitVersion())
+                    .toStdString();
+            }};
 }
 
 void configureEngine(const PluginFile& plugin, const PluginFolder& folder, bool inspect) {
@@ -134,6 +135,8 @@ int runBrowser(const CommandLine& commandLine, char** argv) {
 
 int main(int argc, char* argv[]) {
     std::setlocale(LC_ALL, "");
+    // The settings of the desktop are not the television's, and their service leaves a folder.
+    g_setenv("GSETTINGS_BACKEND", "memory", TRUE);
     desktop::CommandLine commandLine;
     // --help and usage errors need no display.
     if (const auto exitStatus =

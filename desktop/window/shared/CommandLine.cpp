@@ -83,10 +83,11 @@ struct Values {
 // The descriptions that are made at run time, and the parser.
 class Parser {
 public:
-    Parser(Values& values, const std::string& userAgent)
+    explicit Parser(Values& values)
         : m_keys("Press keys of the remote control: " + keyNames() + "."),
           m_plugin("The plug-in to load, default " + besideProgram(kPlugin) + "."),
-          m_userAgent("The user agent string, default " + userAgent + ".") {
+          m_userAgent(std::string("The user agent string, default that of the engine, followed by") +
+                      kHbbtvToken + ".") {
         m_context = g_option_context_new("URL-or-FILE");
         g_option_context_set_help_enabled(m_context, FALSE);
         g_option_context_set_summary(
@@ -287,9 +288,8 @@ std::optional<int> reject(const std::string& error) {
 
 std::optional<int> readCommandLine(const std::vector<std::string>& arguments, const EngineInformation& engine,
                                    CommandLine& commandLine) {
-    const std::string defaultUserAgent = engine.userAgent + kHbbtvToken;
     Values values;
-    Parser parser(values, defaultUserAgent);
+    Parser parser(values);
     const std::string parserError = parser.parse(arguments);
     if (!parserError.empty()) {
         return reject(parserError);
@@ -304,7 +304,7 @@ std::optional<int> readCommandLine(const std::vector<std::string>& arguments, co
     commandLine.fullscreen = values.fullscreen;
     commandLine.inspect = values.inspect;
     commandLine.plugin = values.plugin ? values.plugin : besideProgram(kPlugin);
-    commandLine.userAgent = values.userAgent ? values.userAgent : defaultUserAgent;
+    commandLine.userAgent = values.userAgent ? values.userAgent : engine.userAgent() + kHbbtvToken;
     commandLine.waitForPicture = values.waitForPicture;
     commandLine.waitFor = optional(values.waitFor);
     commandLine.eval = optional(values.eval);
@@ -314,7 +314,7 @@ std::optional<int> readCommandLine(const std::vector<std::string>& arguments, co
 
 EarlyOptions earlyOptions(const std::vector<std::string>& arguments) {
     Values values;
-    Parser parser(values, "");
+    Parser parser(values);
     if (!parser.parse(arguments).empty()) {
         return {};
     }

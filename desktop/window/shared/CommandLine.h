@@ -2,6 +2,7 @@
 #ifndef TELIX_DESKTOP_WINDOW_SHARED_COMMANDLINE_H
 #define TELIX_DESKTOP_WINDOW_SHARED_COMMANDLINE_H
 
+#include <functional>
 #include <optional>
 #include <string>
 #include <vector>
@@ -14,8 +15,8 @@ namespace desktop {
 struct EngineInformation {
     // The engine and its toolkit with their versions, for --version.
     std::string versions;
-    // The engine's own user agent string.
-    std::string userAgent;
+    // Returns the engine's own user agent string; empty without a display, which some engines need for it.
+    std::function<std::string()> userAgent;
 };
 
 struct CommandLine {

@@ -30,7 +30,8 @@ void printError(const std::string& message) {
 
 void printConsoleMessage(const std::string& source, int line, const std::string& text) {
     g_autofree char* file = g_filename_from_uri(source.c_str(), nullptr, nullptr);
-    std::fprintf(stderr, "%s:%d: %s\n", file ? file : source.c_str(), line, text.c_str());
+    const std::string place = line > 0 ? ':' + std::to_string(line) : "";
+    std::fprintf(stderr, "%s%s: %s\n", file ? file : source.c_str(), place.c_str(), text.c_str());
 }
 
 } // namespace desktop

@@ -19,8 +19,8 @@ constexpr int kExitSignalled = 128;
 // Writes `message` to standard error as one line that begins with the program's name.
 void printError(const std::string& message);
 
-// Writes a console message of a page to standard error as `source:line: text`. `source` is the URL of the
-// script; a file URL is printed as a path.
+// Writes a console message of a page to standard error as `source:line: text`, without the line if it is 0.
+// `source` is the URL of the script; a file URL is printed as a path.
 void printConsoleMessage(const std::string& source, int line, const std::string& text);
 
 // `text` with all white space, line ends included, reduced to single spaces, and none at the ends.

@@ -62,14 +62,19 @@ WebKitWebContext* newContext(const Profile& profile) {
 } // namespace
 
 EngineInformation engineInformation() {
-    g_autoptr(WebKitSettings) settings = webkit_settings_new();
     const auto version = [](unsigned major, unsigned minor, unsigned micro) {
         return std::to_string(major) + '.' + std::to_string(minor) + '.' + std::to_string(micro);
     };
     return {"WebKitGTK " +
                 version(webkit_get_major_version(), webkit_get_minor_version(), webkit_get_micro_version()) +
                 ", GTK " + version(gtk_get_major_version(), gtk_get_minor_version(), gtk_get_micro_version()),
-            webkit_settings_get_user_agent(settings)};
+            [] {
+                if (!gtk_init_check(nullptr, nullptr)) {
+                    return std::string();
+                }
+                g_autoptr(WebKitSettings) settings = webkit_settings_new();
+                return std::string(webkit_settings_get_user_agent(settings));
+            }};
 }
 
 Engine::Engine(const CommandLine& commandLine, const PluginFile& plugin, const Profile& profile,

@@ -14,15 +14,18 @@ namespace desktop {
 
 namespace {
 
-// Prints a console message of the engine, URL:LINE:COLUMN: CONSOLE KIND TEXT, if the line is one.
+// Prints a console message of the engine, URL:LINE:COLUMN: CONSOLE KIND TEXT, if the line is one. The engine
+// knows no place for what a script logs outside of its functions: the message then comes from "page".
 bool printAsConsoleMessage(const std::string& line) {
-    static const std::regex kMessage("(.*?):([0-9]+):[0-9]+: CONSOLE ((JS|SECURITY|NETWORK|CSS|DEBUG|INFO|"
-                                     "LOG|WARN|ERROR|TRACE|DIR|TABLE) )*(.*)");
+    static const std::regex kMessage(
+        "(?:(.*?):([0-9]+):[0-9]+|\\[native code\\]): CONSOLE "
+        "(?:(?:JS|SECURITY|NETWORK|CSS|DEBUG|INFO|LOG|WARN|ERROR|TRACE|DIR|TABLE) )*(.*)");
     std::smatch match;
     if (line.find(": CONSOLE ") == std::string::npos || !std::regex_match(line, match, kMessage)) {
         return false;
     }
-    printConsoleMessage(match[1], std::atoi(match[2].str().c_str()), match[5]);
+    const bool hasPlace = match[1].matched;
+    printConsoleMessage(hasPlace ? match[1].str() : "page", std::atoi(match[2].str().c_str()), match[3]);
     return true;
 }
 
