@@ -88,7 +88,7 @@ class Pages(TelixTv):
     def test_console_messages_outside_of_functions_have_the_place_that_the_engine_knows(self):
         page = self.write('<script>console.log("one")</script>')
         run = self.run_tv(page, '--eval', '1')
-        place = f'{page}:1' if os.environ.get('TELIX_ENGINE') == 'npapi' else 'page'
+        place = page if os.environ.get('TELIX_ENGINE') == 'npapi' else 'page'
         self.assertEqual(run.errors, f'{place}: one\n', run)
 
     def test_console_messages_of_a_served_page_come_with_its_address(self):
