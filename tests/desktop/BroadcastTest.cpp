@@ -266,36 +266,6 @@ ServicePresentation::Lateness latenessOf(Broadcast& broadcast) {
     return lateness.get_future().get();
 }
 
-// Waits until the last keyframe of the channels is some pictures old.
-bool waitForOldKeyframe(const std::function<void(bool isOld)>& onLook) {
-    size_t most = 0;
-    const uint64_t serial = takeShot().serial;
-    const auto kept = [] { return Broadcast::instance().state().keptPackets; };
-    const bool isMeasured = waitUntil([&] {
-        most = std::max(most, kept());
-        return takeShot().serial > serial + 50; // several keyframes
-    });
-    return isMeasured && waitUntil([&] {
-               const size_t now = kept();
-               const bool isOld = now > most * 6 / 10 && now < most * 9 / 10;
-               onLook(isOld);
-               return isOld;
-           });
-}
-
-TEST_F(BroadcastTest, ShowsAnotherChannelFromWhatItHasReceivedBefore) {
-    tune(m_channels[0]);
-    // A decoder keeps the first picture back until it has the second one.
-    ASSERT_TRUE(waitForOldKeyframe([](bool isOld) { testClock().freeze(isOld); }));
-    for (const TELIX_JS_CM_HANDLE channel : {m_channels[1], m_channels[2], m_channels[0]}) {
-        tune(channel); // not a single packet arrives meanwhile
-        EXPECT_TRUE(takeShot().visible);
-    }
-    testClock().freeze(false);
-    const uint64_t serial = takeShot().serial;
-    EXPECT_TRUE(waitUntil([&] { return takeShot().serial > serial + 20; }));
-}
-
 TEST_F(BroadcastTest, CatchesUpWithTheBroadcastAfterAChange) {
     tune(m_channels[0]);
     ASSERT_TRUE(waitUntil([] { return Broadcast::instance().state().keptPackets > 0; }));

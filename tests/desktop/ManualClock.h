@@ -3,7 +3,6 @@
 #define TELIX_TESTS_DESKTOP_MANUALCLOCK_H
 
 #include <algorithm>
-#include <atomic>
 #include <chrono>
 #include <condition_variable>
 #include <functional>
@@ -115,22 +114,12 @@ class BroadcastClock : public ManualClock {
 public:
     using ManualClock::ManualClock;
 
-    // While it is frozen, no packets are played out.
-    void freeze(bool isFrozen) { m_isFrozen = isFrozen; }
-    bool isFrozen() const { return m_isFrozen; }
-
     Instant now() const override { return real().now(); }
 
     bool waitUntil(std::unique_lock<std::mutex>& lock, std::condition_variable& changed, Instant when,
                    const std::function<bool()>& isDone) override {
-        while (!real().waitUntil(lock, changed, when, isDone) && m_isFrozen) {
-            when = now() + std::chrono::milliseconds(1);
-        }
-        return isDone();
+        return real().waitUntil(lock, changed, when, isDone);
     }
-
-private:
-    std::atomic<bool> m_isFrozen{false};
 };
 
 #endif

@@ -54,6 +54,11 @@ BorderLog::Entries BorderLog::everything() const {
     return m_entries;
 }
 
+size_t BorderLog::size() const {
+    const std::lock_guard<std::mutex> guard(m_mutex);
+    return m_entries.size();
+}
+
 BorderLog::Entries BorderLog::calls() const {
     Entries entries = everything();
     entries.erase(std::remove_if(entries.begin(), entries.end(), isBookkeeping), entries.end());

@@ -21,6 +21,7 @@ public:
 
     // Every entry.
     Entries everything() const;
+    size_t size() const;
     // The entries without the browser's bookkeeping (identifiers, references, memory).
     Entries calls() const;
     // The entries that begin with `prefix`, bookkeeping included.

@@ -315,7 +315,7 @@ struct BrowserTable {
     }
 
     static NPObject* createObject(NPP npp, NPClass* objectClass) {
-        const size_t place = browser().m_log.everything().size();
+        const size_t place = browser().m_log.size();
         if (!browser().enter("NPN_CreateObject")) {
             return nullptr;
         }
