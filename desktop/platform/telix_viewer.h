@@ -13,14 +13,14 @@
 extern "C" {
 #endif
 
-/* NOLINTBEGIN(modernize-use-using): the header is C. */
+/* NOLINTBEGIN(modernize-use-using, modernize-redundant-void-arg): the header is C. */
 
 typedef uint32_t (*telix_desktop_key_set_function)(void);
 typedef uint32_t (*telix_desktop_channel_function)(void);
 typedef uint32_t (*telix_desktop_channel_count_function)(void);
 typedef uint8_t (*telix_desktop_tune_function)(uint32_t number);
 
-/* NOLINTEND(modernize-use-using) */
+/* NOLINTEND(modernize-use-using, modernize-redundant-void-arg) */
 
 /* The mask of the key groups that pages receive, with the bits of the key set object of OIPF. */
 TELIX_DESKTOP_API uint32_t telix_desktop_key_set(void);

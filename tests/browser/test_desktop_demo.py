@@ -131,7 +131,7 @@ class DesktopMedia(DesktopDemonstration):
                    is_visible('media-bar'), media_state('Playing'))
 
     def test_each_kind_of_error_has_its_words(self):
-        self.watch('errors', 'yellow', *['up'] * 3, 'ok', media_state('The content is not available.'), 'down', 'ok',
+        self.watch('errors', 'yellow', *['up'] * 3, 'ok', media_state('The connection failed.'), 'down', 'ok',
                    media_state('The connection failed.'), 'down', 'ok', media_state('The set cannot play this format.'),
                    'down', 'ok', media_state('Playing'))
 

@@ -26,12 +26,12 @@ bool isBuilt(const std::string& engine) {
 
 // The engine to start; empty, after a message, if there is none.
 std::string selectEngine(const std::string& wanted) {
-    for (const std::string engine : kEngines) {
+    for (const char* engine : kEngines) {
         if ((wanted.empty() || wanted == engine) && isBuilt(engine)) {
             return engine;
         }
     }
-    for (const std::string engine : kEngines) {
+    for (const char* engine : kEngines) {
         if (wanted == engine) {
             printError("--engine: the engine \"" + wanted + "\" is not built");
             return {};

@@ -15,7 +15,7 @@ namespace desktop {
 namespace {
 
 // Longer than any URL that servers accept; a longer message is refused by the socket.
-constexpr std::size_t kMaxMessage = 128 * 1024;
+constexpr std::size_t kMaxMessage = std::size_t{128} * 1024;
 
 // The engine's launcher gives low numbers to descriptors of its own in the web process.
 constexpr int kFirstInheritedDescriptor = 100;

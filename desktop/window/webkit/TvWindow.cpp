@@ -269,7 +269,7 @@ void TvWindow::updateInspector() {
     }
 }
 
-void TvWindow::unload(std::function<void()> done) {
+void TvWindow::unload(const std::function<void()>& done) {
     m_stack.clear();
     if (m_hasCrashed) {
         done();

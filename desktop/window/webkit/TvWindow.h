@@ -52,7 +52,7 @@ public:
     // Opens the web inspector, which follows the topmost application.
     void inspect();
     // Ends all applications. Done when their pages have ended.
-    void unload(std::function<void()> done);
+    void unload(const std::function<void()>& done);
 
     bool hasApplication() const override { return m_stack.top() != nullptr; }
     bool isTopLoaded() const override;

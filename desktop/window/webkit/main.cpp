@@ -39,9 +39,9 @@ struct Run {
     }
 };
 
-template <int signalNumber>
+template <int SignalNumber>
 gboolean onTermination(gpointer run) {
-    static_cast<Run*>(run)->end(kExitSignalled + signalNumber);
+    static_cast<Run*>(run)->end(kExitSignalled + SignalNumber);
     return G_SOURCE_CONTINUE;
 }
 

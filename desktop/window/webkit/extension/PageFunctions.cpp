@@ -16,7 +16,7 @@ namespace {
 // The object that scripts/pagefunctions.js takes from the window object.
 constexpr char kHostObject[] = "telixTvBrowser";
 
-int g_channel = -1;
+int hostChannel = -1;
 
 // The page that calls.
 struct Caller {
@@ -26,7 +26,7 @@ struct Caller {
 ssize_t withoutInterruption(ssize_t (*call)(int, void*, std::size_t), void* data, std::size_t size) {
     ssize_t result = 0;
     do {
-        result = call(g_channel, data, size);
+        result = call(hostChannel, data, size);
     } while (result < 0 && errno == EINTR);
     return result;
 }
@@ -96,7 +96,7 @@ void onWindowObjectCleared(WebKitScriptWorld* world, WebKitWebPage* page, WebKit
 } // namespace
 
 void addPageFunctions(int channel) {
-    g_channel = channel;
+    hostChannel = channel;
     g_signal_connect(webkit_script_world_get_default(), "window-object-cleared",
                      G_CALLBACK(onWindowObjectCleared), nullptr);
 }
