@@ -26,9 +26,9 @@ var media = (function () {
         // The transfer of 60 kB/s is slower than playback.
         { title: 'A slow connection', detail: 'MP4', type: 'video/mp4', url: 'clip.mp4?rate=60000' },
         { title: 'A clip that is not there', detail: 'MP4', type: 'video/mp4', url: 'absent.mp4' },
-        // Port 9 is the discard service, which normally nothing provides.
+        // Nothing listens on port 49151, which is reserved. Engines refuse some ports below 1024 by themselves.
         { title: 'A server that is switched off', detail: 'MP4', type: 'video/mp4',
-          url: 'http://127.0.0.1:9/clip.mp4' },
+          url: 'http://127.0.0.1:49151/clip.mp4' },
         { title: 'A page instead of a clip', detail: 'HTML', type: 'video/mp4', url: '../demo/index.html' }
     ];
 
