@@ -15,7 +15,7 @@ namespace desktop {
 
 namespace {
 
-// The highest version of the specification whose applications the set runs: HbbTV 1.2.1.
+// The highest version of HbbTV whose applications the set runs: 1.2.1.
 constexpr uint8_t kVersionMajor = 1;
 constexpr uint8_t kVersionMinor = 2;
 
