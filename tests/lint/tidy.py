@@ -68,12 +68,17 @@ def parse_arguments():
 
 def read_commands(build):
     """The entries of compile_commands.json without precompiled headers: those of g++ are not clang's, and a source has to
-    include what it uses."""
+    include what it uses. Of commands that compile the same code there is one."""
     with open(os.path.join(build, 'compile_commands.json'), encoding='utf-8') as file:
         entries = json.load(file)
     for entry in entries:
         entry['command'] = re.sub(r' -Winvalid-pch -include \S+/cmake_pch\.hxx', '', entry['command'])
-    return entries
+    return list({code_of(entry): entry for entry in reversed(entries)}.values())
+
+
+def code_of(entry):
+    """What the code depends on: not the name of the object, and of a text in a macro not its characters."""
+    return entry['file'], re.sub(r'(-D\w+=)\\"\S*\\"| -o \S+', r'\1', entry['command'])
 
 
 def commands_of_sources(entries, folders):

@@ -87,10 +87,13 @@ TELIX_RETCODE_ENUM_T play(TELIX_JS_AV_HANDLE player, const char* url, uint32_t, 
     return TELIX_RETCODE_SUCCESS;
 }
 
-TELIX_RETCODE_ENUM_T stop(TELIX_JS_AV_HANDLE) {
+// An engine may end a player after the next one has begun to play.
+TELIX_RETCODE_ENUM_T stop(TELIX_JS_AV_HANDLE player) {
     const std::lock_guard<std::mutex> lock(pipeline.mutex);
-    pipeline.stage = Stage::Idle;
-    pipeline.position = 0;
+    if (pipeline.player == player) {
+        pipeline.stage = Stage::Idle;
+        pipeline.position = 0;
+    }
     return TELIX_RETCODE_SUCCESS;
 }
 
