@@ -16,6 +16,7 @@
 
 namespace {
 
+constexpr TELIX_RETCODE_ENUM_T kError = 1;
 constexpr int kTickMilliseconds = 20;
 constexpr int kTicksToConnect = 5;
 constexpr double kMinute = 60000;
@@ -143,6 +144,11 @@ TELIX_RETCODE_ENUM_T getPlayInfo(TELIX_JS_AV_HANDLE player, TELIX_JS_AV_PLAY_INF
     return TELIX_RETCODE_SUCCESS;
 }
 
+TELIX_RETCODE_ENUM_T noComponents(TELIX_JS_AV_HANDLE, TELIX_JS_AVCOMPTYPE, TELIX_JS_AVCOMPHANDLE**,
+                                  uint32_t*) {
+    return kError;
+}
+
 TELIX_RETCODE_ENUM_T createPlayer(TELIX_JS_AV_HANDLE* player, int32_t, int32_t, uint32_t) {
     static TELIX_JS_AV_HANDLE lastPlayer = 0;
     *player = ++lastPlayer;
@@ -171,6 +177,8 @@ const bool scenario = [] {
     platform.TELIX_JS_AV_SetPlaySpeed = setSpeed;
     platform.TELIX_JS_AV_SetVolume = setVolume;
     platform.TELIX_JS_AV_GetPlayInfo = getPlayInfo;
+    platform.TELIX_JS_AV_GetComponents = noComponents;
+    platform.TELIX_JS_AV_GetCurrActiveComponents = noComponents;
     return true;
 }();
 
