@@ -201,6 +201,11 @@ class Plugins(TelixTv):
                                   '[navigator.plugins.length, navigator.plugins[0].name]')
         self.assertEqual(run.value, [1, 'TELIX Scriptable Plugin'], run)
 
+    def test_an_object_of_any_size_harms_nothing(self):
+        page = self.write('<object id="object" type="video/broadcast" width="40000" height="40000"></object>')
+        run = self.run_tv(page, '--screenshot', os.path.join(self.folder, 'picture.png'), '--eval', 'object.offsetWidth > 4000')
+        self.assertEqual((run.status, run.value), (0, True), run)
+
     def test_the_environment_adds_no_plug_ins(self):
         shutil.copy(FOREIGN_PLUGIN, os.path.join(self.folder, 'npforeign.so'))
         run = self.run_tv(shipped('first.html'), '--eval', 'navigator.plugins.length',
