@@ -28,18 +28,43 @@ constexpr useconds_t kDescriptorShortageDelay = 10000; // microseconds
 const char kTooManyConnections[] = R"({"ok":false,"error":"too many connections"})"
                                    "\n";
 
-std::string& socketPath() {
-    static auto& path = *new std::string;
-    return path;
+ControlSocket& ownSocket() {
+    static auto& socket = *new ControlSocket;
+    return socket;
 }
 
 // Runs when the process exits, while other threads are still running. A forked child inherits the handler,
 // but must not remove the socket of its parent.
 void removeSocket() {
-    const std::string& path = socketPath();
-    if (path == controlSocketPath(path.substr(0, path.rfind('/')), getpid())) {
+    if (ownSocket().pid == getpid()) {
+        unlink(ownSocket().path.c_str());
+    }
+}
+
+// Removes the socket of a process that has ended, and no file of another kind.
+void removeStale(const std::string& path) {
+    struct stat status {};
+    if (lstat(path.c_str(), &status) == 0 && S_ISSOCK(status.st_mode)) {
         unlink(path.c_str());
     }
+}
+
+// Where to listen: on TELIX_SOCKET, else on a socket of this process in the user's folder. Empty, with the
+// reason in `error`, if there is no such place.
+std::string pathToListenOn(std::string& error) {
+    if (const char* path = g_getenv("TELIX_SOCKET"); path && *path) {
+        if (isListening(path)) {
+            error = std::string(path) + ": in use by another television";
+            return "";
+        }
+        return path;
+    }
+    const std::string folder = controlFolder(error);
+    if (folder.empty()) {
+        return "";
+    }
+    runningTelevisions(folder); // removes the sockets of processes that have ended
+    return controlSocketPath(folder, getpid());
 }
 
 using ReadyFunction = std::function<bool()>;
@@ -186,18 +211,16 @@ void Control::start() {
 }
 
 bool Control::open(std::string& error) {
-    const std::string folder = controlFolder(error);
-    if (folder.empty()) {
+    const std::string path = pathToListenOn(error);
+    if (path.empty()) {
         return false;
     }
-    runningTelevisions(folder); // removes the sockets of processes that have ended
-    const std::string path = controlSocketPath(folder, getpid());
     const auto address = socketAddress(path);
     if (!address) {
         error = path + ": the path is too long for a socket";
         return false;
     }
-    unlink(path.c_str()); // of an earlier process with the same id
+    removeStale(path);
     m_socket = ::socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC | SOCK_NONBLOCK, 0);
     // The socket file gets the mode of the descriptor, so that no other user can connect at any time.
     if (m_socket < 0 || fchmod(m_socket, 0600) != 0 ||
@@ -210,7 +233,7 @@ bool Control::open(std::string& error) {
         }
         return false;
     }
-    socketPath() = path;
+    ownSocket() = {getpid(), path};
     std::atexit(removeSocket);
     listen();
     return true;

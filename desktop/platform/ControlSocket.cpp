@@ -29,7 +29,9 @@ pid_t pidOf(const std::string& name) {
                : 0;
 }
 
-// Whether a process listens on the socket; a full backlog counts. Sends nothing.
+} // namespace
+
+// A full backlog counts.
 bool isListening(const std::string& path) {
     const auto address = socketAddress(path);
     const int socket = address ? ::socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC | SOCK_NONBLOCK, 0) : -1;
@@ -42,8 +44,6 @@ bool isListening(const std::string& path) {
     ::close(socket);
     return isConnected;
 }
-
-} // namespace
 
 std::optional<sockaddr_un> socketAddress(const std::string& path) {
     sockaddr_un address{};

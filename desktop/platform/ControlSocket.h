@@ -22,6 +22,9 @@ std::string controlFolder(std::string& error);
 
 std::string controlSocketPath(const std::string& folder, pid_t pid);
 
+// Whether a process listens on the socket. Sends nothing.
+bool isListening(const std::string& path);
+
 // The sockets on which a process listens, in ascending order of the process ids. Removes the sockets of
 // processes that have ended.
 std::vector<ControlSocket> runningTelevisions(const std::string& folder);

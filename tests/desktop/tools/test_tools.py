@@ -208,6 +208,35 @@ class Control(ToolTest):
             self.assertEqual(self.state()['channel']['number'], 1)
             self.assertNotIn(f'telix-{first.pid}.sock', os.listdir(self.folder))
 
+    def test_a_television_listens_on_the_socket_that_is_named(self):
+        path = os.path.join(self.folder, 'own.sock')
+        environment = {**self.environment, 'TELIX_SOCKET': path}
+        with Television(environment) as television:
+            television.wait_for('change 1')
+            self.ctl('channel', 2, TELIX_SOCKET=path)
+            television.wait_for('change 2')
+            with Television(environment) as second:  # has none
+                second.wait_for('change 1')
+                second.end()
+            self.assertEqual(self.state('--socket', path)['channel']['number'], 2)
+            self.assertIn('no television is running', self.ctl('list', status=1))
+            television.kill()  # its socket file stays
+        with Television(environment) as television:
+            television.wait_for('change 1')
+            self.assertEqual(self.state('--socket', path)['channel']['number'], 1)
+            self.assertEqual(television.end(), 0)
+        self.assertFalse(os.path.exists(path))
+
+    def test_a_file_that_is_not_a_socket_stays(self):
+        path = os.path.join(self.folder, 'notes.txt')
+        with open(path, 'w', encoding='utf-8') as file:
+            file.write('notes')
+        with Television({**self.environment, 'TELIX_SOCKET': path}) as television:
+            television.wait_for('change 1')
+            self.assertEqual(television.end(), 0)
+        with open(path, encoding='utf-8') as file:
+            self.assertEqual(file.read(), 'notes')
+
     def test_tells_when_nothing_sensible_answers(self):
         path = os.path.join(self.folder, 'other.sock')
         with contextlib.closing(socket.socket(socket.AF_UNIX)) as server:
