@@ -5,6 +5,7 @@ set -euo pipefail
 
 packages=(build-essential cmake ninja-build pkg-config libglib2.0-dev)
 programs=() # of the npm registry: PROGRAM=PACKAGE@VERSION
+modules=()  # of the npm registry, for node: PACKAGE@VERSION
 for purpose in "$@"; do
     case "$purpose" in
     run)
@@ -17,8 +18,9 @@ for purpose in "$@"; do
     test)
         packages+=(libgtest-dev libgmock-dev libbenchmark-dev libexpat1-dev clang-14 libclang-rt-14-dev
             clang-format-14 clang-tidy-14 libwpewebkit-1.1-dev
-            cog python3 binutils util-linux dpkg-dev man-db openssl)
+            cog python3 binutils util-linux dpkg-dev man-db openssl webkit2gtk-driver python3-selenium)
         programs+=(tsc=typescript@5.4.5)
+        modules+=(selenium-webdriver@4.27.0)
         ;;
     machines)
         packages+=(g++-arm-linux-gnueabihf g++-aarch64-linux-gnu g++-i686-linux-gnu g++-mipsel-linux-gnu
@@ -40,24 +42,27 @@ for package in "${packages[@]}"; do
         missing+=("$package")
     fi
 done
-missing_programs=()
+missing_npm=() # of the npm registry
 for program in "${programs[@]}"; do
-    command -v "${program%%=*}" >/dev/null || missing_programs+=("${program#*=}")
+    command -v "${program%%=*}" >/dev/null || missing_npm+=("${program#*=}")
 done
-if [ ${#missing_programs[@]} -gt 0 ] && ! command -v npm >/dev/null; then
+for module in "${modules[@]}"; do
+    [ -d "$(npm root --global 2>/dev/null)/${module%@*}" ] || missing_npm+=("$module")
+done
+if [ ${#missing_npm[@]} -gt 0 ] && ! command -v npm >/dev/null; then
     missing+=(npm) # not in the list above: other packages of nodejs have it too
 fi
-[ ${#missing[@]} -gt 0 ] || [ ${#missing_programs[@]} -gt 0 ] || exit 0
+[ ${#missing[@]} -gt 0 ] || [ ${#missing_npm[@]} -gt 0 ] || exit 0
 
 if ! command -v apt-get >/dev/null; then
-    echo "$0: cannot install ${missing[*]} ${missing_programs[*]}: apt-get not found" >&2
+    echo "$0: cannot install ${missing[*]} ${missing_npm[*]}: apt-get not found" >&2
     exit 2
 elif [ "$(id -u)" -eq 0 ]; then
     sudo=()
 elif command -v sudo >/dev/null; then
     sudo=(sudo)
 else
-    echo "$0: cannot install ${missing[*]} ${missing_programs[*]}: neither root nor sudo" >&2
+    echo "$0: cannot install ${missing[*]} ${missing_npm[*]}: neither root nor sudo" >&2
     exit 2
 fi
 if [ ${#missing[@]} -gt 0 ]; then
@@ -65,7 +70,7 @@ if [ ${#missing[@]} -gt 0 ]; then
     "${sudo[@]}" apt-get update -q
     "${sudo[@]}" env DEBIAN_FRONTEND=noninteractive apt-get install -q -y --no-install-recommends "${missing[@]}"
 fi
-if [ ${#missing_programs[@]} -gt 0 ]; then
-    echo "Installing: ${missing_programs[*]}"
-    "${sudo[@]}" npm install --global --no-fund --no-audit "${missing_programs[@]}"
+if [ ${#missing_npm[@]} -gt 0 ]; then
+    echo "Installing: ${missing_npm[*]}"
+    "${sudo[@]}" npm install --global --no-fund --no-audit "${missing_npm[@]}"
 fi

@@ -18,7 +18,8 @@ class CommandLine(TelixTv):
         run = self.television.run('--help', environment={'DISPLAY': ''})
         self.assertEqual((run.status, run.errors), (0, ''), run)
         for option in ('size', 'fullscreen', 'plugin', 'screenshot', 'wait-for', 'wait-for-picture', 'timeout', 'eval',
-                       'keys', 'user-agent', 'inspect', 'inspector-server', 'engine', 'help', 'version'):
+                       'keys', 'user-agent', 'inspect', 'inspector-server', 'engine', 'help', 'version',
+                       'automation', 'profile'):
             self.assertIn(f'--{option}', run.output)
 
     def test_help_names_every_key(self):
@@ -41,6 +42,18 @@ class CommandLine(TelixTv):
         run = subprocess.run([launcher, '--engine', 'webkit', shipped('first.html')], capture_output=True, text=True,
                              timeout=RUN_TIMEOUT, check=False)
         self.assertEqual((run.returncode, run.stderr), (2, 'telix-tv: --engine: the engine "webkit" is not built\n'))
+
+    @unittest.skipUnless(IS_NPAPI, 'of the other engine')
+    def test_webdriver_and_profiles_are_refused(self):
+        for option in (('--automation',), ('--profile', self.folder)):
+            self.assert_refused(self.run_tv(*option), f'{option[0]}: only the engine webkit has it')
+
+    @unittest.skipIf(IS_NPAPI, 'of the other engine')
+    def test_automation_opens_no_page_and_performs_no_steps(self):
+        self.assert_refused(self.run_tv('--automation', shipped('first.html')), '--automation: expected no page')
+        for steps in (('--keys', 'red'), ('--wait-for', '1'), ('--wait-for-picture',), ('--eval', '1'),
+                      ('--screenshot', 'page.png')):
+            self.assert_refused(self.run_tv('--automation', *steps), '--automation: excludes --keys, ')
 
     def test_a_bad_inspector_server_is_refused(self):
         for server in ('', '127.0.0.1', '127.0.0.1:', ':', 'a:b:c'):

@@ -16,7 +16,7 @@ namespace desktop {
 namespace {
 
 const char kDescription[] =
-    R"(Automation performs these steps in this order, each only if its option is given:
+    R"(A scripted run performs these steps in this order, each only if its option is given:
   1. load the page;
   2. press --keys, one after the other, each when the page that the previous one opened is loaded;
   3. evaluate --wait-for repeatedly until it is true;
@@ -27,8 +27,12 @@ const char kDescription[] =
 Expressions and keys go to the topmost application, the visible one, when it is loaded. An expression that throws
 counts as false. --timeout applies to all steps together.
 
-Exit status: 0 if all steps are done; 1 after a timeout or if --eval throws; 2 for a bad option and for a page or a
-plug-in that cannot be loaded; 3 if the process of the page ends by itself, with the engine webkit.
+With --automation, a WebDriver session opens and controls the applications. The window is closed when the session
+closes its last application.
+
+Exit status: 0 if all steps are done; 1 after a timeout or if --eval throws; 2 for a bad option, for a page or a
+plug-in that cannot be loaded and for a profile that cannot be used; 3 if the process of the page ends by itself, with
+the engine webkit.
 
 Keyboard: arrow keys, Enter (OK), Backspace or Escape (Back), F1 to F4 (red, green, yellow, blue), F5 to F10 or the
 media keys (play, pause, stop, rewind, fast forward, info), F11 and F12 (channel up and down), End (exit), and the
@@ -55,8 +59,8 @@ std::string keyNames() {
 // Values as given: of the encoding of file names, null if the option is not given.
 struct Values {
     ~Values() {
-        for (char* value :
-             {engine, size, plugin, keys, waitFor, timeout, eval, screenshot, userAgent, inspectorServer}) {
+        for (char* value : {engine, size, profile, plugin, keys, waitFor, timeout, eval, screenshot,
+                            userAgent, inspectorServer}) {
             g_free(value);
         }
         g_strfreev(pages);
@@ -65,6 +69,8 @@ struct Values {
     char* engine = nullptr;
     char* size = nullptr;
     gboolean fullscreen = false;
+    gboolean automation = false;
+    char* profile = nullptr;
     char* plugin = nullptr;
     char* keys = nullptr;
     char* waitFor = nullptr;
@@ -130,6 +136,12 @@ private:
             {"size", 0, 0, kText, &values.size,
              "Size of the window in pixels, default 1280x720. The page is scaled to it.", "WxH"},
             {"fullscreen", 0, 0, kFlag, &values.fullscreen, "Fill the screen.", nullptr},
+            {"profile", 0, 0, kText, &values.profile,
+             "The folder with cookies, storage, cache, configuration and control socket, with the engine "
+             "webkit. It is created if it does not exist; the default is a temporary one.",
+             "FOLDER"},
+            {"automation", 0, 0, kFlag, &values.automation,
+             "Let WebKitWebDriver open and control the pages, with the engine webkit.", nullptr},
             {"plugin", 0, 0, kText, &values.plugin, m_plugin.c_str(), "FILE"},
             {"keys", 0, 0, kText, &values.keys, m_keys.c_str(), "NAME,NAME..."},
             {"wait-for", 0, 0, kText, &values.waitFor, "Wait until the expression is true.", "EXPR"},
@@ -232,11 +244,9 @@ std::string checkStrings(const Values& values) {
     const struct {
         const char* name;
         const char* value;
-    } options[] = {{"--wait-for", values.waitFor},
-                   {"--eval", values.eval},
-                   {"--screenshot", values.screenshot},
-                   {"--plugin", values.plugin},
-                   {"--user-agent", values.userAgent}};
+    } options[] = {{"--wait-for", values.waitFor},      {"--eval", values.eval},
+                   {"--screenshot", values.screenshot}, {"--plugin", values.plugin},
+                   {"--user-agent", values.userAgent},  {"--profile", values.profile}};
     for (const auto& option : options) {
         if (option.value && simplified(option.value).empty()) {
             return std::string(option.name) + ": empty value";
@@ -256,12 +266,38 @@ std::string checkStrings(const Values& values) {
     return {};
 }
 
-std::string parseValues(const Values& values, CommandLine& commandLine) {
-    if (!values.pages || g_strv_length(values.pages) != 1) {
+std::string parsePage(const Values& values, CommandLine& commandLine) {
+    const guint count = values.pages ? g_strv_length(values.pages) : 0;
+    if (values.automation) {
+        return count == 0 ? "" : "--automation: expected no page, because the WebDriver session opens it";
+    }
+    if (count != 1) {
         return "expected exactly one page, see --help";
     }
     commandLine.page = urlOf(values.pages[0]);
-    std::string error = parseSize(values.size ? values.size : kDefaultSize, commandLine);
+    return {};
+}
+
+std::string checkSessions(const Values& values, const EngineInformation& engine) {
+    if ((values.automation || values.profile) && !engine.hasSessions) {
+        return std::string(values.automation ? "--automation" : "--profile") +
+               ": only the engine webkit has it";
+    }
+    if (values.automation &&
+        (values.keys || values.waitFor || values.waitForPicture || values.eval || values.screenshot)) {
+        return "--automation: excludes --keys, --wait-for, --wait-for-picture, --eval and --screenshot";
+    }
+    return {};
+}
+
+std::string parseValues(const Values& values, const EngineInformation& engine, CommandLine& commandLine) {
+    std::string error = checkSessions(values, engine);
+    if (error.empty()) {
+        error = parsePage(values, commandLine);
+    }
+    if (error.empty()) {
+        error = parseSize(values.size ? values.size : kDefaultSize, commandLine);
+    }
     if (error.empty()) {
         error = parseTimeout(values.timeout ? values.timeout : kDefaultTimeout, commandLine);
     }
@@ -297,11 +333,13 @@ std::optional<int> readCommandLine(const std::vector<std::string>& arguments, co
     if (printInformation(parser, values, engine)) {
         return kExitSuccess;
     }
-    const std::string error = parseValues(values, commandLine);
+    const std::string error = parseValues(values, engine, commandLine);
     if (!error.empty()) {
         return reject(error);
     }
     commandLine.fullscreen = values.fullscreen;
+    commandLine.automation = values.automation;
+    commandLine.profile = values.profile ? values.profile : "";
     commandLine.inspect = values.inspect;
     commandLine.plugin = values.plugin ? values.plugin : besideProgram(kPlugin);
     commandLine.userAgent = values.userAgent ? values.userAgent : engine.userAgent() + kHbbtvToken;
@@ -318,7 +356,8 @@ EarlyOptions earlyOptions(const std::vector<std::string>& arguments) {
     if (!parser.parse(arguments).empty()) {
         return {};
     }
-    return {values.engine ? values.engine : "", values.inspectorServer ? values.inspectorServer : ""};
+    const auto given = [](const char* value) { return std::string(value ? value : ""); };
+    return {given(values.engine), given(values.inspectorServer), given(values.profile)};
 }
 
 } // namespace desktop

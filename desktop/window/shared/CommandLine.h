@@ -17,11 +17,17 @@ struct EngineInformation {
     std::string versions;
     // Returns the engine's own user agent string; empty without a display, which some engines need for it.
     std::function<std::string()> userAgent;
+    // Whether it has --automation and --profile.
+    bool hasSessions = false;
 };
 
 struct CommandLine {
-    // The URL of the page, also if a file name is given.
+    // The URL of the page, also if a file name is given. Empty with `automation`.
     std::string page;
+    // Whether a WebDriver session opens the pages.
+    bool automation = false;
+    // The folder of the profile; empty for a temporary one.
+    std::string profile;
     int width = 0;
     int height = 0;
     bool fullscreen = false;
@@ -54,6 +60,7 @@ std::optional<int> readCommandLine(const std::vector<std::string>& arguments, co
 struct EarlyOptions {
     std::string engine;
     std::string inspectorServer;
+    std::string profile;
 };
 EarlyOptions earlyOptions(const std::vector<std::string>& arguments);
 

@@ -70,4 +70,19 @@ std::string pageFunctionsScript() {
     return functionOf("pagefunctions") + ".call(null,{" + codes + "})";
 }
 
+std::string sessionKeysScript() {
+    std::string keys;
+    for (const auto& key : remoteKeys()) {
+        for (const uint32_t keysym : key.keyboardKeys) {
+            const int code = keyCodeOfKeyboardKey(keysym);
+            if (code != 0) {
+                keys += (keys.empty() ? "" : ",") + std::to_string(code) + ":[" + literal(key.name) + "," +
+                        std::to_string(key.keyCode) + "," + std::to_string(key.group) + "," +
+                        (key.hasEngineCode ? "true" : "false") + "]";
+            }
+        }
+    }
+    return functionOf("sessionkeys") + ".call(null," + functionOf("dispatchkey") + ",{" + keys + "})";
+}
+
 } // namespace desktop

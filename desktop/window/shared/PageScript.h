@@ -32,6 +32,9 @@ std::string pageScriptCall(const std::string& name, const std::vector<ScriptValu
 // object.
 std::string pageFunctionsScript();
 
+// The source of an expression that calls the function of scripts/sessionkeys.js with all keys.
+std::string sessionKeysScript();
+
 } // namespace desktop
 
 #endif

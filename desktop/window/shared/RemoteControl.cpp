@@ -71,6 +71,25 @@ const RemoteKey* remoteKeyByKeyboardKey(uint32_t keysym) {
     return found == keys.end() ? nullptr : &*found;
 }
 
+int keyCodeOfKeyboardKey(uint32_t keysym) {
+    // The first and the last keysym of a row, and the code of the first.
+    static const struct {
+        uint32_t first;
+        uint32_t last;
+        int keyCode;
+    } kRows[] = {
+        {XK_BackSpace, XK_BackSpace, 8}, {XK_Return, XK_Return, 13},   {XK_KP_Enter, XK_KP_Enter, 13},
+        {XK_Pause, XK_Pause, 19},        {XK_Escape, XK_Escape, 27},   {XK_End, XK_End, 35},
+        {XK_Left, XK_Down, 37},          {XK_KP_Left, XK_KP_Down, 37}, {XK_0, XK_9, 48},
+        {XK_KP_0, XK_KP_9, 96},          {XK_F1, XK_F12, 112}};
+    for (const auto& row : kRows) {
+        if (keysym >= row.first && keysym <= row.last) {
+            return row.keyCode + static_cast<int>(keysym - row.first);
+        }
+    }
+    return 0;
+}
+
 std::string textOf(const RemoteKey& key) {
     const bool hasText = key.keyCode == '\r' || (key.keyCode >= '0' && key.keyCode <= '9');
     return hasText ? std::string(1, static_cast<char>(key.keyCode)) : std::string();

@@ -23,6 +23,9 @@ enum KeyGroup : uint32_t {
     KeyGroupTelevision = 0x80000000
 };
 
+// What pages receive if the platform library has no key set.
+constexpr uint32_t kAllPageKeys = ~static_cast<uint32_t>(KeyGroupTelevision);
+
 struct RemoteKey {
     // For --keys.
     const char* name;
@@ -48,6 +51,9 @@ const RemoteKey* remoteKeyByName(const std::string& name);
 
 // The key that a keysym is mapped to, or null.
 const RemoteKey* remoteKeyByKeyboardKey(uint32_t keysym);
+
+// The `keyCode` that engines give the events of a keyboard key; 0 for keys without one.
+int keyCodeOfKeyboardKey(uint32_t keysym);
 
 // The text that a keyboard would enter with the key; empty for most keys.
 std::string textOf(const RemoteKey& key);

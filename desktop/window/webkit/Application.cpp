@@ -15,8 +15,6 @@ namespace desktop {
 namespace {
 
 constexpr char kHbbtvType[] = "application/vnd.hbbtv.xhtml+xml";
-// Of a platform library without a key set.
-constexpr uint32_t kAllKeys = ~static_cast<uint32_t>(KeyGroupTelevision);
 constexpr char kEmptyPage[] = "about:blank";
 // A plug-in ends some of its objects on later turns of the web process's main loop.
 constexpr int kTurnsOfTeardown = 10;
@@ -148,6 +146,14 @@ void Application::connectSignals() {
             self->m_listener.onCrashed(*self, reason);
         }),
         this);
+    // The session closes the window of an application. Otherwise nothing but its page ends an application.
+    if (isAutomated()) {
+        g_signal_connect(m_view, "close", G_CALLBACK(+[](WebKitWebView*, gpointer application) {
+                             auto* self = static_cast<Application*>(application);
+                             self->m_listener.onClosed(*self);
+                         }),
+                         this);
+    }
     g_signal_connect(m_view, "decide-policy",
                      G_CALLBACK(+[](WebKitWebView*, WebKitPolicyDecision* decision,
                                     WebKitPolicyDecisionType type) -> gboolean {
@@ -290,7 +296,7 @@ void Application::readKeySet(std::function<void(Application*, uint32_t)> done) {
                 webkit_web_view_send_message_to_page_finish(WEBKIT_WEB_VIEW(view), result, &error);
             GVariant* keySet = reply ? webkit_user_message_get_parameters(reply) : nullptr;
             if (!g_error_matches(error, G_IO_ERROR, G_IO_ERROR_CANCELLED)) {
-                (*onReply)(keySet ? g_variant_get_uint32(keySet) : kAllKeys);
+                (*onReply)(keySet ? g_variant_get_uint32(keySet) : kAllPageKeys);
             }
             g_clear_object(&reply);
         },

@@ -26,6 +26,8 @@ public:
                                   const std::string& reason) = 0;
         // The web process has ended by itself.
         virtual void onCrashed(Application& application, WebKitWebProcessTerminationReason reason) = 0;
+        // The WebDriver session has closed the application.
+        virtual void onClosed(Application& application) = 0;
     };
 
     // `related`: an application whose web process this one shares, or null. Both references must outlive the
@@ -38,6 +40,8 @@ public:
     // The widget for the window; owned by its container.
     GtkWidget* widget() const { return m_bin; }
     WebKitWebView* view() const { return m_view; }
+    // Whether a WebDriver session controls the application.
+    bool isAutomated() const { return webkit_web_view_is_controlled_by_automation(m_view); }
     uint64_t pageId() const { return webkit_web_view_get_page_id(m_view); }
 
     void load(const std::string& url) { webkit_web_view_load_uri(m_view, url.c_str()); }

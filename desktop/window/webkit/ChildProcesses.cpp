@@ -1,8 +1,10 @@
 // The processes that the engine has started.
 #include "desktop/window/webkit/ChildProcesses.h"
 
+#include <glib.h>
 #include <sys/wait.h>
 
+#include <algorithm>
 #include <csignal>
 #include <filesystem>
 #include <fstream>
@@ -12,6 +14,8 @@
 namespace desktop {
 
 namespace {
+
+constexpr unsigned kPollMs = 10;
 
 // Those of all threads: the kernel lists children by the thread that has started them.
 std::vector<pid_t> childProcesses() {
@@ -26,10 +30,23 @@ std::vector<pid_t> childProcesses() {
     return children;
 }
 
+// Waits up to the time in milliseconds until all have ended, while the main loop runs, on which the engine
+// closes its connections to them. Returns those that have not.
+std::vector<pid_t> waitFor(std::vector<pid_t> children, unsigned timeoutMs) {
+    const auto hasEnded = [](pid_t child) { return waitpid(child, nullptr, WNOHANG) != 0; };
+    for (unsigned time = 0; time < timeoutMs && !children.empty(); time += kPollMs) {
+        children.erase(std::remove_if(children.begin(), children.end(), hasEnded), children.end());
+        while (g_main_context_iteration(nullptr, FALSE)) {
+        }
+        g_usleep(kPollMs * G_TIME_SPAN_MILLISECOND);
+    }
+    return children;
+}
+
 } // namespace
 
-void endChildProcesses() {
-    const auto children = childProcesses();
+void endChildProcesses(unsigned timeoutMs) {
+    const auto children = waitFor(childProcesses(), timeoutMs);
     for (const pid_t child : children) {
         kill(child, SIGKILL);
     }

@@ -4,9 +4,9 @@
 
 namespace desktop {
 
-// Ends all child processes of this process and waits until they have ended. The engine ends its own only when
-// this process ends, and they write to the profile until then.
-void endChildProcesses();
+// Ends all child processes of this process, which write to the profile until then: those that have not ended
+// by themselves after the time in milliseconds are killed. Returns when all have ended.
+void endChildProcesses(unsigned timeoutMs);
 
 } // namespace desktop
 

@@ -50,13 +50,21 @@ WebKitSettings* newSettings(const CommandLine& commandLine) {
     return settings;
 }
 
-WebKitWebContext* newContext(const Profile& profile) {
-    g_autoptr(WebKitWebsiteDataManager) data = webkit_website_data_manager_new(
-        "base-data-directory", (profile.folder() + "/data").c_str(), "base-cache-directory",
-        (profile.folder() + "/cache").c_str(), nullptr);
+WebKitWebContext* newContext(const Profile& profile, bool isAutomated) {
+    g_autoptr(WebKitWebsiteDataManager) data =
+        webkit_website_data_manager_new("base-data-directory", profile.dataFolder().c_str(),
+                                        "base-cache-directory", profile.cacheFolder().c_str(), nullptr);
     // Without process swapping the platform library, which is in the web process, outlives a navigation.
-    return WEBKIT_WEB_CONTEXT(g_object_new(WEBKIT_TYPE_WEB_CONTEXT, "website-data-manager", data,
-                                           "process-swap-on-cross-site-navigation-enabled", FALSE, nullptr));
+    WebKitWebContext* context =
+        WEBKIT_WEB_CONTEXT(g_object_new(WEBKIT_TYPE_WEB_CONTEXT, "website-data-manager", data,
+                                        "process-swap-on-cross-site-navigation-enabled", FALSE, nullptr));
+    if (const std::string cookies = profile.cookieFile(); !cookies.empty()) {
+        webkit_cookie_manager_set_persistent_storage(webkit_web_context_get_cookie_manager(context),
+                                                     cookies.c_str(),
+                                                     WEBKIT_COOKIE_PERSISTENT_STORAGE_SQLITE);
+    }
+    webkit_web_context_set_automation_allowed(context, isAutomated);
+    return context;
 }
 
 } // namespace
@@ -74,13 +82,15 @@ EngineInformation engineInformation() {
                 }
                 g_autoptr(WebKitSettings) settings = webkit_settings_new();
                 return std::string(webkit_settings_get_user_agent(settings));
-            }};
+            },
+            true};
 }
 
 Engine::Engine(const CommandLine& commandLine, const PluginFile& plugin, const Profile& profile,
                WebProcessOutput& output, PageChannel& channel)
-    : m_plugin(plugin), m_output(output), m_channel(channel), m_context(newContext(profile)),
-      m_settings(newSettings(commandLine)), m_content(webkit_user_content_manager_new()) {
+    : m_plugin(plugin), m_output(output), m_channel(channel), m_isAutomated(commandLine.automation),
+      m_context(newContext(profile, m_isAutomated)), m_settings(newSettings(commandLine)),
+      m_content(webkit_user_content_manager_new()) {
     g_signal_connect(m_context, "initialize-web-extensions",
                      G_CALLBACK(+[](WebKitWebContext* context, gpointer engine) {
                          static_cast<Engine*>(engine)->onInitializeExtensions(context);
@@ -101,12 +111,13 @@ Engine::~Engine() {
 }
 
 WebKitWebView* Engine::newView(WebKitWebView* related) const {
-    // A related view has the context of the other.
+    // A related view has the context of the other, and is controlled by its session.
     auto* view =
         WEBKIT_WEB_VIEW(related ? g_object_new(WEBKIT_TYPE_WEB_VIEW, "related-view", related, "settings",
                                                m_settings, "user-content-manager", m_content, nullptr)
                                 : g_object_new(WEBKIT_TYPE_WEB_VIEW, "web-context", m_context, "settings",
-                                               m_settings, "user-content-manager", m_content, nullptr));
+                                               m_settings, "user-content-manager", m_content,
+                                               "is-controlled-by-automation", m_isAutomated, nullptr));
     // Where a page has no background, the video plane shows through.
     const GdkRGBA nothing{0, 0, 0, 0};
     webkit_web_view_set_background_color(view, &nothing);
@@ -122,6 +133,7 @@ void Engine::onInitializeExtensions(WebKitWebContext* context) {
     g_variant_dict_insert(&data, "output", "i", m_output.startProcess());
     g_variant_dict_insert(&data, "errors", "i", m_output.errorDescriptor());
     g_variant_dict_insert(&data, "channel", "i", m_channel.useProcess());
+    g_variant_dict_insert(&data, "automation", "b", m_isAutomated);
     webkit_web_context_set_web_extensions_initialization_user_data(context, g_variant_dict_end(&data));
 }
 

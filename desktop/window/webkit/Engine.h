@@ -38,6 +38,7 @@ private:
     const PluginFile& m_plugin;
     WebProcessOutput& m_output;
     PageChannel& m_channel;
+    bool m_isAutomated;
     WebKitWebContext* m_context;
     WebKitSettings* m_settings;
     WebKitUserContentManager* m_content;

@@ -1,5 +1,5 @@
 // The calls of pages in the web process that wait for the window: functions that create, destroy, show and
-// hide applications.
+// hide applications, and keys of a WebDriver session that are the television's.
 #ifndef TELIX_DESKTOP_WINDOW_WEBKIT_PAGECHANNEL_H
 #define TELIX_DESKTOP_WINDOW_WEBKIT_PAGECHANNEL_H
 

@@ -9,6 +9,7 @@
 #include "desktop/window/shared/Notice.h"
 #include "desktop/window/shared/PageGeometry.h"
 #include "desktop/window/webkit/Engine.h"
+#include "desktop/window/webkit/MainLoop.h"
 #include "desktop/window/webkit/Messages.h"
 
 namespace desktop {
@@ -17,6 +18,9 @@ namespace {
 
 constexpr char kTitle[] = "telix-tv";
 constexpr int kOkKeyCode = 13;
+// How long a WebDriver session waits for the end of a page; longer than the time limit of
+// Application::unload().
+constexpr unsigned kCloseTimeoutMs = 10000;
 
 GtkWidget* newBlackArea() {
     GtkWidget* area = gtk_drawing_area_new();
@@ -153,14 +157,14 @@ void TvWindow::place(GtkAllocation& area) const {
     area = {page.x, page.y, page.width, page.height};
 }
 
-void TvWindow::openApplication(const std::string& url) {
+Application& TvWindow::pushApplication() {
     const Application* related = m_applications.empty() ? nullptr : m_applications.back().get();
     m_applications.push_back(std::make_unique<Application>(m_engine, related, *this));
     Application& application = *m_applications.back();
     gtk_overlay_add_overlay(GTK_OVERLAY(m_overlay), application.widget());
     m_stack.push(application);
     updateInspector();
-    application.load(url);
+    return application;
 }
 
 Application* TvWindow::applicationOf(uint64_t page) const {
@@ -187,6 +191,8 @@ void TvWindow::onPageCall(uint64_t page, const std::string& function, const std:
         remove(*m_stack.top());
     } else if (function == "show" || function == "hide") {
         caller->setShown(function == "show");
+    } else if (const RemoteKey* key = function == "key" ? remoteKeyByName(argument) : nullptr) {
+        onTelevisionKey(*key);
     }
     reply(true);
 }
@@ -204,20 +210,24 @@ void TvWindow::createApplication(uint64_t caller, const std::string& url, const 
 void TvWindow::remove(Application& application) {
     m_stack.remove(application);
     updateInspector();
-    application.unload([this, &application] {
-        const auto isIt = [&application](const auto& each) { return each.get() == &application; };
-        // The last one stays, because the web process with the platform library ends with its last page.
-        if (m_applications.size() > 1) {
-            m_applications.erase(std::find_if(m_applications.begin(), m_applications.end(), isIt));
-        }
-    });
+    application.unload([this, &application] { erase(application); });
+}
+
+// The last one stays, because the web process with the platform library ends with its last page.
+void TvWindow::erase(const Application& application) {
+    const auto found = std::find_if(m_applications.begin(), m_applications.end(),
+                                    [&application](const auto& each) { return each.get() == &application; });
+    if (m_applications.size() > 1 && found != m_applications.end()) {
+        m_applications.erase(found);
+    }
 }
 
 void TvWindow::onLoadFailed(Application& application, const std::string& url, const std::string& reason) {
     if (!m_stack.has(application)) {
         return;
     }
-    if (!application.hasDocument()) {
+    // A WebDriver session loads another document.
+    if (!application.hasDocument() && !application.isAutomated()) {
         remove(application);
     }
     if (m_reports.loadFailed) {
@@ -231,6 +241,19 @@ void TvWindow::onCrashed(Application& application, WebKitWebProcessTerminationRe
     if (m_stack.top() == &application && m_reports.crashed) {
         m_hasCrashed = true;
         m_reports.crashed(reason);
+    }
+}
+
+// The driver kills the television when this returns and no application is left.
+void TvWindow::onClosed(Application& application) {
+    m_stack.remove(application);
+    updateInspector();
+    runUntilDone([&application](std::function<void()> done) { application.unload(std::move(done)); },
+                 kCloseTimeoutMs);
+    if (m_applications.size() > 1) {
+        erase(application);
+    } else if (m_reports.closed) {
+        m_reports.closed();
     }
 }
 

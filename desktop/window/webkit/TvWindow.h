@@ -28,7 +28,7 @@ class TvWindow : public ScriptedWindow, public Application::Listener {
 public:
     // What the window reports. The functions may be null.
     struct Reports {
-        // The user has closed the window.
+        // The user has closed the window, or the WebDriver session its last application.
         std::function<void()> closed;
         // A document of an application could not be loaded. An application without any document is removed.
         std::function<void(const std::string& url, const std::string& reason)> loadFailed;
@@ -45,7 +45,9 @@ public:
     void setReports(Reports reports) { m_reports = std::move(reports); }
 
     // Pushes a new application and starts to load its page.
-    void openApplication(const std::string& url);
+    void openApplication(const std::string& url) { pushApplication().load(url); }
+    // Pushes a new application without a document. The window owns it.
+    Application& pushApplication();
     // Shows a notice in place of the applications, whose web process has ended by itself. OK loads them
     // again.
     void showNotice(const std::string& reason);
@@ -64,6 +66,7 @@ public:
 private:
     void onLoadFailed(Application& application, const std::string& url, const std::string& reason) override;
     void onCrashed(Application& application, WebKitWebProcessTerminationReason reason) override;
+    void onClosed(Application& application) override;
     void onPageCall(uint64_t page, const std::string& function, const std::string& argument,
                     const PageChannel::Reply& reply);
     void createApplication(uint64_t caller, const std::string& url, const PageChannel::Reply& reply);
@@ -75,6 +78,7 @@ private:
     void show(const CommandLine& commandLine);
     Application* applicationOf(uint64_t page) const;
     void remove(Application& application);
+    void erase(const Application& application);
     void updateInspector();
     bool paintScreenshot(const std::string& file, cairo_surface_t* page) const;
 

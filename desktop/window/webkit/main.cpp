@@ -11,6 +11,7 @@
 #include "desktop/window/shared/Diagnostics.h"
 #include "desktop/window/shared/LoadCheck.h"
 #include "desktop/window/shared/PluginFile.h"
+#include "desktop/window/webkit/AutomationSession.h"
 #include "desktop/window/webkit/ChildProcesses.h"
 #include "desktop/window/webkit/Engine.h"
 #include "desktop/window/webkit/InspectorServer.h"
@@ -22,6 +23,8 @@
 namespace desktop {
 
 namespace {
+
+constexpr unsigned kProfileTimeoutMs = 5000;
 
 // The main loop and the exit status that ends it.
 struct Run {
@@ -67,6 +70,8 @@ int runWindow(const CommandLine& commandLine, const PluginFile& plugin, const Pr
     g_autoptr(GMainLoop) loop = g_main_loop_new(nullptr, FALSE);
     Run run{loop, &window, -1};
     Automation automation(window, commandLine, [&](int status) { run.end(status); });
+    const AutomationSession session(
+        engine.context(), {[&] { return window.pushApplication().view(); }, [&] { run.end(kExitSuccess); }});
     window.setReports(
         {[&] { automation.onWindowClosed(); },
          [&](const std::string& url, const std::string& reason) { automation.onLoadFailed(url, reason); },
@@ -80,7 +85,9 @@ int runWindow(const CommandLine& commandLine, const PluginFile& plugin, const Pr
     g_unix_signal_add(SIGINT, onTermination<SIGINT>, &run);
     g_unix_signal_add(SIGTERM, onTermination<SIGTERM>, &run);
     g_unix_signal_add(SIGHUP, onTermination<SIGHUP>, &run);
-    window.openApplication(commandLine.page);
+    if (!commandLine.automation) {
+        window.openApplication(commandLine.page);
+    }
     if (commandLine.inspect) {
         window.inspect();
     }
@@ -99,19 +106,21 @@ int runBrowser(const CommandLine& commandLine) {
         printError("cannot load plug-in " + commandLine.plugin + ": " + plugin.failure());
         return kExitBadInput;
     }
-    const std::string error = loadError(commandLine.page, commandLine.userAgent);
+    const std::string error =
+        commandLine.automation ? "" : loadError(commandLine.page, commandLine.userAgent);
     if (!error.empty()) {
         printError("cannot load " + commandLine.page + ": " + error);
         return kExitBadInput;
     }
-    const Profile profile;
+    const Profile profile(commandLine.profile);
     if (!profile.failure().empty()) {
         printError(profile.failure());
         return kExitBadInput;
     }
     std::optional<std::string> evaluated;
     const int exitStatus = runWindow(commandLine, plugin, profile, evaluated);
-    endChildProcesses();
+    // What a profile keeps is written by the engine's processes when they end.
+    endChildProcesses(commandLine.profile.empty() ? 0 : kProfileTimeoutMs);
     // The last line of the output, after what the plug-in logs in its teardown.
     if (evaluated) {
         std::puts(evaluated->c_str());
@@ -129,7 +138,11 @@ int main(int argc, char* argv[]) {
     g_setenv("GSETTINGS_BACKEND", "memory", TRUE);
     g_set_prgname("telix-tv");
     // Before the engine's first function, which reads the settings of the server.
-    const std::string server = desktop::earlyOptions({argv, argv + argc}).inspectorServer;
+    const desktop::EarlyOptions early = desktop::earlyOptions({argv, argv + argc});
+    if (!early.profile.empty()) {
+        desktop::useProfileOfLibrary(early.profile);
+    }
+    const std::string& server = early.inspectorServer;
     const std::string serverError = server.empty() ? "" : desktop::serveInspector(server);
     desktop::CommandLine commandLine;
     // --help and usage errors need no display.

@@ -5,7 +5,6 @@
 #include <sys/socket.h>
 
 #include <cerrno>
-#include <string>
 
 #include "desktop/window/shared/PageScript.h"
 
@@ -29,22 +28,6 @@ ssize_t withoutInterruption(ssize_t (*call)(int, void*, std::size_t), void* data
         result = call(hostChannel, data, size);
     } while (result < 0 && errno == EINTR);
     return result;
-}
-
-// Calls a function of the window and waits for its result, as the page does.
-bool callWindow(uint64_t page, const char* function, const std::string& argument) {
-    std::string message = std::to_string(page) + '\n' + function + '\n' + argument;
-    const auto sendMessage = [](int channel, void* data, std::size_t size) {
-        return send(channel, data, size, MSG_NOSIGNAL);
-    };
-    const auto receive = [](int channel, void* data, std::size_t size) {
-        return recv(channel, data, size, 0);
-    };
-    if (withoutInterruption(sendMessage, message.data(), message.size()) < 0) {
-        return false;
-    }
-    char reply = 0;
-    return withoutInterruption(receive, &reply, 1) == 1 && reply == '1';
 }
 
 gboolean createApplication(const char* url, gpointer data) {
@@ -94,6 +77,21 @@ void onWindowObjectCleared(WebKitScriptWorld* world, WebKitWebPage* page, WebKit
 }
 
 } // namespace
+
+bool callWindow(uint64_t page, const char* function, const std::string& argument) {
+    std::string message = std::to_string(page) + '\n' + function + '\n' + argument;
+    const auto sendMessage = [](int channel, void* data, std::size_t size) {
+        return send(channel, data, size, MSG_NOSIGNAL);
+    };
+    const auto receive = [](int channel, void* data, std::size_t size) {
+        return recv(channel, data, size, 0);
+    };
+    if (withoutInterruption(sendMessage, message.data(), message.size()) < 0) {
+        return false;
+    }
+    char reply = 0;
+    return withoutInterruption(receive, &reply, 1) == 1 && reply == '1';
+}
 
 void addPageFunctions(int channel) {
     hostChannel = channel;

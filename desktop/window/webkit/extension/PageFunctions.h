@@ -5,11 +5,16 @@
 
 #include <webkit2/webkit-web-extension.h>
 
+#include <string>
+
 namespace desktop {
 
 // Adds them from now on, before any script of a page. `channel`: the inherited descriptor of the window's
 // PageChannel; without a valid one the functions return false. Main thread of the web process, once.
 void addPageFunctions(int channel);
+
+// Calls a function of the window for a page and waits for its result.
+bool callWindow(uint64_t page, const char* function, const std::string& argument);
 
 } // namespace desktop
 

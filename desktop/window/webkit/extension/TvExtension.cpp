@@ -5,6 +5,7 @@
 
 #include "desktop/window/webkit/extension/FrameSender.h"
 #include "desktop/window/webkit/extension/PageFunctions.h"
+#include "desktop/window/webkit/extension/SessionKeys.h"
 #include "desktop/window/webkit/extension/ViewerMessages.h"
 
 namespace desktop {
@@ -18,6 +19,15 @@ int descriptorFrom(GVariant* data, const char* name) {
         g_variant_lookup(data, name, "i", &descriptor);
     }
     return descriptor;
+}
+
+// Whether a WebDriver session controls the pages.
+bool isAutomated(GVariant* data) {
+    gboolean automation = FALSE;
+    if (data && g_variant_is_of_type(data, G_VARIANT_TYPE_VARDICT)) {
+        g_variant_lookup(data, "automation", "b", &automation);
+    }
+    return automation;
 }
 
 // What the process prints goes to the window.
@@ -37,6 +47,9 @@ webkit_web_extension_initialize_with_user_data(WebKitWebExtension* extension, co
     desktop::redirect(STDOUT_FILENO, desktop::descriptorFrom(data, "output"));
     desktop::redirect(STDERR_FILENO, desktop::descriptorFrom(data, "errors"));
     desktop::addPageFunctions(desktop::descriptorFrom(data, "channel"));
+    if (desktop::isAutomated(data)) {
+        desktop::addSessionKeys();
+    }
     desktop::sendFrames(extension);
     desktop::answerViewerMessages(extension);
 }

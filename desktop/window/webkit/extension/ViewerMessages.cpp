@@ -3,6 +3,7 @@
 
 #include "desktop/platform/telix_viewer.h"
 #include "desktop/window/shared/PlatformLibrary.h"
+#include "desktop/window/shared/RemoteControl.h"
 #include "desktop/window/webkit/Messages.h"
 
 namespace desktop {
@@ -88,6 +89,10 @@ void answerViewerMessages(WebKitWebExtension* extension) {
                      }),
                      nullptr);
     g_timeout_add_seconds(kChannelIntervalSeconds, reportChannel, extension);
+}
+
+uint32_t keySetOfPages() {
+    return viewer().find() ? viewer().keySet() : kAllPageKeys;
 }
 
 } // namespace desktop

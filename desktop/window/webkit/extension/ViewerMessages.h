@@ -10,6 +10,9 @@ namespace desktop {
 // once.
 void answerViewerMessages(WebKitWebExtension* extension);
 
+// The mask of the key groups that pages receive.
+uint32_t keySetOfPages();
+
 } // namespace desktop
 
 #endif
