@@ -1,6 +1,10 @@
 // The buffering monitor, poll by poll.
+#include <pthread.h>
+
 #include <atomic>
 #include <chrono>
+#include <memory>
+#include <thread>
 
 #include "src/avcontrol/AVControl.h"
 #include "tests/unit/avcontrol/AVControlTest.h"
@@ -108,6 +112,21 @@ TEST_F(AVControlMonitor, PollsOnceASecondAndNotBeforeTheSecondSecond) {
     EXPECT_EQ(reportsAsked(), 3u);
 }
 
+TEST_F(AVControlMonitor, LooksAtNoResultOfItsPausesAndResumes) {
+    const EmbeddedObject object = watched();
+    platform.TELIX_JS_AV_Pause = [](TELIX_JS_AV_HANDLE) { return 1; };
+    platform.TELIX_JS_AV_Resume = [](TELIX_JS_AV_HANDLE) { return 1; };
+    poll(3);
+    EXPECT_EQ(state(object), Buffering);
+    poll(3);
+    EXPECT_THAT(asked(), IsEmpty()); // counts as paused
+    poll(10);
+    EXPECT_THAT(asked(), ElementsAre("TELIX_JS_AV_Resume(7)"));
+    EXPECT_EQ(state(object), Playing);
+    poll(10);
+    EXPECT_THAT(asked(), IsEmpty());
+}
+
 TEST_F(AVControlMonitor, FlagsInTheReportAreDecoded) {
     watched();
     poll(0x00FF0003); // third byte: the low 16 bits are the amount
@@ -175,6 +194,56 @@ TEST_F(AVControlMonitor, ACancelledMonitorSaysSo) {
         clock.await(0);
     });
     EXPECT_THAT(printed, HasSubstr("thread_clean_up ::  is called"));
+}
+
+// How often the platform has been called on a monitor's thread, and how often the thread could be cancelled
+// then.
+struct MonitorCalls {
+    void count() {
+        if (pthread_equal(pthread_self(), browserThread) == 0) {
+            int state = 0;
+            pthread_setcancelstate(PTHREAD_CANCEL_DISABLE, &state);
+            pthread_setcancelstate(state, nullptr);
+            ++made;
+            cancellable += state == PTHREAD_CANCEL_ENABLE;
+        }
+    }
+
+    const pthread_t browserThread = pthread_self();
+    std::atomic<unsigned> made{0};
+    std::atomic<unsigned> cancellable{0};
+};
+
+TEST_F(AVControlMonitor, CannotBeCancelledInACallOfThePlatform) {
+    const auto calls = std::make_shared<MonitorCalls>();
+    const auto reports = [&](const TELIX_JS_AV_PLAY_INFO& reported) {
+        platform.TELIX_JS_AV_GetPlayInfo = [calls, record = reported](TELIX_JS_AV_HANDLE,
+                                                                      TELIX_JS_AV_PLAY_INFO** out) mutable {
+            calls->count();
+            *out = &record;
+            return 0;
+        };
+        poll();
+    };
+    const auto counts = [calls](TELIX_JS_AV_HANDLE) {
+        calls->count();
+        return 0;
+    };
+    platform.TELIX_JS_AV_Pause = counts;
+    platform.TELIX_JS_AV_Resume = counts;
+    platform.TELIX_JS_AV_Stop = counts;
+    playlist(asx({entry("first", "<duration value=\"10\"/>")}));
+    send(TELIX_AV_CB_MSG_PLAYSTART);
+    clock.await(1);
+    clock.second();
+    reports(info(3));
+    EXPECT_EQ(calls->made, 3u); // two reports, of which one is for the log, and the pause
+    reports(info(10));
+    EXPECT_EQ(calls->made, 5u);
+    reports(info(20, 10000));
+    EXPECT_EQ(calls->made, 7u); // with the stop of the clip that has run out
+    EXPECT_EQ(calls->cancellable, 0u);
+    clock.await(0); // the stop has cancelled it, which came into effect afterwards
 }
 
 TEST_F(AVControlMonitor, AMonitorCancelledBeforeItBeganSaysNothing) {
@@ -392,6 +461,50 @@ TEST_F(AVControlMonitor, ASeekThatRestartsReplacesTheMonitor) {
     EXPECT_THAT(asked(), ElementsAre("TELIX_JS_AV_Pause(7)"));
 }
 
+TEST_F(AVControlMonitor, ASeekThatRestartsAfterTheWatchingHasEndedMakesAThreadThatIsNotToRun) {
+    const EmbeddedObject object = watched("mms://media.example/a.wmv");
+    poll(0xFF000001);
+    clock.await(0);
+    EXPECT_EQ(object.call("seek", 1000), true);
+    clock.await(1);
+    clock.second();
+    clock.await(0);
+    EXPECT_EQ(clock.ended(), 2u);
+    // A play has the next one run.
+    object.call("stop");
+    object.call("play", 1);
+    send(TELIX_AV_CB_MSG_PLAYSTART);
+    clock.await(1);
+    clock.second();
+    poll(3);
+    EXPECT_THAT(asked(), ElementsAre("TELIX_JS_AV_Pause(7)"));
+}
+
+TEST_F(AVControlMonitor, WithoutAThreadThePlaybackGoesOnUnwatched) {
+    clock.refuseThreads(true);
+    const EmbeddedObject object = playingVideo();
+    clock.await(0);
+    clock.refuseThreads(false);
+    object.call("stop");
+    object.call("play", 1); // its place is free
+    clock.await(1);
+}
+
+TEST_F(AVControlMonitor, AMonitorThatCannotBeCancelledKeepsItsPlace) {
+    const EmbeddedObject object = watched();
+    clock.refuseCancellation(true);
+    object.call("stop");
+    EXPECT_EQ(state(object), Stopped);
+    object.call("play", 1);
+    send(TELIX_AV_CB_MSG_PLAYSTART);
+    clock.await(1); // no second one
+    poll(3);
+    EXPECT_THAT(asked(), ElementsAre("TELIX_JS_AV_Pause(7)"));
+    clock.refuseCancellation(false);
+    object.call("stop");
+    clock.await(0);
+}
+
 TEST_F(AVControlMonitor, ThereIsOneThreadHoweverOftenThePagePlays) {
     const EmbeddedObject object = watched();
     send(TELIX_AV_CB_MSG_ERR_PLAYING); // leaves the monitor running
@@ -445,6 +558,32 @@ TEST_F(AVControlMonitor, CountsTheDurationFromTheStartTime) {
     EXPECT_THAT(asked(), ElementsAre("TELIX_JS_AV_Stop(7)"));
     EXPECT_EQ(state(object), Finished);
     clock.await(0);
+}
+
+TEST_F(AVControlMonitor, AClipThatRunsOutEndsAlsoIfThePlatformRefusesItsStop) {
+    for (const int result : {0, 1}) {
+        nextPlayer = 7;
+        g_lastReceivedMessage = 0;
+        const EmbeddedObject object = playlist(asx({entry("first", "<duration value=\"10\"/>")}));
+        platform.TELIX_JS_AV_Stop = [result](TELIX_JS_AV_HANDLE) { return result; };
+        send(TELIX_AV_CB_MSG_PLAYSTART);
+        clock.await(1);
+        clock.second();
+        std::vector<int32_t> states;
+        const ScriptFunction listener = browser.function("listener");
+        listener.does([&](const Values&) {
+            states.push_back(state(object));
+            return Value();
+        });
+        object.set("onPlayStateChange", listener);
+        poll(info(20, 10000));
+        EXPECT_THAT(asked(), ElementsAre("TELIX_JS_AV_Stop(7)")) << result;
+        // A stop that was refused is none, and the end of the clip comes all the same.
+        EXPECT_EQ(states,
+                  result == 0 ? (std::vector<int32_t>{Stopped, Finished}) : (std::vector<int32_t>{Finished}));
+        clock.await(0); // cancelled in either case
+        destroy(object);
+    }
 }
 
 TEST_F(AVControlMonitor, ThePositionListenerIsCalledOnceAtTheEndOfSuchAClip) {
@@ -542,6 +681,33 @@ TEST_F(AVControlMonitor, TheEndWaitsThreeSecondsForAPostedChangeAndThenGoesOn) {
     EXPECT_EQ(log.count("NPN_Evaluate"), 0u); // they find their object gone
 }
 
+TEST_F(AVControlMonitor, TheEndDoesNotWaitForAReadyStateThatIsPosted) {
+    const EmbeddedObject object = watched();
+    auto* model = static_cast<AVControl*>(object.model());
+    object.destroy();
+    onPlatformThread([&] { model->changeReadyState(5); });
+    browser.pump();
+    EXPECT_EQ(clock.browserSleeps(), 0u);
+}
+
+TEST_F(AVControlMonitor, AChangeThatFindsNoMemoryIsLostAndNotWaitedFor) {
+    const EmbeddedObject object = playingVideo(kClip, {{"buffering", "false"}});
+    auto* model = static_cast<AVControl*>(object.model());
+    const auto change = [model] {
+        std::thread([model] {
+            const MemoryShortage shortage;
+            model->changePlayState(PLAY_STATE_PLAYING, PLAY_STATE_ERROR);
+        }).join();
+    };
+    change();
+    EXPECT_EQ(log.count("NPN_PluginThreadAsyncCall"), 0u);
+    browser.pump();
+    EXPECT_EQ(state(object), Playing);
+    EXPECT_THAT(logOf(5, change), HasSubstr(logLine("AVCONTROL", "changePlayState", "malloc failed\n")));
+    destroy(object);
+    EXPECT_EQ(clock.browserSleeps(), 0u);
+}
+
 TEST_F(AVControlMonitor, TheEndWaitsNoLongerThanThePostedChanges) {
     const EmbeddedObject object = watched();
     auto* model = static_cast<AVControl*>(object.model());
@@ -566,6 +732,7 @@ TEST_F(AVControlMonitor, AClipChangePostedBeforeTheEndPlaysOnceMoreAndLeavesNoth
     clock.await(0);
     EXPECT_EQ(g_lastPlayedInstance, nullptr);
     send(TELIX_AV_CB_MSG_PLAYSTART); // finds no object
+    blocksLeftBehind(1);             // its record
 }
 
 TEST_F(AVControlMonitor, ManyObjectsComeAndGoWhileTheirMonitorsRun) {

@@ -186,6 +186,7 @@ protected:
         send(message);
         if (!target) {
             EXPECT_EQ(g_lastReceivedMessage, last);
+            blocksLeftBehind(++m_unheard);
             return;
         }
         const int after = target->getPlayState();
@@ -296,6 +297,7 @@ protected:
     std::mt19937 m_random{GetParam()};
     std::vector<Media> m_media;
     std::set<uint32_t> m_living; // changed while no monitor polls
+    size_t m_unheard = 0;        // messages while no object had played
     size_t m_seen = 0;
     TELIX_JS_AV_PLAY_INFO m_report{};
     std::atomic<int> m_reportResult{1};

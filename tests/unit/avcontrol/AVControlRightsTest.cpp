@@ -61,6 +61,20 @@ TEST_F(AVControlRights, WithoutMemoryGiveNull) {
     memoryLeftBehind(2);
 }
 
+TEST_F(AVControlRights, WhoseStringCannotBeCopiedGiveNullForItAndThoseAfterIt) {
+    const EmbeddedObject object = playingVideo();
+    const ScriptFunction listener = browser.function("rights");
+    object.set("onDRMRightsError", listener);
+    sendRightsError(1, "content", "system", "url", 0);
+    EXPECT_THAT(listener.last(), ElementsAre(Value(1), Value(nullptr), Value(nullptr), Value(nullptr)));
+    sendRightsError(1, "content", "system", "url", 1);
+    EXPECT_THAT(listener.last(), ElementsAre(Value(1), Value("content"), Value(nullptr), Value(nullptr)));
+    sendRightsError(1, "content", "system", "url", 2);
+    EXPECT_THAT(listener.last(), ElementsAre(Value(1), Value("content"), Value("system"), Value(nullptr)));
+    leftBehind(listener, 3);
+    memoryLeftBehind(3);
+}
+
 TEST_F(AVControlRights, WithoutAListenerAreAnEventOnly) {
     playingVideo();
     sendRightsError(1, "content", "system", "url");
@@ -75,6 +89,7 @@ TEST_F(AVControlRights, WithNoObjectEverPlayedReachNobody) {
     sendRightsError(1, "content", "system", "url");
     EXPECT_THAT(events(), IsEmpty());
     EXPECT_EQ(listener.count(), 0u);
+    blocksLeftBehind(4); // the record and its three strings
 }
 
 TEST_F(AVControlRights, GoToTheObjectThatPlayedLast) {
@@ -91,6 +106,7 @@ TEST_F(AVControlRights, AfterTheObjectHasGoneReachNobody) {
     destroy(object);
     sendRightsError(1, "content", "system", "url");
     EXPECT_EQ(log.count("event DRMRightsError"), 0u);
+    blocksLeftBehind(4);
 }
 
 TEST_F(AVControlRights, OfAnElementWithoutAnIdStopTheProcess) {

@@ -77,6 +77,9 @@ AVControlTest::AVControlTest() {
 void AVControlTest::TearDown() {
     BorderTest::TearDown();
     clock.await(0); // no monitor is left
+    if (!HasFailure()) {
+        EXPECT_EQ(m_callbackHeap.left(), m_blocksLeftBehind) << "blocks of the platform's callbacks left";
+    }
 }
 
 EmbeddedObject AVControlTest::element(const std::string& mimeType, const Attributes& attributes) {
@@ -116,7 +119,7 @@ EmbeddedObject AVControlTest::playlist(const std::string& text, const Attributes
 
 void AVControlTest::post(TELIX_AV_CB_MSG message) {
     ASSERT_NE(m_stateCallback, nullptr) << "no player was ever registered";
-    onForeignThread([&] { m_stateCallback(7, message); });
+    onForeignThread([&] { m_callbackHeap.during([&] { m_stateCallback(7, message); }); });
 }
 
 void AVControlTest::send(TELIX_AV_CB_MSG message) {
@@ -125,13 +128,16 @@ void AVControlTest::send(TELIX_AV_CB_MSG message) {
 }
 
 void AVControlTest::sendRightsError(int errorState, const std::string& contentId, const std::string& system,
-                                    const std::string& url) {
+                                    const std::string& url, unsigned copies) {
     ASSERT_NE(m_rightsCallback, nullptr) << "no player was ever registered";
     onForeignThread([&] {
         // Gone when the callback returns, like the platform's own.
         std::string texts[] = {contentId, system, url};
         const auto bytes = [](std::string& text) { return reinterpret_cast<unsigned char*>(text.data()); };
-        m_rightsCallback(7, errorState, bytes(texts[0]), bytes(texts[1]), bytes(texts[2]));
+        m_callbackHeap.during([&] {
+            const MemoryShortage shortage(copies < 3 ? 1 : 0, copies);
+            m_rightsCallback(7, errorState, bytes(texts[0]), bytes(texts[1]), bytes(texts[2]));
+        });
     });
     browser.pump();
 }

@@ -8,6 +8,7 @@
 
 #include "tests/support/BorderTest.h"
 #include "tests/unit/avcontrol/MonitorClock.h"
+#include "tests/unit/support/Heap.h"
 
 namespace avcontrol {
 
@@ -44,8 +45,12 @@ protected:
     // The platform calls back; the page is brought to rest after it.
     void send(TELIX_AV_CB_MSG message);
     void post(TELIX_AV_CB_MSG message); // without the rest
+    // There is memory for copies of the first `copies` strings, and none for the next.
     void sendRightsError(int state, const std::string& contentId, const std::string& system,
-                         const std::string& url);
+                         const std::string& url, unsigned copies = 3);
+    // How many blocks the platform's callbacks leave on the heap on purpose: records that nobody gets, and
+    // what belongs to them. The test fails if it isn't exactly that.
+    void blocksLeftBehind(size_t blocks) { m_blocksLeftBehind = blocks; }
     bool hasCallbacks() const { return m_stateCallback != nullptr; }
 
     int32_t state(const EmbeddedObject& object) const { return object.get("playState").value.integer(); }
@@ -68,6 +73,8 @@ protected:
 private:
     TELIX_JS_AV_PLAYSTATE_CB m_stateCallback = nullptr;
     TELIX_JS_AV_DRM_RIGHTS_CB m_rightsCallback = nullptr;
+    HeapWatch m_callbackHeap;
+    size_t m_blocksLeftBehind = 0;
 };
 
 // A playlist document of these clips; what a clip is given beside its URL follows a blank.

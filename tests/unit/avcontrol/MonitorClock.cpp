@@ -2,6 +2,7 @@
 // while it sleeps.
 #include "tests/unit/avcontrol/MonitorClock.h"
 
+#include <cerrno>
 #include <ctime>
 #include <memory>
 
@@ -137,6 +138,8 @@ void MonitorClock::reset() {
     const Lock lock(m_mutex);
     m_ended = 0;
     m_free = false;
+    m_refusesThreads = false;
+    m_refusesCancellation = false;
     m_browserSleeps = 0;
     m_whenBrowserSleeps = nullptr;
 }
@@ -165,6 +168,9 @@ int reallyCreateThread(pthread_t* thread, const pthread_attr_t* attributes, void
 
 int MonitorClock::createThread(pthread_t* thread, const pthread_attr_t* attributes, void* (*body)(void*),
                                void* argument) {
+    if (m_refusesThreads) {
+        return EAGAIN;
+    }
     auto given = std::make_unique<const MonitorThread::Body>(MonitorThread::Body{body, argument});
     const Lock lock(m_mutex);
     const int result = reallyCreateThread(thread, attributes, MonitorThread::run,
@@ -176,10 +182,20 @@ int MonitorClock::createThread(pthread_t* thread, const pthread_attr_t* attribut
     return result;
 }
 
-// The linker leads the `pthread_create` of this program's objects here (tests/unit/CMakeLists.txt).
+int reallyCancelThread(pthread_t thread) __asm__("__real_pthread_cancel");
+
+int MonitorClock::cancelThread(pthread_t thread) const {
+    return m_refusesCancellation ? ESRCH : reallyCancelThread(thread);
+}
+
+// The linker leads both of this program's objects here (tests/unit/CMakeLists.txt).
 extern "C" int __wrap_pthread_create(pthread_t* thread, const pthread_attr_t* attributes,
                                      void* (*body)(void*), void* argument) {
     return MonitorClock::instance().createThread(thread, attributes, body, argument);
+}
+
+extern "C" int __wrap_pthread_cancel(pthread_t thread) {
+    return MonitorClock::instance().cancelThread(thread);
 }
 
 extern "C" unsigned int sleep(unsigned int seconds) {

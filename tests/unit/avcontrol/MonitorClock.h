@@ -6,6 +6,7 @@
 
 #include <pthread.h>
 
+#include <atomic>
 #include <cstddef>
 #include <functional>
 #include <utility>
@@ -29,6 +30,10 @@ public:
     // Threads that have ended since the last reset.
     size_t ended();
 
+    // Whether pthread_create and pthread_cancel fail from now on.
+    void refuseThreads(bool refuses) { m_refusesThreads = refuses; }
+    void refuseCancellation(bool refuses) { m_refusesCancellation = refuses; }
+
     // How often the browser thread slept since the last reset, and what happens meanwhile.
     unsigned browserSleeps() const { return m_browserSleeps; }
     void whenBrowserSleeps(std::function<void()> what) { m_whenBrowserSleeps = std::move(what); }
@@ -36,7 +41,8 @@ public:
 
     void sleepOneSecond(); // what `sleep` does
     int createThread(pthread_t* thread, const pthread_attr_t* attributes, void* (*body)(void*),
-                     void* argument); // what `pthread_create` does
+                     void* argument);         // what `pthread_create` does
+    int cancelThread(pthread_t thread) const; // what `pthread_cancel` does
 
 private:
     friend class MonitorThread;
@@ -54,6 +60,8 @@ private:
     size_t m_ended = 0;
     unsigned long m_now = 0;
     bool m_free = false;
+    bool m_refusesThreads = false;
+    std::atomic<bool> m_refusesCancellation{false};
     unsigned m_browserSleeps = 0;
     std::function<void()> m_whenBrowserSleeps;
 };

@@ -15,6 +15,7 @@
 #include "src/videobroadcast/VideoBroadcast.h"
 #include "src/videobroadcast/VideoBroadcastUtils.h"
 #include "tests/support/BorderTest.h"
+#include "tests/unit/support/Heap.h"
 
 namespace {
 
@@ -121,8 +122,10 @@ protected:
 
     void runEverywhere(const Scenario& scenario, const std::vector<Action>& actions) {
         SCOPED_TRACE(scenario.name);
+        const size_t leftBefore = callbackHeap.left();
         const unsigned calls = runWith(scenario, nullptr, 0);
         EXPECT_GT(calls, 0U) << "the scenario never enters the page";
+        EXPECT_EQ(callbackHeap.left(), leftBefore) << "an event that was delivered has left something";
         for (const Action& action : actions) {
             SCOPED_TRACE(action.name);
             for (unsigned at = 1; at <= calls && !HasFailure(); ++at) {
@@ -204,7 +207,7 @@ public:
     // A message of the platform, which is posted to the page.
     void send(TELIX_AV_CB_MSG message) {
         if (playState) {
-            playState(7, message);
+            callbackHeap.during([&] { playState(7, message); });
             browser.pump();
         }
     }
@@ -225,6 +228,9 @@ public:
     TELIX_JS_VB_PROGRAMMES_CB programmes = nullptr;
     TELIX_JS_VB_PARENTAL_RATING_CB rating = nullptr;
     ScriptedBrowser& page = browser;
+    // Of the platform's callbacks. An event whose object the page has removed leaves its record or its
+    // payload.
+    HeapWatch callbackHeap;
 
 private:
     // A player that has been destroyed is none of the platform's any more.
@@ -378,13 +384,15 @@ const std::vector<Page::Scenario> kBroadcastScenarios = {
      [](Page& page) {
          page.broadcast();
          const TELIX_JS_VB_HANDLE handle = page.vbHandle;
-         page.fullScreenChange(handle);
-         page.channelChange(handle, 3);
-         page.channelError(handle, 3, 1);
-         page.vbPlayState(handle, 0, TELIX_PLAYSTATE_STOPPED, TELIX_ERR_STATE_NONE);
-         page.programmes(handle);
-         page.rating(handle, bytes("content"), 9, bytes("system"));
-         streamEventHandler(handle, nullptr, nullptr, bytes("goal"), bytes("4142"), 4, bytes("trigger"));
+         page.callbackHeap.during([&] {
+             page.fullScreenChange(handle);
+             page.channelChange(handle, 3);
+             page.channelError(handle, 3, 1);
+             page.vbPlayState(handle, 0, TELIX_PLAYSTATE_STOPPED, TELIX_ERR_STATE_NONE);
+             page.programmes(handle);
+             page.rating(handle, bytes("content"), 9, bytes("system"));
+             streamEventHandler(handle, nullptr, nullptr, bytes("goal"), bytes("4142"), 4, bytes("trigger"));
+         });
      }},
 };
 
@@ -454,7 +462,8 @@ const std::vector<Page::Scenario> kControlScenarios = {
      [](Page& page) {
          page.playing();
          if (page.rightsError) {
-             page.rightsError(7, 1, bytes("content"), bytes("system"), bytes("url"));
+             page.callbackHeap.during(
+                 [&] { page.rightsError(7, 1, bytes("content"), bytes("system"), bytes("url")); });
          }
      }},
     {"what the monitor posts",

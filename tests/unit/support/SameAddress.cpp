@@ -1,12 +1,9 @@
-// The linker leads `new` and the sized `delete` of this program's objects here (tests/unit/CMakeLists.txt),
-// and the names "__real_..." to the ones that a sanitizer may have put in place.
+// `new` and the sized `delete` of this program's objects ask here first (Heap.cpp).
 #include "tests/unit/support/SameAddress.h"
 
 #include <gtest/gtest.h>
 
-void* allocate(size_t size) __asm__("__wrap__Znw" TELIX_SIZE_LETTER);
 void* reallyAllocate(size_t size) __asm__("__real__Znw" TELIX_SIZE_LETTER);
-void release(void* block, size_t size) noexcept __asm__("__wrap__ZdlPv" TELIX_SIZE_LETTER);
 void reallyRelease(void* block, size_t size) noexcept __asm__("__real__ZdlPv" TELIX_SIZE_LETTER);
 
 namespace {
@@ -42,15 +39,4 @@ bool SameAddress::giveBack(void* block) {
     }
     t_current->m_isTaken = false;
     return true;
-}
-
-void* allocate(size_t size) {
-    void* block = SameAddress::take(size);
-    return block ? block : reallyAllocate(size);
-}
-
-void release(void* block, size_t size) noexcept {
-    if (!SameAddress::giveBack(block)) {
-        reallyRelease(block, size);
-    }
 }

@@ -136,6 +136,7 @@ TEST_F(BroadcastEventTest, AnElementWithoutIdGetsNoEventsAtAll) {
     EXPECT_EQ(handler.count(), 0U);
     EXPECT_THAT(log.everything(), IsEmpty());
     EXPECT_TRUE(modelOf(vb).isActive());
+    blocksLeftBehind(2); // the payloads of the latter two
 }
 
 TEST_F(BroadcastEventTest, AnElementWithoutIdIsLoggedForEachEvent) {
@@ -168,6 +169,59 @@ TEST_F(BroadcastEventTest, AnEventOfTheLastObjectThatHasGoneTouchesNoScript) {
     browser.pump();
     EXPECT_THAT(log.everything(), IsEmpty());
     EXPECT_EQ(handler.count(), 0U);
+    blocksLeftBehind(1); // the record
+}
+
+// What stays of each event, in blocks of the heap: nothing of one that is delivered, the payload of one whose
+// object has gone, that and the record of one whose object was the last.
+TEST_F(BroadcastEventTest, WhatAnEventLeavesIsItsPayloadOrPayloadAndRecord) {
+    anythingMayBeLeft(); // the references of each delivery
+    struct Row {
+        std::function<void(TELIX_JS_VB_HANDLE)> fire;
+        size_t payload; // its blocks
+    };
+    ___UINT8* const text = bytes("text");
+    const Row rows[] = {
+        {[&](TELIX_JS_VB_HANDLE vb) { callbacks.channelChangeSucceeded(vb, 0); }, 1},
+        {[&](TELIX_JS_VB_HANDLE vb) { callbacks.channelChangeError(vb, 0, 1); }, 1},
+        {[&](TELIX_JS_VB_HANDLE vb) { callbacks.programmesChanged(vb); }, 0},
+        {[&](TELIX_JS_VB_HANDLE vb) { callbacks.parentalRatingChange(vb, text, 0, text); }, 1},
+        {[&](TELIX_JS_VB_HANDLE vb) { callbacks.parentalRatingError(vb, nullptr, 0, text); }, 1},
+        {[&](TELIX_JS_VB_HANDLE vb) { callbacks.playStateChange(vb, 0, 2, 200); }, 1},
+        {[&](TELIX_JS_VB_HANDLE vb) { callbacks.fullScreenChange(vb); }, 0},
+        {[&](TELIX_JS_VB_HANDLE vb) { streamEventHandler(vb, nullptr, nullptr, text, text, 3, text); }, 4},
+    };
+    size_t left = 0;
+    for (const Row& row : rows) {
+        const TELIX_JS_VB_HANDLE handle = nextHandle;
+        const EmbeddedObject delivered = embed();
+        fire([&] { row.fire(handle); });
+        EXPECT_EQ(callbackHeap.left(), left) << &row - rows;
+        const EmbeddedObject gone = embed("other");
+        onPlatformThread([&] { row.fire(handle + 1); });
+        gone.destroy();
+        browser.pump();
+        EXPECT_EQ(callbackHeap.left(), left += row.payload) << &row - rows;
+        onPlatformThread([&] { row.fire(handle); });
+        delivered.destroy();
+        browser.pump();
+        EXPECT_EQ(callbackHeap.left(), left += row.payload + 1) << &row - rows;
+    }
+    blocksLeftBehind(left);
+}
+
+TEST_F(BroadcastEventTest, AnEventThatFindsNoMemoryForItsPayloadIsLost) {
+    const EmbeddedObject vb = ready();
+    onPlatformThread([&] {
+        const MemoryShortage shortage;
+        EXPECT_EQ(callbacks.channelChangeSucceeded(7, 11), 0);
+        EXPECT_EQ(callbacks.channelChangeError(7, 11, 1), 0);
+        EXPECT_EQ(callbacks.parentalRatingChange(7, nullptr, 61, nullptr), 0);
+        EXPECT_EQ(callbacks.parentalRatingError(7, nullptr, 61, nullptr), 0);
+        EXPECT_EQ(callbacks.playStateChange(7, 0, 2, 200), 0);
+    });
+    EXPECT_FALSE(g_main_context_pending(nullptr));
+    blocksLeftBehind(5); // the records
 }
 
 TEST_F(BroadcastEventTest, EventsOfObjectsThatHaveGoneAreLogged) {
@@ -235,6 +289,7 @@ TEST_F(BroadcastEventTest, AnEventIsNotDeliveredToTheNextObjectAtTheSameAddress)
     browser.pump();
     EXPECT_EQ(handler.count(), 1U);
     leftBehind(handler);
+    blocksLeftBehind(3); // the payloads of those that have one
 }
 
 TEST_F(BroadcastEventTest, AnEventForAReplacedObjectIsLoggedAsOneForAnInvalidInstance) {
@@ -310,6 +365,7 @@ TEST_F(BroadcastEventTest, ACallbackForAnUnknownHandleQueuesNothing) {
         EXPECT_EQ(callbacks.fullScreenChange(99), 0);
     });
     EXPECT_FALSE(g_main_context_pending(nullptr));
+    blocksLeftBehind(7); // the records
 }
 
 TEST_F(BroadcastEventTest, EachObjectGetsItsOwnEvents) {

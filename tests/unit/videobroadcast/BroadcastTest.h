@@ -4,12 +4,14 @@
 #define TELIX_TESTS_UNIT_VIDEOBROADCAST_BROADCASTTEST_H
 
 #include <functional>
+#include <optional>
 #include <string>
 #include <thread>
 #include <vector>
 
 #include "src/videobroadcast/VideoBroadcast.h"
 #include "tests/support/BorderTest.h"
+#include "tests/unit/support/Heap.h"
 
 class BroadcastTest : public BorderTest {
 protected:
@@ -59,9 +61,24 @@ protected:
         return *static_cast<VideoBroadcast*>(object.model());
     }
 
-    static void onPlatformThread(const std::function<void()>& body) {
-        std::thread thread(body);
+    // Runs calls of the platform's callbacks as the platform does.
+    void onPlatformThread(const std::function<void()>& body) {
+        std::thread thread([&] { callbackHeap.during(body); });
         thread.join();
+    }
+
+    // How many blocks the platform's callbacks leave on the heap on purpose: records that nobody gets, and
+    // what belongs to them. The test fails if it isn't exactly that.
+    void blocksLeftBehind(size_t blocks) { m_blocksLeftBehind = blocks; }
+
+    // No check of them; only where the test can't know.
+    void anyBlocksMayBeLeft() { m_blocksLeftBehind.reset(); }
+
+    void TearDown() override {
+        BorderTest::TearDown();
+        if (m_blocksLeftBehind && !HasFailure()) {
+            EXPECT_EQ(callbackHeap.left(), *m_blocksLeftBehind) << "blocks of the platform's callbacks left";
+        }
     }
 
     // The calls of the platform since the log was cleared.
@@ -69,6 +86,7 @@ protected:
 
     Callbacks callbacks;
     TELIX_JS_VB_HANDLE nextHandle = 7;
+    HeapWatch callbackHeap;
 
 private:
     template <class Callback>
@@ -85,6 +103,8 @@ private:
             return 0;
         };
     }
+
+    std::optional<size_t> m_blocksLeftBehind = 0; // nothing where the test can't know
 };
 
 #endif

@@ -6,6 +6,7 @@
 #include <gmock/gmock.h>
 
 #include "common/PluginUtils.h"
+#include "src/videobroadcast/VideoBroadcastUtils.h"
 #include "tests/unit/videobroadcast/BroadcastTest.h"
 
 using ::testing::ElementsAre;
@@ -37,6 +38,12 @@ protected:
         const EmbeddedObject vb = ready();
         EXPECT_TRUE(vb.call("addStreamEventListener", url, "goal", "5", tag));
         return given;
+    }
+
+    // From here on a new object gets its window and no element.
+    void refuseElement() {
+        browser.refuse("NPN_GetValue", ~0U, 1);
+        browser.refuse("NPN_GetProperty"); // the element's style
     }
 
     static ___UINT8* bytes(const char* text) { return reinterpret_cast<___UINT8*>(const_cast<char*>(text)); }
@@ -78,6 +85,25 @@ TEST_F(StreamEventTest, WithoutWindowNothingIsStarted) {
     EXPECT_TRUE(vb.call("addStreamEventListener", "events.xml", "goal", browser.function("listener")));
     EXPECT_EQ(log.count("NPN_Evaluate"), 0U);
     EXPECT_THAT(vb.element().calls("addEventListener"), IsEmpty());
+}
+
+TEST_F(StreamEventTest, WithoutElementTheFetchIsStartedAndNoListenerAttached) {
+    refuseElement();
+    const EmbeddedObject vb = ready();
+    EXPECT_TRUE(vb.call("addStreamEventListener", "events.xml", "goal", browser.function("listener")));
+    EXPECT_EQ(browser.lastScript(), parseStreamEventXMLScript("events.xml", "goal", "tv", true));
+    EXPECT_EQ(log.count("NPN_Invoke"), 0U);
+}
+
+TEST_F(StreamEventTest, WithoutElementARemovalTakesTheSubscriptionAway) {
+    refuseElement();
+    const EmbeddedObject vb = ready();
+    vb.call("addStreamEventListener", "dvb://1", "goal", "5", "31");
+    log.clear();
+    EXPECT_TRUE(vb.call("removeStreamEventListener", "dvb://1", "goal", browser.function("listener")));
+    EXPECT_EQ(log.count("NPN_Invoke"), 0U);
+    EXPECT_THAT(platformCalls(),
+                ElementsAre("TELIX_JS_VB_UnRegisterStreamEvent(7, callback, \"5\", \"31\", \"goal\")"));
 }
 
 TEST_F(StreamEventTest, AResultOfTheListItselfIsReleased) {
@@ -299,6 +325,42 @@ TEST_F(StreamEventTest, AnEventWithoutDataHasAnEmptyText) {
     ASSERT_EQ(browser.events().size(), 1U);
     EXPECT_EQ(browser.events().front().fields,
               (std::map<std::string, std::string>{{"name", "goal"}, {"data", ""}, {"status", "error"}}));
+}
+
+TEST_F(StreamEventTest, DataEndAtTheirFirstZeroByte) {
+    const EmbeddedObject vb = ready();
+    onPlatformThread([&] {
+        streamEventHandler(7, nullptr, nullptr, bytes("goal"),
+                           bytes("41\0"
+                                 "42"),
+                           5, bytes("trigger"));
+    });
+    browser.pump();
+    EXPECT_EQ(browser.events().front().fields.at("data"), "41");
+}
+
+TEST_F(StreamEventTest, WithoutMemoryForItsRecordAnEventIsLost) {
+    const EmbeddedObject vb = ready();
+    onPlatformThread([&] {
+        const MemoryShortage shortage;
+        EXPECT_EQ(streamEventHandler(7, nullptr, nullptr, bytes("goal"), bytes("41"), 2, bytes("trigger")),
+                  0);
+    });
+    EXPECT_FALSE(g_main_context_pending(nullptr));
+    blocksLeftBehind(1); // the record
+}
+
+TEST_F(StreamEventTest, ATextThatFindsNoMemoryIsEmptyWithThoseAfterIt) {
+    const EmbeddedObject vb = ready();
+    for (unsigned texts = 0; texts < 3; ++texts) {
+        onPlatformThread([&] {
+            const MemoryShortage shortage(1, 1 + texts); // the payload, then name, data and status
+            streamEventHandler(7, nullptr, nullptr, bytes("goal"), bytes("99"), 2, bytes("trigger"));
+        });
+        browser.pump();
+        EXPECT_EQ(browser.lastScript(),
+                  streamEventScript(texts > 0 ? "goal" : "", texts > 1 ? "99" : "", "", "tv"));
+    }
 }
 
 TEST_F(StreamEventTest, AnEventOfASubscriptionThatHasJustGoneIsDispatchedAllTheSame) {
