@@ -53,6 +53,7 @@ struct ScriptMember {
     ScriptTypes types;     // of a property: the value read, and as the one argument the value written
 
     constexpr bool isMethod() const { return invoke != nullptr; }
+    constexpr bool isConstant() const { return !isMethod() && !read; }
 
     // The row with another spelling of the name in the log.
     constexpr ScriptMember logged(const char* spelling) const {

@@ -72,20 +72,18 @@ bool ScriptWrapper::readMember(const ScriptMember* member, PluginBase* model, NP
     if (m_class.readsStartVoid) {
         setVoid(*result);
     }
+    if (member && member->isConstant()) { // which an object that has gone leaves behind
+        logMember(m_class, "GetProperty", *member);
+        setResult(*result, member->constantValue);
+        return true;
+    }
     if (!model) {
         return false;
     }
-    if (member) {
-        if (member->isMethod()) {
-            return false;
-        }
+    if (member && member->read) {
         logMember(m_class, "GetProperty", *member);
-        if (member->read) {
-            const CallGuard guard(*model);
-            return member->read(*model, *result);
-        }
-        setResult(*result, member->constantValue);
-        return true;
+        const CallGuard guard(*model);
+        return member->read(*model, *result);
     }
     const ScriptArray* array = m_class.array;
     const int index = array ? indexInRange(*array, *model, name) : -1;

@@ -100,7 +100,7 @@ public:
 
     bool HasProperty(NPIdentifier name) override {
         const ScriptMember* member = find(name);
-        return member ? !member->isMethod() : m_class.array && hasIndex(currentModel(), name);
+        return (member && !member->isMethod()) || (m_class.array && hasIndex(currentModel(), name));
     }
 
     bool GetProperty(NPIdentifier name, NPVariant* result) override {

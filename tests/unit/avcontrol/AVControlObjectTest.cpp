@@ -1,6 +1,8 @@
 // The A/V control object: creation from attributes, choice of media, `data`, display area, end.
 #include <cstdlib>
 
+#include "common/PluginUtils.h"
+#include "src/avcontrol/AVControl.h"
 #include "tests/unit/avcontrol/AVControlTest.h"
 
 using ::testing::ElementsAre;
@@ -266,6 +268,21 @@ TEST_F(AVControlObject, ANewAddressStopsWhatPlays) {
     EXPECT_THAT(playerCalls(), ElementsAre("TELIX_JS_AV_Stop(7)"));
 }
 
+TEST_F(AVControlObject, ANewAddressIsResolvedAfterTheStopThenEncodedThenFetched) {
+    const EmbeddedObject object = element("video/mp4", {{"id", "video"}, {"src", kClip}});
+    object.call("play", 1);
+    log.clear();
+    object.set("data", "next one.mp4");
+    const std::string url = "http://page.example/app/next one.mp4";
+    log.expectInOrder({"TELIX_JS_AV_Stop(7)", "event PlayStateChange at video",
+                       "NPN_Evaluate window \"document.location.href\"",
+                       "NPN_Evaluate window \"" + getEncodedURL(url) + "\"",
+                       "NPN_Invoke window.getEncodedURL()",
+                       "NPN_GetURLNotify \"http://page.example/app/next%20one.mp4\" null"});
+    EXPECT_EQ(log.count("NPN_Invoke window"), 1u);
+    EXPECT_EQ(log.count("NPN_GetURLNotify"), 1u);
+}
+
 TEST_F(AVControlObject, ANewAddressIsFetchedUnlessTheElementHadData) {
     const EmbeddedObject plain = element("video/mp4", {{"id", "plain"}});
     plain.set("data", "rtsp://media.example/a");
@@ -351,6 +368,16 @@ TEST_F(AVControlObject, AnUnchangedPlaceIsNotToldAgain) {
     object.setRectangle(0, 0, 641, 360);
     object.setWindow(0, 0, 0, 0);
     EXPECT_EQ(platform.TELIX_JS_AV_SetDisplayArea.count(), 2u);
+}
+
+TEST_F(AVControlObject, AForcedResetTellsAnUnchangedPlaceAgain) {
+    const EmbeddedObject object = video();
+    object.setRectangle(0, 0, 640, 360);
+    object.setWindow(0, 0, 0, 0);
+    log.clear();
+    EXPECT_EQ(static_cast<AVControl*>(object.model())->setWindow(nullptr, true), NPERR_NO_ERROR);
+    log.expectInOrder({"NPN_InvalidateRect top 0 left 0 bottom 360 right 640",
+                       "TELIX_JS_AV_SetDisplayArea(7, {0,0,640,360})"});
 }
 
 TEST_F(AVControlObject, APlaceThatThePlatformRefusedIsToldAgain) {
@@ -485,6 +512,15 @@ TEST_F(AVControlObject, ListenersAreReleasedInOrderButForTheOneOfFullScreen) {
         object.set(property, listeners.back());
         EXPECT_EQ(listeners.back().pluginReferences(), 1) << property;
     }
+    platform.TELIX_JS_AV_GetComponents = [](TELIX_JS_AV_HANDLE, TELIX_JS_AVCOMPTYPE,
+                                            TELIX_JS_AVCOMPHANDLE** out, uint32_t*) {
+        static TELIX_JS_AVCOMPHANDLE none[1];
+        *out = none;
+        return 0;
+    };
+    for (const int type : {2, 0, 1}) { // so that the order of their creation is not that of their release
+        object.call("getComponents", type);
+    }
     object.dropScriptObject();
     object.destroy();
     log.clear();
@@ -493,7 +529,9 @@ TEST_F(AVControlObject, ListenersAreReleasedInOrderButForTheOneOfFullScreen) {
     EXPECT_THAT(released,
                 ElementsAre("NPN_ReleaseObject onPlayStateChange", "NPN_ReleaseObject onPlaySpeedChanged",
                             "NPN_ReleaseObject onPlayPositionChanged", "NPN_ReleaseObject JSAVControl",
-                            "NPN_ReleaseObject onDRMRightsError", "NPN_ReleaseObject video"));
+                            "NPN_ReleaseObject JSAVcomponentList#2", "NPN_ReleaseObject JSAVcomponentList#3",
+                            "NPN_ReleaseObject JSAVcomponentList", "NPN_ReleaseObject onDRMRightsError",
+                            "NPN_ReleaseObject video"));
     leftBehind(listeners[3]);
 }
 
@@ -505,6 +543,21 @@ TEST_F(AVControlObject, AWrapperThatOutlivesItsObjectAnswersNothing) {
     EXPECT_FALSE(wrapper.get("playState").succeeded);
     EXPECT_FALSE(wrapper.set("data", kClip).succeeded);
     EXPECT_THAT(logOf(5, [&] { wrapper.call("play", 1); }), HasSubstr("Can't find plugin pointer\n"));
+}
+
+TEST_F(AVControlObject, AWrapperThatOutlivesItsObjectHasItsConstantsAndRefusesValuesOfAnotherType) {
+    const EmbeddedObject object = video();
+    const ObjectRef wrapper = object.scriptObject();
+    destroy(object);
+    EXPECT_EQ(wrapper.get("COMPONENT_TYPE_VIDEO"), 0);
+    EXPECT_EQ(wrapper.get("COMPONENT_TYPE_AUDIO"), 1);
+    EXPECT_EQ(wrapper.get("COMPONENT_TYPE_SUBTITLE"), 2);
+    EXPECT_FALSE(wrapper.set("COMPONENT_TYPE_VIDEO", 1).succeeded);
+    EXPECT_FALSE(wrapper.set("data", 1).succeeded);
+    EXPECT_FALSE(wrapper.set("persist", 1).succeeded);
+    for (const char* number : {"currentTrackIndex", "width", "height"}) {
+        EXPECT_FALSE(wrapper.set(number, "1").succeeded) << number;
+    }
 }
 
 TEST_F(AVControlObject, TheWrapperIsMadeOnceAndHandedOutWithAReference) {

@@ -303,6 +303,13 @@ TEST_F(ScriptWrapperTest, ArgumentsAreConvertedFromTheFirstToTheLast) {
               converted("a") + converted("b") + converted("c"));
 }
 
+TEST_F(ScriptWrapperTest, AStringOfScriptEndsAtItsFirstZeroByte) {
+    const std::string text("ab\0cd", 5);
+    EXPECT_EQ(shelf.call("join", text, 1, true), "ab 1 yes");
+    EXPECT_TRUE(shelf.set("label", text));
+    EXPECT_EQ(shelf.get("label"), "ab");
+}
+
 TEST_F(ScriptWrapperTest, ArgumentsOfOtherTypesFailTheCall) {
     EXPECT_FALSE(shelf.call("join", 1, 1, true));
     EXPECT_FALSE(shelf.call("join", "a", "1", true));
@@ -406,6 +413,19 @@ TEST_F(ScriptWrapperTest, NamedAccessDoesNoStringWork) {
     EXPECT_EQ(log.count("NPN_UTF8FromIdentifier"), 0U);
     shelf.hasProperty("1");
     EXPECT_EQ(log.count("NPN_UTF8FromIdentifier"), 1U);
+}
+
+TEST_F(ScriptWrapperTest, TheNameOfAMethodIsLookedAtAsAnIndexOfTheListAndIsNone) {
+    Shelf::items = {nullptr};
+    const NPIdentifier name = Name("item").identifier();
+    EXPECT_FALSE(JSPluginBase::_HasProperty(shelf.object(), name));
+    EXPECT_THAT(log.everything(), ElementsAre("NPN_UTF8FromIdentifier item"));
+    NPVariant result{};
+    result.type = NPVariantType_Int32;
+    EXPECT_FALSE(JSPluginBase::_GetProperty(shelf.object(), name, &result));
+    EXPECT_EQ(result.type, NPVariantType_Void);
+    EXPECT_EQ(log.count("NPN_UTF8FromIdentifier item"), 2U);
+    EXPECT_EQ(log.count("NPN_"), 2U);
 }
 
 TEST_F(ScriptWrapperTest, LogsUnderTheModuleOfTheClass) {
