@@ -2,6 +2,8 @@
 #include <cstring>
 
 #include "common/BrowserGates.h"
+#include "common/PluginExports.h"
+#include "common/PluginUtils.h"
 #include "tests/support/BorderTest.h"
 
 using ::testing::IsNull;
@@ -425,6 +427,25 @@ TEST_F(BrowserGatesTest, ALogLevelOfZeroIsReadAgainAndAnyOtherStays) {
               logLine("COMMON", "NPN_MemFlush", " is called\n") +
                   logLine("COMMON", "NPN_MemFlush", " is called\n") +
                   logLine("COMMON", "NPN_MemFlush", " is called\n"));
+}
+
+TEST_F(BrowserGatesTest, EachSourceFileKeepsALogLevelOfItsOwn) {
+    const auto readString = [](const char* text) {
+        stringValue(NPString{text, static_cast<uint32_t>(std::strlen(text))});
+    };
+    EXPECT_EQ(logOf(9,
+                    [&] {
+                        NPN_MemFlush(1); // from here on the gates' level
+                        setenv("LOG_MODULE", "2", 1);
+                        readString("first"); // and from here on that of the values
+                        NPN_MemFlush(1);
+                        setenv("LOG_MODULE", "9", 1);
+                        readString("second");
+                        NPP_SetValue(nullptr, NPNVxDisplay, nullptr); // of a third file
+                    }),
+              logLine("COMMON", "NPN_MemFlush", " is called\n") +
+                  logLine("COMMON", "NPN_MemFlush", " is called\n") +
+                  logLine("COMMON", "setValue", " is called \n"));
 }
 
 } // namespace

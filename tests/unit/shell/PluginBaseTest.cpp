@@ -210,6 +210,12 @@ TEST_F(PluginBaseTest, InvokeJScriptEvaluatesOnTheWindow) {
                 ElementsAre("NPN_GetValue 15", "NPN_Evaluate window \"f()\"", "NPN_ReleaseVariantValue"));
 }
 
+TEST_F(PluginBaseTest, InvokeJScriptEvaluatesAScriptBeyondAZeroByte) {
+    const std::string script("f('a\0b')", 9);
+    browser.whenEvaluating(script).gives(true);
+    EXPECT_TRUE(model.invokeJScript(script));
+}
+
 TEST_F(PluginBaseTest, InvokeJScriptIsTrueForTheBooleanTrueOnly) {
     browser.whenEvaluating("true").gives(true);
     browser.whenEvaluating("false").gives(false);
@@ -286,6 +292,11 @@ TEST_F(PluginBaseTest, AnAddressFromTheRootIsCutInsideTheScheme) {
     EXPECT_EQ(resolved("about:blank", "/a.mp4"), "");
 }
 
+TEST_F(PluginBaseTest, APagesAddressIsReadBeyondAZeroByte) {
+    EXPECT_EQ(resolved(std::string("scheme://ho\0st/p.html", 21), "a.mp4"),
+              std::string("scheme://ho\0st/a.mp4", 20));
+}
+
 TEST_F(PluginBaseTest, ResolvingReleasesThePagesAddress) {
     EXPECT_EQ(resolved("scheme://host/", "a.mp4"), "scheme://host/a.mp4");
     EXPECT_EQ(resolved("about:blank", "/a.mp4"), "");
@@ -325,6 +336,11 @@ TEST_F(PluginBaseTest, AnEmptyStyleSetsOnlyTheColour) {
     const ObjectRef style = tv.element().get("style").object();
     EXPECT_FALSE(style.hasProperty("backgroundImage"));
     EXPECT_EQ(style.get("backgroundColor"), "transparent");
+}
+
+TEST_F(PluginBaseTest, AStyleEndsAtItsFirstZeroByte) {
+    model.setObjectStyle(std::string("url\0(tv:)", 9));
+    EXPECT_EQ(tv.element().get("style").object().get("backgroundImage"), "url");
 }
 
 TEST_F(PluginBaseTest, AnElementWithoutStyleIsLeftAlone) {
