@@ -227,6 +227,24 @@ TEST_F(AVControlStreams, AShortSoundsStreamRunsToItsEnd) {
     stream.destroy();
 }
 
+TEST_F(AVControlStreams, AChunkThatFindsNoMemoryIsDroppedAndTheStreamGoesOn) {
+    const EmbeddedObject object = fetching();
+    BrowserStream& stream = object.newStream(kList);
+    stream.write("<ASX>" + entry("http://media.example/1"));
+    {
+        const std::string chunk = entry("http://media.example/2");
+        const MemoryShortage shortage;
+        EXPECT_EQ(stream.write(chunk), static_cast<int32_t>(chunk.size()));
+    }
+    EXPECT_EQ(stream.write("</ASX>"), 6);
+    EXPECT_FALSE(stream.wasDestroyedByPlugin());
+    EXPECT_EQ(stream.destroy(), NPERR_NO_ERROR);
+    // What had come of the playlist went with its block.
+    EXPECT_EQ(object.get("nrTracks"), 0);
+    EXPECT_THAT(playerCalls(), IsEmpty());
+    EXPECT_EQ(state(object), Stopped);
+}
+
 TEST_F(AVControlStreams, AClipOfTheNetworkWaitsForTheStreamOfItsPlaylist) {
     const EmbeddedObject object = fetching();
     BrowserStream& stream = object.newStream(kList);

@@ -8,6 +8,7 @@
 
 #include "src/drm/DRMAgent.h"
 #include "tests/support/BorderTest.h"
+#include "tests/unit/support/Heap.h"
 #include "tests/unit/support/SameAddress.h"
 
 using ::testing::ElementsAre;
@@ -450,6 +451,27 @@ TEST_F(DRMAgentTest, TextsThatTheRecordCouldNotCopyAreNull) {
     EXPECT_EQ(handleDRMMessageResultEvent(record), 0);
     EXPECT_EQ(handler.last(), (Values{nullptr, nullptr, 5}));
     leftBehind(handler);
+}
+
+TEST_F(DRMAgentTest, WithoutMemoryForTheFirstTextTheSecondIsNotCopiedEither) {
+    const ScriptFunction handler = browser.function("handler");
+    agent.set("onDRMMessageResult", handler);
+    const auto reportWithoutMemoryAfter = [this](unsigned texts) {
+        unsigned char id[] = "id-1";
+        unsigned char message[] = "text";
+        onPlatformThread([&] {
+            const MemoryShortage shortage(1, texts);
+            callback.load()(id, message, 5);
+        });
+        browser.pump();
+    };
+    reportWithoutMemoryAfter(0);
+    EXPECT_EQ(handler.last(), (Values{nullptr, nullptr, 5}));
+    reportWithoutMemoryAfter(1);
+    EXPECT_EQ(handler.last(), (Values{"id-1", nullptr, 5}));
+    EXPECT_EQ(handler.count(), 2U);
+    leftBehind(handler, 2);
+    memoryLeftBehind(1);
 }
 
 TEST_F(DRMAgentTest, NoRecordIsNoResult) {
