@@ -100,12 +100,14 @@ bool isOwner(int socket) {
 
 } // namespace
 
-class Control::Connection {
+// Handles one request after the other: the lines after one that waits for the window are not read.
+class Control::Connection : public std::enable_shared_from_this<Connection> {
 public:
     Connection(Control& control, int socket) : m_control(control), m_socket(socket) { resumeReading(); }
     ~Connection() {
-        removeSource(m_readSource);
-        removeSource(m_writeSource);
+        for (GSource** source : {&m_readSource, &m_writeSource, &m_hangupSource}) {
+            removeSource(*source);
+        }
         ::close(m_socket);
     }
     Connection(const Connection&) = delete;
@@ -113,8 +115,17 @@ public:
 
 private:
     void resumeReading() {
-        if (!m_readSource && !m_isClosing) {
+        removeSource(m_hangupSource);
+        if (!m_readSource && !m_hasEnded) {
             m_readSource = addDescriptorSource(m_socket, G_IO_IN, [this] { return read(); });
+        }
+    }
+
+    // Reads nothing until the response is there, but notices a client that leaves.
+    void pauseReading() {
+        removeSource(m_readSource);
+        if (!m_hangupSource) {
+            m_hangupSource = addDescriptorSource(m_socket, G_IO_HUP, [this] { return close(); });
         }
     }
 
@@ -125,37 +136,52 @@ private:
         if (size < 0) {
             return errno == EAGAIN || errno == EINTR || close();
         }
-        if (size == 0) {
-            // The client may have shut down only its writing side: a last line without an end still counts.
-            if (!m_input.empty()) {
-                m_output += handleControlRequest(m_input) + "\n";
-            }
-            m_isClosing = true;
-        }
+        m_hasEnded = size == 0; // the client may have shut down only its writing side
         m_input.append(buffer, static_cast<size_t>(size));
-        handleLines();
-        return write() && m_readSource;
+        return handleLines() && m_readSource;
     }
 
-    void handleLines() {
-        size_t begin = 0;
-        for (size_t at = m_input.find('\n'); at != std::string::npos; at = m_input.find('\n', begin)) {
-            handleLine(m_input.substr(begin, at - begin));
-            begin = at + 1;
+    // Returns false if the connection has been deleted.
+    bool handleLines() {
+        m_isHandling = true;
+        while (!m_isWaiting && hasLine()) {
+            handleLine();
         }
-        m_input.erase(0, begin);
-        if (m_input.size() > kMaxControlRequest) {
-            handleLine(m_input);
-            m_isClosing = true; // the end of the overlong line may never come
-        }
+        m_isHandling = false;
+        return write();
     }
 
-    void handleLine(std::string line) {
+    // A last line without an end counts, and an overlong one, whose end may never come.
+    bool hasLine() {
+        if (m_input.size() > kMaxControlRequest && m_input.find('\n') == std::string::npos) {
+            m_hasEnded = true;
+        }
+        return m_input.find('\n') != std::string::npos || (m_hasEnded && !m_input.empty());
+    }
+
+    void handleLine() {
+        const size_t end = std::min(m_input.find('\n'), m_input.size());
+        std::string line = m_input.substr(0, end);
+        m_input.erase(0, end + 1);
         if (!line.empty() && line.back() == '\r') {
             line.pop_back();
         }
-        if (!line.empty() && !m_isClosing) {
-            m_output += handleControlRequest(line) + "\n";
+        if (line.empty()) {
+            return;
+        }
+        m_isWaiting = true;
+        handleControlRequest(line, [client = weak_from_this()](const std::string& response) {
+            if (const auto connection = client.lock()) {
+                connection->onResponse(response);
+            }
+        });
+    }
+
+    void onResponse(const std::string& response) {
+        m_output += response + "\n";
+        m_isWaiting = false;
+        if (!m_isHandling) {
+            handleLines();
         }
     }
 
@@ -167,18 +193,22 @@ private:
             return close();
         }
         m_output.erase(0, static_cast<size_t>(std::max<ssize_t>(size, 0)));
-        if (m_output.size() > kMaxOutput || (m_output.empty() && m_isClosing)) {
+        if (m_output.size() > kMaxOutput || (m_output.empty() && m_hasEnded && !m_isWaiting)) {
             return close();
         }
-        if (m_output.empty()) {
-            removeSource(m_writeSource);
-            resumeReading();
-        } else {
+        if (!m_output.empty()) {
             removeSource(m_readSource); // no more requests until the client has read the responses
             if (!m_writeSource) {
                 m_writeSource =
                     addDescriptorSource(m_socket, G_IO_OUT, [this] { return write() && m_writeSource; });
             }
+            return true;
+        }
+        removeSource(m_writeSource);
+        if (m_isWaiting) {
+            pauseReading();
+        } else {
+            resumeReading();
         }
         return true;
     }
@@ -193,9 +223,12 @@ private:
     int m_socket;
     GSource* m_readSource = nullptr;
     GSource* m_writeSource = nullptr;
+    GSource* m_hangupSource = nullptr;
     std::string m_input;
     std::string m_output;
-    bool m_isClosing = false; // once the output has been written
+    bool m_isHandling = false; // in handleLines()
+    bool m_isWaiting = false;  // for the response of a request
+    bool m_hasEnded = false;   // nothing more is read; closed once everything is answered and written
 };
 
 void Control::start() {
@@ -264,7 +297,7 @@ void Control::accept() {
         close(socket);
         return;
     }
-    m_connections.push_back(std::make_unique<Connection>(*this, socket));
+    m_connections.push_back(std::make_shared<Connection>(*this, socket));
 }
 
 void Control::remove(const Connection* connection) {

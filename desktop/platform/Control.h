@@ -3,6 +3,7 @@
 #ifndef TELIX_DESKTOP_PLATFORM_CONTROL_H
 #define TELIX_DESKTOP_PLATFORM_CONTROL_H
 
+#include <functional>
 #include <glib.h>
 #include <list>
 #include <memory>
@@ -10,8 +11,10 @@
 
 namespace desktop {
 
-// Handles one request and returns the response, both without the end of the line. Platform thread.
-std::string handleControlRequest(const std::string& line);
+// Handles one request. `respond` gets the response once, in this call or, if the window handles the request,
+// later; both are without the end of the line. Platform thread.
+using Respond = std::function<void(const std::string& response)>;
+void handleControlRequest(const std::string& line, const Respond& respond);
 
 // The listening socket and its connections. Platform thread.
 class Control {
@@ -33,7 +36,7 @@ private:
     void remove(const Connection* connection);
 
     int m_socket = -1;
-    std::list<std::unique_ptr<Connection>> m_connections;
+    std::list<std::shared_ptr<Connection>> m_connections;
 };
 
 } // namespace desktop

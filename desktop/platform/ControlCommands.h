@@ -6,17 +6,29 @@
 //     goes to a running television: `handler` is a function of ControlRequests.cpp, which does the work in
 //     the television; `printer` is a function of desktop/telixctl/Printers.h, which prints the response
 //     (printNothing if there is nothing to print).
+//   WINDOW_COMMAND(name, windowHandler, printer, help, parameters...)
+//     is passed on to the window of the television: `windowHandler` is a function of
+//     desktop/window/control/WindowCommands.cpp.
+//   JOINT_COMMAND(name, handler, windowHandler, printer, help, parameters...)
+//     has the response of `handler` and, if there is a window, the results of `windowHandler`.
 //   LOCAL_COMMAND(name, function, help, parameters...)
 //     needs no television: `function` is a function of desktop/telixctl/LocalCommands.h.
 //
 // A parameter is an argument, an optionalArgument or an option (ControlProtocol.cpp), in the order of the
-// command line: name, accepted values, placeholder in help texts, default unless required, meaning.
+// command line: name, accepted values, placeholder in help texts, default unless required, meaning. A
+// parameter "timeout" is the time in seconds that the command may wait for something.
 //
-// Define one of the two macros, or both, before including this file; a macro that is not defined drops its
-// rows, and both are undefined afterwards. There is no include guard on purpose: each inclusion expands the
-// list again.
+// Define the macros of the rows that are needed before including this file; a macro that is not defined drops
+// its rows, and all are undefined afterwards. There is no include guard on purpose: each inclusion expands
+// the list again.
 #ifndef CONTROL_COMMAND
 #define CONTROL_COMMAND(name, handler, printer, help, ...)
+#endif
+#ifndef WINDOW_COMMAND
+#define WINDOW_COMMAND(name, windowHandler, printer, help, ...)
+#endif
+#ifndef JOINT_COMMAND
+#define JOINT_COMMAND(name, handler, windowHandler, printer, help, ...)
 #endif
 #ifndef LOCAL_COMMAND
 #define LOCAL_COMMAND(name, function, help, ...)
@@ -27,8 +39,27 @@ CONTROL_COMMAND("state", reportState, printState,
                 "Print what is presented, by which objects and players, and which listeners are registered")
 CONTROL_COMMAND("channel", tuneToChannel, printChannel, "Tune to a channel, as the viewer would",
                 argument("number", number(1, UINT32_MAX), "NUMBER", "Position in the channel list, from 1"))
-CONTROL_COMMAND("applications", listApplications, printApplications,
-                "List the applications that the current channel signals")
+WINDOW_COMMAND("key", pressKeys, printNothing,
+               "Press keys of the remote control, each when the page that the one before opened is loaded",
+               argument("names", strings(), "NAME...", "Names of keys, as those of telix-tv --keys"),
+               option("timeout", number(1, kMaxTimeout), "SECONDS", "30", "How long pages may take to load"))
+WINDOW_COMMAND("screenshot", writeScreenshot, printNothing,
+               "Write a picture of the window, with page and video",
+               argument("file", file(), "FILE", "PNG file"))
+WINDOW_COMMAND("open", openPage, printNothing, "Open a page in place of the applications that run",
+               argument("url", page(), "URL", "URL or file of the page"),
+               option("timeout", number(1, kMaxTimeout), "SECONDS", "30",
+                      "How long the page may take to load"))
+WINDOW_COMMAND("reload", reloadPages, printNothing,
+               "Load the pages of the applications again, also after the end of the web process",
+               option("timeout", number(1, kMaxTimeout), "SECONDS", "30",
+                      "How long the topmost page may take to load"))
+WINDOW_COMMAND("wait", waitForExpression, printNothing,
+               "Wait until an expression is true in the topmost application",
+               argument("expression", string(), "EXPR", "Expression; one that throws counts as false"),
+               option("timeout", number(1, kMaxTimeout), "SECONDS", "30", "How long to wait"))
+JOINT_COMMAND("applications", listApplications, listRunningApplications, printApplications,
+              "List the applications that the current channel signals, and those that run")
 CONTROL_COMMAND("signal", signalApplication, printNothing,
                 "Signal a page as application of a channel, beside those of the broadcast",
                 optionalArgument("url", string(), "URL", "none, ends the signalling",
@@ -93,4 +124,6 @@ LOCAL_COMMAND("check-config", checkConfiguration, "Check a configuration file",
                                "Configuration file"))
 
 #undef CONTROL_COMMAND
+#undef WINDOW_COMMAND
+#undef JOINT_COMMAND
 #undef LOCAL_COMMAND

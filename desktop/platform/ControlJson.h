@@ -5,6 +5,7 @@
 #include <cstdint>
 #include <json-glib/json-glib.h>
 #include <memory>
+#include <optional>
 #include <string>
 
 namespace desktop {
@@ -50,6 +51,41 @@ public:
         return *this;
     }
     inline JsonObjectWriter& array(const char* name, JsonArrayWriter value);
+
+    // Sets all members of another object.
+    JsonObjectWriter& members(const JsonObjectWriter& other) {
+        json_object_foreach_member(
+            other.m_object.get(),
+            [](JsonObject*, const char* name, JsonNode* value, gpointer object) {
+                json_object_set_member(static_cast<JsonObject*>(object), name, json_node_copy(value));
+            },
+            m_object.get());
+        return *this;
+    }
+
+    // The object that a string holds; nothing if the string is not the JSON of an object.
+    static std::optional<JsonObjectWriter> parse(const std::string& json) {
+        const std::unique_ptr<JsonParser, JsonUnref> parser(json_parser_new());
+        JsonNode* root =
+            json_parser_load_from_data(parser.get(), json.data(), static_cast<gssize>(json.size()), nullptr)
+                ? json_parser_get_root(parser.get())
+                : nullptr;
+        if (!root || !JSON_NODE_HOLDS_OBJECT(root)) {
+            return std::nullopt;
+        }
+        JsonObjectWriter object;
+        object.m_object.reset(json_node_dup_object(root));
+        return object;
+    }
+
+    // Whether a member is a boolean, and whether it is true.
+    bool isBoolean(const char* name) const {
+        JsonNode* node = json_object_get_member(m_object.get(), name);
+        return node && JSON_NODE_HOLDS_VALUE(node) && json_node_get_value_type(node) == G_TYPE_BOOLEAN;
+    }
+    bool isTrue(const char* name) const {
+        return isBoolean(name) && json_object_get_boolean_member(m_object.get(), name);
+    }
 
     // The object on one line, without the end of the line.
     std::string toString() const {

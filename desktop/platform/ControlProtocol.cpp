@@ -1,6 +1,8 @@
 // The command table as data, and what requests and command lines are checked with.
 #include "desktop/platform/ControlProtocol.h"
 
+#include <cstdlib>
+
 #include "telix/telix_platform.h"
 
 namespace desktop {
@@ -11,6 +13,18 @@ namespace {
 
 ControlValueType string() {
     return {ControlValueType::Kind::String};
+}
+
+ControlValueType strings() {
+    return {ControlValueType::Kind::Strings};
+}
+
+ControlValueType file() {
+    return {ControlValueType::Kind::File};
+}
+
+ControlValueType page() {
+    return {ControlValueType::Kind::Page};
 }
 
 ControlValueType number(int64_t minimum, int64_t maximum) {
@@ -71,14 +85,29 @@ std::string ControlValueType::description(const char* booleans) const {
         return inWords(booleans);
     case Kind::Choice:
         return inWords(choices);
+    case Kind::Strings:
+        return "an array of strings, not empty";
+    case Kind::File:
+        return "an absolute file name";
+    case Kind::Page:
+        return "an absolute URL";
     default:
         return "a string";
     }
 }
 
+int64_t ControlCommand::defaultTimeout() const {
+    const ControlParameter* timeout = findControlParameter(*this, "timeout");
+    return timeout ? std::strtoll(timeout->defaultMeaning, nullptr, 10) : 0;
+}
+
 const std::vector<ControlCommand>& controlCommands() {
+    using Handler = ControlCommand::Handler;
     static const auto& commands = *new std::vector<ControlCommand>{
-#define CONTROL_COMMAND(name, handler, printer, help, ...) {name, help, {__VA_ARGS__}},
+#define CONTROL_COMMAND(name, handler, printer, help, ...) {name, Handler::Library, help, {__VA_ARGS__}},
+#define WINDOW_COMMAND(name, windowHandler, printer, help, ...) {name, Handler::Window, help, {__VA_ARGS__}},
+#define JOINT_COMMAND(name, handler, windowHandler, printer, help, ...)                                      \
+    {name, Handler::Both, help, {__VA_ARGS__}},
 #include "desktop/platform/ControlCommands.h"
     };
     return commands;
@@ -86,7 +115,8 @@ const std::vector<ControlCommand>& controlCommands() {
 
 const std::vector<ControlCommand>& localCommands() {
     static const auto& commands = *new std::vector<ControlCommand>{
-#define LOCAL_COMMAND(name, function, help, ...) {name, help, {__VA_ARGS__}},
+#define LOCAL_COMMAND(name, function, help, ...)                                                             \
+    {name, ControlCommand::Handler::Library, help, {__VA_ARGS__}},
 #include "desktop/platform/ControlCommands.h"
     };
     return commands;

@@ -15,7 +15,15 @@ namespace desktop {
 
 // What a parameter accepts.
 struct ControlValueType {
-    enum class Kind { String, Number, Boolean, Choice };
+    enum class Kind {
+        String,
+        Strings, // one or more; takes the remaining arguments of a command line
+        Number,
+        Boolean,
+        Choice,
+        File, // absolute file name; on a command line relative to the current folder
+        Page  // absolute URL; on a command line also the name of a file
+    };
 
     Kind kind;
     int64_t minimum = 0; // of a number
@@ -46,9 +54,15 @@ struct ControlParameter {
 };
 
 struct ControlCommand {
+    enum class Handler { Library, Window, Both };
+
     const char* name;
+    Handler handler;
     const char* help;
     std::vector<ControlParameter> parameters;
+
+    // The default of the parameter "timeout", in seconds; 0 without such a parameter.
+    int64_t defaultTimeout() const;
 };
 
 // The commands that a television handles, and those that telixctl runs itself, in the order of the rows.
@@ -58,6 +72,12 @@ const std::vector<ControlCommand>& localCommands();
 // Null if there is none with that name.
 const ControlCommand* findCommand(const std::vector<ControlCommand>& commands, const std::string& name);
 const ControlParameter* findControlParameter(const ControlCommand& command, const std::string& name);
+
+// How long a response may take, in seconds. The time of the parameter "timeout" comes in addition.
+constexpr int64_t kResponseTimeout = 10;
+
+// Of the parameter "timeout".
+constexpr int64_t kMaxTimeout = 3600;
 
 // Length limit of a request in bytes, without the end of the line.
 constexpr size_t kMaxControlRequest = 65536;

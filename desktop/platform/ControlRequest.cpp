@@ -65,10 +65,38 @@ GType valueTypeOf(JsonNode* node) {
     return JSON_NODE_HOLDS_VALUE(node) ? json_node_get_value_type(node) : G_TYPE_NONE;
 }
 
-std::variant<std::string, int64_t, bool> readValue(const ControlParameter& parameter, JsonNode* node) {
+// A string of the parameter's type.
+std::string readString(const ControlParameter& parameter, JsonNode* node, const ControlError& mismatch) {
     using Kind = ControlValueType::Kind;
-    const std::string name = std::string("\"") + parameter.name + "\"";
-    const ControlError mismatch(name + " must be " + parameter.type.description("true|false"));
+    const char* value = valueTypeOf(node) == G_TYPE_STRING ? json_node_get_string(node) : nullptr;
+    if (!value || (parameter.type.kind == Kind::Choice && !parameter.type.acceptsChoice(value)) ||
+        (parameter.type.kind == Kind::File && !g_path_is_absolute(value)) ||
+        (parameter.type.kind == Kind::Page && !g_uri_peek_scheme(value))) {
+        throw mismatch;
+    }
+    if (!g_utf8_validate(value, -1, nullptr)) { // escaped halves of surrogate pairs
+        throw ControlError(std::string("\"") + parameter.name + "\" is not valid UTF-8");
+    }
+    return value;
+}
+
+std::vector<std::string> readStrings(const ControlParameter& parameter, JsonNode* node,
+                                     const ControlError& mismatch) {
+    JsonArray* array = JSON_NODE_HOLDS_ARRAY(node) ? json_node_get_array(node) : nullptr;
+    if (!array || json_array_get_length(array) == 0) {
+        throw mismatch;
+    }
+    std::vector<std::string> strings;
+    for (guint index = 0; index < json_array_get_length(array); ++index) {
+        strings.push_back(readString(parameter, json_array_get_element(array, index), mismatch));
+    }
+    return strings;
+}
+
+ControlRequest::Value readValue(const ControlParameter& parameter, JsonNode* node) {
+    using Kind = ControlValueType::Kind;
+    const ControlError mismatch(std::string("\"") + parameter.name + "\" must be " +
+                                parameter.type.description("true|false"));
     const GType type = valueTypeOf(node);
     switch (parameter.type.kind) {
     case Kind::Number:
@@ -81,17 +109,11 @@ std::variant<std::string, int64_t, bool> readValue(const ControlParameter& param
             throw mismatch;
         }
         return json_node_get_boolean(node) != FALSE;
+    case Kind::Strings:
+        return readStrings(parameter, node, mismatch);
     default:
-        break;
+        return readString(parameter, node, mismatch);
     }
-    const char* value = type == G_TYPE_STRING ? json_node_get_string(node) : nullptr;
-    if (!value || (parameter.type.kind == Kind::Choice && !parameter.type.acceptsChoice(value))) {
-        throw mismatch;
-    }
-    if (!g_utf8_validate(value, -1, nullptr)) { // escaped halves of surrogate pairs
-        throw ControlError(name + " is not valid UTF-8");
-    }
-    return std::string(value);
 }
 
 const ControlCommand& commandOf(JsonObject* object) {

@@ -7,6 +7,7 @@
 #include <stdexcept>
 #include <string>
 #include <variant>
+#include <vector>
 
 #include "desktop/platform/ControlProtocol.h"
 
@@ -40,10 +41,16 @@ public:
     std::string string(const char* name, const std::string& defaultValue = "") const {
         return has(name) ? std::get<std::string>(m_values.at(name)) : defaultValue;
     }
+    const std::vector<std::string>& strings(const char* name) const {
+        return std::get<std::vector<std::string>>(m_values.at(name));
+    }
+
+    // How long the command may wait for something, in seconds; 0 for a command that does not wait.
+    int64_t timeout() const { return has("timeout") ? number("timeout") : m_command->defaultTimeout(); }
+
+    using Value = std::variant<std::string, std::vector<std::string>, int64_t, bool>;
 
 private:
-    using Value = std::variant<std::string, int64_t, bool>;
-
     const ControlCommand* m_command = nullptr;
     std::map<std::string, Value> m_values;
 };

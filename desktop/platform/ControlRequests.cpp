@@ -1,5 +1,7 @@
 // The handlers of the commands that act on the television, and the dispatch of requests to them.
+#include <memory>
 #include <optional>
+#include <utility>
 
 #include "desktop/platform/Broadcast.h"
 #include "desktop/platform/Control.h"
@@ -8,6 +10,7 @@
 #include "desktop/platform/ControlState.h"
 #include "desktop/platform/Device.h"
 #include "desktop/platform/PlayerRegistry.h"
+#include "desktop/platform/WindowRequests.h"
 
 namespace desktop {
 
@@ -198,21 +201,51 @@ JsonObjectWriter sendPlayerMessage(const ControlRequest& request) {
 
 using Handler = JsonObjectWriter (*)(const ControlRequest& request);
 
-// In the order of controlCommands().
+// In the order of controlCommands(); null for commands that are the window's alone.
 const Handler kHandlers[] = {
 #define CONTROL_COMMAND(name, handler, printer, help, ...) handler,
+#define WINDOW_COMMAND(name, windowHandler, printer, help, ...) nullptr,
+#define JOINT_COMMAND(name, handler, windowHandler, printer, help, ...) handler,
 #include "desktop/platform/ControlCommands.h"
 };
 
+std::string failure(const char* reason) {
+    return JsonObjectWriter().boolean("ok", false).string("error", reason).toString();
+}
+
+// Completes the response of the window, which may be any string, by the results of the library.
+std::string joined(JsonObjectWriter results, const std::string& windowResponse) {
+    const auto response = JsonObjectWriter::parse(windowResponse);
+    if (!response || !response->isBoolean("ok")) {
+        return failure("the response of the window is not one");
+    }
+    return response->isTrue("ok") ? results.members(*response).toString() : response->toString();
+}
+
+void handle(const std::string& line, const ControlRequest& request, const Respond& respond) {
+    using By = ControlCommand::Handler;
+    const ControlCommand& command = request.command();
+    const Handler handler = kHandlers[&command - controlCommands().data()];
+    JsonObjectWriter results = handler ? handler(request) : JsonObjectWriter();
+    WindowRequests& window = WindowRequests::instance();
+    if (command.handler == By::Library || (command.handler == By::Both && !window.hasWindow())) {
+        respond(results.boolean("ok", true).toString());
+        return;
+    }
+    // A function object must be copyable.
+    const auto shared = std::make_shared<JsonObjectWriter>(std::move(results));
+    window.send(line, kResponseTimeout + request.timeout(), [shared, respond](const std::string& response) {
+        respond(joined(std::move(*shared), response));
+    });
+}
+
 } // namespace
 
-std::string handleControlRequest(const std::string& line) {
+void handleControlRequest(const std::string& line, const Respond& respond) {
     try {
-        const ControlRequest request = ControlRequest::parse(line);
-        const Handler handler = kHandlers[&request.command() - controlCommands().data()];
-        return handler(request).boolean("ok", true).toString();
+        handle(line, ControlRequest::parse(line), respond);
     } catch (const ControlError& error) {
-        return JsonObjectWriter().boolean("ok", false).string("error", error.what()).toString();
+        respond(failure(error.what()));
     }
 }
 

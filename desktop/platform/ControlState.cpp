@@ -208,10 +208,11 @@ JsonArrayWriter playersJson() {
     return players;
 }
 
-JsonArrayWriter keysJson() {
+// The names of the key groups of a mask.
+JsonArrayWriter keysJson(uint32_t mask) {
     JsonArrayWriter keys;
     for (const KeyGroup& group : keyGroups()) {
-        if ((device().keySet() & group.bit) != 0) {
+        if ((mask & group.bit) != 0) {
             keys.add(group.name);
         }
     }
@@ -308,7 +309,8 @@ JsonObjectWriter reportState(const ControlRequest& request) {
         .number("zapDelay", device().configuration().zapDelay)
         .array("players", playersJson())
         .number("keySet", device().keySet())
-        .array("keys", keysJson())
+        .array("keys", keysJson(device().keySet()))
+        .array("televisionKeys", keysJson(device().configuration().keys & ~device().keySet()))
         .number("freeMemory", device().freeMemory())
         .string("lastDrmMessage", device().lastDrmMessage())
         .object("registrations", registrationsJson(state));

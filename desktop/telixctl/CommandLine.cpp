@@ -2,6 +2,8 @@
 // the first ends at the command, whose own options are known to the second.
 #include "desktop/telixctl/CommandLine.h"
 
+#include <algorithm>
+#include <cstddef>
 #include <cstdio>
 #include <glib.h>
 #include <json-glib/json-glib.h>
@@ -21,8 +23,8 @@ const char kEpilogue[] =
     "Numbers are decimal, or hexadecimal with the prefix 0x.\n"
     "The television is the one given by --socket, --pid or TELIX_SOCKET, else the only one of "
     "this user.\n\n"
-    "Exit status: 0 success; 1 refused by the television, or no television; 2 bad command line "
-    "or\nconfiguration file.";
+    "Exit status: 0 success; 1 refused by the television, not true in time, or no television; "
+    "2 bad\ncommand line or configuration file.";
 
 std::string synopsisOf(const ControlCommand& command) {
     std::string synopsis = command.name;
@@ -205,29 +207,43 @@ void checkValue(const std::string& what, const ControlValueType& type, const std
     }
 }
 
+// The values of a parameter, each of them checked; empty if it is not given. Takes arguments from `next` on.
+std::vector<std::string> valuesOf(const ControlParameter& parameter, const std::string& what,
+                                  const Options& options, const std::vector<std::string>& arguments,
+                                  size_t& next) {
+    std::vector<std::string> values;
+    if (parameter.use == Use::Option) {
+        if (const char* value = options.parameters.at(&parameter)) {
+            values.emplace_back(value);
+        }
+    } else {
+        const size_t left = arguments.size() - next;
+        const size_t count = parameter.type.kind == Kind::Strings ? left : std::min<size_t>(left, 1);
+        values.assign(arguments.begin() + static_cast<ptrdiff_t>(next),
+                      arguments.begin() + static_cast<ptrdiff_t>(next + count));
+        next += count;
+    }
+    for (const std::string& value : values) {
+        checkValue(what, parameter.type, value);
+    }
+    return values;
+}
+
 // The values of a command: its arguments in the order of the row, `arguments` after the command, and options.
-std::map<std::string, std::string> valuesOf(const ControlCommand& command, const Options& options,
-                                            const std::vector<std::string>& arguments) {
-    std::map<std::string, std::string> values;
+std::map<std::string, std::vector<std::string>>
+valuesOf(const ControlCommand& command, const Options& options, const std::vector<std::string>& arguments) {
+    std::map<std::string, std::vector<std::string>> values;
     size_t next = 0;
     for (const ControlParameter& parameter : command.parameters) {
         const std::string what = std::string(command.name) + ": " +
                                  (parameter.use == Use::Option ? std::string("--") + parameter.name
                                                                : std::string(parameter.placeholder));
-        if (parameter.use == Use::Option) {
-            const char* value = options.parameters.at(&parameter);
-            if (!value) {
-                continue;
-            }
-            values[parameter.name] = value;
-        } else if (next < arguments.size()) {
-            values[parameter.name] = arguments[next++];
+        const auto found = valuesOf(parameter, what, options, arguments, next);
+        if (!found.empty()) {
+            values[parameter.name] = found;
         } else if (parameter.isRequired()) {
             throw UsageError(what + " is missing");
-        } else {
-            continue;
         }
-        checkValue(what, parameter.type, values[parameter.name]);
     }
     if (next < arguments.size()) {
         throw UsageError(std::string(command.name) + ": unexpected argument \"" + arguments[next] + "\"");
@@ -277,27 +293,65 @@ CommandLine CommandLine::parse(std::vector<std::string> arguments) {
     return line;
 }
 
+namespace {
+
+// An absolute URL: that of the file, unless the value has a scheme.
+std::string pageOf(const std::string& value) {
+    if (g_uri_peek_scheme(value.c_str())) {
+        return value;
+    }
+    const std::unique_ptr<char, void (*)(void*)> file(g_canonicalize_filename(value.c_str(), nullptr),
+                                                      g_free);
+    const std::unique_ptr<char, void (*)(void*)> url(g_filename_to_uri(file.get(), nullptr, nullptr), g_free);
+    return url.get();
+}
+
+void setMember(JsonObject* request, const ControlParameter& parameter,
+               const std::vector<std::string>& values) {
+    const std::string& value = values.front();
+    const char* name = parameter.name;
+    switch (parameter.type.kind) {
+    case Kind::Number: {
+        int64_t number = 0;
+        readNumber(value, parameter.type, number);
+        json_object_set_int_member(request, name, number);
+        break;
+    }
+    case Kind::Boolean:
+        json_object_set_boolean_member(request, name, value == "on");
+        break;
+    case Kind::Strings: {
+        JsonArray* array = json_array_new();
+        for (const std::string& each : values) {
+            json_array_add_string_element(array, each.c_str());
+        }
+        json_object_set_array_member(request, name, array); // transferred
+        break;
+    }
+    case Kind::File: {
+        char* file = g_canonicalize_filename(value.c_str(), nullptr);
+        json_object_set_string_member(request, name, file);
+        g_free(file);
+        break;
+    }
+    case Kind::Page:
+        json_object_set_string_member(request, name, pageOf(value).c_str());
+        break;
+    default:
+        json_object_set_string_member(request, name, value.c_str());
+        break;
+    }
+}
+
+} // namespace
+
 std::string CommandLine::toRequest() const {
     const std::unique_ptr<JsonObject, void (*)(JsonObject*)> request(json_object_new(), json_object_unref);
     json_object_set_string_member(request.get(), "command", command->name);
     for (const ControlParameter& parameter : command->parameters) {
         const auto found = values.find(parameter.name);
-        if (found == values.end()) {
-            continue;
-        }
-        const std::string& value = found->second;
-        int64_t number = 0;
-        switch (parameter.type.kind) {
-        case Kind::Number:
-            readNumber(value, parameter.type, number);
-            json_object_set_int_member(request.get(), parameter.name, number);
-            break;
-        case Kind::Boolean:
-            json_object_set_boolean_member(request.get(), parameter.name, value == "on");
-            break;
-        default:
-            json_object_set_string_member(request.get(), parameter.name, value.c_str());
-            break;
+        if (found != values.end()) {
+            setMember(request.get(), parameter, found->second);
         }
     }
     const std::unique_ptr<JsonNode, void (*)(JsonNode*)> node(json_node_new(JSON_NODE_OBJECT),
@@ -307,6 +361,17 @@ std::string CommandLine::toRequest() const {
     std::string line = json;
     g_free(json);
     return line;
+}
+
+int64_t CommandLine::responseTimeout() const {
+    int64_t timeout = command->defaultTimeout();
+    const auto given = values.find("timeout");
+    if (given != values.end()) {
+        readNumber(given->second.front(), findControlParameter(*command, "timeout")->type, timeout);
+    }
+    // The television gives a window up first, and says so.
+    const bool isLibrary = command->handler == ControlCommand::Handler::Library;
+    return timeout + (isLibrary ? 1 : 2) * kResponseTimeout;
 }
 
 } // namespace desktop

@@ -2,6 +2,7 @@
 #ifndef TELIX_DESKTOP_TELIXCTL_COMMANDLINE_H
 #define TELIX_DESKTOP_TELIXCTL_COMMANDLINE_H
 
+#include <cstdint>
 #include <map>
 #include <stdexcept>
 #include <string>
@@ -22,9 +23,10 @@ struct CommandLine {
     std::string socket; // --socket; empty if not given
     pid_t pid = 0;      // --pid; 0 if not given
     bool isJson = false;
-    bool isVersion = false;                    // then there is no command
-    const ControlCommand* command = nullptr;   // a row of controlCommands() or localCommands()
-    std::map<std::string, std::string> values; // by name of the parameter; checked against the row
+    bool isVersion = false;                  // then there is no command
+    const ControlCommand* command = nullptr; // a row of controlCommands() or localCommands()
+    // By name of the parameter, checked against the row; one value each, unless it is one of strings.
+    std::map<std::string, std::vector<std::string>> values;
 
     // Parses `arguments`, of which the first is the name of the program. Prints the help text and exits the
     // process if it is asked for. Throws UsageError.
@@ -32,6 +34,9 @@ struct CommandLine {
 
     // The request to a television, one line without its end.
     std::string toRequest() const;
+
+    // How long the response may take, in seconds.
+    int64_t responseTimeout() const;
 };
 
 } // namespace desktop

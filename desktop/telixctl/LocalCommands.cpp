@@ -25,7 +25,7 @@ ExitStatus listTelevisions(const CommandLine& line) {
 
 ExitStatus checkConfiguration(const CommandLine& line) {
     const auto given = line.values.find("file");
-    const std::string file = given == line.values.end() ? Configuration::file() : given->second;
+    const std::string file = given == line.values.end() ? Configuration::file() : given->second.front();
     if (file.empty()) {
         std::printf("There is no configuration file; the defaults apply.\n");
         return ExitStatus::Success;

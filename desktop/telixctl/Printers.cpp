@@ -140,9 +140,9 @@ void printPlayer(JsonObject* player) {
                            numberMember(player, "volume") + ", buffered " + numberMember(player, "buffered"));
 }
 
-std::string keysOf(JsonObject* response) {
+std::string keysOf(JsonObject* response, const char* receiver) {
     std::string keys;
-    for (const std::string& name : stringsMember(response, "keys")) {
+    for (const std::string& name : stringsMember(response, receiver)) {
         keys += (keys.empty() ? "" : " ") + name;
     }
     return keys;
@@ -198,6 +198,10 @@ void printApplications(JsonObject* response) {
     for (const std::string& each : stringsMember(response, "skipped")) {
         printRow("skipped", each);
     }
+    forEachObject(response, "running", [](JsonObject* application) {
+        printRow("running", stringMember(application, "url") +
+                                (booleanMember(application, "visible") ? ", visible" : ""));
+    });
 }
 
 void printListenerCount(JsonObject* response) {
@@ -225,7 +229,8 @@ void printState(JsonObject* response) {
                                 : "off");
     printRow("zap delay", numberMember(response, "zapDelay") + " ms");
     forEachObject(response, "players", printPlayer);
-    printRow("keys", orNone(keysOf(response)));
+    printRow("page keys", orNone(keysOf(response, "keys")));
+    printRow("other keys", orNone(keysOf(response, "televisionKeys")));
     printRow("free memory", numberMember(response, "freeMemory") + " bytes");
     JsonObject* registrations = objectMember(response, "registrations");
     printRow("listeners", orNone(listenersOf(registrations)));
@@ -239,6 +244,8 @@ void printState(JsonObject* response) {
 // In the order of controlCommands().
 const Printer kPrinters[] = {
 #define CONTROL_COMMAND(name, handler, printer, help, ...) printer,
+#define WINDOW_COMMAND(name, windowHandler, printer, help, ...) printer,
+#define JOINT_COMMAND(name, handler, windowHandler, printer, help, ...) printer,
 #include "desktop/platform/ControlCommands.h"
 };
 

@@ -13,17 +13,15 @@ namespace desktop {
 
 namespace {
 
-constexpr time_t kResponseTimeout = 10; // seconds
-
 // A connected socket; negative, with the reason in `error`, if the connection fails.
-int connectTo(const std::string& path, std::string& error) {
+int connectTo(const std::string& path, int64_t timeoutSeconds, std::string& error) {
     const auto address = socketAddress(path);
     if (!address) {
         error = path + ": the path is too long for a socket";
         return -1;
     }
     const int connection = ::socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0);
-    const timeval timeout{kResponseTimeout, 0};
+    const timeval timeout{static_cast<time_t>(timeoutSeconds), 0};
     setsockopt(connection, SOL_SOCKET, SO_RCVTIMEO, &timeout, sizeof(timeout));
     setsockopt(connection, SOL_SOCKET, SO_SNDTIMEO, &timeout, sizeof(timeout));
     if (connect(connection, reinterpret_cast<const sockaddr*>(&*address), sizeof(*address)) != 0) {
@@ -76,9 +74,9 @@ std::optional<std::string> findTelevision(const std::string& socket, pid_t pid, 
     return std::nullopt;
 }
 
-std::optional<std::string> sendRequest(const std::string& socket, const std::string& request,
+std::optional<std::string> sendRequest(const std::string& socket, const std::string& request, int64_t timeout,
                                        std::string& error) {
-    const int connection = connectTo(socket, error);
+    const int connection = connectTo(socket, timeout, error);
     if (connection < 0) {
         return std::nullopt;
     }

@@ -2,6 +2,7 @@
 #ifndef TELIX_DESKTOP_TELIXCTL_TELEVISION_H
 #define TELIX_DESKTOP_TELIXCTL_TELEVISION_H
 
+#include <cstdint>
 #include <optional>
 #include <string>
 #include <sys/types.h>
@@ -14,8 +15,8 @@ namespace desktop {
 std::optional<std::string> findTelevision(const std::string& socket, pid_t pid, std::string& error);
 
 // Sends one request and returns the response, both without the end of the line. Nothing, with the reason in
-// `error`, if no response arrives within ten seconds.
-std::optional<std::string> sendRequest(const std::string& socket, const std::string& request,
+// `error`, if no response arrives within `timeout` seconds.
+std::optional<std::string> sendRequest(const std::string& socket, const std::string& request, int64_t timeout,
                                        std::string& error);
 
 } // namespace desktop

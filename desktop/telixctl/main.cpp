@@ -19,7 +19,8 @@ namespace {
 ExitStatus control(const CommandLine& line) {
     std::string error;
     const auto socket = findTelevision(line.socket, line.pid, error);
-    const auto response = socket ? sendRequest(*socket, line.toRequest(), error) : std::nullopt;
+    const auto response =
+        socket ? sendRequest(*socket, line.toRequest(), line.responseTimeout(), error) : std::nullopt;
     if (!response) {
         return fail(ExitStatus::Refused, error);
     }

@@ -1,5 +1,6 @@
 // The control socket of a running television: state, events, and the handling of bad input.
 #include <algorithm>
+#include <atomic>
 #include <csignal>
 #include <cstdlib>
 #include <fcntl.h>
@@ -18,6 +19,7 @@
 #include "desktop/platform/ControlProtocol.h"
 #include "desktop/platform/ControlSocket.h"
 #include "desktop/platform/Device.h"
+#include "desktop/platform/WindowRequests.h"
 #include "telix/telix_platform.h"
 #include "tests/desktop/Received.h"
 
@@ -293,6 +295,7 @@ TEST_F(ControlTest, TellsWhatIsPresented) {
     EXPECT_EQ(find(state, "$.registrations.channelChange"), "true");
     EXPECT_EQ(find(state, "$.registrations.channelError"), "false");
     EXPECT_EQ(find(state, "$.keys"), R"(["red","navigation"])");
+    EXPECT_EQ(find(state, "$.televisionKeys"), R"(["green","yellow","blue","vcr","info","numeric"])");
     EXPECT_EQ(find(state, "$.keySet"), "17");
     EXPECT_EQ(find(state, "$.freeMemory"), "123456");
 
@@ -401,6 +404,138 @@ TEST_F(ControlTest, ProvokesDrmAnswersAndShortageOfMemory) {
     TELIX_JS_APP_UnRegisterLowMemory(onLowMemory);
 }
 
+// ---- The window
+
+// A window that gets the requests of the socket. `onRequest` runs on the platform thread.
+class Window {
+public:
+    using OnRequest = std::function<void(uint64_t request, const std::string& line)>;
+
+    explicit Window(OnRequest onRequest) : m_onRequest(std::move(onRequest)) {
+        const telix_desktop_control_handler handler{[](uint64_t request, const char* line, void* window) {
+                                                        static_cast<Window*>(window)->m_onRequest(request,
+                                                                                                  line);
+                                                    },
+                                                    this};
+        telix_desktop_set_control_handler(&handler);
+    }
+    ~Window() { telix_desktop_set_control_handler(nullptr); }
+    Window(const Window&) = delete;
+    Window& operator=(const Window&) = delete;
+
+private:
+    OnRequest m_onRequest;
+};
+
+const char kReload[] = R"({"command":"reload"})";
+
+TEST_F(ControlTest, PassesRequestsOfTheWindowOnAndItsResponseBack) {
+    Client client(m_path);
+    EXPECT_EQ(client.send(kReload), R"({"ok":false,"error":"the television has no window"})");
+    Received<std::string> lines;
+    const Window window([&](uint64_t request, const std::string& line) {
+        lines.add(line);
+        telix_desktop_answer_control_request(request, R"({"ok":true,"more":[1]})");
+    });
+    EXPECT_EQ(client.send(R"({"command":"key","names":["ok"]})"), R"({"ok":true,"more":[1]})");
+    EXPECT_EQ(lines.all(), std::vector<std::string>{R"({"command":"key","names":["ok"]})"});
+    EXPECT_THAT(client.send(R"({"command":"key","names":[]})"), HasSubstr("must be an array of strings"));
+    EXPECT_EQ(lines.all().size(), 1U);
+}
+
+TEST_F(ControlTest, PassesARequestOnToAWindowThatAppearsALittleLater) {
+    Client client(m_path);
+    client.write(std::string(kReload) + "\n");
+    Client other(m_path);
+    EXPECT_THAT(other.send(kChannels), HasSubstr("Telix One")); // the request has been read
+    Received<std::string> lines;
+    const Window window([&](uint64_t request, const std::string& line) {
+        lines.add(line);
+        telix_desktop_answer_control_request(request, kDone);
+    });
+    EXPECT_EQ(client.readLine(), kDone);
+    EXPECT_EQ(lines.all(), std::vector<std::string>{kReload});
+}
+
+TEST_F(ControlTest, AnswersTheRequestsOfAClientInTheirOrderAndOthersMeanwhile) {
+    Client client(m_path);
+    Client other(m_path);
+    std::atomic<uint64_t> waiting{0};
+    const Window window([&](uint64_t request, const std::string&) { waiting = request; });
+    client.write(std::string(kReload) + "\n" + kChannels + "\n");
+    ASSERT_TRUE(waitUntil([&] { return waiting != 0; }));
+    EXPECT_THAT(other.send(kChannels), HasSubstr("Telix One"));
+    std::thread([&] {
+        telix_desktop_answer_control_request(waiting, R"({"ok":false,"error":"no"})");
+    }).join();
+    EXPECT_EQ(client.readLine(), R"({"ok":false,"error":"no"})");
+    EXPECT_THAT(client.readLine(), HasSubstr("Telix One"));
+    telix_desktop_answer_control_request(waiting, kDone); // ignored: it has been answered
+    EXPECT_THAT(client.send(kChannels), HasSubstr("Telix One"));
+}
+
+TEST_F(ControlTest, AnswersAClientThatHasEndedItsRequestsAndForgetsOneThatHasLeft) {
+    std::atomic<uint64_t> waiting{0};
+    const Window window([&](uint64_t request, const std::string&) { waiting = request; });
+    {
+        Client gone(m_path);
+        gone.write(std::string(kReload) + "\n");
+        ASSERT_TRUE(waitUntil([&] { return waiting != 0; }));
+    }
+    const uint64_t first = waiting.exchange(0);
+    Client client(m_path);
+    client.write(kReload);
+    client.shutDownWriting();
+    ASSERT_TRUE(waitUntil([&] { return waiting != 0; }));
+    telix_desktop_answer_control_request(first, kDone);
+    telix_desktop_answer_control_request(waiting, kDone);
+    EXPECT_EQ(client.readLine(), kDone);
+    EXPECT_EQ(client.readLine(), "end");
+}
+
+TEST_F(ControlTest, SaysSoIfTheWindowIsClosedOrDoesNotRespondInTimeOrRespondsNonsense) {
+    Client client(m_path);
+    std::atomic<uint64_t> waiting{0};
+    auto window = std::make_unique<Window>([&](uint64_t request, const std::string&) { waiting = request; });
+    client.write(std::string(kReload) + "\n");
+    ASSERT_TRUE(waitUntil([&] { return waiting != 0; }));
+    window.reset();
+    EXPECT_EQ(client.readLine(), R"({"ok":false,"error":"the window has been closed"})");
+
+    window = std::make_unique<Window>([](uint64_t, const std::string&) {});
+    Received<std::string> responses;
+    Platform::instance().post([&] {
+        WindowRequests::instance().send(kReload, 1,
+                                        [&](const std::string& response) { responses.add(response); });
+    });
+    ASSERT_TRUE(waitUntil([&] { return !responses.all().empty(); }));
+    EXPECT_EQ(responses.all(),
+              std::vector<std::string>{R"({"ok":false,"error":"the window does not respond"})"});
+
+    for (const char* response : {"", "hello", "[]", "{}", R"({"ok":1})"}) {
+        window.reset(); // its end removes the handler
+        window = std::make_unique<Window>([&](uint64_t request, const std::string&) {
+            telix_desktop_answer_control_request(request, response);
+        });
+        EXPECT_EQ(client.send(kReload), R"({"ok":false,"error":"the response of the window is not one"})")
+            << response;
+    }
+}
+
+TEST_F(ControlTest, ListsWhatRunsInTheWindowBesideWhatIsSignalled) {
+    Client client(m_path);
+    const char list[] = R"({"command":"applications"})";
+    EXPECT_EQ(client.send(list).find("running"), std::string::npos);
+    const Window window([](uint64_t request, const std::string&) {
+        telix_desktop_answer_control_request(request,
+                                             R"({"ok":true,"running":[{"url":"http://a.example/"}]})");
+    });
+    const std::string response = client.send(list);
+    EXPECT_EQ(find(response, "$.running[*].url"), "\"http://a.example/\"");
+    EXPECT_EQ(find(response, "$.skipped"), "[]");
+    EXPECT_EQ(find(response, "$.ok"), "true");
+}
+
 struct BadLine {
     std::string line;
     const char* reason; // part of the error message
@@ -452,6 +587,13 @@ std::vector<BadLine> badLines() {
         {R"({"command":"stream-event","data":"a\u0000b"})", "a string contains a null character"},
         {R"({"command":"stream-event","tag":256})", "must be a whole number from 0 to 255"},
         {R"({"command":"rating","age":3})", "from 4 to 18"},
+        {R"({"command":"key","names":"ok"})", "must be an array of strings, not empty"},
+        {R"({"command":"key","names":[]})", "must be an array of strings, not empty"},
+        {R"({"command":"key","names":["ok",5]})", "must be an array of strings, not empty"},
+        {R"({"command":"key","names":["ok",["5"]]})", "must be an array of strings, not empty"},
+        {R"({"command":"screenshot","file":"a.png"})", "must be an absolute file name"},
+        {R"({"command":"open","url":"a.html"})", "must be an absolute URL"},
+        {R"({"command":"wait","expression":"1","timeout":3601})", "from 1 to 3600"},
         {R"({"command":"rating","age":4,"region":"Germany"})", "three letters"},
         {deep, "nested too deeply"},
         {R"({"command":)" + deep, "nested too deeply"},
