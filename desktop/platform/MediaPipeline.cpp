@@ -10,6 +10,7 @@
 
 #include "desktop/platform/AudioSink.h"
 #include "desktop/platform/HttpSource.h"
+#include "desktop/platform/SoundTap.h"
 
 namespace desktop {
 
@@ -84,6 +85,7 @@ bool MediaPipeline::createPlaybin(Picture& picture, Picture::Token token, std::s
         error = "a GStreamer element is missing";
         return false;
     }
+    tapSound(audioSink);
     gst_util_set_object_arg(G_OBJECT(m_playbin), "flags", kPlaybinFlags);
     g_object_set(m_playbin, "video-sink", videoSink, "audio-sink", audioSink, "buffer-duration",
                  static_cast<gint64>(kBufferDuration), nullptr);

@@ -11,6 +11,7 @@
 #include "desktop/platform/AudioSink.h"
 #include "desktop/platform/Platform.h"
 #include "desktop/platform/RecentPackets.h"
+#include "desktop/platform/SoundTap.h"
 
 namespace desktop {
 
@@ -143,6 +144,7 @@ void Tuner::configureElements() {
     m_videoTiming.observe(videoSink);
     gst_object_unref(videoSink); // the bin owns it
     m_audioTiming.observe(m_audioSink);
+    tapSound(m_audioSink);
     GstCaps* caps = gst_caps_from_string("video/mpegts,systemstream=(boolean)true,packetsize=(int)188");
     g_object_set(m_source, "caps", caps, "format", GST_FORMAT_TIME, "is-live", TRUE, "max-bytes",
                  guint64{kMaxRecentPackets + kMaxWaiting}, nullptr);
