@@ -85,7 +85,7 @@ class CommandLine(TelixTv):
             self.assert_refused(self.run_tv(f'--keys={keys}', shipped('first.html')), 'key', f'"{unknown}"')
 
     def test_an_empty_expression_or_file_name_is_refused(self):
-        for option in ('--wait-for', '--eval', '--screenshot', '--plugin', '--user-agent'):
+        for option in ('--wait-for', '--eval', '--screenshot', '--record', '--plugin', '--user-agent'):
             self.assert_refused(self.run_tv(f'{option}=', shipped('first.html')), option)
 
     def test_no_display_is_refused(self):

@@ -29,6 +29,7 @@ public:
     // A hidden application paints nothing. It keeps running and receiving keys, so that it can show itself
     // again on a key press.
     void setShown(bool shown);
+    bool isShown() const { return m_shown; }
     // Sends the press and the release of a key, as the keyboard would.
     void press(const RemoteKey& key);
 

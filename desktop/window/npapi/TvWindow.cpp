@@ -2,6 +2,8 @@
 #include "desktop/window/npapi/TvWindow.h"
 
 #include <QFile>
+#include <QImage>
+#include <QPainter>
 #include <QPalette>
 #include <QPixmap>
 #include <QWebFrame>
@@ -92,7 +94,9 @@ bool TvWindow::isTopLoaded() const {
 }
 
 void TvWindow::press(const RemoteKey& key, std::function<void()> done) {
-    m_stack.top()->press(key);
+    if (ApplicationView* top = m_stack.top()) {
+        top->press(key);
+    }
     done();
 }
 
@@ -112,8 +116,52 @@ void TvWindow::evaluate(const std::string& expression, std::function<void(Evalua
     done(evaluation);
 }
 
-void TvWindow::writeScreenshot(const std::string& file, std::function<void(bool)> done) {
-    done(grab().save(QFile::decodeName(file.c_str()), "PNG"));
+void TvWindow::writeScreenshot(const std::string& file, std::function<void(const std::string& error)> done) {
+    QFile png(QFile::decodeName(file.c_str()));
+    const bool isWritten =
+        png.open(QIODevice::WriteOnly | QIODevice::Truncate) && grab().save(&png, "PNG") && png.flush();
+    done(isWritten ? "" : png.errorString().toStdString());
+}
+
+void TvWindow::paint(uint8_t* pixels, int stride) {
+    QImage image(pixels, kPageWidth, kPageHeight, stride, QImage::Format_RGB32);
+    QPainter painter(&image);
+    const QRect area = pageRectIn(size());
+    painter.setRenderHint(QPainter::SmoothPixmapTransform);
+    painter.scale(qreal(kPageWidth) / area.width(), qreal(kPageHeight) / area.height());
+    render(&painter, -area.topLeft());
+}
+
+void TvWindow::open(const std::string& url, std::function<void(const std::string& error)> done) {
+    const std::string error = loadError(url, m_userAgent.toStdString());
+    if (error.empty()) {
+        while (m_stack.top()) {
+            remove(m_stack.top());
+        }
+        openApplication(QUrl(QString::fromStdString(url)));
+    }
+    done(error);
+}
+
+void TvWindow::reload(std::function<void(const std::string& error)> done) {
+    ApplicationView* top = m_stack.top();
+    const std::string error = loadError(top ? top->url().toString(QUrl::FullyEncoded).toStdString() : "",
+                                        m_userAgent.toStdString());
+    if (error.empty()) {
+        for (ApplicationView* application : m_stack.all()) {
+            application->reload();
+        }
+    }
+    done(error);
+}
+
+std::vector<ScriptedWindow::RunningApplication> TvWindow::applications() const {
+    std::vector<RunningApplication> running;
+    for (const ApplicationView* application : m_stack.all()) {
+        running.insert(running.begin(), {application->url().toString(QUrl::FullyEncoded).toStdString(),
+                                         application->isShown() && application == m_stack.top()});
+    }
+    return running;
 }
 
 bool TvWindow::hasPicture() const {

@@ -45,7 +45,12 @@ public:
     void press(const RemoteKey& key, std::function<void()> done) override;
     void evaluate(const std::string& expression, std::function<void(Evaluation)> done) override;
     bool hasPicture() const override;
-    void writeScreenshot(const std::string& file, std::function<void(bool)> done) override;
+    void writeScreenshot(const std::string& file,
+                         std::function<void(const std::string& error)> done) override;
+    void paint(uint8_t* pixels, int stride) override;
+    void open(const std::string& url, std::function<void(const std::string& error)> done) override;
+    void reload(std::function<void(const std::string& error)> done) override;
+    std::vector<RunningApplication> applications() const override;
 
 signals:
     // A document of an application could not be loaded. An application without any document is removed.

@@ -12,9 +12,13 @@
 #include <csignal>
 #include <cstdio>
 
+#include "desktop/window/control/ControlSource.h"
+#include "desktop/window/control/WindowCommands.h"
 #include "desktop/window/npapi/PluginFolder.h"
 #include "desktop/window/npapi/StyleSheet.h"
 #include "desktop/window/npapi/TvWindow.h"
+#include "desktop/window/record/Recording.h"
+#include "desktop/window/record/SoundSource.h"
 #include "desktop/window/shared/Automation.h"
 #include "desktop/window/shared/CommandLine.h"
 #include "desktop/window/shared/Diagnostics.h"
@@ -54,6 +58,19 @@ gboolean onTermination(gpointer signalNumber) {
 // Runs the window until it exits, and destroys it with all pages. `evaluated` receives the value of --eval.
 int runWindow(const CommandLine& commandLine, std::optional<std::string>& evaluated) {
     TvWindow window(QString::fromStdString(commandLine.userAgent));
+    WindowCommands commands(window);
+    const ControlSource control([&](const std::string& line, const ControlSource::Respond& respond) {
+        commands.handle(line, respond);
+    });
+    Recording recording(window, commandLine);
+    if (recording.hasFailed()) {
+        return kExitBadInput;
+    }
+    std::unique_ptr<SoundSource> sound;
+    if (recording.isActive()) {
+        sound = std::make_unique<SoundSource>(
+            [&](const telix_desktop_sound& piece) { recording.addSound(piece); });
+    }
     Automation automation(window, commandLine, QCoreApplication::exit);
     QObject::connect(&window, &TvWindow::loadFailed, [&](const QUrl& url, const QString& reason) {
         automation.onLoadFailed(url.toDisplayString().toStdString(), reason.toStdString());
@@ -73,7 +90,7 @@ int runWindow(const CommandLine& commandLine, std::optional<std::string>& evalua
     }
     const int exitStatus = QCoreApplication::exec();
     evaluated = automation.evaluated();
-    return exitStatus;
+    return recording.finish(exitStatus);
 }
 
 // Whether the event loop and the page can be used; prints the error if not.

@@ -153,11 +153,11 @@ void Automation::writeScreenshotAndEnd(int exitStatus) {
     if (m_timer) {
         g_source_remove(std::exchange(m_timer, 0));
     }
-    m_window.writeScreenshot(*m_commandLine.screenshot, [this, exitStatus](bool isWritten) {
-        if (!isWritten) {
-            printError("cannot write " + *m_commandLine.screenshot);
+    m_window.writeScreenshot(*m_commandLine.screenshot, [this, exitStatus](const std::string& error) {
+        if (!error.empty()) {
+            printError("cannot write " + *m_commandLine.screenshot + ": " + error);
         }
-        end(isWritten || exitStatus != kExitSuccess ? exitStatus : kExitBadInput);
+        end(error.empty() || exitStatus != kExitSuccess ? exitStatus : kExitBadInput);
     });
 }
 

@@ -59,7 +59,7 @@ std::string keyNames() {
 // Values as given: of the encoding of file names, null if the option is not given.
 struct Values {
     ~Values() {
-        for (char* value : {engine, size, profile, plugin, keys, waitFor, timeout, eval, screenshot,
+        for (char* value : {engine, size, profile, plugin, keys, waitFor, timeout, eval, screenshot, record,
                             userAgent, inspectorServer}) {
             g_free(value);
         }
@@ -78,6 +78,7 @@ struct Values {
     char* timeout = nullptr;
     char* eval = nullptr;
     char* screenshot = nullptr;
+    char* record = nullptr;
     char* userAgent = nullptr;
     gboolean inspect = false;
     char* inspectorServer = nullptr;
@@ -151,6 +152,8 @@ private:
              "SECONDS"},
             {"eval", 0, 0, kText, &values.eval, "Print the value of the expression as JSON.", "EXPR"},
             {"screenshot", 0, 0, kText, &values.screenshot, "Write a screenshot of the window.", "FILE.png"},
+            {"record", 0, 0, kText, &values.record,
+             "Record picture, page and sound as an MP4 file (H.264, AAC) until the end.", "FILE.mp4"},
             {"user-agent", 0, 0, kText, &values.userAgent, m_userAgent.c_str(), "TEXT"},
             {"inspect", 0, 0, kFlag, &values.inspect, "Open the web inspector.", nullptr},
             {"inspector-server", 0, 0, kText, &values.inspectorServer,
@@ -246,7 +249,8 @@ std::string checkStrings(const Values& values) {
         const char* value;
     } options[] = {{"--wait-for", values.waitFor},      {"--eval", values.eval},
                    {"--screenshot", values.screenshot}, {"--plugin", values.plugin},
-                   {"--user-agent", values.userAgent},  {"--profile", values.profile}};
+                   {"--user-agent", values.userAgent},  {"--profile", values.profile},
+                   {"--record", values.record}};
     for (const auto& option : options) {
         if (option.value && simplified(option.value).empty()) {
             return std::string(option.name) + ": empty value";
@@ -347,6 +351,7 @@ std::optional<int> readCommandLine(const std::vector<std::string>& arguments, co
     commandLine.waitFor = optional(values.waitFor);
     commandLine.eval = optional(values.eval);
     commandLine.screenshot = optional(values.screenshot);
+    commandLine.record = optional(values.record);
     return std::nullopt;
 }
 

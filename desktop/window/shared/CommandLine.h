@@ -42,6 +42,8 @@ struct CommandLine {
     std::optional<std::string> waitFor;
     std::optional<std::string> eval;
     std::optional<std::string> screenshot;
+    // The file of the recording.
+    std::optional<std::string> record;
     double timeoutSeconds = 0;
 
     // Whether the program exits when all steps are done.

@@ -1,10 +1,12 @@
-// What the automation of the command line does with a window, whatever its toolkit.
+// What the automation of the command line, telixctl and recordings do with a window, whatever its toolkit.
 #ifndef TELIX_DESKTOP_WINDOW_SHARED_SCRIPTEDWINDOW_H
 #define TELIX_DESKTOP_WINDOW_SHARED_SCRIPTEDWINDOW_H
 
+#include <cstdint>
 #include <functional>
 #include <optional>
 #include <string>
+#include <vector>
 
 #include "desktop/window/shared/RemoteControl.h"
 
@@ -21,6 +23,11 @@ public:
         std::optional<std::string> error;
     };
 
+    struct RunningApplication {
+        std::string url;
+        bool isVisible = false;
+    };
+
     virtual ~ScriptedWindow() = default;
 
     // Whether there is an application.
@@ -34,8 +41,21 @@ public:
     virtual void evaluate(const std::string& expression, std::function<void(Evaluation)> done) = 0;
     // Whether the video plane shows a frame.
     virtual bool hasPicture() const = 0;
-    // Writes what the window shows to a PNG file. Done with whether that has succeeded.
-    virtual void writeScreenshot(const std::string& file, std::function<void(bool)> done) = 0;
+    // Writes what the window shows to a PNG file. Done with the reason why it cannot; empty if it has.
+    virtual void writeScreenshot(const std::string& file,
+                                 std::function<void(const std::string& error)> done) = 0;
+    // Paints what the window shows, as it has been drawn last, as 1280x720 pixels of 4 bytes: blue, green,
+    // red, unused. `stride` is in bytes.
+    virtual void paint(uint8_t* pixels, int stride) = 0;
+    // Opens a page in place of all applications. Done with the reason why the page cannot be loaded, and then
+    // nothing has changed; empty when it is being loaded.
+    virtual void open(const std::string& url, std::function<void(const std::string& error)> done) = 0;
+    // Loads the pages of all applications again, also after their process has ended by itself. Done with the
+    // reason why the topmost page cannot be loaded, and then nothing has changed; empty when it is being
+    // loaded.
+    virtual void reload(std::function<void(const std::string& error)> done) = 0;
+    // What runs, the topmost application first.
+    virtual std::vector<RunningApplication> applications() const = 0;
 };
 
 } // namespace desktop

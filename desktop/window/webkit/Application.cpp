@@ -376,6 +376,11 @@ void Application::showNotice(const std::string& html) {
     webkit_web_view_load_alternate_html(m_view, html.c_str(), url ? url : kEmptyPage, nullptr);
 }
 
+void Application::reload() {
+    m_isLoaded = false; // before the engine says so
+    webkit_web_view_reload(m_view);
+}
+
 void Application::unload(std::function<void()> done) {
     if (m_isUnloaded) {
         done();

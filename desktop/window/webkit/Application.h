@@ -78,7 +78,7 @@ public:
     void unload(std::function<void()> done);
     // Shows a page of the window's own in place of the document, which reload() brings back.
     void showNotice(const std::string& html);
-    void reload() { webkit_web_view_reload(m_view); }
+    void reload();
     // Calls no callback in the destructor.
     void forgetCalls() { m_onGone.clear(); }
 

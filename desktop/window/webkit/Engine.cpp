@@ -134,6 +134,7 @@ void Engine::onInitializeExtensions(WebKitWebContext* context) {
     g_variant_dict_insert(&data, "errors", "i", m_output.errorDescriptor());
     g_variant_dict_insert(&data, "channel", "i", m_channel.useProcess());
     g_variant_dict_insert(&data, "automation", "b", m_isAutomated);
+    g_variant_dict_insert(&data, "sound", "i", m_soundDescriptor);
     webkit_web_context_set_web_extensions_initialization_user_data(context, g_variant_dict_end(&data));
 }
 

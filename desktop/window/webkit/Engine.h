@@ -27,6 +27,9 @@ public:
     Engine(const Engine&) = delete;
     Engine& operator=(const Engine&) = delete;
 
+    // The descriptor that web processes which are started from now on send sound to.
+    void setSoundDescriptor(int descriptor) { m_soundDescriptor = descriptor; }
+
     // Returns a new view with a floating reference. `related`: a view whose web process the new one shares,
     // or null. One process for all applications of a window: the platform library is in it.
     WebKitWebContext* context() const { return m_context; }
@@ -39,6 +42,7 @@ private:
     WebProcessOutput& m_output;
     PageChannel& m_channel;
     bool m_isAutomated;
+    int m_soundDescriptor = -1;
     WebKitWebContext* m_context;
     WebKitSettings* m_settings;
     WebKitUserContentManager* m_content;

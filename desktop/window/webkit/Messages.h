@@ -13,6 +13,8 @@ constexpr char kTuneMessage[] = "telix-tune";
 constexpr char kStepMessage[] = "telix-step";
 // To the window's context: the number of the channel that is on (u).
 constexpr char kChannelMessage[] = "telix-channel";
+// To the window's context: a request of the control socket (s). The reply has the response (s).
+constexpr char kControlMessage[] = "telix-control";
 
 } // namespace desktop
 

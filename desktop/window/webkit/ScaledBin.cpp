@@ -127,7 +127,8 @@ void addChild(GtkContainer* container, GtkWidget* child) {
 
 gboolean draw(GtkWidget* widget, cairo_t* context) {
     GdkWindow* offscreen = self(widget)->offscreen;
-    if (gtk_cairo_should_draw_window(context, gtk_widget_get_window(widget)) && self(widget)->isShown) {
+    const bool isOwn = gtk_cairo_should_draw_window(context, gtk_widget_get_window(widget));
+    if (isOwn && self(widget)->isShown) {
         cairo_save(context);
         cairo_scale(context, scaleX(widget), scaleY(widget));
         cairo_set_source_surface(context, gdk_offscreen_window_get_surface(offscreen), 0, 0);
@@ -137,7 +138,8 @@ gboolean draw(GtkWidget* widget, cairo_t* context) {
         cairo_fill(context);
         cairo_restore(context);
     }
-    if (gtk_cairo_should_draw_window(context, offscreen)) {
+    // A drawing of all windows has drawn the child already.
+    if (!isOwn && gtk_cairo_should_draw_window(context, offscreen)) {
         if (GtkWidget* child = gtk_bin_get_child(GTK_BIN(widget))) {
             gtk_container_propagate_draw(GTK_CONTAINER(widget), child, context);
         }

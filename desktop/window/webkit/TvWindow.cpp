@@ -2,6 +2,8 @@
 #include "desktop/window/webkit/TvWindow.h"
 
 #include <algorithm>
+#include <cerrno>
+#include <cstdio>
 #include <utility>
 
 #include "desktop/window/shared/CommandLine.h"
@@ -31,6 +33,23 @@ GtkWidget* newBlackArea() {
                      }),
                      nullptr);
     return area;
+}
+
+// Returns the reason why the file cannot be written; empty if it has been.
+std::string writePng(cairo_surface_t* image, const std::string& file) {
+    g_autoptr(GByteArray) png = g_byte_array_new();
+    const auto append = [](void* bytes, const unsigned char* data, unsigned size) {
+        g_byte_array_append(static_cast<GByteArray*>(bytes), data, size);
+        return CAIRO_STATUS_SUCCESS;
+    };
+    const cairo_status_t status = cairo_surface_write_to_png_stream(image, append, png);
+    if (status != CAIRO_STATUS_SUCCESS) {
+        return cairo_status_to_string(status);
+    }
+    std::FILE* stream = std::fopen(file.c_str(), "wb");
+    const bool isWritten = stream && std::fwrite(png->data, 1, png->len, stream) == png->len;
+    const bool isClosed = stream && std::fclose(stream) == 0;
+    return isWritten && isClosed ? "" : g_strerror(errno);
 }
 
 // A check of a page, whose server may take some seconds to respond, on a thread of its own.
@@ -222,6 +241,22 @@ void TvWindow::erase(const Application& application) {
     }
 }
 
+void TvWindow::removeAll(const std::function<void()>& done) {
+    const std::vector<Application*> all = m_stack.all();
+    if (all.empty()) {
+        done();
+    }
+    const auto left = std::make_shared<std::size_t>(all.size());
+    for (Application* application : all) {
+        remove(*application);
+        application->unload([left, done] {
+            if (--*left == 0) {
+                done();
+            }
+        });
+    }
+}
+
 void TvWindow::onLoadFailed(Application& application, const std::string& url, const std::string& reason) {
     if (!m_stack.has(application)) {
         return;
@@ -316,6 +351,11 @@ bool TvWindow::isTopLoaded() const {
 }
 
 void TvWindow::press(const RemoteKey& key, std::function<void()> done) {
+    if (m_hasCrashed && key.keyCode == kOkKeyCode) {
+        restart();
+        done();
+        return;
+    }
     m_keys.route(key, KeyRouter::Stroke::Press, nullptr);
     m_keys.route(key, KeyRouter::Stroke::Release, std::move(done));
 }
@@ -374,9 +414,57 @@ bool TvWindow::hasPicture() const {
     return m_video.hasFrame();
 }
 
+void TvWindow::paint(uint8_t* pixels, int stride) {
+    cairo_surface_t* image =
+        cairo_image_surface_create_for_data(pixels, CAIRO_FORMAT_RGB24, kPageWidth, kPageHeight, stride);
+    cairo_t* context = cairo_create(image);
+    const PixelRect area =
+        pageRectIn(gtk_widget_get_allocated_width(m_overlay), gtk_widget_get_allocated_height(m_overlay));
+    cairo_scale(context, static_cast<double>(kPageWidth) / area.width,
+                static_cast<double>(kPageHeight) / area.height);
+    cairo_translate(context, -area.x, -area.y);
+    gtk_container_check_resize(GTK_CONTAINER(m_window)); // what is not laid out cannot be drawn
+    gtk_widget_draw(m_overlay, context);
+    cairo_destroy(context);
+    cairo_surface_destroy(image);
+}
+
+void TvWindow::open(const std::string& url, std::function<void(const std::string& error)> done) {
+    checkLoad(url, m_userAgent, m_calls, [this, url, done = std::move(done)](const std::string& error) {
+        if (!error.empty()) {
+            done(error);
+            return;
+        }
+        m_hasCrashed = false;
+        removeAll([this, url, done] {
+            openApplication(url);
+            done({});
+        });
+    });
+}
+
+void TvWindow::reload(std::function<void(const std::string& error)> done) {
+    const char* url = m_stack.top() ? webkit_web_view_get_uri(m_stack.top()->view()) : nullptr;
+    checkLoad(url ? url : "", m_userAgent, m_calls, [this, done = std::move(done)](const std::string& error) {
+        if (error.empty()) {
+            restart();
+        }
+        done(error);
+    });
+}
+
+std::vector<ScriptedWindow::RunningApplication> TvWindow::applications() const {
+    std::vector<RunningApplication> running;
+    for (const Application* application : m_stack.all()) {
+        const char* url = webkit_web_view_get_uri(application->view());
+        running.insert(running.begin(), {url ? url : "", application->isVisible()});
+    }
+    return running;
+}
+
 // The page's part comes from the page itself, because what has been drawn in the window may be older than
 // what a script has done to the page.
-void TvWindow::writeScreenshot(const std::string& file, std::function<void(bool)> done) {
+void TvWindow::writeScreenshot(const std::string& file, std::function<void(const std::string& error)> done) {
     Application* top = m_stack.top();
     if (!top || !top->isVisible()) {
         done(paintScreenshot(file, nullptr));
@@ -390,7 +478,8 @@ void TvWindow::writeScreenshot(const std::string& file, std::function<void(bool)
     });
 }
 
-bool TvWindow::paintScreenshot(const std::string& file, cairo_surface_t* page) const {
+// Returns the reason why the file cannot be written; empty if it has been.
+std::string TvWindow::paintScreenshot(const std::string& file, cairo_surface_t* page) const {
     const int width = gtk_widget_get_allocated_width(m_overlay);
     const int height = gtk_widget_get_allocated_height(m_overlay);
     cairo_surface_t* image = cairo_image_surface_create(CAIRO_FORMAT_RGB24, width, height);
@@ -407,9 +496,9 @@ bool TvWindow::paintScreenshot(const std::string& file, cairo_surface_t* page) c
         cairo_fill(context);
     }
     cairo_destroy(context);
-    const bool isWritten = cairo_surface_write_to_png(image, file.c_str()) == CAIRO_STATUS_SUCCESS;
+    std::string error = writePng(image, file);
     cairo_surface_destroy(image);
-    return isWritten;
+    return error;
 }
 
 } // namespace desktop

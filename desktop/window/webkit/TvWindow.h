@@ -61,7 +61,12 @@ public:
     void press(const RemoteKey& key, std::function<void()> done) override;
     void evaluate(const std::string& expression, std::function<void(Evaluation)> done) override;
     bool hasPicture() const override;
-    void writeScreenshot(const std::string& file, std::function<void(bool)> done) override;
+    void writeScreenshot(const std::string& file,
+                         std::function<void(const std::string& error)> done) override;
+    void paint(uint8_t* pixels, int stride) override;
+    void open(const std::string& url, std::function<void(const std::string& error)> done) override;
+    void reload(std::function<void(const std::string& error)> done) override;
+    std::vector<RunningApplication> applications() const override;
 
 private:
     void onLoadFailed(Application& application, const std::string& url, const std::string& reason) override;
@@ -79,8 +84,9 @@ private:
     Application* applicationOf(uint64_t page) const;
     void remove(Application& application);
     void erase(const Application& application);
+    void removeAll(const std::function<void()>& done);
     void updateInspector();
-    bool paintScreenshot(const std::string& file, cairo_surface_t* page) const;
+    std::string paintScreenshot(const std::string& file, cairo_surface_t* page) const;
 
     const Engine& m_engine;
     PageChannel& m_channel;

@@ -6,6 +6,7 @@
 #include <csignal>
 #include <cstdio>
 
+#include "desktop/window/record/Recording.h"
 #include "desktop/window/shared/Automation.h"
 #include "desktop/window/shared/CommandLine.h"
 #include "desktop/window/shared/Diagnostics.h"
@@ -13,10 +14,12 @@
 #include "desktop/window/shared/PluginFile.h"
 #include "desktop/window/webkit/AutomationSession.h"
 #include "desktop/window/webkit/ChildProcesses.h"
+#include "desktop/window/webkit/ControlReceiver.h"
 #include "desktop/window/webkit/Engine.h"
 #include "desktop/window/webkit/InspectorServer.h"
 #include "desktop/window/webkit/PageChannel.h"
 #include "desktop/window/webkit/Profile.h"
+#include "desktop/window/webkit/SoundChannel.h"
 #include "desktop/window/webkit/TvWindow.h"
 #include "desktop/window/webkit/WebProcessOutput.h"
 
@@ -30,14 +33,15 @@ constexpr unsigned kProfileTimeoutMs = 5000;
 struct Run {
     GMainLoop* loop;
     TvWindow* window;
+    Recording* recording;
     int exitStatus;
 
-    // Ends the pages and then the loop. Later calls do nothing.
+    // Ends the recording, the pages and then the loop. Later calls do nothing.
     void end(int status) {
         if (exitStatus >= 0) {
             return;
         }
-        exitStatus = status;
+        exitStatus = recording->finish(status);
         window->unload([this] { g_main_loop_quit(loop); });
     }
 };
@@ -65,10 +69,21 @@ int runWindow(const CommandLine& commandLine, const PluginFile& plugin, const Pr
               std::optional<std::string>& evaluated) {
     WebProcessOutput output;
     PageChannel channel;
-    const Engine engine(commandLine, plugin, profile, output, channel);
+    Engine engine(commandLine, plugin, profile, output, channel);
     TvWindow window(engine, channel, commandLine);
+    const ControlReceiver control(engine.context(), window);
+    Recording recording(window, commandLine);
+    if (recording.hasFailed()) {
+        return kExitBadInput;
+    }
+    std::unique_ptr<SoundChannel> sound;
+    if (recording.isActive()) {
+        sound = std::make_unique<SoundChannel>(
+            [&](const telix_desktop_sound& piece) { recording.addSound(piece); });
+        engine.setSoundDescriptor(sound->inherited());
+    }
     g_autoptr(GMainLoop) loop = g_main_loop_new(nullptr, FALSE);
-    Run run{loop, &window, -1};
+    Run run{loop, &window, &recording, -1};
     Automation automation(window, commandLine, [&](int status) { run.end(status); });
     const AutomationSession session(
         engine.context(), {[&] { return window.pushApplication().view(); }, [&] { run.end(kExitSuccess); }});

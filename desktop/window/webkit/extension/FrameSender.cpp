@@ -6,6 +6,7 @@
 
 #include "desktop/window/frames/FramePublisher.h"
 #include "desktop/window/frames/FrameRing.h"
+#include "desktop/window/shared/LibrarySearch.h"
 
 namespace desktop {
 
@@ -41,42 +42,13 @@ void sendRing(WebKitWebExtension* extension, int memory, int wakeup) {
     g_object_unref(descriptors);
 }
 
-// Looks for the platform library before the main loop waits: the plug-in loads it during a call of a page on
-// this thread, so the loop runs after it.
-struct SearchSource {
-    GSource source;
-    FramePublisher* publisher;
-};
-
-gboolean prepareSearch(GSource* source, gint* timeout) {
-    *timeout = -1;
-    return reinterpret_cast<SearchSource*>(source)->publisher->start();
-}
-
-gboolean checkSearch(GSource*) {
-    return FALSE;
-}
-
-// The library is found, and stays.
-gboolean dispatchSearch(GSource*, GSourceFunc, gpointer) {
-    return G_SOURCE_REMOVE;
-}
-
-void startSearch(FramePublisher& publisher) {
-    static GSourceFuncs functions{prepareSearch, checkSearch, dispatchSearch, nullptr, nullptr, nullptr};
-    GSource* source = g_source_new(&functions, sizeof(SearchSource));
-    reinterpret_cast<SearchSource*>(source)->publisher = &publisher;
-    g_source_attach(source, nullptr);
-    g_source_unref(source); // the main loop owns it
-}
-
 } // namespace
 
 void sendFrames(WebKitWebExtension* extension) {
     // For the life of the process, as the platform library is.
     auto* publisher =
         new FramePublisher([extension](int memory, int wakeup) { sendRing(extension, memory, wakeup); });
-    startSearch(*publisher);
+    [[maybe_unused]] static auto* search = new LibrarySearch([publisher] { return publisher->start(); });
 }
 
 } // namespace desktop

@@ -3,9 +3,11 @@
 #include <unistd.h>
 #include <webkit2/webkit-web-extension.h>
 
+#include "desktop/window/webkit/extension/ControlForwarder.h"
 #include "desktop/window/webkit/extension/FrameSender.h"
 #include "desktop/window/webkit/extension/PageFunctions.h"
 #include "desktop/window/webkit/extension/SessionKeys.h"
+#include "desktop/window/webkit/extension/SoundSender.h"
 #include "desktop/window/webkit/extension/ViewerMessages.h"
 
 namespace desktop {
@@ -52,4 +54,6 @@ webkit_web_extension_initialize_with_user_data(WebKitWebExtension* extension, co
     }
     desktop::sendFrames(extension);
     desktop::answerViewerMessages(extension);
+    desktop::forwardControlRequests(extension);
+    desktop::sendSound(desktop::descriptorFrom(data, "sound"));
 }
