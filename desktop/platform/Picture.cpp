@@ -236,6 +236,7 @@ void Picture::acquireFrame(telix_desktop_frame& frame) {
 // All but the pixels. A new reference to the sample that is to be seen; null if there is none.
 GstSample* Picture::describeFrame(telix_desktop_frame& frame) {
     std::lock_guard<std::mutex> lock(m_mutex);
+    frame.presenter = m_current != 0 ? m_view.presenter : 0;
     frame.areaX = m_view.x;
     frame.areaY = m_view.y;
     frame.areaWidth = m_view.width;
@@ -254,6 +255,10 @@ void telix_desktop_set_wakeup(telix_desktop_wakeup wakeup, void* data) {
 
 void telix_desktop_acquire_frame(telix_desktop_frame* frame) {
     desktop::Platform::instance().picture().acquireFrame(*frame);
+}
+
+uint64_t telix_desktop_newest_presenter(void) {
+    return desktop::Platform::instance().picture().newestPresenter();
 }
 
 void telix_desktop_release_frame(telix_desktop_frame* frame) {

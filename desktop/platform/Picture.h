@@ -5,6 +5,7 @@
 
 #include <gst/gst.h>
 
+#include <atomic>
 #include <cstdint>
 #include <functional>
 #include <mutex>
@@ -19,14 +20,21 @@ public:
     // Identifies a presentation; 0: none. Every function ignores a token whose presentation has ended.
     using Token = uint64_t;
 
-    // Where on the page of 1280 by 720 pixels the video is shown.
+    // Identifies an object that can present: a video/broadcast object or a media player. 0: none.
+    using Presenter = uint64_t;
+
+    // Where on the page of 1280 by 720 pixels the video of an object is shown.
     struct View {
+        Presenter presenter = 0;
         int32_t x = 0;
         int32_t y = 0;
         uint32_t width = 1280;
         uint32_t height = 720;
         bool fullScreen = false;
     };
+
+    // The number of an object that is created now, increasing. Any thread.
+    Presenter newPresenter() { return ++m_lastPresenter; }
 
     // Starts a presentation and preempts the previous one, whose `onPreempted` runs on this thread before the
     // function returns. `onFirstFrame` runs once, on GStreamer's thread. Platform thread.
@@ -56,6 +64,7 @@ public:
     // The exported functions. Any thread.
     void setWakeup(telix_desktop_wakeup wakeup, void* data);
     void acquireFrame(telix_desktop_frame& frame);
+    Presenter newestPresenter() const { return m_lastPresenter; }
 
 private:
     struct SinkData;
@@ -65,6 +74,8 @@ private:
     void showSample(const SinkData& sink, GstSample* sample);
     GstSample* describeFrame(telix_desktop_frame& frame);
     void wakeUp();
+
+    std::atomic<Presenter> m_lastPresenter{0};
 
     std::mutex m_mutex; // guards what follows; not held in callbacks
     Token m_lastToken = 0;

@@ -32,6 +32,7 @@ PlayerRegistry::Entry* PlayerRegistry::findLocked(TELIX_JS_AV_HANDLE player) {
 TELIX_JS_AV_HANDLE PlayerRegistry::create() {
     std::lock_guard<std::mutex> lock(m_platform.mutex());
     Entry& entry = m_entries[++m_lastHandle];
+    entry.view.presenter = m_platform.picture().newPresenter();
     entry.record = &m_records.emplace_back();
     entry.callbacks = std::make_shared<Callbacks>();
     return m_lastHandle;

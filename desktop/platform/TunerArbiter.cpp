@@ -27,7 +27,7 @@ TunerArbiter::Object* TunerArbiter::findLocked(TELIX_JS_VB_HANDLE object) {
 
 TELIX_JS_VB_HANDLE TunerArbiter::newObject() {
     std::lock_guard<std::mutex> lock(m_platform.mutex());
-    m_objects[++m_lastObject];
+    m_objects[++m_lastObject].view.presenter = m_platform.picture().newPresenter();
     return m_lastObject;
 }
 

@@ -17,7 +17,7 @@
 extern "C" {
 #endif
 
-/* NOLINTBEGIN(modernize-use-using): the header is C. */
+/* NOLINTBEGIN(modernize-use-using, modernize-redundant-void-arg): the header is C. */
 
 /* What is to be seen now. Coordinates are pixels of the browser's 1280 by 720 page. */
 typedef struct telix_desktop_frame {
@@ -27,8 +27,9 @@ typedef struct telix_desktop_frame {
     uint32_t stride;      /* bytes from one line to the next */
     uint32_t aspectWidth; /* display aspect ratio, as 16 and 9; 0 and 0 without a frame */
     uint32_t aspectHeight;
-    uint64_t serial; /* increases with each frame; equal numbers mean equal pixels */
-    int32_t areaX;   /* where the page shows the video */
+    uint64_t presenter; /* the object that presents, see telix_desktop_newest_presenter; 0: none */
+    uint64_t serial;    /* increases with each frame; equal numbers mean equal pixels */
+    int32_t areaX;      /* where the page shows the video */
     int32_t areaY;
     uint32_t areaWidth;
     uint32_t areaHeight;
@@ -45,8 +46,9 @@ typedef void (*telix_desktop_wakeup)(void* data);
 typedef void (*telix_desktop_set_wakeup_function)(telix_desktop_wakeup wakeup, void* data);
 typedef void (*telix_desktop_acquire_frame_function)(telix_desktop_frame* frame);
 typedef void (*telix_desktop_release_frame_function)(telix_desktop_frame* frame);
+typedef uint64_t (*telix_desktop_newest_presenter_function)(void);
 
-/* NOLINTEND(modernize-use-using) */
+/* NOLINTEND(modernize-use-using, modernize-redundant-void-arg) */
 
 #ifndef TELIX_DESKTOP_API
 #define TELIX_DESKTOP_API __attribute__((visibility("default")))
@@ -63,6 +65,12 @@ TELIX_DESKTOP_API void telix_desktop_acquire_frame(telix_desktop_frame* frame);
 
 /* Releases the pixels of an acquired frame and clears the record. A cleared record may be passed again. */
 TELIX_DESKTOP_API void telix_desktop_release_frame(telix_desktop_frame* frame);
+
+/* The number of the object that has been created last, 0 before the first. Video/broadcast objects and media
+ * players are numbered together, from 1, in the order in which TELIX_JS_VB_GetHandle and
+ * TELIX_JS_AV_CreatePlayer create them. So whoever reads this before and after a page's element gets its
+ * object knows the number of the element's object. */
+TELIX_DESKTOP_API uint64_t telix_desktop_newest_presenter(void);
 
 #ifdef __cplusplus
 }

@@ -520,6 +520,33 @@ TEST_F(MediaTest, TakesThePipelineFromAnotherPlayer) {
     expectMessages({kPlayStart, kPlayStart, kPlayEnd});
 }
 
+TEST_F(MediaTest, TheFrameNamesTheObjectThatPresents) {
+    const uint64_t before = telix_desktop_newest_presenter();
+    TELIX_JS_VB_HANDLE object = 0;
+    ASSERT_EQ(TELIX_JS_VB_GetHandle(&object), 0);
+    EXPECT_EQ(telix_desktop_newest_presenter(), before + 1);
+    TELIX_JS_AV_HANDLE other = 0;
+    ASSERT_EQ(TELIX_JS_AV_CreatePlayer(&other, 0, 0, 0), 0);
+    EXPECT_EQ(telix_desktop_newest_presenter(), before + 2);
+    const auto isPresentedBy = [](uint64_t presenter) {
+        return waitUntil([=] { return takeShot().isVisible && takeShot().presenter == presenter; });
+    };
+    ASSERT_EQ(TELIX_JS_AV_Play(other, file("second.mp4").c_str(), 10, 6, 1280, 0, 0, 0), 0);
+    EXPECT_TRUE(isPresentedBy(before + 2));
+    ASSERT_EQ(TELIX_JS_VB_BindToCurrChannel(object), 0);
+    EXPECT_TRUE(isPresentedBy(before + 1));
+    // One player after the other on one presentation.
+    ASSERT_EQ(TELIX_JS_AV_Play(other, file("second.mp4").c_str(), 10, 6, 1280, 0, 0, 0), 0);
+    EXPECT_TRUE(isPresentedBy(before + 2));
+    play(file("clip.mp4"));
+    EXPECT_TRUE(waitUntil([=] { return takeShot().isVisible && takeShot().presenter <= before; }));
+    EXPECT_NE(takeShot().presenter, 0U);
+    ASSERT_EQ(TELIX_JS_AV_Stop(m_player), 0);
+    EXPECT_EQ(TELIX_JS_AV_DestroyPlayer(other), 0);
+    TELIX_JS_VB_Release(object);
+    EXPECT_TRUE(waitUntil([] { return takeShot().presenter == 0; }));
+}
+
 TEST_F(MediaTest, TakesThePictureFromBroadcastAndLosesItToATune) {
     TELIX_JS_VB_HANDLE object = 0;
     ASSERT_EQ(TELIX_JS_VB_GetHandle(&object), 0);

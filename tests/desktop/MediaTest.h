@@ -202,12 +202,14 @@ struct Shot {
     int32_t areaX = 0;
     uint32_t areaWidth = 0;
     bool isFullScreen = false;
+    uint64_t presenter = 0;
 };
 
 inline Shot takeShot() {
     telix_desktop_frame frame{};
     telix_desktop_acquire_frame(&frame);
-    Shot shot{frame.serial, frame.visible != 0, {}, frame.areaX, frame.areaWidth, frame.fullScreen != 0};
+    Shot shot{frame.serial,          frame.visible != 0, {}, frame.areaX, frame.areaWidth,
+              frame.fullScreen != 0, frame.presenter};
     if (frame.pixels) {
         const uint8_t* line = frame.pixels + size_t{frame.height} / 2 * frame.stride;
         shot.pixels.assign(line, line + size_t{frame.width} * 4);
