@@ -152,7 +152,8 @@ webkit_web_extension_initialize_with_user_data(WebKitWebExtension*, const GVaria
         bridge::readSetting(data, bridge::kEngineSetting) == bridge::kGObjectEngine;
     // For the life of the process, as the plug-in's own threads and main loop sources are.
     auto* const extension = new bridge::Extension(std::move(plugin), usesGObjectEngine);
-    g_signal_connect(
+    // After other extensions, which may leave an observer for the page script.
+    g_signal_connect_after(
         webkit_script_world_get_default(), "window-object-cleared",
         G_CALLBACK(+[](WebKitScriptWorld* world, WebKitWebPage*, WebKitFrame* frame, gpointer data) {
             static_cast<bridge::Extension*>(data)->onWindowObjectCleared(frame, world);

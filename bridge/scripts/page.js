@@ -54,6 +54,20 @@
 
     const theWindow = window;
     const theDocument = document;
+
+    // Another extension of the process may follow the instances: it leaves a function in the window object, which the page
+    // never sees.
+    const instanceObserver = theWindow.telixBridgeObserver;
+    deleteProperty(theWindow, 'telixBridgeObserver');
+
+    // Calls it with the element, 'creating', 'created' or 'destroyed', and the number of the instance in this window. The
+    // first two come for each attempt, with the number 0 if there is no instance.
+    function report(element, event, number) {
+        if (instanceObserver) {
+            apply(instanceObserver, undefined, [element, event, number]);
+        }
+    }
+
     const isConnected = getter(Node.prototype, 'isConnected');
     const ownerDocument = getter(Node.prototype, 'ownerDocument');
     const parentNode = getter(Node.prototype, 'parentNode');
@@ -212,7 +226,9 @@
             values[values.length] = parameters[i];
         }
         applyStyle();
+        report(element, 'creating', 0);
         record.number = apply(hostCreate, undefined, values);
+        report(element, 'created', record.number);
         if (record.number === 0) {
             return false;
         }
@@ -264,6 +280,7 @@
             setPrototypeOf(holder, record.base);
         }
         hostDestroy(record.number);
+        report(element, 'destroyed', record.number);
     }
 
     function detachIf(condition) {
