@@ -1,6 +1,7 @@
 #!/usr/bin/env python3
-"""Measures the CPU load of all processes of the desktop television with 720p25 video on each engine, compared in the same run
-with decoding alone and, where it is installed, with mpv in a window, and the time from program start to the first picture.
+"""Measures the CPU load of all processes of the desktop television with 720p25 video on each engine, on WebKitGTK on the video
+plane and painted by the page, compared in the same run with decoding alone and, where it is installed, with mpv in a window, and
+the time from program start to the first picture.
 Usage: television_bench.py BUILD-FOLDER"""
 
 import os
@@ -17,12 +18,17 @@ from television import Television, temporary_folder  # noqa: E402
 SECONDS = 15  # of each measurement
 ROUNDS = 3
 STARTS = 5
-PAGE = '''<!DOCTYPE html><html><body style="margin: 0">
+PAGE = '''<!DOCTYPE html><html><body style="margin: 0; background: {background}">
 <object id="tv" type="video/broadcast" style="position: absolute; width: 1280px; height: 720px"></object>
 <script>
     var tv = document.getElementById('tv');
-    tv.onChannelChangeSucceeded = function () { console.log('presenting'); };
-    window.onload = function () { tv.setChannel(tv.getChannelConfig().channelList.item(0), false); };
+    tv.onChannelChangeSucceeded = function () {{
+        setTimeout(function () {{
+            document.body.style.background = '{later}';
+            console.log('presenting');
+        }}, 1000);
+    }};
+    window.onload = function () {{ tv.setChannel(tv.getChannelConfig().channelList.item(0), false); }};
 </script></body></html>'''
 
 
@@ -32,6 +38,14 @@ def make_stream(file):
          '-f', 'lavfi', '-i', 'sine=frequency=440:sample_rate=48000', '-t', str(SECONDS + 15), '-c:v', 'mpeg2video',
          '-b:v', '6M', '-maxrate', '8M', '-bufsize', '2M', '-g', '12', '-c:a', 'mp2', '-b:a', '192k',
          '-muxdelay', '0.2', '-muxpreload', '0.2', '-f', 'mpegts', file], check=True)
+
+
+def write_page(folder, background, later):
+    """A page in which the video lies on a background, and on another one when it has begun."""
+    file_name = os.path.join(folder, f'{background}-{later}.html')
+    with open(file_name, 'w', encoding='utf-8') as file:
+        file.write(PAGE.format(background=background, later=later))
+    return file_name
 
 
 def stat(pid):
@@ -115,13 +129,18 @@ def main():
     engines = [engine for engine in ('webkit', 'npapi')
                if os.path.isfile(os.path.join(build, 'desktop', f'telix-tv-{engine}'))]
     with temporary_folder() as folder, Television(os.path.join(build, 'desktop', 'telix-tv')) as television:
-        stream, page = os.path.join(folder, 'stream.ts'), os.path.join(folder, 'page.html')
+        stream = os.path.join(folder, 'stream.ts')
         make_stream(stream)
-        with open(page, 'w', encoding='utf-8') as file:
-            file.write(PAGE)
+        page = write_page(folder, 'transparent', 'transparent')
+        opaque_pages = {'painted by the page': write_page(folder, 'gray', 'gray'),
+                        'painted by the page after the plane': write_page(folder, 'transparent', 'gray')}
         channels = {'TELIX_CHANNELS': stream}
         measurements = {f'television, {engine}': lambda engine=engine: television_load(television, engine, page, channels)
                         for engine in engines}
+        if 'webkit' in engines:
+            measurements.update({
+                f'television, webkit, {name}': lambda each=each: television_load(television, 'webkit', each, channels)
+                for name, each in opaque_pages.items()})
         measurements['decoding alone'] = lambda: decoding_load(build, stream)
         if shutil.which('mpv'):
             measurements['mpv --vo=x11'] = lambda: mpv_load(television, stream)

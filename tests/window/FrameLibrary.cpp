@@ -63,6 +63,12 @@ TELIX_DESKTOP_API void showFrame(uint32_t width, uint32_t height, uint8_t value)
     }
 }
 
+TELIX_DESKTOP_API void setPresenter(uint64_t presenter, bool isFullScreen) {
+    const std::lock_guard<std::mutex> lock(frameMutex);
+    current.presenter = presenter;
+    current.fullScreen = isFullScreen ? 1 : 0;
+}
+
 TELIX_DESKTOP_API int countFrames() {
     return acquiredFrames;
 }

@@ -4,6 +4,7 @@
 #include <poll.h>
 #include <unistd.h>
 
+#include <atomic>
 #include <chrono>
 #include <condition_variable>
 #include <memory>
@@ -39,9 +40,11 @@ protected:
         void* const library = dlopen(TELIX_FRAME_LIBRARY, RTLD_NOW | RTLD_LOCAL);
         ASSERT_TRUE(library) << dlerror();
         m_show = reinterpret_cast<ShowFrameFunction>(dlsym(library, "showFrame"));
+        m_setPresenter = reinterpret_cast<SetPresenterFunction>(dlsym(library, "setPresenter"));
         m_count = reinterpret_cast<CountFramesFunction>(dlsym(library, "countFrames"));
         m_hasWakeup = reinterpret_cast<HasWakeupFunction>(dlsym(library, "hasWakeup"));
-        ASSERT_TRUE(m_show && m_count && m_hasWakeup);
+        ASSERT_TRUE(m_show && m_setPresenter && m_count && m_hasWakeup);
+        m_setPresenter(0, false);
     }
 
     void takeRing() {
@@ -73,6 +76,7 @@ protected:
     std::unique_ptr<FramePublisher> m_publisher;
     std::unique_ptr<FrameReader> m_reader;
     ShowFrameFunction m_show = nullptr;
+    SetPresenterFunction m_setPresenter = nullptr;
     CountFramesFunction m_count = nullptr;
     HasWakeupFunction m_hasWakeup = nullptr;
 };
@@ -123,6 +127,50 @@ TEST_F(FramePublisherTest, AFrameForWhichThereIsNoRingHidesTheVideo) {
         m_reader->refresh();
     }
     EXPECT_EQ(m_rings, 1);
+}
+
+TEST_F(FramePublisherTest, FramesOfAnObjectThatIsLeftOutDoNotArrive) {
+    std::atomic<int> changes{0};
+    m_publisher->setOnChange([&] { changes++; });
+    const auto waitForChange = [&](int count) {
+        const auto end = std::chrono::steady_clock::now() + std::chrono::milliseconds(kTimeoutInMilliseconds);
+        while (changes < count && std::chrono::steady_clock::now() < end) {
+            usleep(1000);
+        }
+        return changes.load();
+    };
+    loadLibrary();
+    ASSERT_TRUE(m_publisher->start());
+    m_setPresenter(7, false);
+    m_show(64, 36, 1);
+    takeRing();
+    waitFor(1);
+    EXPECT_EQ(waitForChange(1), 1) << "another object presents";
+    m_publisher->watch(7);
+    m_publisher->leaveOut(7);
+    for (uint8_t value = 2; value < 10; ++value) {
+        m_show(64, 36, value);
+        EXPECT_EQ(waitForChange(value), value) << "each frame of the watched object is reported";
+    }
+    m_reader->refresh();
+    EXPECT_EQ(m_reader->frame().pixels[0], 1);
+    m_setPresenter(7, true);
+    m_show(64, 36, 20);
+    waitFor(20); // full screen is not left out
+    m_setPresenter(8, false);
+    m_show(64, 36, 21);
+    waitFor(21); // nor is another object
+    m_setPresenter(7, false);
+    m_show(64, 36, 22);
+    waitFor(22); // that there is video again
+    m_show(64, 36, 23);
+    EXPECT_EQ(waitForChange(13), 13);
+    m_reader->refresh();
+    EXPECT_EQ(m_reader->frame().pixels[0], 22);
+    m_publisher->leaveOut(0);
+    m_reader->refresh();
+    EXPECT_EQ(m_reader->frame().pixels[0], 23) << "the newest frame is there at once";
+    m_publisher.reset(); // before what the callback uses
 }
 
 TEST_F(FramePublisherTest, AfterItsEndTheLibraryIsFree) {

@@ -39,6 +39,7 @@ struct TestFrame {
         frame.stride = width * 4 + padding;
         frame.aspectWidth = 16;
         frame.aspectHeight = 9;
+        frame.presenter = 5;
         frame.serial = serial;
         frame.areaX = -3;
         frame.areaY = 4;
@@ -115,6 +116,7 @@ TEST_F(FrameRingTest, AFrameArrivesWithAllThatIsSaidOfIt) {
     EXPECT_EQ(shown().stride, kWidth * 4);
     EXPECT_EQ(shown().aspectWidth, 16U);
     EXPECT_EQ(shown().aspectHeight, 9U);
+    EXPECT_EQ(shown().presenter, 5U);
     EXPECT_EQ(shown().serial, 41U);
     EXPECT_EQ(shown().areaX, -3);
     EXPECT_EQ(shown().areaY, 4);

@@ -52,7 +52,9 @@ void FramePublisher::onWakeup(void* publisher) {
 void FramePublisher::run() {
     pthread_setname_np(pthread_self(), "telix-frames");
     while (waitForWakeup()) {
-        publish();
+        if (publish() && m_onChange) {
+            m_onChange();
+        }
     }
 }
 
@@ -64,9 +66,25 @@ bool FramePublisher::waitForWakeup() {
     return !m_isEnding;
 }
 
-void FramePublisher::publish() {
+bool FramePublisher::publish() {
+    const std::lock_guard<std::mutex> lock(m_ringMutex);
     m_source.refresh();
-    telix_desktop_frame frame = m_source.frame();
+    const telix_desktop_frame& frame = m_source.frame();
+    const Scene scene{frame.presenter, frame.fullScreen != 0, frame.visible != 0};
+    const bool isOther = !(scene == m_scene);
+    const bool isLeftOut = scene.presenter != 0 && scene.presenter == m_leftOut && !scene.isFullScreen;
+    const bool isWatched = scene.presenter != 0 && scene.presenter == m_watched;
+    m_scene = scene;
+    // The first frame is published nevertheless, because the window is to know that there is video.
+    if (isOther || !isLeftOut) {
+        publishLocked(frame);
+    }
+    // The frame is in the ring; its buffer goes back to the decoder.
+    m_source.drop();
+    return isOther || isWatched;
+}
+
+void FramePublisher::publishLocked(telix_desktop_frame frame) {
     const size_t size = FrameWriter::sizeOf(frame);
     if (size == 0) {
         frame.visible = 0;
@@ -76,8 +94,16 @@ void FramePublisher::publish() {
         m_writer->publish(frame);
         m_sendRing(m_writer->memoryDescriptor(), m_writer->wakeupDescriptor());
     }
-    // The frame is in the ring; its buffer goes back to the decoder.
-    m_source.drop();
+}
+
+void FramePublisher::leaveOut(uint64_t presenter) {
+    {
+        const std::lock_guard<std::mutex> lock(m_ringMutex);
+        m_leftOut = presenter;
+    }
+    if (presenter == 0 && m_thread.joinable() && publish() && m_onChange) {
+        m_onChange();
+    }
 }
 
 // The reader keeps what it has of the previous ring.

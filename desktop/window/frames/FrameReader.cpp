@@ -106,6 +106,7 @@ bool FrameReader::refresh() {
 
 void FrameReader::show(const FrameDescription& description) {
     m_frame = {};
+    m_frame.presenter = description.presenter;
     m_frame.serial = description.serial;
     if (description.visible == 0 || !isPlausible(description, m_memory->slotSize())) {
         return;

@@ -31,6 +31,7 @@ constexpr size_t kMaximumSlotSize = size_t{kBytesPerPixel} * 4096 * 4096;
 
 // What telix_desktop_frame says, without pointers.
 struct FrameDescription {
+    uint64_t presenter;
     uint64_t serial;
     uint32_t slot;
     uint32_t width;

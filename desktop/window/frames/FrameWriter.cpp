@@ -57,9 +57,11 @@ bool FrameWriter::publish(const telix_desktop_frame& frame) {
     }
     m_slots[m_own] = m_pixelSlot;
     m_memory->header().descriptions[m_own] = {
-        frame.serial,      m_pixelSlot,        frame.width,        frame.height, frame.width * kBytesPerPixel,
-        frame.aspectWidth, frame.aspectHeight, frame.areaX,        frame.areaY,  frame.areaWidth,
-        frame.areaHeight,  frame.fullScreen,   isVisible ? 1U : 0U};
+        frame.presenter,   frame.serial,       m_pixelSlot,
+        frame.width,       frame.height,       frame.width * kBytesPerPixel,
+        frame.aspectWidth, frame.aspectHeight, frame.areaX,
+        frame.areaY,       frame.areaWidth,    frame.areaHeight,
+        frame.fullScreen,  isVisible ? 1U : 0U};
     const uint32_t given = m_memory->header().newest.exchange(m_own | FrameRingHeader::kNew);
     m_own = given % FrameRingHeader::kNew % kSlotCount;
     const uint64_t one = 1;

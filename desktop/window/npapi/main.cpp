@@ -46,7 +46,8 @@ void configureEngine(const PluginFile& plugin, const PluginFolder& folder, bool 
     QWebSettings::setPluginSearchPaths({folder.path()});
     settings->setAttribute(QWebSettings::PluginsEnabled, true);
     settings->setAttribute(QWebSettings::DeveloperExtrasEnabled, inspect);
-    settings->setUserStyleSheetUrl(styleSheetUrl(QString::fromStdString(plugin.styleSheet()) + kSizeLimit));
+    settings->setUserStyleSheetUrl(
+        styleSheetUrl(QString::fromStdString(plugin.styleSheet("opacity: 0 !important;")) + kSizeLimit));
 }
 
 // Exits the event loop, so that destructors remove temporary files.

@@ -6,10 +6,12 @@ namespace desktop {
 FrameSource::FrameSource(telix_desktop_wakeup wakeup, void* data) : m_wakeup(wakeup), m_wakeupData(data) {}
 
 FrameSource::~FrameSource() {
-    if (!m_setWakeup) {
+    if (!m_isBound) {
         return;
     }
-    m_setWakeup(nullptr, nullptr);
+    if (m_wakeup) {
+        m_setWakeup(nullptr, nullptr);
+    }
     m_release(&m_frame);
 }
 
@@ -22,18 +24,16 @@ bool FrameSource::find() {
 }
 
 void FrameSource::bind() {
-    telix_desktop_set_wakeup_function setWakeup = nullptr;
-    if (!m_library.bind("telix_desktop_acquire_frame", m_acquire) ||
-        !m_library.bind("telix_desktop_release_frame", m_release) ||
-        !m_library.bind("telix_desktop_set_wakeup", setWakeup)) {
-        return;
+    m_isBound = m_library.bind("telix_desktop_acquire_frame", m_acquire) &&
+                m_library.bind("telix_desktop_release_frame", m_release) &&
+                m_library.bind("telix_desktop_set_wakeup", m_setWakeup);
+    if (m_isBound && m_wakeup) {
+        m_setWakeup(m_wakeup, m_wakeupData);
     }
-    m_setWakeup = setWakeup;
-    m_setWakeup(m_wakeup, m_wakeupData);
 }
 
 void FrameSource::refresh() {
-    if (!m_setWakeup) {
+    if (!m_isBound) {
         return;
     }
     m_release(&m_frame);
@@ -41,7 +41,7 @@ void FrameSource::refresh() {
 }
 
 void FrameSource::drop() {
-    if (m_setWakeup) {
+    if (m_isBound) {
         m_release(&m_frame);
     }
 }

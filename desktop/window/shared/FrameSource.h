@@ -10,6 +10,8 @@ namespace desktop {
 // All functions are for one thread.
 class FrameSource {
 public:
+    // For frames that are looked at on other occasions, without a wake-up.
+    FrameSource() = default;
     // `wakeup` is called with `data` on any thread when a frame or its placement is new, see telix_picture.h.
     FrameSource(telix_desktop_wakeup wakeup, void* data);
     // Afterwards the wake-up callback is not running and is never called again.
@@ -32,10 +34,11 @@ public:
 private:
     void bind();
 
-    telix_desktop_wakeup m_wakeup;
-    void* m_wakeupData;
+    telix_desktop_wakeup m_wakeup = nullptr;
+    void* m_wakeupData = nullptr;
     PlatformLibrary m_library;
     bool m_isFound = false;
+    bool m_isBound = false; // the library has all functions
     telix_desktop_set_wakeup_function m_setWakeup = nullptr;
     telix_desktop_acquire_frame_function m_acquire = nullptr;
     telix_desktop_release_frame_function m_release = nullptr;

@@ -52,11 +52,10 @@ void PluginFile::load() {
     m_mimeTypes = mimeTypesOf(mimeDescription());
 }
 
-std::string PluginFile::styleSheet() const {
+std::string PluginFile::styleSheet(const std::string& declarations) const {
     std::string style;
     for (const auto& type : m_mimeTypes) {
-        style +=
-            "object[type=\"" + type + "\" i], embed[type=\"" + type + "\" i] { opacity: 0 !important; }\n";
+        style += "object[type=\"" + type + "\" i], embed[type=\"" + type + "\" i] { " + declarations + " }\n";
     }
     return style;
 }

@@ -18,10 +18,10 @@ public:
     const std::string& path() const { return m_path; }
     // The MIME types of NP_GetMIMEDescription().
     const std::vector<std::string>& mimeTypes() const { return m_mimeTypes; }
-    // A style sheet that makes elements of these types transparent, above all styles of a page. Engines paint
-    // windowless plug-ins or fallback content, which would hide the video plane. The elements stay in the
-    // layout, because their position is the display area of the video.
-    std::string styleSheet() const;
+    // A style sheet with declarations for the elements of these types. It is to keep transparent what engines
+    // paint of windowless plug-ins or fallback content, which would hide the video plane, and to leave the
+    // elements in the layout, because their position is the display area of the video.
+    std::string styleSheet(const std::string& declarations) const;
 
 private:
     void load();

@@ -4,6 +4,7 @@
 #include "desktop/window/shared/CommandLine.h"
 #include "desktop/window/shared/PluginFile.h"
 #include "desktop/window/shared/ProgramFolder.h"
+#include "desktop/window/webkit/GpuDevice.h"
 #include "desktop/window/webkit/PageChannel.h"
 #include "desktop/window/webkit/Profile.h"
 #include "desktop/window/webkit/WebProcessOutput.h"
@@ -14,6 +15,16 @@ namespace {
 
 // A television has no scroll bars.
 constexpr char kWindowStyle[] = "::-webkit-scrollbar { display: none !important; }\n";
+
+constexpr GdkRGBA kTransparent{0, 0, 0, 0};
+constexpr GdkRGBA kBlack{0, 0, 0, 1};
+
+// Of an object of the plug-in: nothing of its content, and as background nothing but the video when the page
+// paints it, see scripts/videoplacement.js.
+constexpr char kObjectStyle[] =
+    "content-visibility: hidden !important; color: transparent !important; "
+    "background: var(--telix-video, none) !important; "
+    "background-origin: border-box !important; background-clip: border-box !important;";
 
 // Features of the engine that a hidden application cannot do with: its timers run as fast as those of a
 // visible one, because it may show itself again.
@@ -46,6 +57,11 @@ WebKitSettings* newSettings(const CommandLine& commandLine) {
         "enable-write-console-messages-to-stdout", TRUE,
         // A set shows what its platform library plays, and pages start sound without a click.
         "media-playback-requires-user-gesture", FALSE, "enable-smooth-scrolling", FALSE, nullptr));
+    // In software, OpenGL takes several times as long as the engine without it, most of all for video in the
+    // page.
+    if (!hasGpuDevice()) {
+        webkit_settings_set_hardware_acceleration_policy(settings, WEBKIT_HARDWARE_ACCELERATION_POLICY_NEVER);
+    }
     disableFeatures(settings);
     return settings;
 }
@@ -96,7 +112,7 @@ Engine::Engine(const CommandLine& commandLine, const PluginFile& plugin, const P
                          static_cast<Engine*>(engine)->onInitializeExtensions(context);
                      }),
                      this);
-    const std::string style = kWindowStyle + plugin.styleSheet();
+    const std::string style = kWindowStyle + plugin.styleSheet(kObjectStyle);
     WebKitUserStyleSheet* sheet = webkit_user_style_sheet_new(
         style.c_str(), WEBKIT_USER_CONTENT_INJECT_ALL_FRAMES, WEBKIT_USER_STYLE_LEVEL_USER, nullptr, nullptr);
     webkit_user_content_manager_add_style_sheet(m_content, sheet);
@@ -119,9 +135,15 @@ WebKitWebView* Engine::newView(WebKitWebView* related) const {
                                                m_settings, "user-content-manager", m_content,
                                                "is-controlled-by-automation", m_isAutomated, nullptr));
     // Where a page has no background, the video plane shows through.
-    const GdkRGBA nothing{0, 0, 0, 0};
-    webkit_web_view_set_background_color(view, &nothing);
+    const bool isOpaque = webkit_settings_get_hardware_acceleration_policy(m_settings) ==
+                          WEBKIT_HARDWARE_ACCELERATION_POLICY_NEVER;
+    webkit_web_view_set_background_color(view, isOpaque ? &kBlack : &kTransparent);
     return view;
+}
+
+void Engine::makeTransparent(WebKitWebView* view) const {
+    webkit_settings_set_hardware_acceleration_policy(m_settings, WEBKIT_HARDWARE_ACCELERATION_POLICY_ALWAYS);
+    webkit_web_view_set_background_color(view, &kTransparent);
 }
 
 // Emitted after each start of a web process, which waits for the data.

@@ -35,6 +35,11 @@ public:
     WebKitWebContext* context() const { return m_context; }
     WebKitWebView* newView(WebKitWebView* related) const;
 
+    // Lets the video plane show through a view. Without a GPU a view begins without OpenGL and opaque,
+    // because without OpenGL the engine leaves in the window what a page has drawn where it becomes
+    // transparent. The engine starts to use OpenGL at any time, but does not cease to.
+    void makeTransparent(WebKitWebView* view) const;
+
 private:
     void onInitializeExtensions(WebKitWebContext* context);
 

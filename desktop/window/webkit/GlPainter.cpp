@@ -2,10 +2,11 @@
 #include "desktop/window/webkit/GlPainter.h"
 
 #include <epoxy/gl.h>
-#include <glob.h>
 
 #include <cstring>
 #include <string>
+
+#include "desktop/window/webkit/GpuDevice.h"
 
 namespace desktop {
 
@@ -13,19 +14,6 @@ namespace {
 
 // What the textures and framebuffers of those numbers hold: the frame, and what is painted of it.
 enum Role { kFrame, kScaled };
-
-// Whether a GPU can be there at all: without one, the software renderer need not be loaded for the answer.
-bool hasGpuDevice() {
-    for (const char* pattern : {"/dev/dri/renderD*", "/dev/nvidiactl"}) {
-        glob_t files{};
-        const bool isFound = glob(pattern, GLOB_NOSORT, nullptr, &files) == 0;
-        globfree(&files);
-        if (isFound) {
-            return true;
-        }
-    }
-    return false;
-}
 
 bool isSoftwareRenderer() {
     const auto* name = reinterpret_cast<const char*>(glGetString(GL_RENDERER));

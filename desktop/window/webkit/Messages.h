@@ -16,6 +16,11 @@ constexpr char kChannelMessage[] = "telix-channel";
 // To the window's context: a request of the control socket (s). The reply has the response (s).
 constexpr char kControlMessage[] = "telix-control";
 
+// To the window's context (tb): the page shows the video of the object with that number of telix_picture.h,
+// which the video plane leaves out, or 0; whether the plane is to be seen through the pages. The reply,
+// without parameters, comes when the plane has changed.
+constexpr char kPagePresenterMessage[] = "telix-page-presenter";
+
 } // namespace desktop
 
 #endif

@@ -96,6 +96,11 @@ TvWindow::TvWindow(const Engine& engine, PageChannel& channel, const CommandLine
     gtk_window_set_title(GTK_WINDOW(m_window), kTitle);
     gtk_container_add(GTK_CONTAINER(m_window), m_overlay);
     gtk_container_add(GTK_CONTAINER(m_overlay), newBlackArea());
+    m_video.setOnPlane([this] {
+        for (const auto& application : m_applications) {
+            m_engine.makeTransparent(application->view());
+        }
+    });
     m_video.showFramesOf(engine.context());
     gtk_overlay_add_overlay(GTK_OVERLAY(m_overlay), m_video.widget());
     g_signal_connect(

@@ -9,7 +9,9 @@
 
 #include "desktop/window/frames/FrameReader.h"
 #include "desktop/window/shared/VideoArea.h"
+#include "desktop/window/webkit/FramePainting.h"
 #include "desktop/window/webkit/GlPainter.h"
+#include "desktop/window/webkit/Messages.h"
 
 namespace desktop {
 
@@ -27,33 +29,6 @@ void paintBlackAround(cairo_t* context, const PixelRect& video, int width, int h
     cairo_fill(context);
 }
 
-// Copies the pixels of the frame, scaled to `area`, from where they are.
-void paintFrame(cairo_t* context, const telix_desktop_frame& frame, const PixelRect& area) {
-    // Cairo writes into no surface that is a source.
-    cairo_surface_t* pixels = cairo_image_surface_create_for_data(
-        const_cast<uint8_t*>(frame.pixels), CAIRO_FORMAT_RGB24, static_cast<int>(frame.width),
-        static_cast<int>(frame.height), static_cast<int>(frame.stride));
-    const double scaleX = double(area.width) / frame.width;
-    const double scaleY = double(area.height) / frame.height;
-    cairo_save(context);
-    cairo_rectangle(context, area.x, area.y, area.width, area.height);
-    cairo_clip(context);
-    cairo_translate(context, area.x, area.y);
-    cairo_scale(context, scaleX, scaleY);
-    cairo_set_source_surface(context, pixels, 0, 0);
-    cairo_pattern_t* pattern = cairo_get_source(context);
-    cairo_pattern_set_filter(pattern,
-                             scaleX == 1 && scaleY == 1 ? CAIRO_FILTER_NEAREST : CAIRO_FILTER_BILINEAR);
-    // The smoothing at the edges would mix in what is around the frame.
-    cairo_pattern_set_extend(pattern, CAIRO_EXTEND_PAD);
-    cairo_set_operator(context, CAIRO_OPERATOR_SOURCE);
-    cairo_paint(context);
-    cairo_restore(context);
-    // The ring is written again after the next refresh.
-    cairo_surface_finish(pixels);
-    cairo_surface_destroy(pixels);
-}
-
 } // namespace
 
 class VideoWidget::Private {
@@ -65,9 +40,10 @@ public:
 
     GtkWidget* widget() const { return m_widget; }
     void showFramesOf(WebKitWebContext* context);
-    void dropFrames() { replaceReader(nullptr); }
+    void dropFrames();
     bool hasFrame() const { return frame().visible != 0; }
     void setOnChange(std::function<void()> onChange) { m_onChange = std::move(onChange); }
+    void setOnPlane(std::function<void()> onPlane) { m_onPlane = std::move(onPlane); }
     void paint(cairo_t* context, int width, int height) const;
 
 private:
@@ -77,7 +53,10 @@ private:
     static void onRealize(GtkWidget* widget, gpointer self);
     static void onUnrealize(GtkWidget* widget, gpointer self);
 
+    bool isInPage() const;
+    void leaveToPage(uint64_t presenter);
     telix_desktop_frame frame() const { return m_reader ? m_reader->frame() : telix_desktop_frame{}; }
+    PixelRect areaIn(int width, int height) const;
     PixelRect areaInWidget() const;
     void paintWith(GlPainter* painter, cairo_t* context, int width, int height) const;
     void replaceReader(std::unique_ptr<FrameReader> reader);
@@ -90,8 +69,10 @@ private:
     gulong m_messageHandler = 0;
     std::unique_ptr<FrameReader> m_reader; // null: no web process has sent a ring
     guint m_watch = 0;
+    uint64_t m_pagePresenter = 0;         // whose video the page shows; 0: none
     std::unique_ptr<GlPainter> m_painter; // null: paint with cairo
     std::function<void()> m_onChange;
+    std::function<void()> m_onPlane;
 };
 
 // ---- The widget
@@ -105,6 +86,7 @@ VideoWidget::Private::Private() : m_widget(gtk_drawing_area_new()) {
 
 VideoWidget::Private::~Private() {
     m_onChange = nullptr;
+    m_onPlane = nullptr;
     replaceReader(nullptr);
     if (m_context) {
         g_signal_handler_disconnect(m_context, m_messageHandler);
@@ -131,7 +113,7 @@ gboolean VideoWidget::Private::onDraw(GtkWidget* widget, cairo_t* context, gpoin
 
 // With OpenGL if there is a painter.
 void VideoWidget::Private::paintWith(GlPainter* painter, cairo_t* context, int width, int height) const {
-    const PixelRect area = videoArea(frame(), width, height);
+    const PixelRect area = areaIn(width, height);
     paintBlackAround(context, area, width, height);
     if (!area.isEmpty() && !(painter && painter->paint(context, frame(), area))) {
         paintFrame(context, frame(), area);
@@ -146,9 +128,12 @@ void VideoWidget::Private::paint(cairo_t* context, int width, int height) const 
     cairo_restore(context);
 }
 
+PixelRect VideoWidget::Private::areaIn(int width, int height) const {
+    return isInPage() ? PixelRect{} : videoArea(frame(), width, height);
+}
+
 PixelRect VideoWidget::Private::areaInWidget() const {
-    return videoArea(frame(), gtk_widget_get_allocated_width(m_widget),
-                     gtk_widget_get_allocated_height(m_widget));
+    return areaIn(gtk_widget_get_allocated_width(m_widget), gtk_widget_get_allocated_height(m_widget));
 }
 
 // ---- The frames
@@ -160,7 +145,20 @@ void VideoWidget::Private::showFramesOf(WebKitWebContext* context) {
 }
 
 gboolean VideoWidget::Private::onMessage(WebKitWebContext*, WebKitUserMessage* message, gpointer self) {
-    if (g_strcmp0(webkit_user_message_get_name(message), kFramesMessage) != 0) {
+    auto& video = *static_cast<Private*>(self);
+    const char* name = webkit_user_message_get_name(message);
+    if (g_strcmp0(name, kPagePresenterMessage) == 0) {
+        uint64_t presenter = 0;
+        gboolean isOnPlane = FALSE;
+        g_variant_get(webkit_user_message_get_parameters(message), "(tb)", &presenter, &isOnPlane);
+        video.leaveToPage(presenter);
+        if (isOnPlane && video.m_onPlane) {
+            video.m_onPlane();
+        }
+        webkit_user_message_send_reply(message, webkit_user_message_new(kPagePresenterMessage, nullptr));
+        return TRUE;
+    }
+    if (g_strcmp0(name, kFramesMessage) != 0) {
         return FALSE;
     }
     GUnixFDList* descriptors = webkit_user_message_get_fd_list(message);
@@ -176,8 +174,29 @@ gboolean VideoWidget::Private::onMessage(WebKitWebContext*, WebKitUserMessage* m
         g_printerr("telix-tv: %s\n", error.c_str());
         return TRUE;
     }
-    static_cast<Private*>(self)->replaceReader(std::move(reader));
+    video.replaceReader(std::move(reader));
     return TRUE;
+}
+
+// Full screen lies behind the page.
+bool VideoWidget::Private::isInPage() const {
+    return m_pagePresenter != 0 && frame().presenter == m_pagePresenter && !frame().fullScreen;
+}
+
+void VideoWidget::Private::leaveToPage(uint64_t presenter) {
+    const PixelRect before = areaInWidget();
+    m_pagePresenter = presenter;
+    if (m_reader) {
+        m_reader->refresh();
+    }
+    repaint(before);
+    repaint(areaInWidget());
+    notifyChange();
+}
+
+void VideoWidget::Private::dropFrames() {
+    m_pagePresenter = 0;
+    replaceReader(nullptr);
 }
 
 void VideoWidget::Private::replaceReader(std::unique_ptr<FrameReader> reader) {
@@ -250,6 +269,9 @@ bool VideoWidget::hasFrame() const {
 }
 void VideoWidget::setOnChange(std::function<void()> onChange) {
     m_private->setOnChange(std::move(onChange));
+}
+void VideoWidget::setOnPlane(std::function<void()> onPlane) {
+    m_private->setOnPlane(std::move(onPlane));
 }
 void VideoWidget::paint(cairo_t* context, int width, int height) const {
     m_private->paint(context, width, height);

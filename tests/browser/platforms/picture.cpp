@@ -1,13 +1,14 @@
 // A platform whose video frame is a test pattern: four quadrants, red and green above, blue and white below.
-// A page sets the display area as for any broadcast; setChannelByTriplet(WIDTH, HEIGHT, CONTENT) shows the
-// frame with the aspect ratio WIDTH to HEIGHT, removes it, or calls the wake-up callback continuously (see
-// Content). When the window removes its callback, and for each frame that it releases afterwards, a line is
-// written to standard error.
+// A page sets the display area as for any broadcast; setChannelByTriplet(WIDTH, HEIGHT, CONTENT) of an object
+// shows the frame with the aspect ratio WIDTH to HEIGHT for this object, removes it, or calls the wake-up
+// callback continuously (see Content). When the window removes its callback, and for each frame that it
+// releases afterwards, a line is written to standard error.
 #include "desktop/platform/telix_picture.h"
 #include "tests/support/RecordingPlatform.h"
 
 #include <atomic>
 #include <cstdio>
+#include <map>
 #include <mutex>
 #include <thread>
 
@@ -20,12 +21,13 @@ constexpr uint32_t kHeight = 36;
 constexpr uint32_t kStride = kWidth + 8; // in pixels, with padding after each line
 constexpr uint32_t kPadding = 0xFF123456;
 constexpr int kStormThreads = 3;
-constexpr TELIX_JS_VB_HANDLE kObject = 1;
+constexpr TELIX_JS_DISPLAY_AREA kWholePage{0, 0, 1280, 720};
 
 uint32_t pattern[kStride * kHeight];
 uint32_t invertedPattern[kStride * kHeight];
-std::mutex mutex; // guards `current`
+std::mutex mutex; // guards the next two
 telix_desktop_frame current{};
+std::map<uint64_t, TELIX_JS_DISPLAY_AREA> areas; // of the objects by their handles
 std::atomic<int> acquiredFrames{0};
 
 std::mutex wakeupMutex; // held while the wake-up runs
@@ -63,9 +65,18 @@ const uint32_t* pixelsOf(Content content) {
     }
 }
 
-void show(int32_t aspectWidth, int32_t aspectHeight, Content content) {
+void placeLocked() {
+    const TELIX_JS_DISPLAY_AREA area = current.presenter == 0 ? kWholePage : areas[current.presenter];
+    current.areaX = area.x;
+    current.areaY = area.y;
+    current.areaWidth = area.width;
+    current.areaHeight = area.height;
+}
+
+void show(TELIX_JS_VB_HANDLE object, int32_t aspectWidth, int32_t aspectHeight, Content content) {
     {
         std::lock_guard<std::mutex> lock(mutex);
+        current.presenter = object;
         current.visible = content == Content::None ? 0 : 1;
         current.pixels = reinterpret_cast<const uint8_t*>(pixelsOf(content));
         current.width = kWidth;
@@ -74,17 +85,7 @@ void show(int32_t aspectWidth, int32_t aspectHeight, Content content) {
         current.aspectWidth = static_cast<uint32_t>(aspectWidth);
         current.aspectHeight = static_cast<uint32_t>(aspectHeight);
         ++current.serial;
-    }
-    wake();
-}
-
-void place(int32_t x, int32_t y, uint32_t areaWidth, uint32_t areaHeight) {
-    {
-        std::lock_guard<std::mutex> lock(mutex);
-        current.areaX = x;
-        current.areaY = y;
-        current.areaWidth = areaWidth;
-        current.areaHeight = areaHeight;
+        placeLocked();
     }
     wake();
 }
@@ -103,16 +104,28 @@ const bool scenario = [] {
     draw();
     RecordingPlatform& platform = *telix_recording_platform();
     platform.TELIX_JS_VB_GetHandle = [](TELIX_JS_VB_HANDLE* object) {
-        *object = kObject;
+        std::lock_guard<std::mutex> lock(mutex);
+        *object = static_cast<TELIX_JS_VB_HANDLE>(areas.size() + 1);
+        areas[*object] = kWholePage;
         return TELIX_RETCODE_SUCCESS;
     };
     // Without a broadcast object the video fills the page.
-    platform.TELIX_JS_VB_Release = [](TELIX_JS_VB_HANDLE) {
-        place(0, 0, 1280, 720);
+    platform.TELIX_JS_VB_Release = [](TELIX_JS_VB_HANDLE object) {
+        {
+            std::lock_guard<std::mutex> lock(mutex);
+            current.presenter = current.presenter == object ? 0 : current.presenter;
+            placeLocked();
+        }
+        wake();
         return TELIX_RETCODE_SUCCESS;
     };
-    platform.TELIX_JS_VB_SetDisplayArea = [](TELIX_JS_VB_HANDLE, const TELIX_JS_DISPLAY_AREA* area) {
-        place(area->x, area->y, area->width, area->height);
+    platform.TELIX_JS_VB_SetDisplayArea = [](TELIX_JS_VB_HANDLE object, const TELIX_JS_DISPLAY_AREA* area) {
+        {
+            std::lock_guard<std::mutex> lock(mutex);
+            areas[object] = *area;
+            placeLocked();
+        }
+        wake();
         return TELIX_RETCODE_SUCCESS;
     };
     platform.TELIX_JS_VB_SetFullScreen = [](TELIX_JS_VB_HANDLE, ___UINT8 on) {
@@ -128,10 +141,10 @@ const bool scenario = [] {
         *on = current.fullScreen;
         return TELIX_RETCODE_SUCCESS;
     };
-    platform.TELIX_JS_VB_SetChannelByTriplet = [](TELIX_JS_VB_HANDLE, int32_t onid, int32_t tsid,
+    platform.TELIX_JS_VB_SetChannelByTriplet = [](TELIX_JS_VB_HANDLE object, int32_t onid, int32_t tsid,
                                                   int32_t sid) {
         const auto content = static_cast<Content>(sid);
-        show(onid, tsid, content);
+        show(object, onid, tsid, content);
         for (int number = 0; content == Content::WakeupStorm && number < kStormThreads; ++number) {
             std::thread(wakeContinuously).detach();
         }
@@ -170,4 +183,9 @@ extern "C" void telix_desktop_release_frame(telix_desktop_frame* frame) {
     if (!wakeup) {
         std::fprintf(stderr, "picture: %d frames not released\n", acquiredFrames.load());
     }
+}
+
+extern "C" uint64_t telix_desktop_newest_presenter() {
+    std::lock_guard<std::mutex> lock(mutex);
+    return areas.size();
 }

@@ -1,12 +1,13 @@
 // The television's web process extension, beside the bridge: sends the window the video frames of the
-// platform library that the plug-in loads. All of it runs on the main thread of the web process, unless it
-// says otherwise.
+// platform library that the plug-in loads, unless the page paints them. All of it runs on the main thread of
+// the web process, unless it says otherwise.
 #include <gio/gunixfdlist.h>
 #include <webkit2/webkit-web-extension.h>
 
 #include "desktop/window/frames/FramePublisher.h"
 #include "desktop/window/frames/FrameRing.h"
 #include "desktop/window/shared/LibrarySearch.h"
+#include "desktop/window/webkit/extension/VideoPlacement.h"
 
 namespace desktop {
 
@@ -48,6 +49,7 @@ void sendFrames(WebKitWebExtension* extension) {
     // For the life of the process, as the platform library is.
     auto* publisher =
         new FramePublisher([extension](int memory, int wakeup) { sendRing(extension, memory, wakeup); });
+    new VideoPlacement(extension, *publisher);
     [[maybe_unused]] static auto* search = new LibrarySearch([publisher] { return publisher->start(); });
 }
 

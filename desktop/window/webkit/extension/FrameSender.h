@@ -7,7 +7,8 @@
 namespace desktop {
 
 // Sends them from when the library is loaded to the end of the process, in a ring that the web context
-// receives as a message kFramesMessage. Main thread of the web process, once.
+// receives as a message kFramesMessage, or has the page paint them, see VideoPlacement. Main thread of the
+// web process, once.
 void sendFrames(WebKitWebExtension* extension);
 
 } // namespace desktop
