@@ -3,7 +3,7 @@
 table. Usage: footprint.py [--strings new] BUILD-FOLDER...
 
 Ends with 1 if a plug-in needs a library beyond GLib, GModule and the C and C++ run time, or a symbol newer than in
-LIMITS. --strings new: the plug-in is built with the strings of g++ 5, which the C++ run time before does not have.
+LIMITS, or is larger than in SIZES. --strings new: the plug-in is built with the strings of g++ 5, which the C++ run time before does not have.
 Time is not measured under an emulator, where it says nothing about a set."""
 
 import argparse
@@ -16,6 +16,7 @@ PAGE = 4096
 # The newest version of each kind that the run time libraries of glibc 2.17 and g++ 4.8 have.
 LIMITS = {'GLIBC': (2, 17), 'GLIBCXX': (3, 4, 19), 'CXXABI': (1, 3, 7), 'CXXABI_ARM': (1, 3, 3), 'GCC': (4, 7, 0)}
 NEW_STRINGS = (3, 4, 21)
+SIZES = {'armhf': 300 * 1024}  # stripped
 LIBRARIES = re.compile(r'lib(glib-2\.0|gmodule-2\.0|c|m|pthread|stdc\+\+|gcc_s)\.so\.\d+|ld-linux.*|ld\.so\.1')
 
 
@@ -102,16 +103,14 @@ class Build:
     def load_costs(self):
         """What load_bench prints, by name; empty without load_bench or without what runs it."""
         program = os.path.join(self.folder, 'bench', 'load_bench')
-        command = [program, os.path.join(self.folder, 'bench', 'load', 'nptelixjs.so')]
-        if self.cache.get('TELIX_MACHINE'):
-            if not self.cache.get('TELIX_EMULATOR'):
-                return {}
-            command = [self.cache['TELIX_EMULATOR'], '-L', self.cache['TELIX_SYSROOT'], *command, '1']
-        if not os.path.isfile(program):
+        runner = list(filter(None, self.cache.get('TELIX_RUNNER', '').split(';')))
+        if not os.path.isfile(program) or (self.cache.get('TELIX_MACHINE') and not runner):
             return {}
-        costs = dict(line.split() for line in output_of(*command).splitlines())
-        return {name: cost for name, cost in costs.items()
-                if name.endswith('_heap') or not self.cache.get('TELIX_MACHINE')}
+        emulated = runner and 'qemu' in os.path.basename(runner[0])
+        rounds = ['1'] if emulated else []
+        plugin = os.path.join(self.folder, 'bench', 'load', 'nptelixjs.so')
+        costs = dict(line.split() for line in output_of(*runner, program, plugin, *rounds).splitlines())
+        return {name: cost for name, cost in costs.items() if name.endswith('_heap') or not emulated}
 
 
 def row_of(build):
@@ -133,6 +132,9 @@ def complaints(build, limits):
     for kind, version in build.newest_versions().items():
         if kind not in limits or version > limits[kind]:
             yield f'needs {kind} {".".join(map(str, version))}'
+    size = build.stripped_size()
+    if size > SIZES.get(build.machine, size):
+        yield f'has {size} bytes stripped, more than {SIZES[build.machine]}'
 
 
 def main():

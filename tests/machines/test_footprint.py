@@ -11,6 +11,9 @@ import footprint  # noqa: E402
 class Plugin:
     """A plug-in that needs the limits and every library of a set."""
 
+    machine = 'armhf'
+    size = 300 * 1024
+
     def __init__(self, *libraries, **versions):
         self._libraries = ['libglib-2.0.so.0', 'libgmodule-2.0.so.0', 'libstdc++.so.6', 'libgcc_s.so.1', 'libc.so.6',
                            'libm.so.6', 'libpthread.so.0', 'ld-linux-armhf.so.3', 'ld.so.1', *libraries]
@@ -21,6 +24,9 @@ class Plugin:
 
     def newest_versions(self):
         return self._versions
+
+    def stripped_size(self):
+        return self.size
 
 
 def complaints(*libraries, **versions):
@@ -43,6 +49,14 @@ class Complaints(unittest.TestCase):
 
     def test_a_version_of_an_unknown_kind(self):
         self.assertEqual(complaints(LIBFOO=(1,)), ['needs LIBFOO 1'])
+
+    def test_a_plug_in_that_is_too_large_for_a_set(self):
+        plugin = Plugin()
+        plugin.size += 1
+        self.assertEqual(list(footprint.complaints(plugin, footprint.LIMITS)),
+                         ['has 307201 bytes stripped, more than 307200'])
+        plugin.machine = 'amd64'
+        self.assertEqual(list(footprint.complaints(plugin, footprint.LIMITS)), [])
 
 
 if __name__ == '__main__':

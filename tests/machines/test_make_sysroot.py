@@ -1,6 +1,8 @@
 """tools/make-sysroot.sh with a package repository of its own: what it makes, and what it refuses."""
 
 import os
+import signal
+import socket
 import subprocess
 import tempfile
 import unittest
@@ -48,17 +50,21 @@ class MakeSysroot(unittest.TestCase):
         for folder in (self.repository, self.machine):
             os.mkdir(folder)
 
-    def run_script(self, *arguments):
-        """Runs it with that repository as the only source of the machine, whose package state is in a folder."""
+    def environment(self, source):
+        """One in which that is the machine's only source of packages, and the machine's package state is in a folder."""
         sources = os.path.join(self.folder, 'sources.list')
         with open(sources, 'w', encoding='utf-8') as file:
-            file.write(f'deb [trusted=yes] copy:{self.repository} ./\n')
+            file.write(f'deb [trusted=yes] {source} ./\n')
         configuration = os.path.join(self.folder, 'apt.conf')
         with open(configuration, 'w', encoding='utf-8') as file:
             file.write(f'Dir::Etc::sourcelist "{sources}";\nDir::Etc::sourceparts "-";\n'
                        f'Dir::State "{self.machine}";\nDir::Cache "{self.machine}";\n'
+                       'Acquire::http::Proxy "DIRECT";\n'
                        f'APT::Update::Post-Invoke {{ "touch {self.machine}/hook"; }};\n')
-        return subprocess.run([SCRIPT, *arguments], env={**os.environ, 'APT_CONFIG': configuration}, check=False,
+        return {**os.environ, 'APT_CONFIG': configuration}
+
+    def run_script(self, *arguments):
+        return subprocess.run([SCRIPT, *arguments], env=self.environment(f'copy:{self.repository}'), check=False,
                               stdin=subprocess.DEVNULL, capture_output=True, text=True, timeout=300)
 
     def assert_refused(self, *arguments, because):
@@ -135,6 +141,18 @@ class MakeSysroot(unittest.TestCase):
                     file.seek(-40, os.SEEK_END)
                     file.write(40 * b'x')
         self.assert_refused('i386', self.sysroot, because='i386: cannot fetch packages: ')
+        self.assert_nothing_is_left()
+
+    def test_leaves_nothing_if_it_is_interrupted(self):
+        with socket.create_server(('127.0.0.1', 0)) as server:
+            server.settimeout(60)
+            source = f'http://127.0.0.1:{server.getsockname()[1]}/'
+            with subprocess.Popen([SCRIPT, 'i386', self.sysroot], env=self.environment(source), stdin=subprocess.DEVNULL,
+                                  start_new_session=True) as script:
+                connection, _ = server.accept()  # and never answers
+                os.killpg(script.pid, signal.SIGTERM)
+                self.assertEqual(script.wait(timeout=60), 2)
+                connection.close()
         self.assert_nothing_is_left()
 
 
