@@ -1,5 +1,5 @@
 # Cross-compiles for a Debian architecture: TELIX_MACHINE says which one, TELIX_SYSROOT where its sysroot is. Tests run
-# under qemu, if it is installed.
+# under qemu, if it is installed; those for i386 without it, if this machine runs them.
 set(CMAKE_TRY_COMPILE_PLATFORM_VARIABLES TELIX_MACHINE TELIX_SYSROOT)
 
 # The machines: Debian's name, the compiler's prefix, the folder of libraries, the processor, the emulator.
@@ -37,7 +37,18 @@ set(ENV{PKG_CONFIG_SYSROOT_DIR} ${TELIX_SYSROOT})
 set(ENV{PKG_CONFIG_LIBDIR} ${TELIX_SYSROOT}/usr/lib/${telix_multiarch}/pkgconfig:${TELIX_SYSROOT}/usr/share/pkgconfig)
 set(ENV{PKG_CONFIG_PATH} "")
 
+# TELIX_RUNNER: the command before each program of the machine. A 64-bit x86 processor and kernel run those for i386 with the
+# sysroot's own dynamic linker.
+set(loader ${TELIX_SYSROOT}/lib/ld-linux.so.2)
+set(folders ${TELIX_SYSROOT}/lib/${telix_multiarch}:${TELIX_SYSROOT}/usr/lib/${telix_multiarch})
 find_program(TELIX_EMULATOR ${telix_emulator})
-if(TELIX_EMULATOR)
-  set(CMAKE_CROSSCOMPILING_EMULATOR ${TELIX_EMULATOR} -L ${TELIX_SYSROOT})
+set(result 1)
+if(TELIX_MACHINE STREQUAL i386)
+  execute_process(COMMAND ${loader} --version RESULT_VARIABLE result OUTPUT_QUIET ERROR_QUIET)
 endif()
+if(result EQUAL 0)
+  set(TELIX_RUNNER ${loader} --library-path ${folders} CACHE STRING "The command that runs programs of the machine")
+elseif(TELIX_EMULATOR)
+  set(TELIX_RUNNER ${TELIX_EMULATOR} -L ${TELIX_SYSROOT} CACHE STRING "The command that runs programs of the machine")
+endif()
+set(CMAKE_CROSSCOMPILING_EMULATOR ${TELIX_RUNNER})

@@ -1,9 +1,10 @@
 #!/usr/bin/env bash
 # Installs the packages that are missing for the given purposes: of Debian, and programs from the npm registry.
-# Usage: tools/install-packages.sh run|test|machines|packages ...
+# Usage: tools/install-packages.sh run|test|armhf|arm64|i386|mipsel|packages ...
 set -euo pipefail
 
 packages=(build-essential cmake ninja-build pkg-config libglib2.0-dev)
+machine=(qemu-user-static googletest python3) # for every other machine
 programs=() # of the npm registry: PROGRAM=PACKAGE@VERSION
 modules=()  # of the npm registry, for node: PACKAGE@VERSION
 for purpose in "$@"; do
@@ -18,19 +19,19 @@ for purpose in "$@"; do
     test)
         packages+=(libgtest-dev libgmock-dev libbenchmark-dev libexpat1-dev clang-14 libclang-rt-14-dev
             clang-format-14 clang-tidy-14 libwpewebkit-1.1-dev
-            cog python3 binutils util-linux dpkg-dev man-db openssl webkit2gtk-driver python3-selenium)
+            cog python3 binutils util-linux procps dpkg-dev man-db openssl webkit2gtk-driver python3-selenium)
         programs+=(tsc=typescript@5.4.5)
         modules+=(selenium-webdriver@4.27.0)
         ;;
-    machines)
-        packages+=(g++-arm-linux-gnueabihf g++-aarch64-linux-gnu g++-i686-linux-gnu g++-mipsel-linux-gnu
-            qemu-user-static googletest python3)
-        ;;
+    armhf) packages+=(g++-arm-linux-gnueabihf "${machine[@]}") ;;
+    arm64) packages+=(g++-aarch64-linux-gnu "${machine[@]}") ;;
+    i386) packages+=(g++-i686-linux-gnu "${machine[@]}") ;;
+    mipsel) packages+=(g++-mipsel-linux-gnu "${machine[@]}") ;;
     packages)
         packages+=(debhelper dpkg-dev lintian mmdebstrap python3 util-linux git)
         ;;
     *)
-        echo "$0: $purpose: unknown purpose, expected run, test, machines or packages" >&2
+        echo "$0: $purpose: unknown purpose, expected run, test, armhf, arm64, i386, mipsel or packages" >&2
         exit 2
         ;;
     esac
