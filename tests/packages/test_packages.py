@@ -76,9 +76,9 @@ class Root:
         return must('unshare', '--mount', 'sh', '-euc', script, 'sh', *command, cwd=self.path, env=environment)
 
     def files(self):
-        """All but temporary ones and what package tools keep for themselves."""
-        found = self.run('find', '/', '-xdev')
-        own = ('/tmp/', '/var/lib/dpkg/', '/var/lib/apt/', '/var/cache/', '/var/log/')
+        """Those where packages install any, but not what package tools keep for themselves."""
+        found = self.run('find', '/etc', '/opt', '/usr', '/var', '-ignore_readdir_race')
+        own = ('/var/lib/dpkg/', '/var/lib/apt/', '/var/cache/', '/var/log/')
         return {file for file in found.splitlines() if not file.startswith(own)}
 
     def copy_in(self, files):
