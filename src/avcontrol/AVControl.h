@@ -27,6 +27,7 @@
 #include "common/DisplayArea.h"
 #include "common/LiveRef.h"
 #include "common/PluginBase.h"
+#include "src/avcontrol/SharedNumber.h"
 #include "src/avcontrol/StreamBody.h"
 #include "telix/telix_platform.h"
 
@@ -272,8 +273,8 @@ private:
     StreamState m_streamState = StreamState::NotRequested;
     int32_t m_mediaType = -1;
     bool m_streamSeen = false;
-    std::atomic<double> m_playSpeed{1.0}; // in force
-    double m_requestedSpeed = 1.0;        // the last one asked for but 0
+    SharedNumber m_playSpeed{1.0}; // in force
+    double m_requestedSpeed = 1.0; // the last one asked for but 0
     std::atomic<bool> m_isPlayList{false};
     StreamBody m_body;             // read only if it is a playlist
     bool m_bodyIsPlaylist = false; // the one that is being gathered

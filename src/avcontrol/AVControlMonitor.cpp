@@ -14,7 +14,7 @@
 #include "src/avcontrol/AVControl.h"
 #include "src/avcontrol/Asx.h"
 
-// Never locked: nothing that the threads share needs more than an atomic.
+// Never locked: what the threads share has atomics and locks of its own.
 pthread_mutex_t g_bufferingMutex = PTHREAD_MUTEX_INITIALIZER;
 
 namespace {
