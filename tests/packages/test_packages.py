@@ -51,7 +51,7 @@ class Root:
     def __init__(self, folder):
         self.path = os.path.join(folder, 'root')
         self.mounts = ''
-        made = run('mmdebstrap', '--variant=apt', '--include=xvfb,xauth', 'bookworm', self.path)
+        made = run('unshare', '--mount', 'mmdebstrap', '--variant=apt', '--include=xvfb,xauth', 'bookworm', self.path)
         if made.returncode != 0:
             print(f'mmdebstrap: {made.stdout.strip().splitlines()[-1]}\nThe root is a copy of this machine\'s.')
             self.copy_of_this_machine(folder)
