@@ -66,7 +66,9 @@ TEST(SharedObject, ExportsTheEntryPointsTheGatesAndTheForwardersAndNothingElse) 
     const std::vector<std::string> forwarders = callNames();
     EXPECT_EQ(forwarders.size(), 121U);
     expected.insert(forwarders.begin(), forwarders.end());
-    EXPECT_EQ(lastWords(outputOfCommand(TELIX_TEST_NM " -D --defined-only " TELIX_TEST_PLUGIN)), expected);
+    // On MIPS, the dynamic symbols include local ones, because of the global offset table.
+    EXPECT_EQ(lastWords(outputOfCommand(TELIX_TEST_NM " -D --defined-only --extern-only " TELIX_TEST_PLUGIN)),
+              expected);
 }
 
 TEST(SharedObject, NeedsGLibGModuleAndTheRunTimeLibrariesOnly) {
