@@ -38,16 +38,16 @@ EngineInformation engineInformation() {
 }
 
 // The engine paints an object into a pixmap of its size, and the program ends if the X server has none.
-constexpr QLatin1String
-    kSizeLimit("object, embed { max-width: 4096px !important; max-height: 4096px !important; }");
+constexpr char kSizeLimit[] =
+    "object, embed { max-width: 4096px !important; max-height: 4096px !important; }";
 
 void configureEngine(const PluginFile& plugin, const PluginFolder& folder, bool inspect) {
     QWebSettings* settings = QWebSettings::globalSettings();
     QWebSettings::setPluginSearchPaths({folder.path()});
     settings->setAttribute(QWebSettings::PluginsEnabled, true);
     settings->setAttribute(QWebSettings::DeveloperExtrasEnabled, inspect);
-    settings->setUserStyleSheetUrl(
-        styleSheetUrl(QString::fromStdString(plugin.styleSheet("opacity: 0 !important;")) + kSizeLimit));
+    settings->setUserStyleSheetUrl(styleSheetUrl(
+        QString::fromStdString(plugin.styleSheet("opacity: 0 !important;")) + QLatin1String(kSizeLimit)));
 }
 
 // Exits the event loop, so that destructors remove temporary files.
