@@ -58,8 +58,8 @@ WebKitSettings* newSettings(const CommandLine& commandLine) {
         // A set shows what its platform library plays, and pages start sound without a click.
         "media-playback-requires-user-gesture", FALSE, "enable-smooth-scrolling", FALSE, nullptr));
     // In software, OpenGL takes several times as long as the engine without it, most of all for video in the
-    // page.
-    if (!hasGpuDevice()) {
+    // page. A WebDriver session waits for ever for a screenshot without OpenGL.
+    if (!hasGpuDevice() && !commandLine.automation) {
         webkit_settings_set_hardware_acceleration_policy(settings, WEBKIT_HARDWARE_ACCELERATION_POLICY_NEVER);
     }
     disableFeatures(settings);
