@@ -1,5 +1,5 @@
-// A platform library that lacks one function and has another one without a value: both fail, their neighbours
-// work.
+// A platform library that lacks one function and, where the machine allows it, has another one without a
+// value: both fail, their neighbours work.
 #include "tests/loader/LoaderOutput.h"
 
 #include "src/platform/PlatformLoader.h"
@@ -50,14 +50,16 @@ TEST_F(PartialLibrary, TheMissingFunctionReturnsFive) {
     EXPECT_EQ(TELIX_JS_AV_Pause(1), 5);
 }
 
+#ifdef TELIX_NULL_FUNCTION
 TEST_F(PartialLibrary, AFunctionThatResolvesToNullCountsAsFoundAndReturnsFive) {
     EXPECT_EQ(TELIX_JS_AV_PlaySound(1, 2, 3, 4, 5, 6, 7), 5); // and no word of it among the warnings
     LoaderOutput output;
     void* slot = &slot;
-    EXPECT_EQ(resolve_symbol(g_platformModule, "TELIX_JS_AV_PlaySound", &slot), 1);
+    EXPECT_EQ(resolve_symbol(g_platformModule, TELIX_NULL_FUNCTION, &slot), 1);
     EXPECT_EQ(slot, nullptr);
     EXPECT_EQ(output.warnings(), std::vector<std::string>{});
 }
+#endif
 
 TEST_F(PartialLibrary, AllOthersReachTheLibrary) {
     RecordingPlatform& platform = recordingPlatformAt(kLibraryFile);
@@ -71,9 +73,10 @@ TEST_F(PartialLibrary, AllOthersReachTheLibrary) {
 #include "telix/telix_platform_calls.h"
 
     std::vector<std::string> expected = boundCallNames();
-    for (const char* name : {"TELIX_JS_AV_Pause", "TELIX_JS_AV_PlaySound"}) {
-        expected.erase(std::remove(expected.begin(), expected.end(), name), expected.end());
-    }
+    expected.erase(std::remove(expected.begin(), expected.end(), "TELIX_JS_AV_Pause"), expected.end());
+#ifdef TELIX_NULL_FUNCTION
+    expected.erase(std::remove(expected.begin(), expected.end(), TELIX_NULL_FUNCTION), expected.end());
+#endif
     EXPECT_EQ(reached, expected);
     platform.reset();
 }
