@@ -91,10 +91,15 @@ class Session(DrivenTv):
         file_name = os.path.join(self.folder, 'page.png')
         with self.session('--size', '400x300') as session:
             session.get(self.url('<style>body { margin: 0; background: rgb(0, 128, 0) }</style>'))
-            self.assertTrue(session.save_screenshot(file_name))
-        picture = PngImage(file_name)
-        self.assertEqual((picture.width, picture.height), (1280, 720))
-        self.assertEqual([picture.colour(*point) for point in ((0, 0), (1279, 719))], [GREEN, GREEN])
+
+            def colours():
+                # Of what the engine has painted last, which may be older than the document.
+                self.assertTrue(session.save_screenshot(file_name))
+                picture = PngImage(file_name)
+                self.assertEqual((picture.width, picture.height), (1280, 720))
+                return [picture.colour(*point) for point in ((0, 0), (1279, 719))]
+
+            wait_for(lambda: colours() == [GREEN, GREEN], 'the page is not in the screenshot')
 
     def test_a_page_that_cannot_be_loaded(self):
         with self.session() as session:
