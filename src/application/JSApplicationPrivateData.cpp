@@ -5,7 +5,7 @@ namespace {
 
 using Model = ApplicationPrivateData;
 
-// quirk 21: an object variant also when there is no object; no null is put in its place.
+// quirk 21: an object variant also without an object, never a null variant.
 bool readCurrentChannel(PluginBase& model, NPVariant& result) {
     result.type = NPVariantType_Object;
     result.value.objectValue = static_cast<Model&>(model).getCurrChannel();

@@ -145,10 +145,10 @@ var actions = [
         frame.parentNode.removeChild(frame);
     },
     function reloadFrame() { frameWindow().location.reload(); },
-    function writeFrameAnew() {
+    function rewriteFrame() {
         var inner = frameWindow().document;
         inner.open();
-        inner.write(one(['anew', markup[0], '</object>']));
+        inner.write(one(['text', markup[0], '</object>']));
         inner.close();
     },
     function moveIntoFrame() { frameWindow().document.body.appendChild(element()); },
