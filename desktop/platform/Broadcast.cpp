@@ -33,6 +33,7 @@ Broadcast::Broadcast(Clock& clock)
       m_ratings(m_programmes, m_callbacks), m_arbiter(m_channels, m_callbacks, arbiterListener()),
       m_presentFollowing(m_programmes, m_arbiter, m_ratings, m_callbacks),
       m_presentation(m_channels, m_arbiter, m_components, clock, presentationListener()), m_faults(*this) {
+    m_platform.picture().setOnFree([this] { m_platform.post([this] { fillBackground(); }); });
     m_presentation.start();
 }
 
@@ -40,7 +41,12 @@ TunerArbiter::Listener Broadcast::arbiterListener() {
     TunerArbiter::Listener listener;
     listener.onTune = [this](const Tune& tune) { m_presentation.tune(tune); };
     listener.onRelease = [this] { m_presentation.stop(); };
-    listener.onChannel = [this](TELIX_JS_CM_HANDLE channel) { m_presentation.receive(channel); };
+    listener.onUnbound = [this] { fillBackground(); };
+    listener.onChannel = [this](TELIX_JS_CM_HANDLE channel) {
+        if (!tuneInBackground()) {
+            m_presentation.receive(channel);
+        }
+    };
     return listener;
 }
 
@@ -66,6 +72,30 @@ ServicePresentation::Listener Broadcast::presentationListener() {
 
 void Broadcast::followApplications() {
     m_platform.post([this] { m_presentation.receive(m_arbiter.currentChannel()); });
+}
+
+void Broadcast::presentInBackground() {
+    m_platform.post([this] {
+        m_presentsInBackground = true;
+        fillBackground();
+    });
+}
+
+void Broadcast::fillBackground() {
+    if (!m_presentation.isActive()) {
+        tuneInBackground();
+    }
+}
+
+// Whatever is presented then, which is the background's or nothing, is replaced.
+bool Broadcast::tuneInBackground() {
+    const bool isPictureAvailable = m_presentation.isActive() || m_platform.picture().isFree();
+    const auto tune =
+        m_presentsInBackground && isPictureAvailable ? m_arbiter.backgroundTune() : std::nullopt;
+    if (tune) {
+        m_presentation.tune(*tune);
+    }
+    return tune.has_value();
 }
 
 bool Broadcast::changeView(TELIX_JS_VB_HANDLE object,

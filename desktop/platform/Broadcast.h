@@ -69,6 +69,10 @@ public:
     // Receives the current channel even if no object has tuned to it yet, so that its applications are known.
     void followApplications();
 
+    // From now on the current channel is presented on the whole video plane while neither an object nor a
+    // player presents, unless an object has stopped its channel: what a set shows by itself.
+    void presentInBackground();
+
     // Changes how and where an object shows its picture.
     bool changeView(TELIX_JS_VB_HANDLE object, const std::function<void(Picture::View& view)>& change);
 
@@ -117,6 +121,8 @@ private:
 
     TunerArbiter::Listener arbiterListener();
     ServicePresentation::Listener presentationListener();
+    bool tuneInBackground();
+    void fillBackground();
 
     Platform& m_platform;
     BroadcastCallbacks m_callbacks;
@@ -130,6 +136,7 @@ private:
     PresentFollowing m_presentFollowing;
     ServicePresentation m_presentation;
     FaultInjection m_faults;
+    bool m_presentsInBackground = false; // platform thread
 };
 
 } // namespace desktop

@@ -10,6 +10,7 @@
 
 #include "desktop/platform/AudioSink.h"
 #include "desktop/platform/HttpSource.h"
+#include "desktop/platform/OutputVolume.h"
 #include "desktop/platform/SoundTap.h"
 
 namespace desktop {
@@ -36,6 +37,7 @@ MediaPipeline::~MediaPipeline() {
     if (!m_playbin) {
         return;
     }
+    OutputVolume::instance().remove(m_playbin);
     GstBus* bus = gst_element_get_bus(m_playbin);
     gst_bus_remove_watch(bus);
     gst_bus_set_flushing(bus, TRUE);

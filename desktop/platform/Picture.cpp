@@ -86,11 +86,13 @@ Picture::Token Picture::acquire(const View& view, std::function<void()> onPreemp
 
 void Picture::release(Token token) {
     GstSample* oldSample = nullptr;
+    std::function<void()> onFree;
     {
         std::lock_guard<std::mutex> lock(m_mutex);
         if (!isCurrentLocked(token)) {
             return;
         }
+        onFree = m_onFree;
         m_current = 0;
         m_onPreempted = nullptr;
         m_onFirstFrame = nullptr;
@@ -98,6 +100,19 @@ void Picture::release(Token token) {
     }
     unref(oldSample);
     wakeUp();
+    if (onFree) {
+        onFree();
+    }
+}
+
+void Picture::setOnFree(std::function<void()> onFree) {
+    std::lock_guard<std::mutex> lock(m_mutex);
+    m_onFree = std::move(onFree);
+}
+
+bool Picture::isFree() const {
+    std::lock_guard<std::mutex> lock(m_mutex);
+    return m_current == 0;
 }
 
 void Picture::setView(Token token, const View& view) {

@@ -44,6 +44,13 @@ public:
     // Ends a presentation; the video plane becomes black and `onPreempted` does not run. Platform thread.
     void release(Token token);
 
+    // Whether there is no presentation. Any thread.
+    bool isFree() const;
+
+    // Called from now on at the end of each presentation that no other one has preempted, on the platform
+    // thread. Any thread.
+    void setOnFree(std::function<void()> onFree);
+
     // Any thread, as the next two.
     void setView(Token token, const View& view);
 
@@ -77,7 +84,7 @@ private:
 
     std::atomic<Presenter> m_lastPresenter{0};
 
-    std::mutex m_mutex; // guards what follows; not held in callbacks
+    mutable std::mutex m_mutex; // guards what follows; not held in callbacks
     Token m_lastToken = 0;
     Token m_current = 0;
     uint64_t m_lastSink = 0; // the id of the sink that was made last
@@ -86,6 +93,7 @@ private:
     GstSample* m_sample = nullptr; // owns a reference; null: no frame
     uint64_t m_serial = 0;
     std::function<void()> m_onPreempted;
+    std::function<void()> m_onFree;
     std::function<void()> m_onFirstFrame;
 
     std::mutex m_wakeupMutex; // guards what follows; held while the wake-up runs

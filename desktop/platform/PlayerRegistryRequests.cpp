@@ -6,13 +6,14 @@
 #include <cstdio>
 #include <utility>
 
+#include "desktop/platform/OutputVolume.h"
+
 namespace desktop {
 
 namespace {
 
 constexpr double kMinSpeed = 0.1;
 constexpr double kMaxSpeed = 32;
-constexpr uint32_t kMaxVolume = 100;
 
 } // namespace
 

@@ -26,6 +26,9 @@ void PresentFollowing::onEit(TELIX_JS_CM_HANDLE channel, const Eit& eit) {
         }
         slot = programme;
     }
+    if (owner == 0) {
+        return; // presented by the set itself: there is nobody to report to
+    }
     m_callbacks.onProgrammes.call(owner);
     if (isPresent) {
         const auto found = m_programmes.find(programme);

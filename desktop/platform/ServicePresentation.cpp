@@ -60,7 +60,7 @@ void ServicePresentation::abortPendingTune() {
 // ---- Reception
 
 void ServicePresentation::receive(TELIX_JS_CM_HANDLE handle) {
-    if (m_pendingTune.id != 0 || m_tuner) {
+    if (isActive()) {
         return; // the channel is received already
     }
     const Channel channel = m_channels.find(handle).value_or(Channel());

@@ -47,6 +47,9 @@ public:
     // Ends what is presented.
     void stop();
 
+    // Whether a channel is presented, or about to be.
+    bool isActive() const { return m_pendingTune.id != 0 || m_tuner; }
+
     // Receives the signalling of a channel while nothing is presented.
     void receive(TELIX_JS_CM_HANDLE channel);
 

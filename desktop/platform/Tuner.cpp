@@ -9,6 +9,7 @@
 #include <memory>
 
 #include "desktop/platform/AudioSink.h"
+#include "desktop/platform/OutputVolume.h"
 #include "desktop/platform/Platform.h"
 #include "desktop/platform/RecentPackets.h"
 #include "desktop/platform/SoundTap.h"
@@ -145,6 +146,7 @@ void Tuner::configureElements() {
     gst_object_unref(videoSink); // the bin owns it
     m_audioTiming.observe(m_audioSink);
     tapSound(m_audioSink);
+    OutputVolume::instance().apply(m_volume, 1);
     GstCaps* caps = gst_caps_from_string("video/mpegts,systemstream=(boolean)true,packetsize=(int)188");
     g_object_set(m_source, "caps", caps, "format", GST_FORMAT_TIME, "is-live", TRUE, "max-bytes",
                  guint64{kMaxRecentPackets + kMaxWaiting}, nullptr);
@@ -166,6 +168,7 @@ void Tuner::linkElements() {
 }
 
 Tuner::~Tuner() {
+    OutputVolume::instance().remove(m_volume);
     if (m_watch != 0) {
         if (GSource* source = g_main_context_find_source_by_id(Platform::instance().context(), m_watch)) {
             g_source_destroy(source);

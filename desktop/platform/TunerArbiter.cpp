@@ -1,6 +1,7 @@
 // Ownership of the tuner, and the play states of the video/broadcast objects.
 #include "desktop/platform/TunerArbiter.h"
 
+#include <algorithm>
 #include <mutex>
 
 namespace desktop {
@@ -62,6 +63,9 @@ bool TunerArbiter::end(TELIX_JS_VB_HANDLE object, TELIX_PLAYSTATE_ENUM_T state) 
     if (changesState) {
         m_platform.post(
             [this, object, state] { m_callbacks.onPlayState.call(object, 0U, state, TELIX_ERR_STATE_NONE); });
+    }
+    if (state == TELIX_PLAYSTATE_UNREALIZED) {
+        m_platform.post([this] { m_listener.onUnbound(); });
     }
     return true;
 }
@@ -141,6 +145,18 @@ bool TunerArbiter::zap(TELIX_JS_CM_HANDLE channel) {
     return true;
 }
 
+std::optional<Tune> TunerArbiter::backgroundTune() {
+    std::lock_guard<std::mutex> lock(m_platform.mutex());
+    const bool hasStopped = std::any_of(m_objects.begin(), m_objects.end(), [](const auto& each) {
+        return each.second.playState == TELIX_PLAYSTATE_STOPPED;
+    });
+    if (m_tunerOwner != 0 || hasStopped || m_currentChannel == 0) {
+        return std::nullopt;
+    }
+    m_latestTune = {m_latestTune.id + 1, 0, m_currentChannel};
+    return m_latestTune;
+}
+
 // ---- State
 
 bool TunerArbiter::exists(TELIX_JS_VB_HANDLE object) const {
@@ -193,21 +209,29 @@ bool TunerArbiter::isLatest(const Tune& tune) const {
 }
 
 void TunerArbiter::reportConnecting(const Tune& tune) {
-    m_callbacks.onPlayState.call(tune.object, 0U, TELIX_PLAYSTATE_CONNECTING, TELIX_ERR_STATE_NONE);
+    if (tune.object != 0) {
+        m_callbacks.onPlayState.call(tune.object, 0U, TELIX_PLAYSTATE_CONNECTING, TELIX_ERR_STATE_NONE);
+    }
 }
 
 void TunerArbiter::reportPresenting(const Tune& tune) {
-    changeState(tune.object, TELIX_PLAYSTATE_PRESENTING, TELIX_ERR_STATE_NONE);
-    m_callbacks.onChannelChange.call(tune.object, tune.channel);
+    if (tune.object != 0) {
+        changeState(tune.object, TELIX_PLAYSTATE_PRESENTING, TELIX_ERR_STATE_NONE);
+        m_callbacks.onChannelChange.call(tune.object, tune.channel);
+    }
 }
 
 void TunerArbiter::reportAborted(const Tune& tune) {
-    m_callbacks.onChannelError.call(tune.object, tune.channel, kErrorInterrupted);
+    if (tune.object != 0) {
+        m_callbacks.onChannelError.call(tune.object, tune.channel, kErrorInterrupted);
+    }
 }
 
 void TunerArbiter::reportFailed(const Tune& tune, TELIX_ERR_STATE_ENUM_T error) {
-    m_callbacks.onChannelError.call(tune.object, tune.channel, error);
-    changeState(tune.object, TELIX_PLAYSTATE_UNREALIZED, error);
+    if (tune.object != 0) {
+        m_callbacks.onChannelError.call(tune.object, tune.channel, error);
+        changeState(tune.object, TELIX_PLAYSTATE_UNREALIZED, error);
+    }
 }
 
 void TunerArbiter::reportBroken(TELIX_JS_VB_HANDLE object, TELIX_ERR_STATE_ENUM_T error) {

@@ -24,7 +24,7 @@ constexpr TELIX_ERR_STATE_ENUM_T kErrorInterrupted = 6;
 // A request to tune. Each has a higher id than the one before; 0 stands for no tune.
 struct Tune {
     uint64_t id = 0;
-    TELIX_JS_VB_HANDLE object = 0;
+    TELIX_JS_VB_HANDLE object = 0; // 0: the set itself
     TELIX_JS_CM_HANDLE channel = 0;
 };
 
@@ -37,6 +37,7 @@ public:
     struct Listener {
         std::function<void(const Tune& tune)> onTune;              // the owner asks for a channel
         std::function<void()> onRelease;                           // the owner gives the tuner up
+        std::function<void()> onUnbound;                           // an object has given its channel up
         std::function<void(TELIX_JS_CM_HANDLE channel)> onChannel; // the current one changes without an owner
     };
 
@@ -69,6 +70,11 @@ public:
     // The viewer changes the channel: the owner tunes. Without an owner the channel becomes the current one,
     // to which the next object binds. Refuses an unknown channel.
     bool zap(TELIX_JS_CM_HANDLE channel);
+
+    // A request of the set itself for the current channel, which owns nothing and is reported to nobody: any
+    // request of an object replaces it. Nothing while an object owns the tuner, or has stopped its channel
+    // and not released it: then the page wants no broadcast.
+    std::optional<Tune> backgroundTune();
 
     // ---- State. Any thread.
 

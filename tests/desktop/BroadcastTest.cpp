@@ -6,7 +6,9 @@
 
 #include "desktop/platform/Broadcast.h"
 #include "desktop/platform/Multiplex.h"
+#include "desktop/platform/OutputVolume.h"
 #include "desktop/platform/telix_picture.h"
+#include "desktop/platform/telix_viewer.h"
 #include "telix/telix_platform.h"
 #include "tests/desktop/ManualClock.h"
 #include "tests/desktop/Received.h"
@@ -257,6 +259,89 @@ TEST_F(BroadcastTest, GoesFromConnectingToPresentingAndStopped) {
     ASSERT_EQ(TELIX_JS_VB_Release(m_object), 0);
     EXPECT_NE(TELIX_JS_VB_GetCurrentChannel(m_object, &channel), 0);
     tune(m_channels[1]); // a released object is good for another tune
+}
+
+// Where the frame is shown; nothing if there is none.
+std::optional<std::pair<int32_t, uint32_t>> placeOfPicture() {
+    telix_desktop_frame frame{};
+    telix_desktop_acquire_frame(&frame);
+    const auto place =
+        frame.visible != 0 ? std::optional(std::pair(frame.areaX, frame.areaWidth)) : std::nullopt;
+    telix_desktop_release_frame(&frame);
+    return place;
+}
+
+TEST_F(BroadcastTest, PresentsTheChannelByItselfWhileNoObjectDoes) {
+    const std::pair<int32_t, uint32_t> whole{0, 1280};
+    const std::pair<int32_t, uint32_t> part{100, 640};
+    telix_desktop_present_channel();
+    EXPECT_TRUE(waitUntil([&] { return placeOfPicture() == whole; }));
+    EXPECT_EQ(countOf("change") + countOf("state") + countOf("programmes"), 0U);
+    const TELIX_JS_DISPLAY_AREA area{100, 50, 640, 360};
+    ASSERT_EQ(TELIX_JS_VB_SetDisplayArea(m_object, &area), 0);
+    ASSERT_EQ(TELIX_JS_VB_BindToCurrChannel(m_object), 0);
+    EXPECT_EQ(waitFor("change").first, m_channels.front());
+    EXPECT_EQ(placeOfPicture(), part);
+    ASSERT_EQ(TELIX_JS_VB_Stop(m_object), 0);
+    EXPECT_TRUE(waitUntil([] { return !placeOfPicture(); }));
+    ASSERT_EQ(TELIX_JS_VB_Release(m_object), 0);
+    EXPECT_TRUE(waitUntil([&] { return placeOfPicture() == whole; }));
+    EXPECT_EQ(countOf("change"), 1U);
+    EXPECT_EQ(countOf("error"), 0U);
+}
+
+TEST_F(BroadcastTest, KeepsTheChannelOffWhileAnObjectHasStoppedIt) {
+    telix_desktop_present_channel();
+    EXPECT_TRUE(waitUntil([] { return placeOfPicture().has_value(); }));
+    tune(m_channels[0]);
+    ASSERT_EQ(TELIX_JS_VB_Stop(m_object), 0);
+    ASSERT_EQ(telix_desktop_tune(2), 1);
+    flushPlatformThread();
+    flushPlatformThread(); // what follows from the channel
+    EXPECT_FALSE(Broadcast::instance().arbiter().backgroundTune());
+    EXPECT_FALSE(placeOfPicture());
+}
+
+TEST_F(BroadcastTest, FollowsTheViewerWithoutAnObject) {
+    telix_desktop_present_channel();
+    EXPECT_TRUE(waitUntil([] { return placeOfPicture().has_value(); }));
+    const Shot first = takeShot();
+    ASSERT_EQ(telix_desktop_tune(2), 1);
+    EXPECT_EQ(telix_desktop_channel(), 2U);
+    EXPECT_TRUE(waitUntil([&] { return placeOfPicture() && difference(first, takeShot(), 0.1, 0.9) > 0.5; }));
+}
+
+TEST_F(BroadcastTest, NamesItsChannelsForTheViewer) {
+    char name[32];
+    EXPECT_EQ(telix_desktop_channel_name(2, name, sizeof(name)), 9U);
+    EXPECT_STREQ(name, "Telix Two");
+    EXPECT_EQ(telix_desktop_channel_name(2, name, 4), 9U);
+    EXPECT_STREQ(name, "Tel");
+    EXPECT_EQ(telix_desktop_channel_name(9, name, sizeof(name)), 0U);
+    EXPECT_STREQ(name, "");
+}
+
+TEST(OutputVolumeTest, MultipliesTheVolumeOfEachElement) {
+    gst_init(nullptr, nullptr);
+    GstElement* element = GST_ELEMENT(gst_object_ref_sink(gst_element_factory_make("volume", nullptr)));
+    const auto volume = [element] {
+        gdouble value = 0;
+        g_object_get(element, "volume", &value, nullptr);
+        return value;
+    };
+    OutputVolume& output = OutputVolume::instance();
+    output.apply(element, 0.5);
+    EXPECT_DOUBLE_EQ(volume(), 0.5);
+    telix_desktop_set_volume(50);
+    EXPECT_DOUBLE_EQ(volume(), 0.25);
+    output.apply(element, 1);
+    EXPECT_DOUBLE_EQ(volume(), 0.5);
+    telix_desktop_set_volume(1000);
+    EXPECT_DOUBLE_EQ(volume(), 1);
+    output.remove(element);
+    telix_desktop_set_volume(0);
+    EXPECT_DOUBLE_EQ(volume(), 1);
+    gst_object_unref(element);
 }
 
 // How late picture and sound are presented.
