@@ -23,8 +23,9 @@ constexpr char kScriptName[] = "telix-webkit-bridge:page.js";
 
 } // namespace
 
-std::shared_ptr<Page> Page::create(Plugin& plugin, const MakeEngine& makeEngine) {
-    std::shared_ptr<Page> page(new Page(plugin));
+std::shared_ptr<Page> Page::create(Plugin& plugin, const std::string& idPrefix,
+                                   const MakeEngine& makeEngine) {
+    std::shared_ptr<Page> page(new Page(plugin, idPrefix));
     page->m_engine = makeEngine(*page);
     page->m_scriptObjects = std::make_unique<ScriptObjects>(*page->m_engine);
     page->m_host = std::make_shared<Instance>(*page, kNoCalls, nullptr);
@@ -45,7 +46,8 @@ bool Page::start() {
         return false;
     }
     // What the script has to know of the plug-in follows the host object, three arguments for each type.
-    std::vector<std::string_view> texts = {m_plugin.name(), m_plugin.description(), m_plugin.fileName()};
+    std::vector<std::string_view> texts = {m_plugin.name(), m_plugin.description(), m_plugin.fileName(),
+                                           m_idPrefix};
     for (const MimeType& type : m_plugin.mimeTypes()) {
         texts.insert(texts.end(), {type.type, type.suffixes, type.description});
     }

@@ -28,8 +28,10 @@ class Page : public ScriptEngine::Client, public std::enable_shared_from_this<Pa
 public:
     using MakeEngine = std::function<std::unique_ptr<ScriptEngine>(ScriptEngine::Client&)>;
 
-    // The plug-in outlives the page. The page script does not run yet.
-    static std::shared_ptr<Page> create(Plugin& plugin, const MakeEngine& makeEngine);
+    // The plug-in outlives the page. `idPrefix`: how the ids begin that elements without one get before the
+    // plug-in sees them; empty if they get none. The page script does not run yet.
+    static std::shared_ptr<Page> create(Plugin& plugin, const std::string& idPrefix,
+                                        const MakeEngine& makeEngine);
     ~Page() override;
 
     // Runs the page script, before any script of the page's own. False when it does not run.
@@ -61,12 +63,14 @@ public:
     bool callScript(const char* function, const Arguments& arguments, NPVariant* result);
 
 private:
-    explicit Page(Plugin& plugin) : m_plugin(plugin), m_streams(*this) {}
+    Page(Plugin& plugin, std::string idPrefix)
+        : m_plugin(plugin), m_idPrefix(std::move(idPrefix)), m_streams(*this) {}
 
     void endInstances();
     void close();
 
     Plugin& m_plugin;
+    const std::string m_idPrefix;
     std::unique_ptr<ScriptEngine> m_engine;
     std::unique_ptr<ScriptObjects> m_scriptObjects;
     Streams m_streams;

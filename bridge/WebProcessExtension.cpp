@@ -36,6 +36,8 @@ constexpr Setting kPluginSetting = {"plugin", "TELIX_PLUGIN"};
 // "gobject" selects the GObject API where the C API is the default.
 constexpr Setting kEngineSetting = {"engine", "TELIX_BRIDGE_ENGINE"};
 constexpr char kGObjectEngine[] = "gobject";
+// How the ids begin that elements without one get.
+constexpr Setting kIdsSetting = {"ids", "TELIX_BRIDGE_IDS"};
 
 std::string readSetting(GVariant* data, const Setting& setting) {
     const gchar* text = nullptr;
@@ -60,8 +62,9 @@ std::string ownFolder() {
 // The pages of a web process.
 class Extension {
 public:
-    Extension(std::unique_ptr<Plugin> plugin, bool usesGObjectEngine)
-        : m_plugin(std::move(plugin)), m_usesGObjectEngine(usesGObjectEngine) {}
+    Extension(std::unique_ptr<Plugin> plugin, std::string idPrefix, bool usesGObjectEngine)
+        : m_plugin(std::move(plugin)), m_idPrefix(std::move(idPrefix)),
+          m_usesGObjectEngine(usesGObjectEngine) {}
 
     void onWindowObjectCleared(WebKitFrame* frame, WebKitScriptWorld* world);
 
@@ -72,6 +75,7 @@ private:
                                              ScriptEngine::Client& client) const;
 
     std::unique_ptr<Plugin> m_plugin;
+    std::string m_idPrefix;
     bool m_usesGObjectEngine;
     std::unordered_map<WebKitFrame*, std::shared_ptr<Page>> m_pages; // the current one of each frame
 };
@@ -93,8 +97,9 @@ std::unique_ptr<ScriptEngine> Extension::makeEngine(WebKitFrame* frame, WebKitSc
 
 void Extension::onWindowObjectCleared(WebKitFrame* frame, WebKitScriptWorld* world) {
     endPage(frame);
-    const auto page = Page::create(
-        *m_plugin, [&](ScriptEngine::Client& client) { return makeEngine(frame, world, client); });
+    const auto page = Page::create(*m_plugin, m_idPrefix, [&](ScriptEngine::Client& client) {
+        return makeEngine(frame, world, client);
+    });
     if (page->start()) {
         m_pages.emplace(frame, page);
         g_object_weak_ref(G_OBJECT(frame), onFrameGone, this);
@@ -151,7 +156,8 @@ webkit_web_extension_initialize_with_user_data(WebKitWebExtension*, const GVaria
     const bool usesGObjectEngine =
         bridge::readSetting(data, bridge::kEngineSetting) == bridge::kGObjectEngine;
     // For the life of the process, as the plug-in's own threads and main loop sources are.
-    auto* const extension = new bridge::Extension(std::move(plugin), usesGObjectEngine);
+    auto* const extension = new bridge::Extension(
+        std::move(plugin), bridge::readSetting(data, bridge::kIdsSetting), usesGObjectEngine);
     // After other extensions, which may leave an observer for the page script.
     g_signal_connect_after(
         webkit_script_world_get_default(), "window-object-cleared",

@@ -2,7 +2,8 @@
 // place, and makes the requests of the plug-in. The other half is the host object (HostObject.cpp).
 //
 // The function runs once per window object, before any script of the page's own, with the host object, the plug-in's name,
-// description and file name, and three strings for each of its types: type, suffixes, description. What it uses of the
+// description and file name, the prefix of the ids for elements without one (empty: they get none), and three strings for
+// each of its types: type, suffixes, description. What it uses of the
 // engine it takes now, because the page may replace everything later; so it never asks an element by its own
 // properties, and iterates with indexes only.
 //
@@ -12,14 +13,14 @@
 // behind it, so that the plug-in's names come first when they are read, without a proxy in between. Writes pass by
 // prototypes that are not proxies, so the guard hands them to the plug-in. A guard belongs to one element, because the
 // engine gives up its fast arrays in a page with a proxy that is a prototype of a prototype.
-(function (host, pluginName, pluginDescription, pluginFile) {
+(function (host, pluginName, pluginDescription, pluginFile, idPrefix) {
     'use strict';
 
     const { apply, defineProperty, deleteProperty, get, getOwnPropertyDescriptor, getPrototypeOf, has,
         ownKeys, set, setPrototypeOf } = Reflect;
     const { create, assign } = Object;
     const typeFields = 3;
-    const firstType = 4;
+    const firstType = 5;
 
     // f as a function whose first argument is `this`.
     function uncurry(f) {
@@ -81,6 +82,7 @@
     const clientLeft = getter(Element.prototype, 'clientLeft');
     const clientTop = getter(Element.prototype, 'clientTop');
     const getAttribute = uncurry(Element.prototype.getAttribute);
+    const setAttribute = uncurry(Element.prototype.setAttribute);
     const querySelectorAll = uncurry(Element.prototype.querySelectorAll);
     const querySelectorAllOfFragment = uncurry(DocumentFragment.prototype.querySelectorAll);
     const boundingRect = uncurry(Element.prototype.getBoundingClientRect);
@@ -152,6 +154,7 @@
     let pending = [];
     // The elements that have a guard; true if script, not the parser, puts them into the document.
     const guarded = new WeakMap();
+    let lastId = 0; // of those given to elements
     let isAway = false; // the document is going, or kept by the engine for the way back
 
     function isEmbedding(node) {
@@ -220,6 +223,9 @@
         const record = { __proto__: null, element, number: 0, object: null, base: null, place: '' };
         // Before all else, so that what the plug-in and the page do meanwhile does not come here again.
         mapSet(recordOf, element, record);
+        if (idPrefix !== '' && !getAttribute(element, 'id')) {
+            setAttribute(element, 'id', idPrefix + ++lastId);
+        }
         const values = [element, typeOf(element)];
         const parameters = parametersOf(element);
         for (let i = 0; i < parameters.length; i++) {
