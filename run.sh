@@ -5,9 +5,9 @@ set -euo pipefail
 usage='Usage: ./run.sh [OPTION...] [PAGE | TRANSPORT-STREAM...]
 
 Without arguments, shows the demonstration application with a generated multiplex of three services.
-  PAGE                show this page instead: a URL, or a file *.html, *.htm, *.xhtml or *.hbbtv
+  PAGE                show this page instead: a URL, or a file *.html, *.htm, *.xhtml, *.hbbtv or *.aitx (XML AIT)
   TRANSPORT-STREAM    show the services of these transport streams: a file, or a folder with *.ts
-  OPTION              an option of build/desktop/telix-tv, see its --help
+  OPTION              an option of build/desktop/telix-tv, see its --help; --signal and --ait show no demonstration
 Without a display, writes a screenshot instead, as soon as there is a picture or after 20 seconds.'
 
 fail() {
@@ -19,13 +19,17 @@ top=$(cd "$(dirname "${BASH_SOURCE[0]}")" && pwd)
 build="$top/build"
 options=() # of telix-tv
 operands=() # pages and transport streams
+has_application= # by an option
 while [ $# -gt 0 ]; do
+    case "$1" in
+    --signal | --signal=* | --ait | --ait=*) has_application=yes ;;
+    esac
     case "$1" in
     -h | --help)
         echo "$usage"
         exit 0
         ;;
-    --fullscreen | --inspect | --version | --wait-for-picture | --*=*) options+=("$1") ;;
+    --fullscreen | --inspect | --strict | --version | --wait-for-picture | --*=*) options+=("$1") ;;
     --)
         shift
         operands+=("$@")
@@ -66,7 +70,7 @@ read_operand() {
     [ -e "$1" ] || fail "$1: No such file"
     [ -r "$1" ] || fail "$1: not readable"
     case "${1,,}" in
-    *.html | *.htm | *.xhtml | *.hbbtv)
+    *.html | *.htm | *.xhtml | *.hbbtv | *.aitx)
         [ -f "$1" ] || fail "$1: not a file"
         page=$1
         return
@@ -99,7 +103,7 @@ if [ ${#channels[@]} -gt 0 ]; then
     TELIX_CHANNELS=$(IFS=';' && echo "${channels[*]}")
     export TELIX_CHANNELS
 fi
-if [ -z "$page" ]; then
+if [ -z "$page$has_application" ]; then
     # shellcheck source=tools/serve-demonstration.sh
     . "$top/tools/serve-demonstration.sh"
     serve_demonstration "$top" "$build/media"
@@ -107,13 +111,13 @@ if [ -z "$page" ]; then
 fi
 
 if [ -n "${DISPLAY:-}" ]; then
-    exec "$build/desktop/telix-tv" "${options[@]}" "$page"
+    exec "$build/desktop/telix-tv" "${options[@]}" ${page:+"$page"}
 fi
 screenshot="$build/screenshot.png"
 echo "No display: writing a screenshot to $screenshot"
 status=0
 xvfb-run -a -s "-screen 0 1280x720x24" "$build/desktop/telix-tv" --wait-for-picture --timeout 20 \
-    --screenshot "$screenshot" "${options[@]}" "$page" || status=$?
+    --screenshot "$screenshot" "${options[@]}" ${page:+"$page"} || status=$?
 # A page that shows no video is not an error.
 if [ $status -eq 1 ] && [ ${#options[@]} -eq 0 ] && [ ${#operands[@]} -eq 1 ] && [ ${#channels[@]} -eq 0 ]; then
     status=0

@@ -3,7 +3,6 @@ var device = (function () {
     'use strict';
 
     var linesOfLog = 3;
-    var previewMilliseconds = 3000;
     var applicationHandlers = ['onKeyPress', 'onKeyUp', 'onKeyDown', 'onApplicationShown', 'onApplicationHidden'];
     var managerHandlers = ['onLowMemory', 'onApplicationLoaded', 'onApplicationUnloaded', 'onApplicationLoadError'];
     var applicationMethods = ['createApplication', 'destroyApplication', 'show', 'hide'];
@@ -24,6 +23,7 @@ var device = (function () {
     var hidden = false;
     var lastKey = null;
     var created = null;
+    var isPreviewing = false;
     var drm = { sent: null, id: null, result: null, code: null };
 
     function log(text) {
@@ -72,22 +72,26 @@ var device = (function () {
 
     // ---- Applications
 
-    function openSecond() {
-        created = application.createApplication('second.html', true);
-        log('createApplication("second.html", true) returns ' + tv.describeApplication(created));
+    function open(page) {
+        created = application.createApplication(page, true);
+        log('createApplication("' + page + '", true) returns ' + tv.describeApplication(created));
     }
 
+    function openSecond() {
+        open('second.html');
+    }
+
+    // The second page ends itself after some seconds.
     function preview() {
-        openSecond();
-        if (created) {
-            setTimeout(function () {
-                // If the viewer has closed it, this call would close this page.
-                if (document.hidden) {
-                    created.destroyApplication();
-                    log('destroyApplication() brings this page back');
-                    update();
-                }
-            }, previewMilliseconds);
+        open('second.html#preview');
+        isPreviewing = created !== null;
+    }
+
+    function afterPreview() {
+        if (isPreviewing && !document.hidden) {
+            isPreviewing = false;
+            log('destroyApplication() brings this page back');
+            update();
         }
     }
 
@@ -357,6 +361,7 @@ var device = (function () {
         }
         Object.keys(keysWithPlugin).forEach(function (name) { layer.keys[name] = keysWithPlugin[name]; });
         document.addEventListener('keydown', rememberKey, false);
+        document.addEventListener('visibilitychange', afterPreview, false);
         tv.byId('agent').onDRMMessageResult = onDrmResult;
         update();
     }

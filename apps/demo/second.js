@@ -2,6 +2,7 @@
 (function () {
     'use strict';
 
+    var previewMilliseconds = 3000;
     var application = tv.ownerApplication(document.getElementById('manager'));
     var state = document.getElementById('state');
     state.textContent = 'getOwnerApplication(document) returned ' + tv.describeApplication(application) + '.';
@@ -12,6 +13,9 @@
         }
     }
 
+    if (location.hash === '#preview') {
+        setTimeout(close, previewMilliseconds);
+    }
     var actions = {};
     actions[VK_BACK] = close;
     actions[VK_ENTER] = close;

@@ -145,7 +145,8 @@ void ServicePresentation::startTuner(const Tune& tune, uint16_t serviceId) {
     m_tuner = std::make_unique<Tuner>(serviceId, listener);
     m_activeTuneId = tune.id;
 
-    const Picture::View view = m_arbiter.viewOf(tune.object).value_or(Picture::View());
+    const Picture::View view = tune.object == 0 ? m_arbiter.backgroundView()
+                                                : m_arbiter.viewOf(tune.object).value_or(Picture::View());
     const Picture::Token token = m_platform.picture().acquire(
         view, [this, object = tune.object] { onTunerPreempted(object); },
         [this, id = tune.id, post] { post([this, id] { onPrerolled(id); }); });

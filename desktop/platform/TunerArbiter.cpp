@@ -9,6 +9,7 @@ namespace desktop {
 TunerArbiter::TunerArbiter(const Channels& channels, BroadcastCallbacks& callbacks, Listener listener)
     : m_platform(Platform::instance()), m_channels(channels), m_callbacks(callbacks),
       m_listener(std::move(listener)) {
+    m_backgroundView.presenter = m_platform.picture().newPresenter();
     if (!m_channels.list().empty()) {
         m_currentChannel = m_channels.list().front();
     }

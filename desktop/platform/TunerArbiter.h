@@ -81,6 +81,8 @@ public:
     bool exists(TELIX_JS_VB_HANDLE object) const;
     TELIX_JS_CM_HANDLE channelOf(TELIX_JS_VB_HANDLE object) const; // 0: none
     std::optional<Picture::View> viewOf(TELIX_JS_VB_HANDLE object) const;
+    // That of what the set presents by itself.
+    const Picture::View& backgroundView() const { return m_backgroundView; }
     std::optional<TELIX_PLAYSTATE_ENUM_T> playState(TELIX_JS_VB_HANDLE object) const;
     bool setPlayState(TELIX_JS_VB_HANDLE object, TELIX_PLAYSTATE_ENUM_T state);
 
@@ -128,6 +130,7 @@ private:
     std::map<TELIX_JS_VB_HANDLE, Object>
         m_objects; // kept for the life of the process: a released one may tune
     TELIX_JS_VB_HANDLE m_lastObject = 0;
+    Picture::View m_backgroundView; // constant
     TELIX_JS_VB_HANDLE m_tunerOwner = 0;
     TELIX_JS_CM_HANDLE m_currentChannel = 0;
     Tune m_latestTune; // object and channel are 0 after a release

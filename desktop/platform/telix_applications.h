@@ -7,9 +7,9 @@
  * The window keeps what runs. It takes a snapshot at each wake-up, and compares its numbers with those of the
  * snapshot before: another `service` is the event TELIX_DESKTOP_SERVICE_SELECTED, another `serial` while the
  * state is TELIX_DESKTOP_SIGNALLING_KNOWN is TELIX_DESKTOP_SIGNALLING_CHANGED, in this order. For each event
- * it asks telix_desktop_decide_application what ends and what starts. A window that is in another process than
- * the library, as telix-tv can be, has the same rules and the same parser compiled in (ApplicationLifecycle.h,
- * XmlAit.h).
+ * it asks telix_desktop_decide_application what ends and what starts. A window that is in another process
+ * than the library, as telix-tv can be, has the same rules and the same parser compiled in
+ * (ApplicationLifecycle.h, XmlAit.h).
  *
  * All functions may be called on any thread, also concurrently. */
 #ifndef TELIX_DESKTOP_PLATFORM_TELIX_APPLICATIONS_H

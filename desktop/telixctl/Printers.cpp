@@ -199,7 +199,8 @@ void printApplications(JsonObject* response) {
         printRow("skipped", each);
     }
     forEachObject(response, "running", [](JsonObject* application) {
-        printRow("running", stringMember(application, "url") +
+        const std::string id = stringMember(application, "id");
+        printRow("running", stringMember(application, "url") + (id.empty() ? "" : ", " + id) +
                                 (booleanMember(application, "visible") ? ", visible" : ""));
     });
 }

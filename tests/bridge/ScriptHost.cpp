@@ -54,7 +54,7 @@ ScriptHost::ScriptHost() : m_context(std::make_unique<Context>()) {
         m_context->gobject = jsc_context_new();
     }
     page = bridge::Page::create(
-        *plugin, [this](bridge::ScriptEngine::Client& client) -> std::unique_ptr<bridge::ScriptEngine> {
+        *plugin, "", [this](bridge::ScriptEngine::Client& client) -> std::unique_ptr<bridge::ScriptEngine> {
             if (m_context->cApi) {
                 return std::make_unique<bridge::JscApiEngine>(m_context->cApi, client);
             }

@@ -17,9 +17,11 @@ def is_striped(picture):
 
 
 def has_bars(picture):
-    """The moving bars of the second channel, of 75 % saturated colours or grey."""
-    return all(all(component < 30 or 160 < component < 230 for component in colour) or
-               all(90 < component < 112 for component in colour) for colour in columns(picture))
+    """The moving bars of the second channel, of 75 % saturated colours or grey, and not black alone."""
+    colours = columns(picture)
+    are_bars = all(all(component < 30 or 160 < component < 230 for component in colour) or
+                   all(90 < component < 112 for component in colour) for colour in colours)
+    return are_bars and max(map(max, colours)) > 90
 
 
 def is_dark(picture):

@@ -71,11 +71,10 @@ class Keys(TelixTv):
         self.assertEqual([e[1] for e in self.value(page, '--keys', 'red,green', '--wait-for', 'seen.length',
                                                    '--eval', 'seen')], [404, 404, 404])
 
-    def test_keys_that_no_application_is_there_for_end_in_time(self):
-        run, error = self.run_to_timeout(shipped('first.html'), '--keys', 'back,red',
-                                         error='telix-tv: --keys: key number 2 not pressed within {} s\n')
+    def test_without_an_application_keys_are_the_television_s(self):
+        run = self.run_tv(shipped('first.html'), '--keys', 'back,red,2,volume-down', '--eval', '1')
         self.assertEqual(run.status, 1, run)
-        self.assertEqual(run.errors, error)
+        self.assertIn('no application', run.errors)
 
 
 class Applications(TelixTv):
@@ -96,12 +95,29 @@ class Applications(TelixTv):
             with self.subTest(keys):
                 self.assertEqual(self.value(shipped('first.html'), '--keys', keys, *self.TITLE), title)
 
-    def test_an_application_beneath_ends_the_one_that_it_has_opened(self):
-        page = self.write(f'''<title>beneath</title><script>onload = function () {{
-            created = createHbbTVApplication('file://{shipped("second.html")}');
-            setTimeout(function () {{ destroyHbbTVApplication(); ended = true; }}, 200); }}</script>''')
-        self.assertEqual(self.value(page, '--wait-for', 'ended', '--eval', '[created, document.title]'),
-                         [True, 'beneath'])
+    def hand_over(self):
+        """A page that starts another one with a key and ends itself in the same script."""
+        return self.write(f'''<title>before</title><script>onkeydown = function () {{
+            createHbbTVApplication('file://{shipped("second.html")}');
+            destroyHbbTVApplication(); }}</script>''')
+
+    def test_an_application_hands_over_to_the_one_that_it_has_opened(self):
+        self.assertEqual(self.value(self.hand_over(), '--keys', 'red', *self.TITLE), 'second')
+        self.assertEqual(self.screenshot(self.hand_over(), '--keys', 'red').colours(), {bytes(BLUE)})
+
+    def test_after_a_hand_over_nothing_is_beneath(self):
+        run = self.run_tv(self.hand_over(), '--keys', 'red,back', *self.TITLE)
+        self.assertEqual(run.status, 1, run)
+        self.assertIn('no application', run.errors)
+
+    def test_a_page_that_opens_itself_stops_at_sixteen_applications(self):
+        page = self.write('''<script>onload = function () {
+            var created = createHbbTVApplication(location.href);
+            document.title = created ? "covered" : "last";
+            for (var i = 0; !created && i < 100; i++) { createHbbTVApplication(location.href); } }</script>''')
+        run = self.run_tv(page, '--wait-for', 'document.title === "last"', '--eval', '1')
+        self.assertEqual(run.status, 0, run)
+        self.assertEqual(run.errors.count('16 applications'), 1, run)
 
     def test_after_the_last_application_the_screen_is_empty(self):
         self.assertEqual(self.screenshot(shipped('first.html'), '--keys', 'back').colours(), {bytes(BLACK)})
@@ -123,23 +139,25 @@ class Applications(TelixTv):
 
     def test_a_page_knows_whether_it_is_on_the_screen(self):
         page = self.write(f'''<script>seen = [document.hidden];
+            // The last one ends itself.
             var steps = [hideHbbTVApplication, showHbbTVApplication, function () {{
-                createHbbTVApplication('file://{shipped("second.html")}'); }}, destroyHbbTVApplication];
+                createHbbTVApplication('file://{shipped("closing.html")}'); }}];
             // An engine may report a change later, so each step waits for the one before.
             onload = function () {{ setTimeout(steps.shift(), 0); }};
             document.addEventListener('visibilitychange', function () {{
                 seen.push(document.hidden);
-                if (steps.length > 0) {{ onload(); }} }}, false);</script>''')
+                if (steps.length > 0) {{ setTimeout(steps.shift(), 0); }} }}, false);</script>''')
         self.assertEqual(self.value(page, '--wait-for', 'seen.length === 5', '--eval', 'seen'),
                          [False, True, False, True, False])
 
     def test_an_application_of_a_server_opens_if_the_server_has_it(self):
         with server() as url:
             page = self.write(f'''<script>opened = ['page', 'elsewhere', 'error'].map(function (path) {{
-                var created = createHbbTVApplication('{url}/' + path);
-                if (created) {{ destroyHbbTVApplication(); }}
-                return created; }})</script>''')
-            self.assertEqual(self.value(page, '--eval', 'opened'), [True, True, False])
+                return createHbbTVApplication('{url}/' + path); }});
+                console.log('opened ' + opened);</script>''')
+            run = self.run_tv(page, '--wait-for', 'document.title === "served"', '--eval', '1')
+            self.assertEqual(run.status, 0, run)
+            self.assertIn('opened true,true,false\n', run.errors)
 
     def test_a_server_that_does_not_answer_gives_no_application(self):
         with server() as url:

@@ -18,8 +18,8 @@ class CommandLine(TelixTv):
         run = self.television.run('--help', environment={'DISPLAY': ''})
         self.assertEqual((run.status, run.errors), (0, ''), run)
         for option in ('size', 'fullscreen', 'plugin', 'screenshot', 'wait-for', 'wait-for-picture', 'timeout', 'eval',
-                       'keys', 'user-agent', 'inspect', 'inspector-server', 'engine', 'help', 'version',
-                       'automation', 'profile'):
+                       'keys', 'user-agent', 'inspect', 'inspector-server', 'engine', 'signal', 'on', 'ait', 'strict', 'help',
+                       'version', 'automation', 'profile'):
             self.assertIn(f'--{option}', run.output)
 
     def test_help_names_every_key(self):
@@ -65,9 +65,6 @@ class CommandLine(TelixTv):
 
     def test_an_option_without_its_value_is_refused(self):
         self.assert_refused(self.run_tv(shipped('first.html'), '--eval'), 'eval')
-
-    def test_no_page_is_refused(self):
-        self.assert_refused(self.run_tv(), 'page')
 
     def test_two_pages_are_refused(self):
         self.assert_refused(self.run_tv(shipped('first.html'), shipped('second.html')), 'page')

@@ -6,7 +6,6 @@ import os
 import signal
 import socket
 import subprocess
-import time
 import unittest
 import urllib.request
 
@@ -49,13 +48,10 @@ class Crash(TelixTv):
         self.assertEqual((process.returncode, errors), (3, 'telix-tv: the web process has crashed\n'))
 
     def test_the_window_stays_with_the_channel_that_was_on(self):
-        page = self.write(TELEVISION % (1, 'console.log("ready");'))
+        page = self.write(TELEVISION % (1, 'tv.onChannelChangeSucceeded = function () { console.log("tuned"); };'))
         with self.television.start('--plugin', DESKTOP_PLUGIN, page) as process:
             messages = Lines(process.stderr)
-            self.assertTrue(messages.wait_for('ready'))
-            # The window learns of the channel a second after its change.
-            wait_for(lambda: has_bars(self.television.screen()), 'no picture')
-            time.sleep(2)
+            self.assertTrue(messages.wait_for('tuned'))
             first, = self.web_processes(process)
             os.kill(first, signal.SIGKILL)
             self.assertTrue(messages.wait_for('telix-tv: the web process has crashed'))
@@ -66,6 +62,19 @@ class Crash(TelixTv):
             process.terminate()
             process.communicate(timeout=RUN_TIMEOUT)
         self.assertEqual(process.returncode, 128 + signal.SIGTERM)
+
+
+    def test_without_an_application_the_channel_comes_back(self):
+        with self.television.start('--plugin', DESKTOP_PLUGIN, '--keys', '2') as process:
+            wait_for(lambda: has_bars(self.television.screen()), 'no picture')
+            first, = self.web_processes(process)
+            os.kill(first, signal.SIGKILL)
+            wait_for(lambda: set(self.web_processes(process)) - {first}, 'no web process')
+            wait_for(lambda: has_bars(self.television.screen()) and self.channel() == 'Telix Two', 'another channel')
+            process.terminate()
+            _, errors = process.communicate(timeout=RUN_TIMEOUT)
+        self.assertEqual(process.returncode, 128 + signal.SIGTERM)
+        self.assertIn('telix-tv: the web process has ended, starting it again', errors)
 
 
 class KeySet(TelixTv):

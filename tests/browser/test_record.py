@@ -33,7 +33,8 @@ BROADCAST = STYLE + '''<object id="tv" type="video/broadcast"></object><div></di
     </script>'''
 CLIP = STYLE + '''<object id="player" type="video/mp4" data="%s"></object><div></div>
     <script>onload = function () { player.play(1); };</script>'''
-EMPTY = STYLE + '<div></div><script>loaded = Date.now();</script>'
+STOPPED = STYLE + '''<object id="tv" type="video/broadcast"></object><div></div>
+    <script>onload = function () { tv.bindToCurrentChannel(); tv.stop(); loaded = Date.now(); };</script>'''
 
 
 def run(*arguments):
@@ -109,14 +110,14 @@ class Record(TelixTv):
         self.assertLess(start / RATE, float(self.streams()['video']['duration']) - 3)
 
     def test_without_media_there_is_silence(self):
-        result = self.record(self.write(EMPTY), '--wait-for', 'Date.now() - loaded > 2000')
+        result = self.record(self.write(STOPPED), '--wait-for', 'window.loaded && Date.now() - loaded > 2000')
         self.assertEqual(result.status, 0, result)
         self.assert_playable(seconds=2)
         self.assertLess(max(self.sound()), 0.001)
         self.assert_colour(self.last_frame(), (100, 600), (0, 0, 0))
 
     def test_a_window_of_another_size_is_recorded_with_the_size_of_the_page(self):
-        result = self.record(self.write(EMPTY), '--size', '500x300', '--wait-for', 'Date.now() - loaded > 2000')
+        result = self.record(self.write(STOPPED), '--size', '500x300', '--wait-for', 'window.loaded && Date.now() - loaded > 2000')
         self.assertEqual(result.status, 0, result)
         self.assert_playable(seconds=2)
         frame = self.last_frame()
@@ -167,7 +168,7 @@ class Record(TelixTv):
         self.assert_playable(seconds=1)
 
     def test_a_file_that_cannot_be_written_is_refused(self):
-        page = self.write(EMPTY)
+        page = self.write(STOPPED)
         self.file = os.path.join(self.folder, 'absent', 'run.mp4')
         self.assert_refused(self.record(page), f'--record {self.file}: No such file or directory')
         self.file = self.folder
@@ -175,7 +176,7 @@ class Record(TelixTv):
 
     def test_a_missing_encoder_is_named_and_no_file_is_left(self):
         with temporary_folder() as empty:
-            result = self.record(self.write(EMPTY), environment={
+            result = self.record(self.write(STOPPED), environment={
                 'GST_PLUGIN_SYSTEM_PATH': empty, 'GST_REGISTRY': os.path.join(empty, 'registry')})
         self.assert_refused(result, f'--record {self.file}: the GStreamer element x264enc is not installed')
         self.assertFalse(os.path.exists(self.file))

@@ -262,11 +262,13 @@ class Broadcast(DesktopTelevision):
         self.wait_for('events.some(function (each) { return each[0] === "fullScreen"; })')
         self.assertEqual(self.value('tv.fullScreen'), True)
 
-    def test_a_released_picture_is_black(self):
+    def test_a_stopped_picture_is_black_and_a_released_one_the_channel_of_the_set(self):
         self.tune('Telix One')
-        self.wait_for_pattern('Telix One')
+        self.value('tv.style.cssText = "left: 640px; top: 360px; width: 320px; height: 180px"')
+        self.value('tv.stop()')
+        wait_for(lambda: self.is_near((800, 450), (0, 0, 0)) and self.is_near((1200, 300), (0, 0, 0)), 'not black')
         self.value('tv.release()')
-        wait_for(lambda: self.is_near((300, 300), (0, 0, 0)) and self.is_near((1200, 300), (0, 0, 0)), 'not black')
+        self.wait_for_pattern('Telix One')
 
 
 class Files(DesktopTelevision):

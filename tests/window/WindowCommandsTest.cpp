@@ -45,8 +45,9 @@ public:
         calls.push_back("reload");
         answer([this, done = std::move(done)] { done(error); });
     }
+    bool isIdle() const override { return false; }
     std::vector<RunningApplication> applications() const override {
-        return {{"http://b.example/", true}, {"http://a.example/", false}};
+        return {{"http://b.example/", "1.2", true}, {"http://a.example/", "", false}};
     }
 
     std::vector<std::string> calls;
@@ -204,8 +205,8 @@ TEST_F(WindowCommandsTest, CarriesRequestsOutSideBySide) {
     std::string other;
     m_commands->handle(R"({"command":"applications"})",
                        [&](const std::string& response) { other = response; });
-    EXPECT_EQ(other, R"({"running":[{"url":"http://b.example/","visible":true},)"
-                     R"({"url":"http://a.example/","visible":false}],"ok":true})");
+    EXPECT_EQ(other, R"({"running":[{"url":"http://b.example/","id":"1.2","visible":true},)"
+                     R"({"url":"http://a.example/","id":"","visible":false}],"ok":true})");
     EXPECT_EQ(m_response, "");
 }
 

@@ -178,7 +178,7 @@ void listRunningApplications(ScriptedWindow& window, WindowCommand& request) {
     JsonArrayWriter running;
     for (const ScriptedWindow::RunningApplication& each : window.applications()) {
         JsonObjectWriter application;
-        application.string("url", each.url).boolean("visible", each.isVisible);
+        application.string("url", each.url).string("id", each.id).boolean("visible", each.isVisible);
         running.add(std::move(application));
     }
     JsonObjectWriter results;

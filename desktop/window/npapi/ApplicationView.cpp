@@ -23,13 +23,9 @@ namespace desktop {
 
 namespace {
 
-// The remote control key that a keyboard event is mapped to, if the engine has no key code for it; else null.
+// The same, but null if the engine has a key code for it.
 const RemoteKey* keyWithoutEngineCode(const QKeyEvent& event) {
-    const auto shortcutModifiers = Qt::ControlModifier | Qt::AltModifier | Qt::MetaModifier;
-    if (event.modifiers() & shortcutModifiers) {
-        return nullptr;
-    }
-    const RemoteKey* key = remoteKeyByKeyboardKey(event.nativeVirtualKey());
+    const RemoteKey* key = remoteKeyOf(event);
     return key && !key->hasEngineCode ? key : nullptr;
 }
 
@@ -62,8 +58,13 @@ void dispatchUnload(QWebFrame& frame) {
 
 } // namespace
 
-ApplicationView::ApplicationView(const QString& userAgent, QWidget* parent)
-    : QWebView(parent), m_page(new ApplicationPage(userAgent, this)) {
+const RemoteKey* remoteKeyOf(const QKeyEvent& event) {
+    const auto shortcutModifiers = Qt::ControlModifier | Qt::AltModifier | Qt::MetaModifier;
+    return event.modifiers() & shortcutModifiers ? nullptr : remoteKeyByKeyboardKey(event.nativeVirtualKey());
+}
+
+ApplicationView::ApplicationView(const QString& userAgent, std::function<uint32_t()> keySet, QWidget* parent)
+    : QWebView(parent), m_page(new ApplicationPage(userAgent, this)), m_keySet(std::move(keySet)) {
     setPage(m_page);
     m_page->setViewportSize(kPageSize);
     // Where a page has no background, the video plane shows through. The page takes the palette of the
@@ -190,7 +191,20 @@ void ApplicationView::hideEvent(QHideEvent* event) {
     updateVisibilityState();
 }
 
+// Returns whether the television has got the key, because the page has not asked for it.
+bool ApplicationView::takePress(const QKeyEvent& event) {
+    const RemoteKey* key = remoteKeyOf(event);
+    m_hasPagePress = !key || (m_keySet() & key->group) != 0;
+    if (!m_hasPagePress) {
+        emit televisionKey(*key);
+    }
+    return !m_hasPagePress;
+}
+
 void ApplicationView::keyPressEvent(QKeyEvent* event) {
+    if (takePress(*event)) {
+        return;
+    }
     const RemoteKey* key = keyWithoutEngineCode(*event);
     if (!key) {
         QKeyEvent plain = withoutKeypadModifier(*event);
@@ -201,6 +215,9 @@ void ApplicationView::keyPressEvent(QKeyEvent* event) {
 }
 
 void ApplicationView::keyReleaseEvent(QKeyEvent* event) {
+    if (!m_hasPagePress && remoteKeyOf(*event)) {
+        return;
+    }
     const RemoteKey* key = keyWithoutEngineCode(*event);
     if (!key) {
         QKeyEvent plain = withoutKeypadModifier(*event);
@@ -216,10 +233,6 @@ void ApplicationView::updateVisibilityState() {
 }
 
 void ApplicationView::dispatchKeyEvent(const char* type, const RemoteKey& key, bool isRepeat) {
-    // Keys of the television do nothing in this window.
-    if (key.group == KeyGroupTelevision) {
-        return;
-    }
     callPageScript(*m_page->currentFrame(), "dispatchkey", {type, key.keyCode, isRepeat});
 }
 

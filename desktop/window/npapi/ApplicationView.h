@@ -4,10 +4,16 @@
 
 #include <QWebView>
 
+#include <cstdint>
+#include <functional>
+
 namespace desktop {
 
 class ApplicationPage;
 struct RemoteKey;
+
+// The key of the remote control that a keyboard event is mapped to; null if it is mapped to none.
+const RemoteKey* remoteKeyOf(const QKeyEvent& event);
 
 // The page is laid out for 1280x720 pixels whatever the size of the widget, and painted scaled: scripts and
 // plug-ins see the same geometry in every window.
@@ -15,8 +21,9 @@ class ApplicationView : public QWebView {
     Q_OBJECT
 
 public:
-    // `userAgent`: the User-Agent header of requests, and navigator.userAgent.
-    ApplicationView(const QString& userAgent, QWidget* parent);
+    // `userAgent`: the User-Agent header of requests, and navigator.userAgent. `keySet` returns the mask of
+    // the key groups that pages receive.
+    ApplicationView(const QString& userAgent, std::function<uint32_t()> keySet, QWidget* parent);
     ~ApplicationView() override;
 
     ApplicationPage& applicationPage() const { return *m_page; }
@@ -36,6 +43,8 @@ public:
 signals:
     // A document could not be loaded; the previous one stays.
     void loadFailed(const QString& reason);
+    // A key has been pressed that the page does not get.
+    void televisionKey(const desktop::RemoteKey& key);
 
 protected:
     void paintEvent(QPaintEvent* event) override;
@@ -57,7 +66,12 @@ private:
     QMouseEvent inPageCoordinates(const QMouseEvent& event) const;
     void dispatchKeyEvent(const char* type, const RemoteKey& key, bool isRepeat);
 
+    bool takePress(const QKeyEvent& event);
+
     ApplicationPage* m_page;
+    std::function<uint32_t()> m_keySet;
+    // Whether the page has got the last press, and so gets the release.
+    bool m_hasPagePress = false;
     bool m_loaded = false;
     bool m_hasDocument = false;
     bool m_shown = true;

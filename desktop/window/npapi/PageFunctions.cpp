@@ -26,7 +26,7 @@ bool PageFunctions::createApplication(const QString& url) {
 }
 
 void PageFunctions::destroyApplication() {
-    m_window.destroyTopApplication(m_application);
+    m_window.destroyApplication(m_application);
 }
 
 void PageFunctions::showApplication() {

@@ -1,34 +1,75 @@
 // The main window: the video plane and, above it, a stack of applications.
 #include "desktop/window/npapi/TvWindow.h"
 
+#include <QAbstractEventDispatcher>
+#include <QCoreApplication>
+#include <QEvent>
 #include <QFile>
 #include <QImage>
+#include <QKeyEvent>
 #include <QPainter>
 #include <QPalette>
 #include <QPixmap>
+#include <QTimer>
 #include <QWebFrame>
 #include <QWebInspector>
 
+#include <algorithm>
+
 #include "desktop/window/npapi/ApplicationPage.h"
 #include "desktop/window/npapi/ApplicationView.h"
+#include "desktop/window/npapi/OnScreenDisplay.h"
 #include "desktop/window/npapi/PageFunctions.h"
 #include "desktop/window/npapi/PageGeometry.h"
 #include "desktop/window/npapi/PageScript.h"
 #include "desktop/window/npapi/VideoPlane.h"
+#include "desktop/window/shared/CommandLine.h"
+#include "desktop/window/shared/Diagnostics.h"
 #include "desktop/window/shared/LoadCheck.h"
 
 namespace desktop {
 
-TvWindow::TvWindow(const QString& userAgent) : m_userAgent(userAgent), m_videoPlane(new VideoPlane(this)) {
+namespace {
+
+// The one that is on at first.
+constexpr uint32_t kFirstChannel = 1;
+
+QEvent::Type signallingEvent() {
+    static const auto kType = static_cast<QEvent::Type>(QEvent::registerEventType());
+    return kType;
+}
+
+QUrl urlOf(const std::string& url) {
+    return QUrl(QString::fromStdString(url));
+}
+
+} // namespace
+
+TvWindow::TvWindow(const CommandLine& commandLine)
+    : m_userAgent(QString::fromStdString(commandLine.userAgent)), m_start{commandLine.channel,
+                                                                          commandLine.signalUrl,
+                                                                          std::max(commandLine.channel,
+                                                                                   kFirstChannel)},
+      m_videoPlane(new VideoPlane(this)), m_display(new OnScreenDisplay(this)),
+      m_television(libraryCalls(), stackCalls(),
+                   [this](const std::string& text) { m_display->show(QString::fromStdString(text)); }) {
+    signallingEvent();
+    m_library.loadBeside(commandLine.plugin);
+    // The plug-in loads another library during a call of a page on this thread, so the event loop runs after
+    // it.
+    m_searchConnection = connect(QAbstractEventDispatcher::instance(),
+                                 &QAbstractEventDispatcher::aboutToBlock, this, &TvWindow::startTelevision);
     QPalette black = palette();
     black.setColor(QPalette::Window, Qt::black);
     setPalette(black);
     setWindowTitle(QStringLiteral("telix-tv"));
     resize(kPageSize);
     place(*m_videoPlane);
+    place(*m_display);
 }
 
 TvWindow::~TvWindow() {
+    m_library.stop();
     delete m_inspector;
     // Calls of pages during their teardown are ignored, because their applications are not in the stack.
     m_stack.clear();
@@ -36,8 +77,15 @@ TvWindow::~TvWindow() {
     qDeleteAll(findChildren<ApplicationView*>());
 }
 
-void TvWindow::openApplication(const QUrl& url) {
-    auto* application = new ApplicationView(m_userAgent, this);
+ApplicationView& TvWindow::openApplication(const QUrl& url) {
+    ApplicationView& application = push();
+    application.load(url);
+    return application;
+}
+
+ApplicationView& TvWindow::push() {
+    auto* application = new ApplicationView(
+        m_userAgent, [this] { return m_library.find() ? m_library.keySet() : kAllPageKeys; }, this);
     auto* page = &application->applicationPage();
     page->setNetworkAccessManager(&m_network);
     const auto addFunctions = [this, application](QWebFrame* frame) {
@@ -46,29 +94,76 @@ void TvWindow::openApplication(const QUrl& url) {
     addFunctions(page->mainFrame());
     connect(page, &QWebPage::frameCreated, this, addFunctions);
     connect(application, &ApplicationView::loadFailed, this, [this, application](const QString& reason) {
-        if (!application->hasDocument()) {
-            remove(application);
-        }
-        emit loadFailed(application->applicationPage().failedUrl(), reason);
+        onLoadFailed(*application, application->applicationPage().failedUrl(), reason);
     });
+    connect(application, &ApplicationView::televisionKey, this,
+            [this](const RemoteKey& key) { m_television.onKey(key); });
     m_stack.push(*application);
     updateTop();
-    application->load(url);
+    return *application;
+}
+
+void TvWindow::onLoadFailed(ApplicationView& application, const QUrl& url, const QString& reason) {
+    if (!application.hasDocument()) {
+        if (m_television.applications().onLoadFailed(&application)) {
+            printError("cannot load " + url.toDisplayString().toStdString() + ": " + reason.toStdString());
+            return;
+        }
+        remove(&application);
+    }
+    emit loadFailed(url, reason);
+}
+
+// Checked on a later turn of the event loop, because the engine would show the page with which a server
+// reports an error.
+ApplicationView& TvWindow::openSignalled(const std::string& url) {
+    ApplicationView& application = push();
+    QTimer::singleShot(0, &application, [this, &application, url] {
+        const std::string error = loadError(url, m_userAgent.toStdString());
+        if (!m_stack.has(application)) {
+            return;
+        }
+        if (error.empty()) {
+            application.load(urlOf(url));
+        } else {
+            onLoadFailed(application, urlOf(url), QString::fromStdString(error));
+        }
+    });
+    return application;
 }
 
 bool TvWindow::createApplication(const ApplicationView& caller, const QUrl& url) {
-    if (!m_stack.has(caller) ||
-        !loadError(url.toString(QUrl::FullyEncoded).toStdString(), m_userAgent.toStdString()).empty()) {
+    const std::string address = url.toString(QUrl::FullyEncoded).toStdString();
+    const auto report = [&address](const std::string& reason) {
+        printError("cannot load " + address + ": " + reason);
+    };
+    if (!m_stack.has(caller) || !m_stack.hasSpace(report)) {
         return false;
     }
-    openApplication(url);
+    const ApplicationTarget target = findTarget(address);
+    if (!target.error.empty()) {
+        return false;
+    }
+    openTarget(target);
     return true;
 }
 
-void TvWindow::destroyTopApplication(const ApplicationView& caller) {
+ApplicationTarget TvWindow::findTarget(const std::string& url) const {
+    return findApplication(url, m_userAgent.toStdString(),
+                           m_television.applications().signalling().applications);
+}
+
+void TvWindow::openTarget(const ApplicationTarget& target) {
+    const ApplicationView& opened = openApplication(urlOf(target.url));
+    if (target.signalled) {
+        m_television.applications().onOpened(&opened, *target.signalled);
+    }
+}
+
+void TvWindow::destroyApplication(ApplicationView& caller) {
     // The script of an application keeps running after its removal.
     if (m_stack.has(caller)) {
-        remove(m_stack.top());
+        remove(&caller);
     }
 }
 
@@ -84,6 +179,7 @@ void TvWindow::inspect() {
 
 void TvWindow::resizeEvent(QResizeEvent*) {
     place(*m_videoPlane);
+    place(*m_display);
     for (auto* application : m_stack.all()) {
         place(*application);
     }
@@ -96,6 +192,8 @@ bool TvWindow::isTopLoaded() const {
 void TvWindow::press(const RemoteKey& key, std::function<void()> done) {
     if (ApplicationView* top = m_stack.top()) {
         top->press(key);
+    } else {
+        m_television.onKey(key);
     }
     done();
 }
@@ -133,14 +231,14 @@ void TvWindow::paint(uint8_t* pixels, int stride) {
 }
 
 void TvWindow::open(const std::string& url, std::function<void(const std::string& error)> done) {
-    const std::string error = loadError(url, m_userAgent.toStdString());
-    if (error.empty()) {
+    const ApplicationTarget target = findTarget(url);
+    if (target.error.empty()) {
         while (m_stack.top()) {
             remove(m_stack.top());
         }
-        openApplication(QUrl(QString::fromStdString(url)));
+        openTarget(target);
     }
-    done(error);
+    done(target.error);
 }
 
 void TvWindow::reload(std::function<void(const std::string& error)> done) {
@@ -157,9 +255,10 @@ void TvWindow::reload(std::function<void(const std::string& error)> done) {
 
 std::vector<ScriptedWindow::RunningApplication> TvWindow::applications() const {
     std::vector<RunningApplication> running;
-    for (const ApplicationView* application : m_stack.all()) {
-        running.insert(running.begin(), {application->url().toString(QUrl::FullyEncoded).toStdString(),
-                                         application->isShown() && application == m_stack.top()});
+    for (const ApplicationView* each : m_stack.all()) {
+        running.insert(running.begin(),
+                       {each->url().toString(QUrl::FullyEncoded).toStdString(),
+                        m_television.applications().idOf(each), each->isVisible() && each->isShown()});
     }
     return running;
 }
@@ -170,9 +269,100 @@ bool TvWindow::hasPicture() const {
 
 void TvWindow::remove(ApplicationView* application) {
     m_stack.remove(*application);
+    m_television.applications().onEnded(application);
     // Deferred, because the call may come from a script of the application.
     application->deleteLater();
     updateTop();
+}
+
+// The application and those above it.
+void TvWindow::removeFrom(const ApplicationView& lowest) {
+    while (m_stack.has(lowest)) {
+        remove(m_stack.top());
+    }
+}
+
+// ---- The television
+
+void TvWindow::startTelevision() {
+    if (!m_library.find()) {
+        return;
+    }
+    disconnect(m_searchConnection);
+    const std::string error = m_library.start(m_start, onWakeup, this);
+    if (!error.empty()) {
+        printError(error);
+    }
+}
+
+// Called on threads of the platform library.
+void TvWindow::onWakeup(void* window) {
+    auto* self = static_cast<TvWindow*>(window);
+    if (!self->m_wakeupPosted.exchange(true)) {
+        QCoreApplication::postEvent(self, new QEvent(signallingEvent()));
+    }
+}
+
+bool TvWindow::event(QEvent* event) {
+    if (event->type() != signallingEvent()) {
+        return QWidget::event(event);
+    }
+    // Reset before the signalling is read, so that a change meanwhile posts another event.
+    m_wakeupPosted = false;
+    m_television.applications().update(m_library.signalling());
+    return true;
+}
+
+// Without an application the window has the focus.
+void TvWindow::keyPressEvent(QKeyEvent* event) {
+    if (const RemoteKey* key = remoteKeyOf(*event)) {
+        m_television.onKey(*key);
+    }
+}
+
+bool TvWindow::isIdle() const {
+    return !m_stack.top() && m_television.applications().signalling().state == TELIX_DESKTOP_SIGNALLING_KNOWN;
+}
+
+Television::Library TvWindow::libraryCalls() {
+    const auto report = [this](const Television::OnChannel& done) {
+        const TelevisionLibrary::Channel channel = m_library.channel();
+        done(channel.number, channel.name);
+    };
+    Television::Library calls;
+    calls.tune = [this, report](uint32_t number, const Television::OnChannel& done) {
+        if (m_library.find()) {
+            m_library.tune(number);
+            report(done);
+        }
+    };
+    calls.step = [this, report](int positions, const Television::OnChannel& done) {
+        if (m_library.find()) {
+            m_library.step(positions);
+            report(done);
+        }
+    };
+    calls.setVolume = [this](uint32_t volume) {
+        if (m_library.find()) {
+            m_library.setVolume(volume);
+        }
+    };
+    return calls;
+}
+
+SignalledApplications::Window TvWindow::stackCalls() {
+    SignalledApplications::Window calls;
+    calls.hasApplication = [this] { return hasApplication(); };
+    calls.open = [this](const std::string& url) { return &openSignalled(url); };
+    calls.end = [this](SignalledApplications::Application application) {
+        removeFrom(*static_cast<const ApplicationView*>(application));
+    };
+    calls.endAll = [this] {
+        if (!m_stack.all().empty()) {
+            removeFrom(*m_stack.all().front());
+        }
+    };
+    return calls;
 }
 
 void TvWindow::updateTop() {

@@ -5,9 +5,14 @@
 #include <QString>
 #include <QWidget>
 
+#include <atomic>
+
 #include "desktop/window/npapi/NetworkAccess.h"
 #include "desktop/window/shared/ApplicationStack.h"
+#include "desktop/window/shared/ApplicationTarget.h"
 #include "desktop/window/shared/ScriptedWindow.h"
+#include "desktop/window/shared/Television.h"
+#include "desktop/window/shared/TelevisionLibrary.h"
 
 class QUrl;
 class QWebInspector;
@@ -15,7 +20,9 @@ class QWebInspector;
 namespace desktop {
 
 class ApplicationView;
+class OnScreenDisplay;
 class VideoPlane;
+struct CommandLine;
 
 // The topmost application is visible. The video plane shows through where its page is transparent, and
 // everywhere if there is no application. Both are scaled to the window, with black bars if the aspect ratios
@@ -24,24 +31,23 @@ class TvWindow : public QWidget, public ScriptedWindow {
     Q_OBJECT
 
 public:
-    // `userAgent`: the User-Agent header of requests, and navigator.userAgent.
-    explicit TvWindow(const QString& userAgent);
+    explicit TvWindow(const CommandLine& commandLine);
     ~TvWindow() override;
 
     // Pushes a new application and starts to load its page.
-    void openApplication(const QUrl& url);
+    ApplicationView& openApplication(const QUrl& url);
     // The same for an application that calls it. Returns false, without any change, if the page cannot be
-    // loaded or the caller is no longer in the stack.
+    // loaded, the stack is full or the caller is no longer in it.
     bool createApplication(const ApplicationView& caller, const QUrl& url);
-    // Pops the topmost application for an application that calls it; ignored if the caller is no longer in
-    // the stack. Always the topmost: an application destroys either itself, while it is topmost, or the one
-    // that it has created. The window stays open without an application and shows the video plane.
-    void destroyTopApplication(const ApplicationView& caller);
+    // Ends the application that calls it; ignored if it is no longer in the stack. The window stays open
+    // without an application and shows the video plane.
+    void destroyApplication(ApplicationView& caller);
     // Opens the web inspector, which follows the topmost application.
     void inspect();
 
     bool hasApplication() const override { return m_stack.top() != nullptr; }
     bool isTopLoaded() const override;
+    bool isIdle() const override;
     void press(const RemoteKey& key, std::function<void()> done) override;
     void evaluate(const std::string& expression, std::function<void(Evaluation)> done) override;
     bool hasPicture() const override;
@@ -57,15 +63,34 @@ signals:
     void loadFailed(const QUrl& url, const QString& reason);
 
 protected:
+    bool event(QEvent* event) override;
+    void keyPressEvent(QKeyEvent* event) override;
     void resizeEvent(QResizeEvent* event) override;
 
 private:
+    static void onWakeup(void* window);
+    void startTelevision();
+    Television::Library libraryCalls();
+    SignalledApplications::Window stackCalls();
+    ApplicationView& push();
+    ApplicationView& openSignalled(const std::string& url);
+    ApplicationTarget findTarget(const std::string& url) const;
+    void openTarget(const ApplicationTarget& target);
+    void onLoadFailed(ApplicationView& application, const QUrl& url, const QString& reason);
     void remove(ApplicationView* application);
+    void removeFrom(const ApplicationView& lowest);
     void updateTop();
     void place(QWidget& view) const;
 
     QString m_userAgent;
+    TelevisionStart m_start;
+    TelevisionLibrary m_library;
+    QMetaObject::Connection m_searchConnection;
+    // Set while a wake-up event is queued for the window's thread: at most one is.
+    std::atomic<bool> m_wakeupPosted{false};
     VideoPlane* m_videoPlane;
+    OnScreenDisplay* m_display;
+    Television m_television;
     // One for all applications, because they share cookies.
     NetworkAccess m_network;
     ApplicationStack<ApplicationView> m_stack;

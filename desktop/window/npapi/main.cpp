@@ -22,7 +22,7 @@
 #include "desktop/window/shared/Automation.h"
 #include "desktop/window/shared/CommandLine.h"
 #include "desktop/window/shared/Diagnostics.h"
-#include "desktop/window/shared/LoadCheck.h"
+#include "desktop/window/shared/FirstPage.h"
 #include "desktop/window/shared/PluginFile.h"
 
 namespace desktop {
@@ -56,9 +56,11 @@ gboolean onTermination(gpointer signalNumber) {
     return G_SOURCE_CONTINUE;
 }
 
-// Runs the window until it exits, and destroys it with all pages. `evaluated` receives the value of --eval.
-int runWindow(const CommandLine& commandLine, std::optional<std::string>& evaluated) {
-    TvWindow window(QString::fromStdString(commandLine.userAgent));
+// Runs the window until it exits, and destroys it with all pages. `page`: to open; empty for the channel
+// alone. `evaluated` receives the value of --eval.
+int runWindow(const CommandLine& commandLine, const std::string& page,
+              std::optional<std::string>& evaluated) {
+    TvWindow window(commandLine);
     WindowCommands commands(window);
     const ControlSource control([&](const std::string& line, const ControlSource::Respond& respond) {
         commands.handle(line, respond);
@@ -85,7 +87,9 @@ int runWindow(const CommandLine& commandLine, std::optional<std::string>& evalua
         window.resize(commandLine.width, commandLine.height);
         window.show();
     }
-    window.openApplication(QUrl(QString::fromStdString(commandLine.page)));
+    if (!page.empty()) {
+        window.openApplication(QUrl(QString::fromStdString(page)));
+    }
     if (commandLine.inspect) {
         window.inspect();
     }
@@ -94,23 +98,19 @@ int runWindow(const CommandLine& commandLine, std::optional<std::string>& evalua
     return recording.finish(exitStatus);
 }
 
-// Whether the event loop and the page can be used; prints the error if not.
-bool isUsable(const CommandLine& commandLine) {
+// Whether the event loop can be used; prints the error if not.
+bool isEventLoopUsable() {
     if (!QAbstractEventDispatcher::instance()->inherits("QEventDispatcherGlib")) {
         printError(
             "Qt does not use the GLib main loop, which delivers the events of the plug-in; is QT_NO_GLIB "
             "set?");
         return false;
     }
-    const std::string error = loadError(commandLine.page, commandLine.userAgent);
-    if (!error.empty()) {
-        printError("cannot load " + commandLine.page + ": " + error);
-        return false;
-    }
     return true;
 }
 
 int runBrowser(const CommandLine& commandLine, char** argv) {
+    escapeEvents(commandLine);
     if (qEnvironmentVariableIsEmpty("DISPLAY")) {
         printError("no display: DISPLAY is not set");
         return kExitBadInput;
@@ -132,7 +132,11 @@ int runBrowser(const CommandLine& commandLine, char** argv) {
     int qtArgumentCount = 1; // Qt must not interpret the options of telix-tv
     QApplication application(qtArgumentCount, argv);
     QApplication::setQuitOnLastWindowClosed(false); // Automation exits with its own status
-    if (!isUsable(commandLine)) {
+    if (!isEventLoopUsable()) {
+        return kExitBadInput;
+    }
+    const std::optional<std::string> page = pageOf(commandLine);
+    if (!page) {
         return kExitBadInput;
     }
     for (const int signalNumber : {SIGINT, SIGTERM, SIGHUP}) {
@@ -141,7 +145,7 @@ int runBrowser(const CommandLine& commandLine, char** argv) {
     configureEngine(plugin, folder, commandLine.inspect);
 
     std::optional<std::string> evaluated;
-    const int exitStatus = runWindow(commandLine, evaluated);
+    const int exitStatus = runWindow(commandLine, *page, evaluated);
     // Runs callbacks that the plug-in has deferred to the event loop.
     QCoreApplication::processEvents();
     // The last line of the output, after what the plug-in logs in its teardown.

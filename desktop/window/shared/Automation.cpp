@@ -39,7 +39,8 @@ Automation::~Automation() {
 }
 
 void Automation::step() {
-    m_pageLoaded = m_pageLoaded || m_window.isTopLoaded();
+    m_pageLoaded =
+        m_pageLoaded || m_window.isTopLoaded() || (m_commandLine.page.empty() && m_window.isIdle());
     if (g_get_monotonic_time() - m_start > m_commandLine.timeoutSeconds * G_USEC_PER_SEC) {
         onTimeout();
         return;
@@ -59,9 +60,6 @@ void Automation::step() {
 
 // One key per step, so that the event loop handles its effects before the next key or condition.
 void Automation::pressNextKey() {
-    if (!m_window.hasApplication()) {
-        return;
-    }
     m_isBusy = true;
     m_window.press(*m_commandLine.keys[m_keysPressed++], [this] { m_isBusy = false; });
 }
@@ -107,7 +105,9 @@ void Automation::evaluateLast() {
 void Automation::onTimeout() {
     g_autofree char* timeout = g_strdup_printf("within %g s", m_commandLine.timeoutSeconds);
     if (!m_pageLoaded) {
-        printError("cannot load " + m_commandLine.page + ": not loaded " + timeout);
+        printError(m_commandLine.page.empty()
+                       ? std::string("no channel ") + timeout
+                       : "cannot load " + m_commandLine.page + ": not loaded " + timeout);
         end(kExitBadInput);
         return;
     }

@@ -17,7 +17,7 @@ namespace {
 
 const char kDescription[] =
     R"(A scripted run performs these steps in this order, each only if its option is given:
-  1. load the page;
+  1. load the page, or the application that the channel signals;
   2. press --keys, one after the other, each when the page that the previous one opened is loaded;
   3. evaluate --wait-for repeatedly until it is true;
   4. --wait-for-picture: wait until the video plane shows broadcast or media;
@@ -34,11 +34,15 @@ Exit status: 0 if all steps are done; 1 after a timeout or if --eval throws; 2 f
 plug-in that cannot be loaded and for a profile that cannot be used; 3 if the process of the page ends by itself, with
 the engine webkit.
 
+Without a page the window shows the current channel and starts what it signals.
+
 Keyboard: arrow keys, Enter (OK), Backspace or Escape (Back), F1 to F4 (red, green, yellow, blue), F5 to F10 or the
-media keys (play, pause, stop, rewind, fast forward, info), F11 and F12 (channel up and down), End (exit), and the
-digits. With the engine webkit, a page gets the keys of its key set; digits outside of it select a channel.)";
+media keys (play, pause, stop, rewind, fast forward, info), Page Up and Page Down or F11 and F12 (channel up and down),
++ and - (volume), End (exit), Home (text: start what the channel signals), and the digits. A page gets the keys of its
+key set; digits outside of it select a channel.)";
 
 constexpr int kMaxSide = 16384;
+constexpr uint32_t kMaxChannel = 65535;
 constexpr double kMaxTimeoutSeconds = 24 * 60 * 60;
 constexpr char kDefaultSize[] = "1280x720";
 constexpr char kDefaultTimeout[] = "30";
@@ -60,7 +64,7 @@ std::string keyNames() {
 struct Values {
     ~Values() {
         for (char* value : {engine, size, profile, plugin, keys, waitFor, timeout, eval, screenshot, record,
-                            userAgent, inspectorServer}) {
+                            userAgent, inspectorServer, ait, signal, on}) {
             g_free(value);
         }
         g_strfreev(pages);
@@ -82,6 +86,10 @@ struct Values {
     char* userAgent = nullptr;
     gboolean inspect = false;
     char* inspectorServer = nullptr;
+    char* ait = nullptr;
+    char* signal = nullptr;
+    char* on = nullptr;
+    gboolean strict = false;
     gboolean help = false;
     gboolean version = false;
     char** pages = nullptr;
@@ -95,7 +103,7 @@ public:
           m_plugin("The plug-in to load, default " + besideProgram(kPlugin) + "."),
           m_userAgent(std::string("The user agent string, default that of the engine, followed by") +
                       kHbbtvToken + ".") {
-        m_context = g_option_context_new("URL-or-FILE");
+        m_context = g_option_context_new("[URL-or-FILE]");
         g_option_context_set_help_enabled(m_context, FALSE);
         g_option_context_set_summary(
             m_context,
@@ -134,6 +142,16 @@ private:
         constexpr auto kFlag = G_OPTION_ARG_NONE;
         const GOptionEntry entries[] = {
             {"engine", 0, 0, kText, &values.engine, "The browser engine: webkit (default) or npapi.", "NAME"},
+            {"ait", 0, 0, kText, &values.ait, "Start the application of an XML AIT, in place of a page.",
+             "URL-or-FILE"},
+            {"signal", 0, 0, kText, &values.signal,
+             "Signal a page as autostart application of the channel that is on.", "URL-or-FILE"},
+            {"on", 0, 0, kText, &values.on, "With --signal: the channel, which is on at first, from 1.",
+             "CHANNEL"},
+            {"strict", 0, 0, kFlag, &values.strict,
+             "Run the plug-in as sets in the field do: events without escapes, and none for elements without "
+             "an id.",
+             nullptr},
             {"size", 0, 0, kText, &values.size,
              "Size of the window in pixels, default 1280x720. The page is scaled to it.", "WxH"},
             {"fullscreen", 0, 0, kFlag, &values.fullscreen, "Fill the screen.", nullptr},
@@ -250,7 +268,8 @@ std::string checkStrings(const Values& values) {
     } options[] = {{"--wait-for", values.waitFor},      {"--eval", values.eval},
                    {"--screenshot", values.screenshot}, {"--plugin", values.plugin},
                    {"--user-agent", values.userAgent},  {"--profile", values.profile},
-                   {"--record", values.record}};
+                   {"--record", values.record},         {"--ait", values.ait},
+                   {"--signal", values.signal}};
     for (const auto& option : options) {
         if (option.value && simplified(option.value).empty()) {
             return std::string(option.name) + ": empty value";
@@ -270,16 +289,35 @@ std::string checkStrings(const Values& values) {
     return {};
 }
 
-std::string parsePage(const Values& values, CommandLine& commandLine) {
-    const guint count = values.pages ? g_strv_length(values.pages) : 0;
-    if (values.automation) {
-        return count == 0 ? "" : "--automation: expected no page, because the WebDriver session opens it";
+std::string parseChannel(const std::string& text, CommandLine& commandLine) {
+    guint64 channel = 0;
+    if (!g_ascii_string_to_unsigned(text.c_str(), 10, 1, kMaxChannel, &channel, nullptr)) {
+        return "--on: bad channel \"" + text + "\", expected a number from 1";
     }
-    if (count != 1) {
-        return "expected exactly one page, see --help";
-    }
-    commandLine.page = urlOf(values.pages[0]);
+    commandLine.channel = static_cast<uint32_t>(channel);
     return {};
+}
+
+// What the window shows.
+std::string parsePage(const Values& values, CommandLine& commandLine) {
+    const guint pages = values.pages ? g_strv_length(values.pages) : 0;
+    if (values.automation) {
+        return pages == 0 && !values.ait && !values.signal
+                   ? ""
+                   : "--automation: expected no page, because the WebDriver session opens it";
+    }
+    if (pages > 1 || (pages > 0 && values.ait)) {
+        return "expected one page at most, see --help";
+    }
+    if (values.on && !values.signal) {
+        return "--on: expected --signal, too";
+    }
+    if (pages > 0 || values.ait) {
+        commandLine.page = urlOf(values.ait ? values.ait : values.pages[0]);
+    }
+    commandLine.isXmlAit = values.ait != nullptr;
+    commandLine.signalUrl = values.signal ? urlOf(values.signal) : "";
+    return values.on ? parseChannel(values.on, commandLine) : "";
 }
 
 std::string checkSessions(const Values& values, const EngineInformation& engine) {
@@ -345,6 +383,7 @@ std::optional<int> readCommandLine(const std::vector<std::string>& arguments, co
     commandLine.automation = values.automation;
     commandLine.profile = values.profile ? values.profile : "";
     commandLine.inspect = values.inspect;
+    commandLine.isStrict = values.strict;
     commandLine.plugin = values.plugin ? values.plugin : besideProgram(kPlugin);
     commandLine.userAgent = values.userAgent ? values.userAgent : engine.userAgent() + kHbbtvToken;
     commandLine.waitForPicture = values.waitForPicture;
@@ -353,6 +392,12 @@ std::optional<int> readCommandLine(const std::vector<std::string>& arguments, co
     commandLine.screenshot = optional(values.screenshot);
     commandLine.record = optional(values.record);
     return std::nullopt;
+}
+
+void escapeEvents(const CommandLine& commandLine) {
+    if (!commandLine.isStrict) {
+        g_setenv("PLUGIN_ESCAPE_EVENTS", "1", FALSE);
+    }
 }
 
 EarlyOptions earlyOptions(const std::vector<std::string>& arguments) {

@@ -2,6 +2,7 @@
 #ifndef TELIX_DESKTOP_WINDOW_SHARED_COMMANDLINE_H
 #define TELIX_DESKTOP_WINDOW_SHARED_COMMANDLINE_H
 
+#include <cstdint>
 #include <functional>
 #include <optional>
 #include <string>
@@ -22,8 +23,16 @@ struct EngineInformation {
 };
 
 struct CommandLine {
-    // The URL of the page, also if a file name is given. Empty with `automation`.
+    // The URL of the page, also if a file name is given; empty for live television, and with `automation`.
     std::string page;
+    // Whether `page` is the URL of an XML AIT.
+    bool isXmlAit = false;
+    // The URL of a page to signal, and the channel that signals it and is on at first; empty and 0 if the
+    // options are not given.
+    std::string signalUrl;
+    uint32_t channel = 0;
+    // Whether the plug-in works as on sets in the field.
+    bool isStrict = false;
     // Whether a WebDriver session opens the pages.
     bool automation = false;
     // The folder of the profile; empty for a temporary one.
@@ -56,6 +65,10 @@ struct CommandLine {
 // shall exit: after --help or --version, which are handled here, and after a usage error, which is printed.
 std::optional<int> readCommandLine(const std::vector<std::string>& arguments, const EngineInformation& engine,
                                    CommandLine& commandLine);
+
+// Lets the plug-in escape what it puts into the scripts of pages, unless the command line is strict or the
+// user has decided: it reads the environment.
+void escapeEvents(const CommandLine& commandLine);
 
 // What must be known before an engine is there. Empty strings if the options are not given, or if the
 // arguments cannot be parsed, which readCommandLine() reports.

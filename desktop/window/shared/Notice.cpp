@@ -15,11 +15,10 @@ void replace(std::string& text, const std::string& placeholder, const std::strin
 
 } // namespace
 
-std::string noticePage(const std::string& reason, uint32_t channel) {
+std::string noticePage(const std::string& reason) {
     std::string page = resourceText("notice.html");
     g_autofree char* valid = g_utf8_make_valid(reason.c_str(), -1);
     g_autofree char* markup = g_markup_escape_text(valid, -1);
-    replace(page, "@CHANNEL@", std::to_string(channel));
     replace(page, "@REASON@", markup);
     return page;
 }

@@ -2,13 +2,12 @@
 #ifndef TELIX_DESKTOP_WINDOW_SHARED_NOTICE_H
 #define TELIX_DESKTOP_WINDOW_SHARED_NOTICE_H
 
-#include <cstdint>
 #include <string>
 
 namespace desktop {
 
-// The page as HTML. It shows the reason, and the channel of that number, if it is not 0, beneath.
-std::string noticePage(const std::string& reason, uint32_t channel);
+// The page as HTML, which shows the reason over the video plane.
+std::string noticePage(const std::string& reason);
 
 } // namespace desktop
 

@@ -23,8 +23,10 @@ public:
         std::optional<std::string> error;
     };
 
+    // An application of the stack.
     struct RunningApplication {
         std::string url;
+        std::string id; // as in dvb://current.ait/ORG.APP; empty unless it is signalled
         bool isVisible = false;
     };
 
@@ -34,8 +36,10 @@ public:
     virtual bool hasApplication() const = 0;
     // Whether the topmost application has a document and loads no other.
     virtual bool isTopLoaded() const = 0;
-    // Presses and releases a key, for the topmost application. Done when the page has handled both and, if it
-    // has gone to another page, loads that.
+    // Whether there is no application and the channel that is on starts none by itself.
+    virtual bool isIdle() const = 0;
+    // Presses and releases a key, for the topmost application or the television. Done when the page has
+    // handled both and, if it has gone to another page, loads that.
     virtual void press(const RemoteKey& key, std::function<void()> done) = 0;
     // Evaluates an expression in the topmost application.
     virtual void evaluate(const std::string& expression, std::function<void(Evaluation)> done) = 0;

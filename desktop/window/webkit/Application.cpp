@@ -15,7 +15,6 @@ namespace desktop {
 namespace {
 
 constexpr char kHbbtvType[] = "application/vnd.hbbtv.xhtml+xml";
-constexpr char kEmptyPage[] = "about:blank";
 // A plug-in ends some of its objects on later turns of the web process's main loop.
 constexpr int kTurnsOfTeardown = 10;
 // After that the web process is taken as one that hangs.
@@ -303,15 +302,36 @@ void Application::readKeySet(std::function<void(Application*, uint32_t)> done) {
         onReply);
 }
 
-void Application::tune(uint32_t number) {
-    webkit_web_view_send_message_to_page(m_view,
-                                         webkit_user_message_new(kTuneMessage, g_variant_new_uint32(number)),
-                                         nullptr, nullptr, nullptr);
+void Application::tune(uint32_t number, const Television::OnChannel& done) {
+    changeChannel(kTuneMessage, g_variant_new_uint32(number), done);
 }
 
-void Application::stepChannel(int positions) {
+void Application::stepChannel(int positions, const Television::OnChannel& done) {
+    changeChannel(kStepMessage, g_variant_new_int32(positions), done);
+}
+
+void Application::changeChannel(const char* message, GVariant* parameters,
+                                const Television::OnChannel& done) {
     webkit_web_view_send_message_to_page(
-        m_view, webkit_user_message_new(kStepMessage, g_variant_new_int32(positions)), nullptr, nullptr,
+        m_view, webkit_user_message_new(message, parameters), m_calls,
+        [](GObject* view, GAsyncResult* result, gpointer data) {
+            const std::unique_ptr<Television::OnChannel> done(static_cast<Television::OnChannel*>(data));
+            WebKitUserMessage* reply =
+                webkit_web_view_send_message_to_page_finish(WEBKIT_WEB_VIEW(view), result, nullptr);
+            if (GVariant* channel = reply ? webkit_user_message_get_parameters(reply) : nullptr) {
+                guint32 number = 0;
+                const char* name = nullptr;
+                g_variant_get(channel, "(u&s)", &number, &name);
+                (*done)(number, name);
+            }
+            g_clear_object(&reply);
+        },
+        new Television::OnChannel(done));
+}
+
+void Application::setVolume(uint32_t volume) {
+    webkit_web_view_send_message_to_page(
+        m_view, webkit_user_message_new(kVolumeMessage, g_variant_new_uint32(volume)), nullptr, nullptr,
         nullptr);
 }
 

@@ -10,10 +10,14 @@
 #include <vector>
 
 #include "desktop/window/shared/ScriptedWindow.h"
+#include "desktop/window/shared/Television.h"
 
 namespace desktop {
 
 class Engine;
+
+// A page without anything.
+constexpr char kEmptyPage[] = "about:blank";
 
 // Main thread. Callbacks are not called after the destruction, and in it only where the function says so.
 class Application {
@@ -61,9 +65,11 @@ public:
     // Reads the mask of the key groups that pages receive; all if the platform library has no key set. Called
     // also if the application ends before, with null.
     void readKeySet(std::function<void(Application*, uint32_t keySet)> done);
-    // Tunes to a channel by its number, or by its position after the one that is on.
-    void tune(uint32_t number);
-    void stepChannel(int positions);
+    // Functions of the platform library, see Television::Library. `done` is not called if the application
+    // ends before.
+    void tune(uint32_t number, const Television::OnChannel& done);
+    void stepChannel(int positions, const Television::OnChannel& done);
+    void setVolume(uint32_t volume);
     // Sends the press (`isRepeat`: a repeated one) or the release of a key to the page.
     void sendPress(const RemoteKey& key, bool isRepeat);
     void sendRelease(const RemoteKey& key);
@@ -90,6 +96,7 @@ private:
     bool onLoadFailed(const char* url, const GError& error);
     bool onScriptDialog(WebKitScriptDialog& dialog);
     void updateVisibility();
+    void changeChannel(const char* message, GVariant* parameters, const Television::OnChannel& done);
     void dispatchKeyEvent(const char* type, const RemoteKey& key, bool isRepeat);
     void sendKeyEvent(GdkEventType type, const RemoteKey& key);
     void onUnloaded();

@@ -13,6 +13,9 @@ namespace desktop {
 
 namespace {
 
+// The plug-in sends events only to elements with an id.
+constexpr char kIdPrefix[] = "telix-object-";
+
 // A television has no scroll bars.
 constexpr char kWindowStyle[] = "::-webkit-scrollbar { display: none !important; }\n";
 
@@ -105,8 +108,8 @@ EngineInformation engineInformation() {
 Engine::Engine(const CommandLine& commandLine, const PluginFile& plugin, const Profile& profile,
                WebProcessOutput& output, PageChannel& channel)
     : m_plugin(plugin), m_output(output), m_channel(channel), m_isAutomated(commandLine.automation),
-      m_context(newContext(profile, m_isAutomated)), m_settings(newSettings(commandLine)),
-      m_content(webkit_user_content_manager_new()) {
+      m_isStrict(commandLine.isStrict), m_context(newContext(profile, m_isAutomated)),
+      m_settings(newSettings(commandLine)), m_content(webkit_user_content_manager_new()) {
     g_signal_connect(m_context, "initialize-web-extensions",
                      G_CALLBACK(+[](WebKitWebContext* context, gpointer engine) {
                          static_cast<Engine*>(engine)->onInitializeExtensions(context);
@@ -157,6 +160,14 @@ void Engine::onInitializeExtensions(WebKitWebContext* context) {
     g_variant_dict_insert(&data, "channel", "i", m_channel.useProcess());
     g_variant_dict_insert(&data, "automation", "b", m_isAutomated);
     g_variant_dict_insert(&data, "sound", "i", m_soundDescriptor);
+    if (!m_isStrict) {
+        g_variant_dict_insert(&data, "ids", "s", kIdPrefix);
+    }
+    const TelevisionStart start = m_start ? m_start() : TelevisionStart();
+    g_variant_dict_insert(&data, "tune", "u", start.channel);
+    g_variant_dict_insert(&data, "signal", "s", start.signalUrl.c_str());
+    g_variant_dict_insert(&data, "signal-channel", "u", start.signalChannel);
+    g_variant_dict_insert(&data, "volume", "u", start.volume);
     webkit_web_context_set_web_extensions_initialization_user_data(context, g_variant_dict_end(&data));
 }
 

@@ -4,7 +4,11 @@
 
 #include <webkit2/webkit2.h>
 
+#include <functional>
 #include <string>
+#include <utility>
+
+#include "desktop/window/shared/TelevisionLibrary.h"
 
 namespace desktop {
 
@@ -29,10 +33,12 @@ public:
 
     // The descriptor that web processes which are started from now on send sound to.
     void setSoundDescriptor(int descriptor) { m_soundDescriptor = descriptor; }
+    // What the television starts with in each web process; asked before its start.
+    void setTelevisionStart(std::function<TelevisionStart()> start) { m_start = std::move(start); }
 
+    WebKitWebContext* context() const { return m_context; }
     // Returns a new view with a floating reference. `related`: a view whose web process the new one shares,
     // or null. One process for all applications of a window: the platform library is in it.
-    WebKitWebContext* context() const { return m_context; }
     WebKitWebView* newView(WebKitWebView* related) const;
 
     // Lets the video plane show through a view. Without a GPU a view begins without OpenGL and opaque,
@@ -46,7 +52,9 @@ private:
     const PluginFile& m_plugin;
     WebProcessOutput& m_output;
     PageChannel& m_channel;
-    bool m_isAutomated;
+    const bool m_isAutomated;
+    const bool m_isStrict;
+    std::function<TelevisionStart()> m_start;
     int m_soundDescriptor = -1;
     WebKitWebContext* m_context;
     WebKitSettings* m_settings;

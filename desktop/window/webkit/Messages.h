@@ -7,12 +7,15 @@ namespace desktop {
 // To a page, without parameters. The reply has the mask of the key groups that pages receive (u), or none if
 // the platform library has no key set.
 constexpr char kKeySetMessage[] = "telix-key-set";
-// To a page: tune to the channel of that number (u).
+// To a page: tune to the channel of that number (u). The reply has number and name of the channel that is on
+// then (us), or none without a library.
 constexpr char kTuneMessage[] = "telix-tune";
-// To a page: tune to the channel so many positions after the one that is on (i).
+// To a page: tune to the channel so many positions after the one that is on (i). The reply is the same.
 constexpr char kStepMessage[] = "telix-step";
-// To the window's context: the number of the channel that is on (u).
-constexpr char kChannelMessage[] = "telix-channel";
+// To a page: the volume of the set (u).
+constexpr char kVolumeMessage[] = "telix-volume";
+// To the window's context: what the channel that is on signals, see SignallingMessage.h.
+constexpr char kSignallingMessage[] = "telix-signalling";
 // To the window's context: a request of the control socket (s). The reply has the response (s).
 constexpr char kControlMessage[] = "telix-control";
 

@@ -7,12 +7,13 @@
 #include <utility>
 
 #include "desktop/window/shared/CommandLine.h"
-#include "desktop/window/shared/LoadCheck.h"
+#include "desktop/window/shared/Diagnostics.h"
 #include "desktop/window/shared/Notice.h"
 #include "desktop/window/shared/PageGeometry.h"
 #include "desktop/window/webkit/Engine.h"
 #include "desktop/window/webkit/MainLoop.h"
 #include "desktop/window/webkit/Messages.h"
+#include "desktop/window/webkit/SignallingMessage.h"
 
 namespace desktop {
 
@@ -23,6 +24,8 @@ constexpr int kOkKeyCode = 13;
 // How long a WebDriver session waits for the end of a page; longer than the time limit of
 // Application::unload().
 constexpr unsigned kCloseTimeoutMs = 10000;
+// The one that is on at first.
+constexpr uint32_t kFirstChannel = 1;
 
 GtkWidget* newBlackArea() {
     GtkWidget* area = gtk_drawing_area_new();
@@ -52,44 +55,47 @@ std::string writePng(cairo_surface_t* image, const std::string& file) {
     return isWritten && isClosed ? "" : g_strerror(errno);
 }
 
-// A check of a page, whose server may take some seconds to respond, on a thread of its own.
-struct LoadCheck {
+// The search for what a URL leads to, whose server may take some seconds to respond, on a thread of its own.
+struct TargetSearch {
     std::string url;
     std::string userAgent;
-    std::string error;
-    std::function<void(const std::string& error)> done;
+    std::vector<SignalledApplication> signalled;
+    ApplicationTarget target;
+    std::function<void(const ApplicationTarget& target)> done;
 };
 
-void deleteLoadCheck(gpointer check) {
-    delete static_cast<LoadCheck*>(check);
+void deleteTargetSearch(gpointer search) {
+    delete static_cast<TargetSearch*>(search);
 }
 
-void checkLoad(const std::string& url, const std::string& userAgent, GCancellable* calls,
-               std::function<void(const std::string& error)> done) {
+void findTarget(TargetSearch search, GCancellable* calls) {
     g_autoptr(GTask) task = g_task_new(
         nullptr, calls,
         [](GObject*, GAsyncResult* result, gpointer) {
-            auto* check = static_cast<LoadCheck*>(g_task_get_task_data(G_TASK(result)));
+            auto* search = static_cast<TargetSearch*>(g_task_get_task_data(G_TASK(result)));
             if (g_task_propagate_boolean(G_TASK(result), nullptr)) {
-                check->done(check->error);
+                search->done(search->target);
             }
         },
         nullptr);
-    g_task_set_task_data(task, new LoadCheck{url, userAgent, {}, std::move(done)}, deleteLoadCheck);
+    g_task_set_task_data(task, new TargetSearch(std::move(search)), deleteTargetSearch);
     g_task_run_in_thread(task, [](GTask* task, gpointer, gpointer data, GCancellable*) {
-        auto* check = static_cast<LoadCheck*>(data);
-        check->error = loadError(check->url, check->userAgent);
+        auto* search = static_cast<TargetSearch*>(data);
+        search->target = findApplication(search->url, search->userAgent, search->signalled);
         g_task_return_boolean(task, TRUE);
     });
 }
 
 } // namespace
 
-TvWindow::TvWindow(const Engine& engine, PageChannel& channel, const CommandLine& commandLine)
+TvWindow::TvWindow(Engine& engine, PageChannel& channel, const CommandLine& commandLine)
     : m_engine(engine), m_channel(channel), m_userAgent(commandLine.userAgent),
       m_window(gtk_window_new(GTK_WINDOW_TOPLEVEL)), m_overlay(gtk_overlay_new()),
-      m_keys({[this] { return m_stack.top(); }, [this](const RemoteKey& key) { onTelevisionKey(key); }}),
+      m_keys({[this] { return m_stack.top(); }, [this](const RemoteKey& key) { m_television.onKey(key); }}),
+      m_television(libraryCalls(), stackCalls(), [this](const std::string& text) { m_display.show(text); }),
+      m_start{commandLine.channel, commandLine.signalUrl, std::max(commandLine.channel, kFirstChannel)},
       m_calls(g_cancellable_new()) {
+    engine.setTelevisionStart([this] { return televisionStart(); });
     m_channel.setHandler(
         [this](uint64_t page, const std::string& function, const std::string& argument,
                const PageChannel::Reply& reply) { onPageCall(page, function, argument, reply); });
@@ -103,6 +109,8 @@ TvWindow::TvWindow(const Engine& engine, PageChannel& channel, const CommandLine
     });
     m_video.showFramesOf(engine.context());
     gtk_overlay_add_overlay(GTK_OVERLAY(m_overlay), m_video.widget());
+    gtk_overlay_add_overlay(GTK_OVERLAY(m_overlay), m_display.widget());
+    gtk_overlay_set_overlay_pass_through(GTK_OVERLAY(m_overlay), m_display.widget(), TRUE);
     g_signal_connect(
         m_overlay, "get-child-position",
         G_CALLBACK(+[](GtkOverlay*, GtkWidget*, GdkRectangle* area, gpointer window) -> gboolean {
@@ -137,6 +145,7 @@ TvWindow::~TvWindow() {
     g_cancellable_cancel(m_calls);
     g_object_unref(m_calls);
     m_channel.setHandler(nullptr);
+    m_engine.setTelevisionStart(nullptr);
     m_stack.clear();
     for (const auto& application : m_applications) {
         application->forgetCalls();
@@ -150,10 +159,14 @@ TvWindow::~TvWindow() {
 
 // Returns whether the message is the window's.
 bool TvWindow::onMessage(WebKitUserMessage& message) {
-    if (g_strcmp0(webkit_user_message_get_name(&message), kChannelMessage) != 0) {
+    if (g_strcmp0(webkit_user_message_get_name(&message), kSignallingMessage) != 0) {
         return false;
     }
-    m_lastChannel = g_variant_get_uint32(webkit_user_message_get_parameters(&message));
+    Signalling signalling = signallingOf(webkit_user_message_get_parameters(&message));
+    if (signalling.channel != 0) {
+        m_start.channel = signalling.channel;
+    }
+    m_television.applications().update(std::move(signalling));
     return true;
 }
 
@@ -181,15 +194,91 @@ void TvWindow::place(GtkAllocation& area) const {
     area = {page.x, page.y, page.width, page.height};
 }
 
-Application& TvWindow::pushApplication() {
+Application& TvWindow::addApplication() {
     const Application* related = m_applications.empty() ? nullptr : m_applications.back().get();
     m_applications.push_back(std::make_unique<Application>(m_engine, related, *this));
     Application& application = *m_applications.back();
     gtk_overlay_add_overlay(GTK_OVERLAY(m_overlay), application.widget());
+    gtk_overlay_reorder_overlay(GTK_OVERLAY(m_overlay), m_display.widget(), -1);
+    return application;
+}
+
+Application& TvWindow::pushApplication() {
+    Application& application = addApplication();
     m_stack.push(application);
     updateInspector();
     return application;
 }
+
+void TvWindow::openApplication(const std::string& url) {
+    pushApplication().load(url);
+}
+
+// The platform library is in a web process, which needs a page.
+void TvWindow::showChannel() {
+    addApplication().load(kEmptyPage);
+}
+
+// The engine would show the page with which a server reports an error.
+Application* TvWindow::openSignalled(const std::string& url) {
+    Application& application = pushApplication();
+    findTarget({url,
+                m_userAgent,
+                {},
+                {},
+                [this, page = application.pageId()](const ApplicationTarget& target) {
+                    Application* opened = applicationOf(page);
+                    if (opened && target.error.empty()) {
+                        opened->load(target.url);
+                    } else if (opened) {
+                        onLoadFailed(*opened, target.url, target.error);
+                    }
+                }},
+               m_calls);
+    return &application;
+}
+
+// ---- The television
+
+Television::Library TvWindow::libraryCalls() {
+    // The library can be reached as long as there is a page, also of an application that has ended.
+    Television::Library calls;
+    calls.tune = [this](uint32_t number, const Television::OnChannel& done) {
+        m_applications.back()->tune(number, done);
+    };
+    calls.step = [this](int positions, const Television::OnChannel& done) {
+        m_applications.back()->stepChannel(positions, done);
+    };
+    calls.setVolume = [this](uint32_t volume) { m_applications.back()->setVolume(volume); };
+    return calls;
+}
+
+SignalledApplications::Window TvWindow::stackCalls() {
+    SignalledApplications::Window calls;
+    calls.hasApplication = [this] { return hasApplication(); };
+    calls.open = [this](const std::string& url) { return openSignalled(url); };
+    calls.end = [this](SignalledApplications::Application application) {
+        removeFrom(*static_cast<const Application*>(application));
+    };
+    calls.endAll = [this] {
+        if (!m_stack.all().empty()) {
+            removeFrom(*m_stack.all().front());
+        }
+    };
+    return calls;
+}
+
+TelevisionStart TvWindow::televisionStart() const {
+    TelevisionStart start = m_start;
+    start.volume = m_television.volume();
+    return start;
+}
+
+bool TvWindow::isIdle() const {
+    return !m_stack.top() && m_television.applications().signalling().state == TELIX_DESKTOP_SIGNALLING_KNOWN;
+}
+
+// ---- The stack
 
 Application* TvWindow::applicationOf(uint64_t page) const {
     const auto& all = m_stack.all();
@@ -212,27 +301,55 @@ void TvWindow::onPageCall(uint64_t page, const std::string& function, const std:
         return;
     }
     if (function == "destroy") {
-        remove(*m_stack.top());
+        remove(*caller);
     } else if (function == "show" || function == "hide") {
         caller->setShown(function == "show");
     } else if (const RemoteKey* key = function == "key" ? remoteKeyByName(argument) : nullptr) {
-        onTelevisionKey(*key);
+        m_television.onKey(*key);
     }
     reply(true);
 }
 
 void TvWindow::createApplication(uint64_t caller, const std::string& url, const PageChannel::Reply& reply) {
-    checkLoad(url, m_userAgent, m_calls, [this, caller, url, reply](const std::string& error) {
-        const bool isCreated = error.empty() && applicationOf(caller);
-        if (isCreated) {
-            openApplication(url);
-        }
-        reply(isCreated);
-    });
+    const auto report = [&url](const std::string& reason) {
+        printError("cannot load " + url + ": " + reason);
+    };
+    if (!m_stack.hasSpace(report)) {
+        reply(false);
+        return;
+    }
+    findTarget({url,
+                m_userAgent,
+                m_television.applications().signalling().applications,
+                {},
+                [this, caller, reply](const ApplicationTarget& target) {
+                    const bool isCreated = target.error.empty() && applicationOf(caller);
+                    if (isCreated) {
+                        openTarget(target);
+                    }
+                    reply(isCreated);
+                }},
+               m_calls);
+}
+
+void TvWindow::openTarget(const ApplicationTarget& target) {
+    Application& application = pushApplication();
+    if (target.signalled) {
+        m_television.applications().onOpened(&application, *target.signalled);
+    }
+    application.load(target.url);
+}
+
+// The application and those above it.
+void TvWindow::removeFrom(const Application& lowest) {
+    while (m_stack.has(lowest)) {
+        remove(*m_stack.top());
+    }
 }
 
 void TvWindow::remove(Application& application) {
     m_stack.remove(application);
+    m_television.applications().onEnded(&application);
     updateInspector();
     application.unload([this, &application] { erase(application); });
 }
@@ -268,6 +385,10 @@ void TvWindow::onLoadFailed(Application& application, const std::string& url, co
     }
     // A WebDriver session loads another document.
     if (!application.hasDocument() && !application.isAutomated()) {
+        if (m_television.applications().onLoadFailed(&application)) {
+            printError("cannot load " + url + ": " + reason);
+            return;
+        }
         remove(application);
     }
     if (m_reports.loadFailed) {
@@ -277,8 +398,12 @@ void TvWindow::onLoadFailed(Application& application, const std::string& url, co
 
 void TvWindow::onCrashed(Application& application, WebKitWebProcessTerminationReason reason) {
     m_video.dropFrames();
+    m_television.applications().onLibraryEnded();
     // Each application reports it.
-    if (m_stack.top() == &application && m_reports.crashed) {
+    if (!m_stack.top() && m_applications.back().get() == &application) {
+        printError("the web process has ended, starting it again");
+        application.load(kEmptyPage);
+    } else if (m_stack.top() == &application && m_reports.crashed) {
         m_hasCrashed = true;
         m_reports.crashed(reason);
     }
@@ -287,6 +412,7 @@ void TvWindow::onCrashed(Application& application, WebKitWebProcessTerminationRe
 // The driver kills the television when this returns and no application is left.
 void TvWindow::onClosed(Application& application) {
     m_stack.remove(application);
+    m_television.applications().onEnded(&application);
     updateInspector();
     runUntilDone([&application](std::function<void()> done) { application.unload(std::move(done)); },
                  kCloseTimeoutMs);
@@ -298,7 +424,7 @@ void TvWindow::onClosed(Application& application) {
 }
 
 void TvWindow::showNotice(const std::string& reason) {
-    m_stack.top()->showNotice(noticePage(reason, m_lastChannel));
+    m_stack.top()->showNotice(noticePage(reason));
 }
 
 void TvWindow::restart() {
@@ -333,6 +459,8 @@ void TvWindow::updateInspector() {
 }
 
 void TvWindow::unload(const std::function<void()>& done) {
+    // What the channel signals starts nothing any more.
+    g_signal_handlers_disconnect_by_data(m_engine.context(), this);
     m_stack.clear();
     if (m_hasCrashed) {
         done();
@@ -388,22 +516,6 @@ bool TvWindow::onKey(const GdkEventKey& event) {
     return true;
 }
 
-// Digits and channel keys select a channel; EXIT ends the applications.
-void TvWindow::onTelevisionKey(const RemoteKey& key) {
-    // The platform library can be reached as long as there is a page, also of an application that has ended.
-    Application& page = *m_applications.back();
-    const std::string name = key.name;
-    if (key.group == KeyGroupNumeric) {
-        page.tune(static_cast<uint32_t>(key.keyCode - '0'));
-    } else if (name == "channel-up" || name == "channel-down") {
-        page.stepChannel(name == "channel-up" ? 1 : -1);
-    } else if (name == "exit") {
-        while (m_stack.top()) {
-            remove(*m_stack.top());
-        }
-    }
-}
-
 void TvWindow::evaluate(const std::string& expression, std::function<void(Evaluation)> done) {
     Application* top = m_stack.top();
     if (!top) {
@@ -435,34 +547,45 @@ void TvWindow::paint(uint8_t* pixels, int stride) {
 }
 
 void TvWindow::open(const std::string& url, std::function<void(const std::string& error)> done) {
-    checkLoad(url, m_userAgent, m_calls, [this, url, done = std::move(done)](const std::string& error) {
-        if (!error.empty()) {
-            done(error);
-            return;
-        }
-        m_hasCrashed = false;
-        removeAll([this, url, done] {
-            openApplication(url);
-            done({});
-        });
-    });
+    findTarget({url,
+                m_userAgent,
+                m_television.applications().signalling().applications,
+                {},
+                [this, done = std::move(done)](const ApplicationTarget& target) {
+                    if (!target.error.empty()) {
+                        done(target.error);
+                        return;
+                    }
+                    m_hasCrashed = false;
+                    removeAll([this, target, done] {
+                        openTarget(target);
+                        done({});
+                    });
+                }},
+               m_calls);
 }
 
 void TvWindow::reload(std::function<void(const std::string& error)> done) {
     const char* url = m_stack.top() ? webkit_web_view_get_uri(m_stack.top()->view()) : nullptr;
-    checkLoad(url ? url : "", m_userAgent, m_calls, [this, done = std::move(done)](const std::string& error) {
-        if (error.empty()) {
-            restart();
-        }
-        done(error);
-    });
+    findTarget({url ? url : "",
+                m_userAgent,
+                {},
+                {},
+                [this, done = std::move(done)](const ApplicationTarget& target) {
+                    if (target.error.empty()) {
+                        restart();
+                    }
+                    done(target.error);
+                }},
+               m_calls);
 }
 
 std::vector<ScriptedWindow::RunningApplication> TvWindow::applications() const {
     std::vector<RunningApplication> running;
-    for (const Application* application : m_stack.all()) {
-        const char* url = webkit_web_view_get_uri(application->view());
-        running.insert(running.begin(), {url ? url : "", application->isVisible()});
+    for (const Application* each : m_stack.all()) {
+        const char* url = webkit_web_view_get_uri(each->view());
+        running.insert(running.begin(),
+                       {url ? url : "", m_television.applications().idOf(each), each->isVisible()});
     }
     return running;
 }
@@ -500,6 +623,9 @@ std::string TvWindow::paintScreenshot(const std::string& file, cairo_surface_t* 
         cairo_rectangle(context, 0, 0, kPageWidth, kPageHeight);
         cairo_fill(context);
     }
+    cairo_identity_matrix(context);
+    cairo_translate(context, area.x, area.y);
+    m_display.paint(context, area.width, area.height);
     cairo_destroy(context);
     std::string error = writePng(image, file);
     cairo_surface_destroy(image);

@@ -10,9 +10,13 @@
 #include <vector>
 
 #include "desktop/window/shared/ApplicationStack.h"
+#include "desktop/window/shared/ApplicationTarget.h"
 #include "desktop/window/shared/ScriptedWindow.h"
+#include "desktop/window/shared/Television.h"
+#include "desktop/window/shared/TelevisionLibrary.h"
 #include "desktop/window/webkit/Application.h"
 #include "desktop/window/webkit/KeyRouter.h"
+#include "desktop/window/webkit/OnScreenDisplay.h"
 #include "desktop/window/webkit/PageChannel.h"
 #include "desktop/window/webkit/VideoWidget.h"
 
@@ -37,7 +41,7 @@ public:
     };
 
     // The references must outlive the object.
-    TvWindow(const Engine& engine, PageChannel& channel, const CommandLine& commandLine);
+    TvWindow(Engine& engine, PageChannel& channel, const CommandLine& commandLine);
     ~TvWindow() override;
     TvWindow(const TvWindow&) = delete;
     TvWindow& operator=(const TvWindow&) = delete;
@@ -45,7 +49,9 @@ public:
     void setReports(Reports reports) { m_reports = std::move(reports); }
 
     // Pushes a new application and starts to load its page.
-    void openApplication(const std::string& url) { pushApplication().load(url); }
+    void openApplication(const std::string& url);
+    // Shows the channel and starts what it signals.
+    void showChannel();
     // Pushes a new application without a document. The window owns it.
     Application& pushApplication();
     // Shows a notice in place of the applications, whose web process has ended by itself. OK loads them
@@ -58,6 +64,7 @@ public:
 
     bool hasApplication() const override { return m_stack.top() != nullptr; }
     bool isTopLoaded() const override;
+    bool isIdle() const override;
     void press(const RemoteKey& key, std::function<void()> done) override;
     void evaluate(const std::string& expression, std::function<void(Evaluation)> done) override;
     bool hasPicture() const override;
@@ -74,10 +81,16 @@ private:
     void onClosed(Application& application) override;
     void onPageCall(uint64_t page, const std::string& function, const std::string& argument,
                     const PageChannel::Reply& reply);
+    void removeFrom(const Application& lowest);
     void createApplication(uint64_t caller, const std::string& url, const PageChannel::Reply& reply);
     bool onMessage(WebKitUserMessage& message);
     bool onKey(const GdkEventKey& event);
-    void onTelevisionKey(const RemoteKey& key);
+    Television::Library libraryCalls();
+    SignalledApplications::Window stackCalls();
+    TelevisionStart televisionStart() const;
+    Application& addApplication();
+    Application* openSignalled(const std::string& url);
+    void openTarget(const ApplicationTarget& target);
     void restart();
     void place(GtkAllocation& area) const;
     void show(const CommandLine& commandLine);
@@ -88,7 +101,7 @@ private:
     void updateInspector();
     std::string paintScreenshot(const std::string& file, cairo_surface_t* page) const;
 
-    const Engine& m_engine;
+    Engine& m_engine;
     PageChannel& m_channel;
     std::string m_userAgent;
     Reports m_reports;
@@ -104,8 +117,9 @@ private:
     KeyRouter m_keys;
     // The key that is held down, or null.
     const RemoteKey* m_heldKey = nullptr;
-    // The number of the channel that was on last; 0 if none was.
-    uint32_t m_lastChannel = 0;
+    Television m_television;
+    OnScreenDisplay m_display;
+    TelevisionStart m_start;
     // Whether the web process has ended by itself and the applications have not been loaded again.
     bool m_hasCrashed = false;
     // Cancelled in the destructor.

@@ -10,7 +10,7 @@
 #include "desktop/window/shared/Automation.h"
 #include "desktop/window/shared/CommandLine.h"
 #include "desktop/window/shared/Diagnostics.h"
-#include "desktop/window/shared/LoadCheck.h"
+#include "desktop/window/shared/FirstPage.h"
 #include "desktop/window/shared/PluginFile.h"
 #include "desktop/window/webkit/AutomationSession.h"
 #include "desktop/window/webkit/ChildProcesses.h"
@@ -64,9 +64,10 @@ std::string crashReason(WebKitWebProcessTerminationReason reason, const std::str
     return "the web process has been terminated";
 }
 
-// Runs the window until it exits, and destroys it with all pages. `evaluated` receives the value of --eval.
-int runWindow(const CommandLine& commandLine, const PluginFile& plugin, const Profile& profile,
-              std::optional<std::string>& evaluated) {
+// Runs the window until it exits, and destroys it with all pages. `page`: to open; empty for the channel
+// alone. `evaluated` receives the value of --eval.
+int runWindow(const CommandLine& commandLine, const std::string& page, const PluginFile& plugin,
+              const Profile& profile, std::optional<std::string>& evaluated) {
     WebProcessOutput output;
     PageChannel channel;
     Engine engine(commandLine, plugin, profile, output, channel);
@@ -100,8 +101,12 @@ int runWindow(const CommandLine& commandLine, const PluginFile& plugin, const Pr
     g_unix_signal_add(SIGINT, onTermination<SIGINT>, &run);
     g_unix_signal_add(SIGTERM, onTermination<SIGTERM>, &run);
     g_unix_signal_add(SIGHUP, onTermination<SIGHUP>, &run);
-    if (!commandLine.automation) {
-        window.openApplication(commandLine.page);
+    if (commandLine.automation) {
+        // The session opens the pages.
+    } else if (page.empty()) {
+        window.showChannel();
+    } else {
+        window.openApplication(page);
     }
     if (commandLine.inspect) {
         window.inspect();
@@ -112,6 +117,7 @@ int runWindow(const CommandLine& commandLine, const PluginFile& plugin, const Pr
 }
 
 int runBrowser(const CommandLine& commandLine) {
+    escapeEvents(commandLine);
     if (!gtk_init_check(nullptr, nullptr)) {
         printError("no display: cannot connect to DISPLAY or WAYLAND_DISPLAY");
         return kExitBadInput;
@@ -121,10 +127,8 @@ int runBrowser(const CommandLine& commandLine) {
         printError("cannot load plug-in " + commandLine.plugin + ": " + plugin.failure());
         return kExitBadInput;
     }
-    const std::string error =
-        commandLine.automation ? "" : loadError(commandLine.page, commandLine.userAgent);
-    if (!error.empty()) {
-        printError("cannot load " + commandLine.page + ": " + error);
+    const std::optional<std::string> page = pageOf(commandLine);
+    if (!page) {
         return kExitBadInput;
     }
     const Profile profile(commandLine.profile);
@@ -133,7 +137,7 @@ int runBrowser(const CommandLine& commandLine) {
         return kExitBadInput;
     }
     std::optional<std::string> evaluated;
-    const int exitStatus = runWindow(commandLine, plugin, profile, evaluated);
+    const int exitStatus = runWindow(commandLine, *page, plugin, profile, evaluated);
     // What a profile keeps is written by the engine's processes when they end.
     endChildProcesses(commandLine.profile.empty() ? 0 : kProfileTimeoutMs);
     // The last line of the output, after what the plug-in logs in its teardown.

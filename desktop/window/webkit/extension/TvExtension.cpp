@@ -32,6 +32,25 @@ bool isAutomated(GVariant* data) {
     return automation;
 }
 
+std::string stringFrom(GVariant* data, const char* name) {
+    const char* text = nullptr;
+    if (data && g_variant_is_of_type(data, G_VARIANT_TYPE_VARDICT)) {
+        g_variant_lookup(data, name, "&s", &text);
+    }
+    return text ? text : "";
+}
+
+TelevisionStart startFrom(GVariant* data) {
+    TelevisionStart start;
+    start.signalUrl = stringFrom(data, "signal");
+    if (data && g_variant_is_of_type(data, G_VARIANT_TYPE_VARDICT)) {
+        g_variant_lookup(data, "signal-channel", "u", &start.signalChannel);
+        g_variant_lookup(data, "tune", "u", &start.channel);
+        g_variant_lookup(data, "volume", "u", &start.volume);
+    }
+    return start;
+}
+
 // What the process prints goes to the window.
 void redirect(int descriptor, int inherited) {
     if (inherited >= 0) {
@@ -53,7 +72,7 @@ webkit_web_extension_initialize_with_user_data(WebKitWebExtension* extension, co
         desktop::addSessionKeys();
     }
     desktop::sendFrames(extension);
-    desktop::answerViewerMessages(extension);
+    desktop::serveTelevision(extension, desktop::stringFrom(data, "plugin"), desktop::startFrom(data));
     desktop::forwardControlRequests(extension);
     desktop::sendSound(desktop::descriptorFrom(data, "sound"));
 }

@@ -1,0 +1,31 @@
+// What the command line lets the window show first.
+#include "desktop/window/shared/FirstPage.h"
+
+#include "desktop/window/shared/ApplicationTarget.h"
+#include "desktop/window/shared/CommandLine.h"
+#include "desktop/window/shared/Diagnostics.h"
+#include "desktop/window/shared/LoadCheck.h"
+
+namespace desktop {
+
+std::optional<std::string> pageOf(const CommandLine& commandLine) {
+    const auto refuse = [](const std::string& url, const std::string& error) {
+        printError("cannot load " + url + ": " + error);
+        return std::nullopt;
+    };
+    if (!commandLine.signalUrl.empty()) {
+        const std::string error = loadError(commandLine.signalUrl, commandLine.userAgent);
+        if (!error.empty()) {
+            return refuse(commandLine.signalUrl, error);
+        }
+    }
+    if (commandLine.page.empty()) {
+        return std::string();
+    }
+    const ApplicationTarget target = commandLine.isXmlAit
+                                         ? findApplicationOfXmlAit(commandLine.page, commandLine.userAgent)
+                                         : findApplication(commandLine.page, commandLine.userAgent, {});
+    return target.error.empty() ? std::optional(target.url) : refuse(commandLine.page, target.error);
+}
+
+} // namespace desktop

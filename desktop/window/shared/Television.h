@@ -1,0 +1,58 @@
+// What a television does by itself, whatever its window's toolkit: the keys that no page gets, the on-screen
+// display that answers them, and the applications that the broadcast signals.
+#ifndef TELIX_DESKTOP_WINDOW_SHARED_TELEVISION_H
+#define TELIX_DESKTOP_WINDOW_SHARED_TELEVISION_H
+
+#include <cstdint>
+#include <functional>
+#include <string>
+
+#include "desktop/window/shared/RemoteControl.h"
+#include "desktop/window/shared/SignalledApplications.h"
+
+namespace desktop {
+
+// Main thread.
+class Television {
+public:
+    // Receives the channel that is on then; 0 and an empty name if there is none.
+    using OnChannel = std::function<void(uint32_t number, const std::string& name)>;
+
+    // The functions of telix_viewer.h, which may be in another process: they call `done` at once or later,
+    // not at all without a library.
+    struct Library {
+        // Tunes to a channel by its number.
+        std::function<void(uint32_t number, OnChannel done)> tune;
+        // Tunes to a channel by its position after the one that is on.
+        std::function<void(int positions, OnChannel done)> step;
+        std::function<void(uint32_t volume)> setVolume;
+    };
+
+    // `display` shows a text of the on-screen display for some seconds.
+    Television(Library library, SignalledApplications::Window window,
+               std::function<void(const std::string& text)> display);
+    Television(const Television&) = delete;
+    Television& operator=(const Television&) = delete;
+
+    // A key that no page gets has been pressed.
+    void onKey(const RemoteKey& key);
+
+    // 0 to 100, for a library that starts again.
+    uint32_t volume() const { return m_volume; }
+
+    SignalledApplications& applications() { return m_applications; }
+    const SignalledApplications& applications() const { return m_applications; }
+
+private:
+    void setVolume(uint32_t volume);
+
+    Library m_library;
+    std::function<void(const std::string& text)> m_display;
+    SignalledApplications m_applications;
+    uint32_t m_volume = 100;
+    uint32_t m_volumeBeforeMute = 0; // 0: not muted
+};
+
+} // namespace desktop
+
+#endif
