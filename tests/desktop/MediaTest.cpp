@@ -524,20 +524,22 @@ TEST_F(MediaTest, TheFrameNamesTheObjectThatPresents) {
     const uint64_t before = telix_desktop_newest_presenter();
     TELIX_JS_VB_HANDLE object = 0;
     ASSERT_EQ(TELIX_JS_VB_GetHandle(&object), 0);
-    EXPECT_EQ(telix_desktop_newest_presenter(), before + 1);
+    const uint64_t broadcast = telix_desktop_newest_presenter();
+    EXPECT_GT(broadcast, before);
     TELIX_JS_AV_HANDLE other = 0;
     ASSERT_EQ(TELIX_JS_AV_CreatePlayer(&other, 0, 0, 0), 0);
-    EXPECT_EQ(telix_desktop_newest_presenter(), before + 2);
+    const uint64_t player = telix_desktop_newest_presenter();
+    EXPECT_EQ(player, broadcast + 1);
     const auto isPresentedBy = [](uint64_t presenter) {
         return waitUntil([=] { return takeShot().isVisible && takeShot().presenter == presenter; });
     };
     ASSERT_EQ(TELIX_JS_AV_Play(other, file("second.mp4").c_str(), 10, 6, 1280, 0, 0, 0), 0);
-    EXPECT_TRUE(isPresentedBy(before + 2));
+    EXPECT_TRUE(isPresentedBy(player));
     ASSERT_EQ(TELIX_JS_VB_BindToCurrChannel(object), 0);
-    EXPECT_TRUE(isPresentedBy(before + 1));
+    EXPECT_TRUE(isPresentedBy(broadcast));
     // One player after the other on one presentation.
     ASSERT_EQ(TELIX_JS_AV_Play(other, file("second.mp4").c_str(), 10, 6, 1280, 0, 0, 0), 0);
-    EXPECT_TRUE(isPresentedBy(before + 2));
+    EXPECT_TRUE(isPresentedBy(player));
     play(file("clip.mp4"));
     EXPECT_TRUE(waitUntil([=] { return takeShot().isVisible && takeShot().presenter <= before; }));
     EXPECT_NE(takeShot().presenter, 0U);

@@ -13,7 +13,10 @@ namespace {
 
 class ApplicationTargetTest : public testing::Test {
 protected:
-    ApplicationTargetTest() : m_folder(g_dir_make_tmp("telix-XXXXXX", nullptr)) {}
+    ApplicationTargetTest() {
+        g_autofree char* folder = g_dir_make_tmp("telix-XXXXXX", nullptr);
+        m_folder = folder;
+    }
     ~ApplicationTargetTest() override {
         for (const std::string& file : m_files) {
             g_unlink(file.c_str());
@@ -112,6 +115,14 @@ TEST_F(ApplicationTargetTest, QueryAndFragmentAreAddedToThoseOfTheSignalling) {
                       .url,
                   page + each.result);
     }
+}
+
+TEST_F(ApplicationTargetTest, AnAddressMayHaveAnyLength) {
+    const std::string page = write("page.html", "x");
+    const std::string query = "?" + std::string(4000000, 'a');
+    EXPECT_EQ(findApplication("dvb://current.ait/1.1" + query, "agent", {signalled(1, 1, page)}).url,
+              page + query);
+    EXPECT_NE(findApplication("dvb://current.ait/" + std::string(4000000, '0'), "agent", {}).error, "");
 }
 
 TEST_F(ApplicationTargetTest, AnApplicationThatIsNotSignalledOrMayNotRunIsRefused) {

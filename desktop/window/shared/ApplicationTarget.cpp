@@ -2,10 +2,10 @@
 #include "desktop/window/shared/ApplicationTarget.h"
 
 #include <algorithm>
-#include <regex>
 
 #include "desktop/platform/XmlAit.h"
 #include "desktop/window/shared/LoadCheck.h"
+#include "desktop/window/shared/Pattern.h"
 
 namespace desktop {
 
@@ -65,12 +65,12 @@ ApplicationTarget targetOfXmlAit(const std::string& document, const std::string&
 
 ApplicationTarget findApplication(const std::string& url, const std::string& userAgent,
                                   const std::vector<SignalledApplication>& signalled) {
-    static const std::regex kSignalledUrl(
-        R"(dvb://current\.ait/0*([0-9a-f]{1,8})\.0*([0-9a-f]{1,4})(\?[^#]*)?(#.*)?)", std::regex::icase);
-    std::smatch parts;
-    if (std::regex_match(url, parts, kSignalledUrl)) {
-        const ApplicationId id{static_cast<uint32_t>(std::stoul(parts[1], nullptr, 16)),
-                               static_cast<uint16_t>(std::stoul(parts[2], nullptr, 16))};
+    static const Pattern kSignalledUrl(
+        R"(dvb://current\.ait/0*([0-9a-f]{1,8})\.0*([0-9a-f]{1,4})(\?[^#]*)?(#.*)?)",
+        Pattern::Case::Insensitive);
+    if (const auto parts = kSignalledUrl.match(url)) {
+        const ApplicationId id{static_cast<uint32_t>(std::stoul((*parts)[1], nullptr, 16)),
+                               static_cast<uint16_t>(std::stoul((*parts)[2], nullptr, 16))};
         const auto found =
             std::find_if(signalled.begin(), signalled.end(), [&id](const SignalledApplication& each) {
                 return each.id == id && each.isStartable();
@@ -79,7 +79,7 @@ ApplicationTarget findApplication(const std::string& url, const std::string& use
             return failure("the channel signals no such application");
         }
         ApplicationTarget target =
-            checkedPage(withQueryAndFragment(found->url, parts[3], parts[4]), userAgent);
+            checkedPage(withQueryAndFragment(found->url, (*parts)[3], (*parts)[4]), userAgent);
         target.signalled = *found;
         return target;
     }

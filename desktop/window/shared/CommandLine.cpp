@@ -6,9 +6,9 @@
 #include <algorithm>
 #include <cmath>
 #include <cstdio>
-#include <regex>
 
 #include "desktop/window/shared/Diagnostics.h"
+#include "desktop/window/shared/Pattern.h"
 #include "desktop/window/shared/ProgramFolder.h"
 
 namespace desktop {
@@ -204,8 +204,8 @@ bool printInformation(const Parser& parser, const Values& values, const EngineIn
 
 // A string with a scheme is a URL, any other a file name.
 std::string urlOf(const std::string& page) {
-    static const std::regex kScheme("^([a-zA-Z][a-zA-Z0-9+.-]*://|data:|about:)");
-    if (std::regex_search(page, kScheme)) {
+    static const Pattern kUrl("([a-zA-Z][a-zA-Z0-9+.-]*://|data:|about:).*");
+    if (kUrl.match(page)) {
         return page;
     }
     g_autoptr(GFile) file = g_file_new_for_path(page.c_str());
@@ -216,11 +216,10 @@ std::string urlOf(const std::string& page) {
 // The following functions return the usage error, an empty string if there is none.
 
 std::string parseSize(const std::string& text, CommandLine& commandLine) {
-    static const std::regex kSize("([1-9][0-9]{0,4})x([1-9][0-9]{0,4})");
-    std::smatch match;
-    if (std::regex_match(text, match, kSize)) {
-        commandLine.width = std::stoi(match[1]);
-        commandLine.height = std::stoi(match[2]);
+    static const Pattern kSize("([1-9][0-9]{0,4})x([1-9][0-9]{0,4})");
+    if (const auto parts = kSize.match(text)) {
+        commandLine.width = std::stoi((*parts)[1]);
+        commandLine.height = std::stoi((*parts)[2]);
         if (commandLine.width <= kMaxSide && commandLine.height <= kMaxSide) {
             return {};
         }

@@ -6,9 +6,9 @@
 #include <unistd.h>
 
 #include <cstdio>
-#include <regex>
 
 #include "desktop/window/shared/Diagnostics.h"
+#include "desktop/window/shared/Pattern.h"
 
 namespace desktop {
 
@@ -17,15 +17,19 @@ namespace {
 // Prints a console message of the engine, URL:LINE:COLUMN: CONSOLE KIND TEXT, if the line is one. The engine
 // knows no place for what a script logs outside of its functions: the message then comes from "page".
 bool printAsConsoleMessage(const std::string& line) {
-    static const std::regex kMessage(
+    static const Pattern kMessage(
         "(?:(.*?):([0-9]+):[0-9]+|\\[native code\\]): CONSOLE "
         "(?:(?:JS|SECURITY|NETWORK|CSS|DEBUG|INFO|LOG|WARN|ERROR|TRACE|DIR|TABLE) )*(.*)");
-    std::smatch match;
-    if (line.find(": CONSOLE ") == std::string::npos || !std::regex_match(line, match, kMessage)) {
+    if (line.find(": CONSOLE ") == std::string::npos) {
         return false;
     }
-    const bool hasPlace = match[1].matched;
-    printConsoleMessage(hasPlace ? match[1].str() : "page", std::atoi(match[2].str().c_str()), match[3]);
+    const auto parts = kMessage.match(line);
+    if (!parts) {
+        return false;
+    }
+    const std::string& lineNumber = (*parts)[2]; // empty if the message has no place
+    printConsoleMessage(lineNumber.empty() ? "page" : (*parts)[1], std::atoi(lineNumber.c_str()),
+                        (*parts)[3]);
     return true;
 }
 
