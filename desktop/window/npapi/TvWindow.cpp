@@ -118,7 +118,9 @@ void TvWindow::onLoadFailed(ApplicationView& application, const QUrl& url, const
 // reports an error.
 ApplicationView& TvWindow::openSignalled(const std::string& url) {
     ApplicationView& application = push();
-    QTimer::singleShot(0, &application, [this, &application, url] {
+    auto* later = new QTimer(&application);
+    later->setSingleShot(true);
+    connect(later, &QTimer::timeout, this, [this, &application, url] {
         const std::string error = loadError(url, m_userAgent.toStdString());
         if (!m_stack.has(application)) {
             return;
@@ -129,6 +131,7 @@ ApplicationView& TvWindow::openSignalled(const std::string& url) {
             onLoadFailed(application, urlOf(url), QString::fromStdString(error));
         }
     });
+    later->start(0);
     return application;
 }
 

@@ -14,8 +14,8 @@ namespace {
 
 // For the life of the process, as the platform library is.
 TelevisionLibrary& library() {
-    static auto* const library = new TelevisionLibrary;
-    return *library;
+    static auto* const kLibrary = new TelevisionLibrary;
+    return *kLibrary;
 }
 
 // Set while a report is scheduled: at most one is.
