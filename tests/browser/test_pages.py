@@ -99,7 +99,7 @@ class Pages(TelixTv):
     def test_console_messages_may_have_any_length(self):
         page = self.write('<script>function say(text) { console.log(text); } say(new Array(1000001).join("x"));</script>')
         run = self.run_tv(page, '--eval', '1')
-        self.assertTrue(run.errors == f'{page}:1: {"x" * 1000000}\n', (run.exit_status, len(run.errors), run.errors[:200]))
+        self.assertTrue(run.errors == f'{page}:1: {"x" * 1000000}\n', (run.status, len(run.errors), run.errors[:200]))
 
     def test_questions_are_printed_and_answered_with_no(self):
         page = self.write('<script>alert("a"); answers = [confirm("b"), prompt("c", "d")];</script>')
