@@ -1,10 +1,9 @@
-"""Nothing that a page does ends the web process: random steps, each seed another order.
-test_random.py Plugin|Objects [SEEDS [STEPS [FIRST SEED]]], 3 seeds of 2,000 steps by default."""
+"""Nothing that a page does ends the web process: random steps, each seed another order. The environment may set other
+numbers of seeds and steps, as tools/random-pages.sh does."""
 
 import os
 import pathlib
 import re
-import sys
 import unittest
 import urllib.parse
 
@@ -13,7 +12,9 @@ from television import Television
 TESTS = pathlib.Path(__file__).absolute().parent
 PAGES = TESTS / 'pages'
 REFERENCE = TESTS.parent.parent / 'docs' / 'api' / 'telix.d.ts'
-SEEDS, STEPS, FIRST = [int(text) for text in sys.argv[2:]] + [3, 2000, 1][len(sys.argv) - 2:]
+SEEDS = int(os.environ.get('TELIX_RANDOM_SEEDS', 3))
+STEPS = int(os.environ.get('TELIX_RANDOM_STEPS', 2000))
+FIRST = int(os.environ.get('TELIX_RANDOM_FIRST', 1))
 # These end the page, or put another one above it.
 ENDING = {'createApplication', 'destroyApplication'}
 
@@ -29,7 +30,7 @@ class RandomSteps(unittest.TestCase):
             for seed in range(FIRST, FIRST + SEEDS):
                 with self.subTest(seed=seed):
                     url = f'{(PAGES / page).as_uri()}?{urllib.parse.urlencode(dict(query, seed=seed, steps=STEPS))}'
-                    run = television.run('--plugin', os.environ['TELIX_PLUGIN'], '--timeout', 100, '--wait-for',
+                    run = television.run('--plugin', os.environ['TELIX_PLUGIN'], '--timeout', max(100, STEPS / 50), '--wait-for',
                                          'window.stepsResult', '--eval', 'window.stepsResult', url)
                     self.assertEqual(run.status, 0, str(run)[-3000:])
                     self.assertEqual(run.value['steps'], STEPS)
@@ -50,4 +51,4 @@ class Objects(RandomSteps):
 
 
 if __name__ == '__main__':
-    unittest.main(argv=sys.argv[:2])
+    unittest.main()
