@@ -40,7 +40,7 @@ Broadcast::Broadcast(Clock& clock)
 TunerArbiter::Listener Broadcast::arbiterListener() {
     TunerArbiter::Listener listener;
     listener.onTune = [this](const Tune& tune) { m_presentation.tune(tune); };
-    listener.onRelease = [this] { m_presentation.stop(); };
+    listener.onRelease = [this] { onRelease(); };
     listener.onUnbound = [this] { fillBackground(); };
     listener.onChannel = [this](TELIX_JS_CM_HANDLE channel) {
         if (!tuneInBackground()) {
@@ -65,6 +65,10 @@ ServicePresentation::Listener Broadcast::presentationListener() {
     listener.onStreamEvent = [this](uint8_t componentTag, const StreamEvent& event) {
         m_streamEvents.dispatch(m_arbiter.owner(), componentTag, event);
     };
+    listener.onHandOver = [this] {
+        m_ratings.reset();
+        m_presentFollowing.repeat();
+    };
     listener.onEnd = [this] { m_ratings.reset(); };
     listener.onEndLocked = [this] { m_presentFollowing.clearLocked(); };
     return listener;
@@ -79,6 +83,21 @@ void Broadcast::presentInBackground() {
         m_presentsInBackground = true;
         fillBackground();
     });
+}
+
+// The set goes on with the channel that the object has presented, so that the picture stays while one page
+// follows the other.
+void Broadcast::onRelease() {
+    if (m_presentsInBackground && !m_presentation.isPending()) {
+        if (m_arbiter.owner() != 0) {
+            return; // the tune of the next object follows
+        }
+        const auto tune = m_arbiter.backgroundTune();
+        if (tune && m_presentation.handOver(*tune)) {
+            return;
+        }
+    }
+    m_presentation.stop();
 }
 
 void Broadcast::fillBackground() {

@@ -122,6 +122,7 @@ private:
     TunerArbiter::Listener arbiterListener();
     ServicePresentation::Listener presentationListener();
     bool tuneInBackground();
+    void onRelease();
     void fillBackground();
 
     Platform& m_platform;

@@ -119,6 +119,11 @@ void BroadcastComponents::onPmt(TELIX_JS_CM_HANDLE channel, const Pmt& pmt) {
     m_selection.selectDefaults(m_platform.configuration().audioLanguage);
 }
 
+void BroadcastComponents::selectDefaults() {
+    std::lock_guard<std::mutex> lock(m_platform.mutex());
+    m_selection.selectDefaults(m_platform.configuration().audioLanguage);
+}
+
 void BroadcastComponents::onAudioFormat(TELIX_JS_CM_HANDLE channel, uint16_t pid, uint32_t audioChannels) {
     std::lock_guard<std::mutex> lock(m_platform.mutex());
     for (const ComponentSelection::Available& each : m_selection.available()) {

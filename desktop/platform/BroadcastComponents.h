@@ -49,6 +49,9 @@ public:
     // The components of the channel become available, and the default ones active.
     void onPmt(TELIX_JS_CM_HANDLE channel, const Pmt& pmt);
 
+    // The default ones become active, as after onPmt().
+    void selectDefaults();
+
     void onAudioFormat(TELIX_JS_CM_HANDLE channel, uint16_t pid, uint32_t audioChannels);
 
     // Reads the aspect ratio of the active video from the frame that is shown.

@@ -31,9 +31,29 @@ void PresentFollowing::onEit(TELIX_JS_CM_HANDLE channel, const Eit& eit) {
     }
     m_callbacks.onProgrammes.call(owner);
     if (isPresent) {
-        const auto found = m_programmes.find(programme);
-        m_ratings.update(m_arbiter.owner(), found && !found->ratings.empty() ? found->ratings.front() : 0);
+        updateRating(owner, programme);
     }
+}
+
+void PresentFollowing::repeat() const {
+    const TELIX_JS_VB_HANDLE owner = m_arbiter.owner();
+    TELIX_JS_SI_HANDLE present = 0;
+    TELIX_JS_SI_HANDLE following = 0;
+    {
+        std::lock_guard<std::mutex> lock(m_platform.mutex());
+        present = m_present;
+        following = m_following;
+    }
+    if (owner == 0 || (present == 0 && following == 0)) {
+        return;
+    }
+    m_callbacks.onProgrammes.call(owner);
+    updateRating(owner, present);
+}
+
+void PresentFollowing::updateRating(TELIX_JS_VB_HANDLE owner, TELIX_JS_SI_HANDLE present) const {
+    const auto found = m_programmes.find(present);
+    m_ratings.update(owner, found && !found->ratings.empty() ? found->ratings.front() : 0);
 }
 
 void PresentFollowing::clearLocked() {

@@ -23,6 +23,9 @@ public:
     // Platform thread.
     void onEit(TELIX_JS_CM_HANDLE channel, const Eit& eit);
 
+    // Another object presents the service: what is known is reported to it. Platform thread.
+    void repeat() const;
+
     // The service is not presented any more.
     void clearLocked();
 
@@ -33,6 +36,8 @@ public:
     TELIX_JS_SI_HANDLE followingLocked() const { return m_following; } // 0: none
 
 private:
+    void updateRating(TELIX_JS_VB_HANDLE owner, TELIX_JS_SI_HANDLE present) const;
+
     Platform& m_platform;
     Programmes& m_programmes;
     const TunerArbiter& m_arbiter;

@@ -30,6 +30,9 @@ void ServicePresentation::onTestMultiplex() {
 }
 
 void ServicePresentation::tune(const Tune& tune) {
+    if (handOver(tune)) {
+        return;
+    }
     stop();
     m_awaitedChannel = 0;
     m_pendingTune = tune;
@@ -44,6 +47,25 @@ void ServicePresentation::tune(const Tune& tune) {
             present(tune);
         }
     });
+}
+
+bool ServicePresentation::handOver(const Tune& tune) {
+    if (!m_tuner || m_presented.channel != tune.channel || m_presented.object == tune.object) {
+        return false;
+    }
+    const bool isPrerolled = m_pendingTune.id == 0;
+    abortPendingTune();
+    m_pendingTune = tune;
+    m_presented = tune;
+    m_platform.picture().setView(m_pictureToken, viewOf(tune)); // no lock: this thread alone changes it
+    m_arbiter.reportConnecting(tune);
+    m_components.selectDefaults();
+    applySelection();
+    m_listener.onHandOver();
+    if (isPrerolled) {
+        onPrerolled(m_activeTuneId);
+    }
+    return true;
 }
 
 void ServicePresentation::stop() {
@@ -131,6 +153,11 @@ void ServicePresentation::present(const Tune& tune) {
     }
 }
 
+Picture::View ServicePresentation::viewOf(const Tune& tune) const {
+    return tune.object == 0 ? m_arbiter.backgroundView()
+                            : m_arbiter.viewOf(tune.object).value_or(Picture::View());
+}
+
 void ServicePresentation::startTuner(const Tune& tune, uint16_t serviceId) {
     const auto post = [this](auto function) { m_platform.post(std::move(function)); };
     Tuner::Listener listener;
@@ -144,11 +171,10 @@ void ServicePresentation::startTuner(const Tune& tune, uint16_t serviceId) {
     };
     m_tuner = std::make_unique<Tuner>(serviceId, listener);
     m_activeTuneId = tune.id;
+    m_presented = tune;
 
-    const Picture::View view = tune.object == 0 ? m_arbiter.backgroundView()
-                                                : m_arbiter.viewOf(tune.object).value_or(Picture::View());
     const Picture::Token token = m_platform.picture().acquire(
-        view, [this, object = tune.object] { onTunerPreempted(object); },
+        viewOf(tune), [this] { onTunerPreempted(); },
         [this, id = tune.id, post] { post([this, id] { onPrerolled(id); }); });
     {
         std::lock_guard<std::mutex> lock(m_platform.mutex());
@@ -209,7 +235,7 @@ void ServicePresentation::onFirstAudio(uint64_t tuneId) {
 }
 
 void ServicePresentation::onPrerolled(uint64_t tuneId) {
-    if (m_pendingTune.id != tuneId) {
+    if (m_pendingTune.id == 0 || m_activeTuneId != tuneId) {
         return;
     }
     const Tune presented = std::exchange(m_pendingTune, {});
@@ -218,7 +244,7 @@ void ServicePresentation::onPrerolled(uint64_t tuneId) {
 }
 
 void ServicePresentation::onTimeout(uint64_t tuneId) {
-    if (m_pendingTune.id == tuneId) {
+    if (m_pendingTune.id != 0 && m_activeTuneId == tuneId) {
         fail(tuneId, kErrorNoSignal, "no picture and no sound within the timeout");
     }
 }
@@ -226,7 +252,7 @@ void ServicePresentation::onTimeout(uint64_t tuneId) {
 // Either the tune fails, or what it presents breaks down later.
 void ServicePresentation::fail(uint64_t tuneId, TELIX_ERR_STATE_ENUM_T error, const std::string& reason) {
     const bool isPending = m_pendingTune.id != 0;
-    if (tuneId != (isPending ? m_pendingTune.id : m_activeTuneId) || tuneId == 0) {
+    if (tuneId == 0 || (tuneId != m_pendingTune.id && tuneId != m_activeTuneId)) {
         return;
     }
     std::fprintf(stderr, "libtelix: channel: %s\n", reason.c_str());
@@ -241,7 +267,8 @@ void ServicePresentation::fail(uint64_t tuneId, TELIX_ERR_STATE_ENUM_T error, co
 }
 
 // Called by the picture, inside of the player's request for it.
-void ServicePresentation::onTunerPreempted(TELIX_JS_VB_HANDLE object) {
+void ServicePresentation::onTunerPreempted() {
+    const TELIX_JS_VB_HANDLE object = m_presented.object;
     abortPendingTune();
     {
         std::lock_guard<std::mutex> lock(m_platform.mutex());

@@ -29,6 +29,7 @@ public:
         std::function<void(TELIX_JS_CM_HANDLE channel, const ApplicationList& list)> onApplications;
         std::function<void(TELIX_JS_CM_HANDLE channel, const Eit& eit)> onEit;
         std::function<void(uint8_t componentTag, const StreamEvent& event)> onStreamEvent;
+        std::function<void()> onHandOver;  // the service is presented on, for another object or for none
         std::function<void()> onEnd;       // the service is not presented any more
         std::function<void()> onEndLocked; // the same, with Platform::mutex() held
     };
@@ -44,11 +45,18 @@ public:
     // Replaces what is presented. The outcome is reported to the arbiter.
     void tune(const Tune& tune);
 
+    // Presents the service on, with the pipeline as it is, for another object or for the set itself. False,
+    // with nothing changed, if another service is presented, or the same for that object already.
+    bool handOver(const Tune& tune);
+
     // Ends what is presented.
     void stop();
 
     // Whether a channel is presented, or about to be.
     bool isActive() const { return m_pendingTune.id != 0 || m_tuner; }
+
+    // Whether a tune has no outcome yet.
+    bool isPending() const { return m_pendingTune.id != 0; }
 
     // Receives the signalling of a channel while nothing is presented.
     void receive(TELIX_JS_CM_HANDLE channel);
@@ -79,12 +87,13 @@ private:
     BroadcastSource::Result openSource(const Channel& channel, std::string& error);
     void followApplications(const Channel& channel);
     void loseService();
+    Picture::View viewOf(const Tune& tune) const;
     void startTuner(const Tune& tune, uint16_t serviceId);
     void selectService(const Tune& tune, uint16_t serviceId);
     void onPmt(const Tune& tune, const Pmt& pmt);
     void onFirstAudio(uint64_t tuneId);
     void onPrerolled(uint64_t tuneId);
-    void onTunerPreempted(TELIX_JS_VB_HANDLE object);
+    void onTunerPreempted();
     void onTimeout(uint64_t tuneId);
     void fail(uint64_t tuneId, TELIX_ERR_STATE_ENUM_T error, const std::string& reason);
     void abortPendingTune();
@@ -102,7 +111,8 @@ private:
     Tune m_pendingTune;                       // without an outcome yet
     TELIX_JS_CM_HANDLE m_awaitedChannel = 0;  // to be received when the test multiplex is there; 0: none
     TELIX_JS_CM_HANDLE m_followedChannel = 0; // whose applications are followed; 0: none
-    uint64_t m_activeTuneId = 0;              // the tune to which the tuner belongs; 0: there is none
+    uint64_t m_activeTuneId = 0;              // the tune that has started the tuner; 0: there is none
+    Tune m_presented;                         // the tune for which the tuner runs now
     Picture::Token m_pictureToken = 0; // changed on the platform thread alone, guarded by Platform::mutex()
 };
 

@@ -290,6 +290,70 @@ TEST_F(BroadcastTest, PresentsTheChannelByItselfWhileNoObjectDoes) {
     EXPECT_EQ(countOf("error"), 0U);
 }
 
+TEST_F(BroadcastTest, KeepsThePictureFromAnObjectToTheSetAndToTheNextObject) {
+    const std::pair<int32_t, uint32_t> whole{0, 1280};
+    const std::pair<int32_t, uint32_t> part{100, 640};
+    const TELIX_JS_DISPLAY_AREA area{100, 50, 640, 360};
+    telix_desktop_present_channel();
+    tune(m_channels[0]);
+    waitFor("programmes");
+    ASSERT_EQ(TELIX_JS_VB_Release(m_object), 0);
+    flushPlatformThread();
+    EXPECT_EQ(placeOfPicture(), whole);
+    TELIX_JS_VB_HANDLE next = 0;
+    ASSERT_EQ(TELIX_JS_VB_GetHandle(&next), 0);
+    TELIX_JS_VB_RegisterOnProgrammesChanged(next, onProgrammes);
+    ASSERT_EQ(TELIX_JS_VB_SetDisplayArea(next, &area), 0);
+    events.clear();
+    ASSERT_EQ(TELIX_JS_VB_BindToCurrChannel(next), 0);
+    flushPlatformThread();
+    EXPECT_EQ(placeOfPicture(), part);
+    EXPECT_EQ(waitFor("state", 0).first, TELIX_PLAYSTATE_CONNECTING);
+    EXPECT_EQ(waitFor("state", 1).first, TELIX_PLAYSTATE_PRESENTING);
+    EXPECT_EQ(waitFor("change").object, next);
+    EXPECT_EQ(waitFor("programmes").object, next);
+    ASSERT_EQ(TELIX_JS_VB_BindToCurrChannel(m_object), 0); // without a release of the other one
+    flushPlatformThread();
+    EXPECT_EQ(placeOfPicture(), whole);
+    TELIX_PLAYSTATE_ENUM_T state = TELIX_PLAYSTATE_PRESENTING;
+    EXPECT_EQ(TELIX_JS_VB_GetPlayBackState(next, &state), 0);
+    EXPECT_EQ(state, TELIX_PLAYSTATE_UNREALIZED);
+}
+
+TEST_F(BroadcastTest, SelectsTheDefaultAudioForTheNextObject) {
+    telix_desktop_present_channel();
+    tune(m_channels[0]);
+    const auto audio = [](TELIX_JS_VB_HANDLE object, bool activeOnly) {
+        return Broadcast::instance()
+            .components(object, TELIX_JS_AVCOMPTYPE_AUDIO, activeOnly)
+            .value_or(std::vector<TELIX_JS_AVCOMPHANDLE>());
+    };
+    const auto first = audio(m_object, true);
+    ASSERT_EQ(audio(m_object, false).size(), 2U);
+    ASSERT_TRUE(Broadcast::instance().selectComponent(m_object, audio(m_object, false)[1],
+                                                      TELIX_JS_AVCOMPTYPE_AUDIO, true));
+    ASSERT_NE(audio(m_object, true), first);
+    TELIX_JS_VB_HANDLE next = 0;
+    ASSERT_EQ(TELIX_JS_VB_GetHandle(&next), 0);
+    ASSERT_EQ(TELIX_JS_VB_BindToCurrChannel(next), 0);
+    waitFor("change", 1);
+    EXPECT_EQ(audio(next, true), first);
+}
+
+TEST_F(BroadcastTest, HandsTheChannelOnBeforeItIsPresented) {
+    telix_desktop_present_channel();
+    ASSERT_EQ(TELIX_JS_VB_BindToCurrChannel(m_object), 0);
+    TELIX_JS_VB_HANDLE next = 0;
+    ASSERT_EQ(TELIX_JS_VB_GetHandle(&next), 0);
+    ASSERT_EQ(TELIX_JS_VB_BindToCurrChannel(next), 0);
+    EXPECT_EQ(waitFor("change").object, next);
+    flushPlatformThread();
+    // The first request has an outcome as well.
+    EXPECT_EQ(waitFor("error").object, m_object);
+    EXPECT_EQ(countOf("change") + countOf("error"), 2U);
+    TELIX_JS_VB_Release(next);
+}
+
 TEST_F(BroadcastTest, KeepsTheChannelOffWhileAnObjectHasStoppedIt) {
     telix_desktop_present_channel();
     EXPECT_TRUE(waitUntil([] { return placeOfPicture().has_value(); }));
