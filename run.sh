@@ -29,7 +29,7 @@ while [ $# -gt 0 ]; do
         echo "$usage"
         exit 0
         ;;
-    --fullscreen | --inspect | --strict | --version | --wait-for-picture | --*=*) options+=("$1") ;;
+    --fullscreen | --ignore-certificate-errors | --inspect | --strict | --version | --wait-for-picture | --*=*) options+=("$1") ;;
     --)
         shift
         operands+=("$@")

@@ -19,7 +19,7 @@ class CommandLine(TelixTv):
         self.assertEqual((run.status, run.errors), (0, ''), run)
         for option in ('size', 'fullscreen', 'plugin', 'screenshot', 'wait-for', 'wait-for-picture', 'timeout', 'eval',
                        'keys', 'user-agent', 'inspect', 'inspector-server', 'engine', 'signal', 'on', 'ait', 'strict', 'help',
-                       'version', 'automation', 'profile'):
+                       'version', 'automation', 'profile', 'ignore-certificate-errors'):
             self.assertIn(f'--{option}', run.output)
 
     def test_help_names_every_key(self):

@@ -79,21 +79,21 @@ protected:
 
 TEST_F(ApplicationTargetTest, APageIsItsOwnTarget) {
     const std::string page = write("page.html", "x") + "?a=1#b";
-    const ApplicationTarget target = findApplication(page, "agent", {});
+    const ApplicationTarget target = findApplication(page, {"agent"}, {});
     EXPECT_EQ(target.url, page);
     EXPECT_EQ(target.error, "");
     EXPECT_FALSE(target.signalled);
-    EXPECT_EQ(findApplication("file://" + m_folder + "/none.html", "agent", {}).error, "No such file");
+    EXPECT_EQ(findApplication("file://" + m_folder + "/none.html", {"agent"}, {}).error, "No such file");
 }
 
 TEST_F(ApplicationTargetTest, ASignalledApplicationIsFoundByItsHexadecimalIds) {
     const std::string page = write("page.html", "x");
-    const auto target = findApplication("dvb://current.ait/1F.A", "agent", {signalled(0x1f, 0xa, page)});
+    const auto target = findApplication("dvb://current.ait/1F.A", {"agent"}, {signalled(0x1f, 0xa, page)});
     EXPECT_EQ(target.url, page);
     EXPECT_EQ(target.error, "");
     ASSERT_TRUE(target.signalled);
     EXPECT_EQ(target.signalled->id, (ApplicationId{0x1f, 0xa}));
-    EXPECT_EQ(findApplication("DVB://current.ait/0001f.000a", "agent", {signalled(0x1f, 0xa, page)}).url,
+    EXPECT_EQ(findApplication("DVB://current.ait/0001f.000a", {"agent"}, {signalled(0x1f, 0xa, page)}).url,
               page);
 }
 
@@ -110,7 +110,7 @@ TEST_F(ApplicationTargetTest, QueryAndFragmentAreAddedToThoseOfTheSignalling) {
                  {"#y", "#b", "#b"},
                  {"", "?a=#b?c", "?a=#b?c"}};
     for (const auto& each : cases) {
-        EXPECT_EQ(findApplication(std::string("dvb://current.ait/1.1") + each.added, "agent",
+        EXPECT_EQ(findApplication(std::string("dvb://current.ait/1.1") + each.added, {"agent"},
                                   {signalled(1, 1, page + each.signalled)})
                       .url,
                   page + each.result);
@@ -120,9 +120,9 @@ TEST_F(ApplicationTargetTest, QueryAndFragmentAreAddedToThoseOfTheSignalling) {
 TEST_F(ApplicationTargetTest, AnAddressMayHaveAnyLength) {
     const std::string page = write("page.html", "x");
     const std::string query = "?" + std::string(4000000, 'a');
-    EXPECT_EQ(findApplication("dvb://current.ait/1.1" + query, "agent", {signalled(1, 1, page)}).url,
+    EXPECT_EQ(findApplication("dvb://current.ait/1.1" + query, {"agent"}, {signalled(1, 1, page)}).url,
               page + query);
-    EXPECT_NE(findApplication("dvb://current.ait/" + std::string(4000000, '0'), "agent", {}).error, "");
+    EXPECT_NE(findApplication("dvb://current.ait/" + std::string(4000000, '0'), {"agent"}, {}).error, "");
 }
 
 TEST_F(ApplicationTargetTest, AnApplicationThatIsNotSignalledOrMayNotRunIsRefused) {
@@ -133,7 +133,7 @@ TEST_F(ApplicationTargetTest, AnApplicationThatIsNotSignalledOrMayNotRunIsRefuse
     for (const char* url : {"dvb://current.ait/1.1", "dvb://current.ait/1.2", "dvb://current.ait/1.9",
                             "dvb://current.ait/1.3", "dvb://current.ait/1", "dvb://current.ait/x.1",
                             "dvb://current.ait/123456789.1", "dvb://other.ait/1.1", "dvb://1.2.3/"}) {
-        EXPECT_NE(findApplication(url, "agent", list).error, "") << url;
+        EXPECT_NE(findApplication(url, {"agent"}, list).error, "") << url;
     }
 }
 
@@ -145,7 +145,7 @@ TEST_F(ApplicationTargetTest, AnXmlAitLeadsToItsApplicationWithTheHighestPriorit
                                                             {"AUTOSTART", 5, "high.html"},
                                                             {"PRESENT", 9, "low.html"},
                                                             {"KILL", 99, "low.html"}}));
-    const ApplicationTarget target = findApplication(document, "agent", {});
+    const ApplicationTarget target = findApplication(document, {"agent"}, {});
     EXPECT_EQ(target.error, "");
     EXPECT_EQ(target.url, "file://" + m_folder + "/high.html");
     EXPECT_FALSE(target.signalled);
@@ -153,19 +153,20 @@ TEST_F(ApplicationTargetTest, AnXmlAitLeadsToItsApplicationWithTheHighestPriorit
 
 TEST_F(ApplicationTargetTest, AnXmlAitWithoutAnApplicationToStartSaysWhy) {
     const std::string document = write("list.aitx", xmlAit({{"KILL", 1, "low.html"}}));
-    EXPECT_EQ(findApplication(document, "agent", {}).error, "the XML AIT has no application to start");
+    EXPECT_EQ(findApplication(document, {"agent"}, {}).error, "the XML AIT has no application to start");
     const std::string missing = write("missing.aitx", xmlAit({{"AUTOSTART", 1, "none.html"}}));
-    EXPECT_EQ(findApplication(missing, "agent", {}).error, "file://" + m_folder + "/none.html: No such file");
-    EXPECT_NE(findApplication(write("bad.aitx", "<html></html>"), "agent", {}).error, "");
+    EXPECT_EQ(findApplication(missing, {"agent"}, {}).error,
+              "file://" + m_folder + "/none.html: No such file");
+    EXPECT_NE(findApplication(write("bad.aitx", "<html></html>"), {"agent"}, {}).error, "");
 }
 
 TEST_F(ApplicationTargetTest, OnlyTheOptionTakesADocumentOfAnotherNameAsXmlAit) {
     write("low.html", "x");
     const std::string document = write("list.xml", xmlAit({{"AUTOSTART", 1, "low.html"}}));
-    EXPECT_EQ(findApplication(document, "agent", {}).url, document);
-    EXPECT_EQ(findApplicationOfXmlAit(document, "agent").url, "file://" + m_folder + "/low.html");
-    EXPECT_NE(findApplicationOfXmlAit(write("page.html", "x"), "agent").error, "");
-    EXPECT_EQ(findApplicationOfXmlAit("data:text/html,x", "agent").error, "not an XML AIT");
+    EXPECT_EQ(findApplication(document, {"agent"}, {}).url, document);
+    EXPECT_EQ(findApplicationOfXmlAit(document, {"agent"}).url, "file://" + m_folder + "/low.html");
+    EXPECT_NE(findApplicationOfXmlAit(write("page.html", "x"), {"agent"}).error, "");
+    EXPECT_EQ(findApplicationOfXmlAit("data:text/html,x", {"agent"}).error, "not an XML AIT");
 }
 
 } // namespace

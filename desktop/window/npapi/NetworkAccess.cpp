@@ -8,6 +8,9 @@ namespace desktop {
 QNetworkReply* NetworkAccess::createRequest(Operation operation, const QNetworkRequest& request,
                                             QIODevice* outgoingData) {
     QNetworkReply* reply = QNetworkAccessManager::createRequest(operation, request, outgoingData);
+    if (m_ignoresCertificateErrors) {
+        reply->ignoreSslErrors();
+    }
     return DocumentReply::mayBeDocument(request) ? new DocumentReply(reply, this) : reply;
 }
 

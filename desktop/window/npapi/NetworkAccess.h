@@ -12,11 +12,16 @@ class NetworkAccess : public QNetworkAccessManager {
     Q_OBJECT
 
 public:
-    using QNetworkAccessManager::QNetworkAccessManager;
+    // `ignoresCertificateErrors`: whether servers may have any certificate.
+    explicit NetworkAccess(bool ignoresCertificateErrors)
+        : m_ignoresCertificateErrors(ignoresCertificateErrors) {}
 
 protected:
     QNetworkReply* createRequest(Operation operation, const QNetworkRequest& request,
                                  QIODevice* outgoingData) override;
+
+private:
+    const bool m_ignoresCertificateErrors;
 };
 
 } // namespace desktop

@@ -46,13 +46,12 @@ QUrl urlOf(const std::string& url) {
 } // namespace
 
 TvWindow::TvWindow(const CommandLine& commandLine)
-    : m_userAgent(QString::fromStdString(commandLine.userAgent)), m_start{commandLine.channel,
-                                                                          commandLine.signalUrl,
-                                                                          std::max(commandLine.channel,
-                                                                                   kFirstChannel)},
+    : m_requestOptions(commandLine.requestOptions()), m_start{commandLine.channel, commandLine.signalUrl,
+                                                              std::max(commandLine.channel, kFirstChannel)},
       m_videoPlane(new VideoPlane(this)), m_display(new OnScreenDisplay(this)),
       m_television(libraryCalls(), stackCalls(),
-                   [this](const std::string& text) { m_display->show(QString::fromStdString(text)); }) {
+                   [this](const std::string& text) { m_display->show(QString::fromStdString(text)); }),
+      m_network(commandLine.ignoresCertificateErrors) {
     signallingEvent();
     m_library.loadBeside(commandLine.plugin);
     // The plug-in loads another library during a call of a page on this thread, so the event loop runs after
@@ -85,7 +84,8 @@ ApplicationView& TvWindow::openApplication(const QUrl& url) {
 
 ApplicationView& TvWindow::push() {
     auto* application = new ApplicationView(
-        m_userAgent, [this] { return m_library.find() ? m_library.keySet() : kAllPageKeys; }, this);
+        QString::fromStdString(m_requestOptions.userAgent),
+        [this] { return m_library.find() ? m_library.keySet() : kAllPageKeys; }, this);
     auto* page = &application->applicationPage();
     page->setNetworkAccessManager(&m_network);
     const auto addFunctions = [this, application](QWebFrame* frame) {
@@ -121,7 +121,7 @@ ApplicationView& TvWindow::openSignalled(const std::string& url) {
     auto* later = new QTimer(&application);
     later->setSingleShot(true);
     connect(later, &QTimer::timeout, this, [this, &application, url] {
-        const std::string error = loadError(url, m_userAgent.toStdString());
+        const std::string error = loadError(url, m_requestOptions);
         if (!m_stack.has(application)) {
             return;
         }
@@ -152,8 +152,7 @@ bool TvWindow::createApplication(const ApplicationView& caller, const QUrl& url)
 }
 
 ApplicationTarget TvWindow::findTarget(const std::string& url) const {
-    return findApplication(url, m_userAgent.toStdString(),
-                           m_television.applications().signalling().applications);
+    return findApplication(url, m_requestOptions, m_television.applications().signalling().applications);
 }
 
 void TvWindow::openTarget(const ApplicationTarget& target) {
@@ -246,8 +245,8 @@ void TvWindow::open(const std::string& url, std::function<void(const std::string
 
 void TvWindow::reload(std::function<void(const std::string& error)> done) {
     ApplicationView* top = m_stack.top();
-    const std::string error = loadError(top ? top->url().toString(QUrl::FullyEncoded).toStdString() : "",
-                                        m_userAgent.toStdString());
+    const std::string error =
+        loadError(top ? top->url().toString(QUrl::FullyEncoded).toStdString() : "", m_requestOptions);
     if (error.empty()) {
         for (ApplicationView* application : m_stack.all()) {
             application->reload();

@@ -82,7 +82,7 @@ private:
     void updateTop();
     void place(QWidget& view) const;
 
-    QString m_userAgent;
+    RequestOptions m_requestOptions;
     TelevisionStart m_start;
     TelevisionLibrary m_library;
     QMetaObject::Connection m_searchConnection;

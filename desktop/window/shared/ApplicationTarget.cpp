@@ -4,7 +4,6 @@
 #include <algorithm>
 
 #include "desktop/platform/XmlAit.h"
-#include "desktop/window/shared/LoadCheck.h"
 #include "desktop/window/shared/Pattern.h"
 
 namespace desktop {
@@ -17,8 +16,8 @@ ApplicationTarget failure(const std::string& error) {
     return target;
 }
 
-ApplicationTarget checkedPage(const std::string& url, const std::string& userAgent) {
-    return {url, std::nullopt, loadError(url, userAgent)};
+ApplicationTarget checkedPage(const std::string& url, const RequestOptions& options) {
+    return {url, std::nullopt, loadError(url, options)};
 }
 
 // The URL with a query (`?...`) and a fragment (`#...`) added, which may be empty. A query is added to one
@@ -39,7 +38,7 @@ bool isBetter(const SignalledApplication& left, const SignalledApplication& righ
     return isLeftAutostart != isRightAutostart ? isLeftAutostart : left.priority > right.priority;
 }
 
-ApplicationTarget targetOfXmlAit(const std::string& document, const std::string& userAgent) {
+ApplicationTarget targetOfXmlAit(const std::string& document, const RequestOptions& options) {
     std::string error;
     const auto list = parseXmlAit(document, error);
     if (!list) {
@@ -52,7 +51,7 @@ ApplicationTarget targetOfXmlAit(const std::string& document, const std::string&
     ApplicationTarget last =
         failure(list->skipped.empty() ? "the XML AIT has no application to start" : list->skipped.front());
     for (const SignalledApplication& each : startable) {
-        last = checkedPage(each.url, userAgent);
+        last = checkedPage(each.url, options);
         if (last.error.empty()) {
             break;
         }
@@ -63,7 +62,7 @@ ApplicationTarget targetOfXmlAit(const std::string& document, const std::string&
 
 } // namespace
 
-ApplicationTarget findApplication(const std::string& url, const std::string& userAgent,
+ApplicationTarget findApplication(const std::string& url, const RequestOptions& options,
                                   const std::vector<SignalledApplication>& signalled) {
     static const Pattern kSignalledUrl(
         R"(dvb://current\.ait/0*([0-9a-f]{1,8})\.0*([0-9a-f]{1,4})(\?[^#]*)?(#.*)?)",
@@ -79,19 +78,19 @@ ApplicationTarget findApplication(const std::string& url, const std::string& use
             return failure("the channel signals no such application");
         }
         ApplicationTarget target =
-            checkedPage(withQueryAndFragment(found->url, (*parts)[3], (*parts)[4]), userAgent);
+            checkedPage(withQueryAndFragment(found->url, (*parts)[3], (*parts)[4]), options);
         target.signalled = *found;
         return target;
     }
-    const LoadResult result = load(url, userAgent);
-    return result.xmlAit ? targetOfXmlAit(*result.xmlAit, userAgent)
+    const LoadResult result = load(url, options);
+    return result.xmlAit ? targetOfXmlAit(*result.xmlAit, options)
                          : ApplicationTarget{url, std::nullopt, result.error};
 }
 
-ApplicationTarget findApplicationOfXmlAit(const std::string& url, const std::string& userAgent) {
-    const LoadResult result = load(url, userAgent, ExpectedDocument::XmlAit);
+ApplicationTarget findApplicationOfXmlAit(const std::string& url, const RequestOptions& options) {
+    const LoadResult result = load(url, options, ExpectedDocument::XmlAit);
     if (result.xmlAit) {
-        return targetOfXmlAit(*result.xmlAit, userAgent);
+        return targetOfXmlAit(*result.xmlAit, options);
     }
     return failure(result.error.empty() ? "not an XML AIT" : result.error);
 }

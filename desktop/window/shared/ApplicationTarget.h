@@ -7,6 +7,7 @@
 #include <vector>
 
 #include "desktop/platform/ApplicationInformation.h"
+#include "desktop/window/shared/LoadCheck.h"
 
 namespace desktop {
 
@@ -25,11 +26,11 @@ struct ApplicationTarget {
 //                              loaded the one with the highest priority, AUTOSTART before PRESENT
 //   anything else              the page itself
 // Blocks until the server has responded. Any thread.
-ApplicationTarget findApplication(const std::string& url, const std::string& userAgent,
+ApplicationTarget findApplication(const std::string& url, const RequestOptions& options,
                                   const std::vector<SignalledApplication>& signalled);
 
 // The same for a URL that must be one of an XML AIT.
-ApplicationTarget findApplicationOfXmlAit(const std::string& url, const std::string& userAgent);
+ApplicationTarget findApplicationOfXmlAit(const std::string& url, const RequestOptions& options);
 
 } // namespace desktop
 

@@ -84,6 +84,7 @@ struct Values {
     char* screenshot = nullptr;
     char* record = nullptr;
     char* userAgent = nullptr;
+    gboolean ignoreCertificateErrors = false;
     gboolean inspect = false;
     char* inspectorServer = nullptr;
     char* ait = nullptr;
@@ -173,6 +174,8 @@ private:
             {"record", 0, 0, kText, &values.record,
              "Record picture, page and sound as an MP4 file (H.264, AAC) until the end.", "FILE.mp4"},
             {"user-agent", 0, 0, kText, &values.userAgent, m_userAgent.c_str(), "TEXT"},
+            {"ignore-certificate-errors", 0, 0, kFlag, &values.ignoreCertificateErrors,
+             "Accept any certificate of a server, for tests with one that nobody has signed.", nullptr},
             {"inspect", 0, 0, kFlag, &values.inspect, "Open the web inspector.", nullptr},
             {"inspector-server", 0, 0, kText, &values.inspectorServer,
              "Let a remote web inspector connect, with the engine webkit.", "HOST:PORT"},
@@ -385,6 +388,7 @@ std::optional<int> readCommandLine(const std::vector<std::string>& arguments, co
     commandLine.isStrict = values.strict;
     commandLine.plugin = values.plugin ? values.plugin : besideProgram(kPlugin);
     commandLine.userAgent = values.userAgent ? values.userAgent : engine.userAgent() + kHbbtvToken;
+    commandLine.ignoresCertificateErrors = values.ignoreCertificateErrors;
     commandLine.waitForPicture = values.waitForPicture;
     commandLine.waitFor = optional(values.waitFor);
     commandLine.eval = optional(values.eval);

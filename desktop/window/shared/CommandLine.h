@@ -8,6 +8,7 @@
 #include <string>
 #include <vector>
 
+#include "desktop/window/shared/LoadCheck.h"
 #include "desktop/window/shared/RemoteControl.h"
 
 namespace desktop {
@@ -47,6 +48,7 @@ struct CommandLine {
     std::string plugin;
     std::vector<const RemoteKey*> keys;
     std::string userAgent;
+    bool ignoresCertificateErrors = false;
     bool waitForPicture = false;
     std::optional<std::string> waitFor;
     std::optional<std::string> eval;
@@ -59,6 +61,8 @@ struct CommandLine {
     bool quitsWhenDone() const { return waitForPicture || waitFor || eval || screenshot; }
     // Whether there are steps at all.
     bool hasSteps() const { return quitsWhenDone() || !keys.empty(); }
+
+    RequestOptions requestOptions() const { return {userAgent, ignoresCertificateErrors}; }
 };
 
 // Parses the arguments (the program's name first) into `commandLine`. Returns the exit status if the program

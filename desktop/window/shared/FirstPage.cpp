@@ -4,7 +4,6 @@
 #include "desktop/window/shared/ApplicationTarget.h"
 #include "desktop/window/shared/CommandLine.h"
 #include "desktop/window/shared/Diagnostics.h"
-#include "desktop/window/shared/LoadCheck.h"
 
 namespace desktop {
 
@@ -14,7 +13,7 @@ std::optional<std::string> pageOf(const CommandLine& commandLine) {
         return std::nullopt;
     };
     if (!commandLine.signalUrl.empty()) {
-        const std::string error = loadError(commandLine.signalUrl, commandLine.userAgent);
+        const std::string error = loadError(commandLine.signalUrl, commandLine.requestOptions());
         if (!error.empty()) {
             return refuse(commandLine.signalUrl, error);
         }
@@ -22,9 +21,9 @@ std::optional<std::string> pageOf(const CommandLine& commandLine) {
     if (commandLine.page.empty()) {
         return std::string();
     }
-    const ApplicationTarget target = commandLine.isXmlAit
-                                         ? findApplicationOfXmlAit(commandLine.page, commandLine.userAgent)
-                                         : findApplication(commandLine.page, commandLine.userAgent, {});
+    const ApplicationTarget target =
+        commandLine.isXmlAit ? findApplicationOfXmlAit(commandLine.page, commandLine.requestOptions())
+                             : findApplication(commandLine.page, commandLine.requestOptions(), {});
     return target.error.empty() ? std::optional(target.url) : refuse(commandLine.page, target.error);
 }
 

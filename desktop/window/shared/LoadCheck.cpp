@@ -46,12 +46,18 @@ LoadResult readXmlAit(GInputStream* stream) {
 
 // Sends a GET and closes the connection after the response headers of a page, because many servers reject
 // HEAD.
-LoadResult request(const std::string& url, const std::string& userAgent, ExpectedDocument expected) {
-    g_autoptr(SoupSession) session = soup_session_new_with_options("timeout", kServerTimeoutSeconds,
-                                                                   "user-agent", userAgent.c_str(), nullptr);
+LoadResult request(const std::string& url, const RequestOptions& options, ExpectedDocument expected) {
+    g_autoptr(SoupSession) session = soup_session_new_with_options(
+        "timeout", kServerTimeoutSeconds, "user-agent", options.userAgent.c_str(), nullptr);
     g_autoptr(SoupMessage) message = soup_message_new(SOUP_METHOD_GET, url.c_str());
     if (!message) {
         return {"malformed URL", std::nullopt};
+    }
+    if (options.ignoresCertificateErrors) {
+        g_signal_connect(message, "accept-certificate",
+                         G_CALLBACK(+[](SoupMessage*, GTlsCertificate*, GTlsCertificateFlags,
+                                        gpointer) -> gboolean { return TRUE; }),
+                         nullptr);
     }
     g_autoptr(GError) error = nullptr;
     g_autoptr(GInputStream) body = soup_session_send(session, message, nullptr, &error);
@@ -104,7 +110,7 @@ LoadResult loadFile(const std::string& url, ExpectedDocument expected) {
 
 } // namespace
 
-LoadResult load(const std::string& url, const std::string& userAgent, ExpectedDocument expected) {
+LoadResult load(const std::string& url, const RequestOptions& options, ExpectedDocument expected) {
     g_autofree char* schemeText = g_uri_parse_scheme(url.c_str());
     const std::string scheme = schemeText ? schemeText : "";
     if (scheme.empty()) {
@@ -119,11 +125,11 @@ LoadResult load(const std::string& url, const std::string& userAgent, ExpectedDo
     if (scheme != "http" && scheme != "https") {
         return {"unsupported URL scheme", std::nullopt};
     }
-    return request(url, userAgent, expected);
+    return request(url, options, expected);
 }
 
-std::string loadError(const std::string& url, const std::string& userAgent) {
-    return load(url, userAgent).error;
+std::string loadError(const std::string& url, const RequestOptions& options) {
+    return load(url, options).error;
 }
 
 } // namespace desktop

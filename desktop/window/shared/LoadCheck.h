@@ -7,6 +7,13 @@
 
 namespace desktop {
 
+// What the requests of the window share with those of its engine.
+struct RequestOptions {
+    std::string userAgent;
+    // Whether servers may have any certificate.
+    bool ignoresCertificateErrors = false;
+};
+
 struct LoadResult {
     // The reason why the document cannot be loaded, as the end of a message; empty if it can.
     std::string error;
@@ -18,12 +25,12 @@ struct LoadResult {
 enum class ExpectedDocument { Page, XmlAit };
 
 // A local file must be readable; a server must start a successful response within 5 seconds. Blocks the
-// calling thread, and runs no event of it meanwhile. `userAgent` is sent to the server. Any thread.
-LoadResult load(const std::string& url, const std::string& userAgent,
+// calling thread, and runs no event of it meanwhile. Any thread.
+LoadResult load(const std::string& url, const RequestOptions& options,
                 ExpectedDocument expected = ExpectedDocument::Page);
 
 // The error alone.
-std::string loadError(const std::string& url, const std::string& userAgent);
+std::string loadError(const std::string& url, const RequestOptions& options);
 
 } // namespace desktop
 

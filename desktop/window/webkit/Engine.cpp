@@ -69,10 +69,13 @@ WebKitSettings* newSettings(const CommandLine& commandLine) {
     return settings;
 }
 
-WebKitWebContext* newContext(const Profile& profile, bool isAutomated) {
+WebKitWebContext* newContext(const CommandLine& commandLine, const Profile& profile) {
     g_autoptr(WebKitWebsiteDataManager) data =
         webkit_website_data_manager_new("base-data-directory", profile.dataFolder().c_str(),
                                         "base-cache-directory", profile.cacheFolder().c_str(), nullptr);
+    if (commandLine.ignoresCertificateErrors) {
+        webkit_website_data_manager_set_tls_errors_policy(data, WEBKIT_TLS_ERRORS_POLICY_IGNORE);
+    }
     // Without process swapping the platform library, which is in the web process, outlives a navigation.
     WebKitWebContext* context =
         WEBKIT_WEB_CONTEXT(g_object_new(WEBKIT_TYPE_WEB_CONTEXT, "website-data-manager", data,
@@ -82,7 +85,7 @@ WebKitWebContext* newContext(const Profile& profile, bool isAutomated) {
                                                      cookies.c_str(),
                                                      WEBKIT_COOKIE_PERSISTENT_STORAGE_SQLITE);
     }
-    webkit_web_context_set_automation_allowed(context, isAutomated);
+    webkit_web_context_set_automation_allowed(context, commandLine.automation);
     return context;
 }
 
@@ -108,7 +111,7 @@ EngineInformation engineInformation() {
 Engine::Engine(const CommandLine& commandLine, const PluginFile& plugin, const Profile& profile,
                WebProcessOutput& output, PageChannel& channel)
     : m_plugin(plugin), m_output(output), m_channel(channel), m_isAutomated(commandLine.automation),
-      m_isStrict(commandLine.isStrict), m_context(newContext(profile, m_isAutomated)),
+      m_isStrict(commandLine.isStrict), m_context(newContext(commandLine, profile)),
       m_settings(newSettings(commandLine)), m_content(webkit_user_content_manager_new()) {
     g_signal_connect(m_context, "initialize-web-extensions",
                      G_CALLBACK(+[](WebKitWebContext* context, gpointer engine) {

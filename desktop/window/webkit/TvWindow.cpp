@@ -58,7 +58,7 @@ std::string writePng(cairo_surface_t* image, const std::string& file) {
 // The search for what a URL leads to, whose server may take some seconds to respond, on a thread of its own.
 struct TargetSearch {
     std::string url;
-    std::string userAgent;
+    RequestOptions options;
     std::vector<SignalledApplication> signalled;
     ApplicationTarget target;
     std::function<void(const ApplicationTarget& target)> done;
@@ -81,7 +81,7 @@ void findTarget(TargetSearch search, GCancellable* calls) {
     g_task_set_task_data(task, new TargetSearch(std::move(search)), deleteTargetSearch);
     g_task_run_in_thread(task, [](GTask* task, gpointer, gpointer data, GCancellable*) {
         auto* search = static_cast<TargetSearch*>(data);
-        search->target = findApplication(search->url, search->userAgent, search->signalled);
+        search->target = findApplication(search->url, search->options, search->signalled);
         g_task_return_boolean(task, TRUE);
     });
 }
@@ -89,7 +89,7 @@ void findTarget(TargetSearch search, GCancellable* calls) {
 } // namespace
 
 TvWindow::TvWindow(Engine& engine, PageChannel& channel, const CommandLine& commandLine)
-    : m_engine(engine), m_channel(channel), m_userAgent(commandLine.userAgent),
+    : m_engine(engine), m_channel(channel), m_requestOptions(commandLine.requestOptions()),
       m_window(gtk_window_new(GTK_WINDOW_TOPLEVEL)), m_overlay(gtk_overlay_new()),
       m_keys({[this] { return m_stack.top(); }, [this](const RemoteKey& key) { m_television.onKey(key); }}),
       m_television(libraryCalls(), stackCalls(), [this](const std::string& text) { m_display.show(text); }),
@@ -223,7 +223,7 @@ void TvWindow::showChannel() {
 Application* TvWindow::openSignalled(const std::string& url) {
     Application& application = pushApplication();
     findTarget({url,
-                m_userAgent,
+                m_requestOptions,
                 {},
                 {},
                 [this, page = application.pageId()](const ApplicationTarget& target) {
@@ -319,7 +319,7 @@ void TvWindow::createApplication(uint64_t caller, const std::string& url, const 
         return;
     }
     findTarget({url,
-                m_userAgent,
+                m_requestOptions,
                 m_television.applications().signalling().applications,
                 {},
                 [this, caller, reply](const ApplicationTarget& target) {
@@ -548,7 +548,7 @@ void TvWindow::paint(uint8_t* pixels, int stride) {
 
 void TvWindow::open(const std::string& url, std::function<void(const std::string& error)> done) {
     findTarget({url,
-                m_userAgent,
+                m_requestOptions,
                 m_television.applications().signalling().applications,
                 {},
                 [this, done = std::move(done)](const ApplicationTarget& target) {
@@ -568,7 +568,7 @@ void TvWindow::open(const std::string& url, std::function<void(const std::string
 void TvWindow::reload(std::function<void(const std::string& error)> done) {
     const char* url = m_stack.top() ? webkit_web_view_get_uri(m_stack.top()->view()) : nullptr;
     findTarget({url ? url : "",
-                m_userAgent,
+                m_requestOptions,
                 {},
                 {},
                 [this, done = std::move(done)](const ApplicationTarget& target) {

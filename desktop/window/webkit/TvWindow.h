@@ -103,7 +103,7 @@ private:
 
     Engine& m_engine;
     PageChannel& m_channel;
-    std::string m_userAgent;
+    RequestOptions m_requestOptions;
     Reports m_reports;
     GtkWidget* m_window;
     GtkWidget* m_overlay;
