@@ -22,8 +22,9 @@ RUN_TIMEOUT = 300
 PROGRAM_TIMEOUT = 840
 POLL_INTERVAL = 0.05
 
-# For the mouse pointer and the contents of the screen. The library is installed with Qt.
+# For the mouse pointer, the keyboard and the contents of the screen. The libraries are installed with Qt and GTK.
 X11 = ctypes.CDLL('libX11.so.6')
+XTEST = ctypes.CDLL('libXtst.so.6')
 X11.XOpenDisplay.restype = ctypes.c_void_p
 X11.XDefaultRootWindow.restype = ctypes.c_ulong
 X11.XDefaultRootWindow.argtypes = X11.XCloseDisplay.argtypes = X11.XDestroyImage.argtypes = [ctypes.c_void_p]
@@ -33,6 +34,11 @@ X11.XWarpPointer.argtypes = [ctypes.c_void_p, ctypes.c_ulong, ctypes.c_ulong] + 
 X11.XGetImage.argtypes = [ctypes.c_void_p, ctypes.c_ulong] + 2 * [ctypes.c_int] + 2 * [ctypes.c_uint] + \
     [ctypes.c_ulong, ctypes.c_int]
 X11.XGetImage.restype = ctypes.c_void_p
+X11.XStringToKeysym.restype = ctypes.c_ulong
+X11.XStringToKeysym.argtypes = [ctypes.c_char_p]
+X11.XKeysymToKeycode.restype = ctypes.c_ubyte
+X11.XKeysymToKeycode.argtypes = [ctypes.c_void_p, ctypes.c_ulong]
+XTEST.XTestFakeKeyEvent.argtypes = [ctypes.c_void_p, ctypes.c_uint, ctypes.c_int, ctypes.c_ulong]
 ZPIXMAP = 2
 
 
@@ -45,10 +51,10 @@ class XImage(ctypes.Structure):  # pylint: disable=too-few-public-methods
 
 
 class Screen:
-    """The contents of a display at one moment, with the interface of PngImage."""
+    """The contents of a part of a display at one moment, with the interface of PngImage."""
 
-    def __init__(self, display, width, height):
-        pointer = X11.XGetImage(display, X11.XDefaultRootWindow(display), 0, 0, width, height, ctypes.c_ulong(-1),
+    def __init__(self, display, width, height, left=0, top=0):
+        pointer = X11.XGetImage(display, X11.XDefaultRootWindow(display), left, top, width, height, ctypes.c_ulong(-1),
                                 ZPIXMAP)
         image = XImage.from_address(pointer)
         self.width, self.height, self._length = width, height, image.bytes_per_line
@@ -164,10 +170,21 @@ class Television:
         X11.XWarpPointer(display, 0, X11.XDefaultRootWindow(display), 0, 0, 0, 0, x, y)
         X11.XSync(display, 0)
 
+    def press_key(self, name):
+        """Presses and releases a key of the keyboard, by the name of its X keysym."""
+        display = self._display()
+        code = X11.XKeysymToKeycode(display, X11.XStringToKeysym(name.encode()))
+        for is_press in (True, False):
+            XTEST.XTestFakeKeyEvent(display, code, is_press, 0)
+        X11.XSync(display, 0)
+
+    def colour(self, x, y):
+        """The colour of the screen at a point now."""
+        return Screen(self._display(), 1, 1, x, y).colour(0, 0)
+
     def wait_for_colour(self, point, colour):
         """Waits until the screen has the colour at a point."""
-        wait_for(lambda: self.screen().colour(*point) == colour,
-                 lambda: f'{point} is {self.screen().colour(*point)}, expected {colour}')
+        wait_for(lambda: self.colour(*point) == colour, lambda: f'{point} is {self.colour(*point)}, expected {colour}')
 
     def screen(self):
         """The contents of the screen now."""

@@ -2,6 +2,7 @@
 the inspector."""
 
 import contextlib
+import json
 import os
 import signal
 import socket
@@ -22,6 +23,16 @@ TELEVISION = '''<object id="manager" type="application/oipfApplicationManager"><
         onkeydown = function (event) { codes.push(event.keyCode); };
         onload = function () { tv.setChannel(tv.getChannelConfig().channelList.item(%d), false); %s };
     </script>'''
+# A DRM message to an object without an id, which gets one unless the window is strict, is answered with an event for
+# no element.
+DRM_MESSAGE = """<object type="application/oipfDrmAgent"></object>
+    <script>
+        onload = function () { console.log("ready"); };
+        onkeydown = function () {
+            document.querySelector("object").sendDRMMessage("application/xml", "<message/>", "urn:dvb:casystemid:1");
+        };
+    </script>"""
+ASSERTION = "Assertion `!id.empty()' failed."
 NUMERIC = 0x100
 
 
@@ -63,6 +74,31 @@ class Crash(TelixTv):
             process.communicate(timeout=RUN_TIMEOUT)
         self.assertEqual(process.returncode, 128 + signal.SIGTERM)
 
+    def is_true(self, expression):
+        """Whether the expression is true in the topmost application; false while there is no web process."""
+        with contextlib.suppress(AssertionError):
+            self.television.telixctl('wait', expression, '--timeout', 1)
+            return True
+        return False
+
+    def test_the_notice_has_the_assertion_that_has_failed_and_ok_starts_the_application_again(self):
+        page = self.write(DRM_MESSAGE)
+        for press_ok in (lambda: self.television.press_key('Return'), lambda: self.television.telixctl('key', 'ok')):
+            with self.television.start('--plugin', DESKTOP_PLUGIN, '--strict', '--keys', 'red', page) as process:
+                messages = Lines(process.stderr)
+                self.assertTrue(messages.wait_for(ASSERTION), messages.lines)
+                reason, = (line for line in messages.lines if line.endswith(ASSERTION))
+                self.assertRegex(reason, '^telix-tv: the web process has crashed: .*common/PluginUtils')
+                reason = reason[len('telix-tv: '):]
+                wait_for(lambda reason=reason: self.is_true(
+                    f'document.getElementById("notice").textContent.indexOf({json.dumps(reason)}) >= 0'), 'no notice')
+                press_ok()
+                wait_for(lambda messages=messages: sum(line.endswith('ready') for line in messages.lines) == 2,
+                         'the application has not been started again')
+                self.assertTrue(self.is_true('document.querySelector("object") && !document.getElementById("notice")'))
+                process.terminate()
+                process.wait(RUN_TIMEOUT)
+            self.assertEqual(process.returncode, 128 + signal.SIGTERM)
 
     def test_without_an_application_the_channel_comes_back(self):
         with self.television.start('--plugin', DESKTOP_PLUGIN, '--keys', '2') as process:
