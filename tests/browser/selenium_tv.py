@@ -10,6 +10,7 @@ from selenium.webdriver.webkitgtk.options import Options
 from selenium.webdriver.webkitgtk.service import Service
 from selenium.common.exceptions import WebDriverException
 
+from recordings import Recorded
 from telix_tv import PLUGIN, TelixTv
 from television import RUN_TIMEOUT
 
@@ -46,8 +47,8 @@ def press(session, *keys):
     ActionChains(session).send_keys(*keys).perform()
 
 
-class DrivenTv(TelixTv):
-    """Base class: sessions of telix-tv, which end with the test."""
+class DrivenTv(Recorded, TelixTv):
+    """Base class: sessions of telix-tv, which end with the test and are recorded."""
 
     @classmethod
     def setUpClass(cls):
@@ -64,7 +65,8 @@ class DrivenTv(TelixTv):
             service.stop()
 
     def start_session(self, service, *arguments, plugin=PLUGIN):
-        return webdriver.Remote(service.service_url, options=options_of('--plugin', plugin, *arguments))
+        options = options_of('--plugin', plugin, '--record', self.new_recording(), *arguments)
+        return webdriver.Remote(service.service_url, options=options)
 
     @contextlib.contextmanager
     def session_of(self, service, *arguments, **options):

@@ -5,6 +5,7 @@ import subprocess
 import sys
 import unittest
 
+from recordings import Recorded
 from television import RUN_TIMEOUT, PngImage, Television
 
 ROOT = os.path.abspath(__file__).rsplit('/tests/', 1)[0]
@@ -17,7 +18,15 @@ from media_server import MediaServer  # noqa: E402 (found by the line above)
 COLOURS_OF_A_PAGE = 50
 
 
-class Examples(unittest.TestCase):
+class Examples(Recorded, unittest.TestCase):
+    def recorded_television(self):
+        """A program that starts telix-tv with a recording, because the examples choose the options themselves."""
+        program = os.path.join(self.recordings, 'telix-tv')
+        with open(program, 'w', encoding='utf-8') as file:
+            file.write(f'#!/bin/sh\nexec "{os.environ["TELIX_TV"]}" "$@" --record "{self.new_recording()}"\n')
+        os.chmod(program, 0o755)
+        return program
+
     def run_example(self, *command):
         """Runs an example with the demonstration and a file for its screenshot."""
         name = os.path.basename(command[-1])
@@ -27,7 +36,7 @@ class Examples(unittest.TestCase):
         television = Television(os.environ['TELIX_TV'])
         self.addCleanup(television.close)
         # The keys of a television without settings.
-        environment = {**television.environment, 'TELIX_CONFIG': ''}
+        environment = {**television.environment, 'TELIX_CONFIG': '', 'TELIX_TV': self.recorded_television()}
         run = subprocess.run([*command, server.url + '/demo/index.html', screenshot], env=environment,
                              stdin=subprocess.DEVNULL, capture_output=True, text=True, timeout=RUN_TIMEOUT, check=False)
         self.assertEqual((run.returncode, run.stdout.splitlines()[-1:]), (0, ['passed']), run)

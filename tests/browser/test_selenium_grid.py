@@ -47,7 +47,7 @@ class Node(DrivenTv):
             self.addCleanup(services[-1].stop)
 
         def start(service):
-            options = options_of('--plugin', PLUGIN)
+            options = options_of('--plugin', PLUGIN, '--record', self.new_recording())
             for name, value in offer.items():
                 options.set_capability(name, value)
             session = webdriver.Remote(service.service_url, options=options)
