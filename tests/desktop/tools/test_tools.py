@@ -189,12 +189,12 @@ class Control(ToolTest):
         self.assertIn('no television is running', self.ctl('list', status=1))
         self.assertIn('telix-1.sock: cannot connect to a television: No such file', self.ctl('--pid', 1, 'state', status=1))
         with self.television() as first, self.television() as second:
+            first.wait_for('change 1')
+            second.wait_for('change 1')
             both = self.ctl('state', status=1)
             self.assertIn('several televisions', both)
             self.assertIn(str(first.pid), both)
             self.assertEqual(self.ctl('list').split()[::2], [str(pid) for pid in sorted((first.pid, second.pid))])
-            first.wait_for('change 1')
-            second.wait_for('change 1')
             socket_of_second = f'{self.folder}/telix-{second.pid}.sock'
             self.ctl('--pid', second.pid, 'channel', 2)
             second.wait_for('change 2')
