@@ -39,6 +39,8 @@ std::string fetchString(std::string& cache, uint32_t handle, Ask ask) {
 
 } // namespace
 
+uint32_t Channel::s_resetCount = 0;
+
 Channel::Channel(NPP npp) : PluginBase(npp), m_channelType(kTypeUnknown) {}
 
 void Channel::reset(uint32_t handle) {
@@ -50,6 +52,7 @@ void Channel::reset(uint32_t handle) {
     m_dsd.clear();
     m_channelType = kTypeUnknown;
     m_channelHandle = handle;
+    ++s_resetCount;
 }
 
 uint32_t Channel::getOnid() {
@@ -90,4 +93,8 @@ std::string Channel::getCcid() {
         PLUGIN_LOG(CHANNEL, "Channel:( %p )::m_Ccid= ( %s )\n", static_cast<void*>(this), m_ccid.c_str());
     }
     return m_ccid;
+}
+
+bool Channel::logsCcid() {
+    return logWanted(logLevelOfFile, LogModule::CHANNEL);
 }

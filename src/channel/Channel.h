@@ -17,6 +17,9 @@ public:
     // Turns the object into another channel: empties the caches too.
     void reset(uint32_t handle);
 
+    // How often any channel has become another one: what was found by handle before may not be true any more.
+    static uint32_t resetCount() { return s_resetCount; }
+
     // DVB ids: original network, transport stream, service. 0 until the platform has given one.
     uint32_t getOnid();
     uint32_t getTsid();
@@ -33,7 +36,12 @@ public:
     // keeps the handle.
     std::string getCcid();
 
+    // Whether each getCcid() prints to the log.
+    static bool logsCcid();
+
 private:
+    static uint32_t s_resetCount;
+
     uint32_t m_onid = 0;
     uint32_t m_tsid = 0;
     uint32_t m_sid = 0;

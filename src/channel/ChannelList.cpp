@@ -1,16 +1,32 @@
-// The channel list: built from handles, searched from the front.
+// The channel list: built from handles; its searches find the first entry that matches.
 #include "src/channel/ChannelList.h"
 
 #include <strings.h>
+
+#include <algorithm>
+#include <cstdlib>
+#include <optional>
 
 #include "common/Log.h"
 #include "src/channel/JSChannel.h"
 #include "telix/telix_platform.h"
 
+namespace {
+
+// The handle with this ccid. Nothing for other strings, which only a channel without a handle can have.
+std::optional<uint32_t> handleOfCcid(const std::string& ccid) {
+    const auto number = static_cast<int32_t>(std::strtol(ccid.c_str(), nullptr, 10));
+    const bool isHandle = number != 0 && std::to_string(number) == ccid.c_str();
+    return isHandle ? std::optional(static_cast<uint32_t>(number)) : std::nullopt;
+}
+
+} // namespace
+
 ChannelList::ChannelList(NPP npp) : PluginBase(npp) {}
 
 void ChannelList::initialize(const uint32_t* handles, unsigned int count) {
     m_channels.setLength(0);
+    m_byHandle.clear();
     if (!handles) {
         return;
     }
@@ -36,6 +52,10 @@ NPObject* ChannelList::getChannel(unsigned int handle) {
 
 NPObject* ChannelList::getChannel(const std::string& ccid) {
     PLUGIN_LOG(CHANNEL, "Channel Id =( %s )\n", ccid.c_str());
+    const auto handle = handleOfCcid(ccid);
+    if (handle && !Channel::logsCcid()) { // the log shows a search from the front
+        return findSorted(*handle);
+    }
     return m_channels.find([&ccid](Channel& channel) {
         if (strcasecmp(channel.getCcid().c_str(), ccid.c_str()) != 0) {
             return false;
@@ -45,6 +65,24 @@ NPObject* ChannelList::getChannel(const std::string& ccid) {
                        ccid.c_str());
         return true;
     });
+}
+
+NPObject* ChannelList::findSorted(uint32_t handle) {
+    if (m_byHandle.size() != getLength() || m_sortedAtReset != Channel::resetCount()) {
+        sortByHandle();
+    }
+    const auto found = std::lower_bound(m_byHandle.begin(), m_byHandle.end(), std::pair(handle, 0U));
+    return found != m_byHandle.end() && found->first == handle ? m_channels.item(found->second) : nullptr;
+}
+
+void ChannelList::sortByHandle() {
+    m_byHandle.clear();
+    m_byHandle.reserve(getLength());
+    for (uint32_t index = 0; index < getLength(); ++index) {
+        m_byHandle.emplace_back(m_channels.wrapperAt(index).impl()->getChannelHandle(), index);
+    }
+    std::sort(m_byHandle.begin(), m_byHandle.end());
+    m_sortedAtReset = Channel::resetCount();
 }
 
 NPObject* ChannelList::getChannelByTriplet(unsigned int onid, unsigned int tsid, unsigned int sid) {

@@ -3,6 +3,9 @@
 #ifndef TELIX_SRC_CHANNEL_CHANNELLIST_H
 #define TELIX_SRC_CHANNEL_CHANNELLIST_H
 
+#include <utility>
+#include <vector>
+
 #include "common/PluginBase.h"
 #include "common/ScriptObjectList.h"
 
@@ -24,7 +27,15 @@ public:
     NPObject* getChannelByTriplet(unsigned int onid, unsigned int tsid, unsigned int sid);
 
 private:
+    NPObject* findSorted(uint32_t handle);
+    void sortByHandle();
+
     ScriptObjectList<JSChannel> m_channels;
+
+    // Handles and indexes of the entries, sorted at the first search by ccid, and again after entries have
+    // become other channels.
+    std::vector<std::pair<uint32_t, uint32_t>> m_byHandle;
+    uint32_t m_sortedAtReset = 0;
 };
 
 #endif

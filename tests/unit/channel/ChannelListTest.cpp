@@ -213,6 +213,46 @@ TEST_F(ChannelListTest, GetChannelOfAnEmptyTextFindsAChannelWithoutACcid) {
     EXPECT_EQ(listOf({5}).call("getChannel", ""), nullptr);
 }
 
+TEST_F(ChannelListTest, GetChannelFindsCcidsOfLargeHandlesInNoOtherNotation) {
+    const ObjectRef list = listOf({0x80000000, 9, 0xFFFFFFFF, 0, 2147483647});
+    EXPECT_EQ(list.call("getChannel", "-2147483648").object(), list.call("item", 0).object());
+    EXPECT_EQ(list.call("getChannel", "-1").object(), list.call("item", 2).object());
+    EXPECT_EQ(list.call("getChannel", "2147483647").object(), list.call("item", 4).object());
+    for (const char* other :
+         {"4294967295", "99999999999999999999", "0", "-0", "+9", "09", " 9", "9x", "0x9"}) {
+        EXPECT_EQ(list.call("getChannel", other), nullptr) << other;
+    }
+}
+
+TEST_F(ChannelListTest, GetChannelFindsWhatAnEntryHasBecome) {
+    const ObjectRef list = listOf({5, 7, 9});
+    EXPECT_EQ(list.call("getChannel", "7").object(), list.call("item", 1).object());
+    modelOf<JSChannel>(list.call("item", 0).object()).reset(9);
+    EXPECT_EQ(list.call("getChannel", "9").object(), list.call("item", 0).object());
+    EXPECT_EQ(list.call("getChannel", "5"), nullptr);
+    modelOf<JSChannel>(list.call("item", 0).object()).reset(0);
+    EXPECT_EQ(list.call("getChannel", "9").object(), list.call("item", 2).object());
+    EXPECT_EQ(list.call("getChannel", "").object(), list.call("item", 0).object());
+}
+
+TEST_F(ChannelListTest, TheLogShowsASearchFromTheFrontEachTime) {
+    const std::string text = logOf(4, [this] {
+        const ObjectRef list = listOf({5, 6, 7});
+        EXPECT_TRUE(list.call("getChannel", "6"));
+        EXPECT_TRUE(list.call("getChannel", "6"));
+    });
+    const auto countOf = [&text](const std::string& part) {
+        size_t count = 0;
+        for (size_t at = text.find(part); at != std::string::npos; at = text.find(part, at + 1)) {
+            ++count;
+        }
+        return count;
+    };
+    EXPECT_EQ(countOf("::m_Ccid= ( 5 )"), 2U);
+    EXPECT_EQ(countOf("::m_Ccid= ( 6 )"), 2U);
+    EXPECT_EQ(countOf("::m_Ccid= ( 7 )"), 0U);
+}
+
 TEST_F(ChannelListTest, GetChannelTakesATextOnly) {
     const ObjectRef list = listOf({5});
     for (const Value& value :
