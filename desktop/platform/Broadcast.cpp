@@ -176,8 +176,11 @@ Broadcast::State Broadcast::state() const {
         state.present = m_presentFollowing.presentLocked();
         state.following = m_presentFollowing.followingLocked();
     }
-    state.instantZap = m_presentation.receiver().keepsPackets();
-    state.keptPackets = m_presentation.receiver().keptSize();
+    state.instantZap = m_presentation.source().keepsPackets();
+    state.tuners = m_presentation.source().receptions();
+    for (const BroadcastSource::Reception& tuner : state.tuners) {
+        state.keptPackets += tuner.keptSize;
+    }
     state.subscriptions = m_streamEvents.subscriptions();
     return state;
 }

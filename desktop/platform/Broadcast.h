@@ -76,7 +76,8 @@ public:
     // Changes how and where an object shows its picture.
     bool changeView(TELIX_JS_VB_HANDLE object, const std::function<void(Picture::View& view)>& change);
 
-    // Whether channel changes within the multiplex begin with what has been received since the last keyframe.
+    // Whether channel changes begin with what has been received since the last keyframe, if the multiplex is
+    // received already.
     void setInstantZap(bool isOn) { m_presentation.setInstantZap(isOn); }
 
     // The components of one type of what the object presents, or the active ones of them. Empty if it does
@@ -112,7 +113,8 @@ public:
         TELIX_JS_SI_HANDLE present; // 0: none
         TELIX_JS_SI_HANDLE following;
         bool instantZap;
-        size_t keptPackets; // bytes, of all services
+        std::vector<BroadcastSource::Reception> tuners;
+        size_t keptPackets; // bytes, of all tuners and services
     };
     State state() const;
 

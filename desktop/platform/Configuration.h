@@ -79,6 +79,7 @@ struct Configuration {
     std::string capabilitiesFile; // absolute path; empty: the generated document
     uint32_t extraSdVideoDecodes;
     uint32_t extraHdVideoDecodes;
+    uint32_t tuners;   // at least 1
     bool instantZap;   // changes of the channel begin with kept packets
     uint32_t zapDelay; // milliseconds before a tune begins
     uint32_t keys;     // bits of the key groups that the remote control has

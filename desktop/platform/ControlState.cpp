@@ -93,6 +93,21 @@ JsonArrayWriter componentsJson(const Broadcast::State& state) {
     return components;
 }
 
+JsonArrayWriter tunersJson(const Broadcast::State& state) {
+    JsonArrayWriter tuners;
+    for (const BroadcastSource::Reception& each : state.tuners) {
+        JsonObjectWriter tuner;
+        if (each.file.empty()) {
+            tuner.null("multiplex");
+        } else {
+            tuner.string("multiplex", each.file);
+        }
+        tuner.boolean("selected", each.isSelected).number("keptPackets", static_cast<int64_t>(each.keptSize));
+        tuners.add(std::move(tuner));
+    }
+    return tuners;
+}
+
 // In milliseconds, negative for what waits for its time; null before anything is presented.
 void setLateness(JsonObjectWriter& json) {
     const ServicePresentation::Lateness lateness = broadcast().lateness();
@@ -306,6 +321,7 @@ JsonObjectWriter reportState(const ControlRequest& request) {
         .object("picture", pictureJson())
         .boolean("instantZap", state.instantZap)
         .number("keptPackets", static_cast<int64_t>(state.keptPackets))
+        .array("tuners", tunersJson(state))
         .number("zapDelay", device().configuration().zapDelay)
         .array("players", playersJson())
         .number("keySet", device().keySet())

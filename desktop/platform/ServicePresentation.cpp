@@ -8,6 +8,13 @@
 
 namespace desktop {
 
+namespace {
+
+// A viewer who goes through the channels does not stay that long on any of them.
+constexpr auto kSettled = std::chrono::seconds(1);
+
+} // namespace
+
 ServicePresentation::ServicePresentation(const Channels& channels, TunerArbiter& arbiter,
                                          BroadcastComponents& components, Clock& clock, Listener listener)
     : m_platform(Platform::instance()), m_channels(channels), m_arbiter(arbiter), m_components(components),
@@ -33,7 +40,7 @@ void ServicePresentation::tune(const Tune& tune) {
     if (handOver(tune)) {
         return;
     }
-    stop();
+    end();
     m_awaitedChannel = 0;
     m_pendingTune = tune;
     m_arbiter.reportConnecting(tune);
@@ -69,6 +76,11 @@ bool ServicePresentation::handOver(const Tune& tune) {
 }
 
 void ServicePresentation::stop() {
+    end();
+    receiveNeighbours();
+}
+
+void ServicePresentation::end() {
     abortPendingTune();
     stopTuner();
 }
@@ -125,6 +137,22 @@ void ServicePresentation::followApplications(const Channel& channel) {
 void ServicePresentation::loseService() {
     m_followedChannel = 0;
     m_listener.onServiceLost();
+}
+
+void ServicePresentation::setInstantZap(bool isOn) {
+    m_source.keepPackets(isOn);
+    m_platform.post([this] { receiveNeighbours(); });
+}
+
+// While a channel is on, whose picture the neighbours could follow without waiting for a keyframe.
+void ServicePresentation::receiveNeighbours() {
+    std::vector<Channel> neighbours;
+    if (m_tuner && m_pendingTune.id == 0 && m_source.keepsPackets()) {
+        for (const TELIX_JS_CM_HANDLE handle : m_arbiter.neighbours()) {
+            neighbours.push_back(m_channels.find(handle).value_or(Channel()));
+        }
+    }
+    m_source.receiveBesides(neighbours);
 }
 
 // ---- From the channel to the running pipeline
@@ -241,6 +269,11 @@ void ServicePresentation::onPrerolled(uint64_t tuneId) {
     const Tune presented = std::exchange(m_pendingTune, {});
     m_components.updateAspectRatio();
     m_arbiter.reportPresenting(presented);
+    m_clock.callAfter(kSettled, [this, tuneId] {
+        if (m_activeTuneId == tuneId) {
+            receiveNeighbours();
+        }
+    });
 }
 
 void ServicePresentation::onTimeout(uint64_t tuneId) {
@@ -276,6 +309,7 @@ void ServicePresentation::onTunerPreempted() {
         m_arbiter.preemptLocked(object);
     }
     stopTuner();
+    receiveNeighbours();
     m_arbiter.reportPreempted(object);
 }
 

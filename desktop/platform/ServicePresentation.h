@@ -61,9 +61,11 @@ public:
     // Receives the signalling of a channel while nothing is presented.
     void receive(TELIX_JS_CM_HANDLE channel);
 
-    // Whether changes within the multiplex begin with what has been received before. Any thread.
-    void setInstantZap(bool isOn) { m_source.receiver().keepPackets(isOn); }
-    const Receiver& receiver() const { return m_source.receiver(); }
+    // Whether changes to a multiplex that is received begin with what has been received before. Any thread.
+    void setInstantZap(bool isOn);
+
+    // What is received, by which tuners.
+    const BroadcastSource& source() const { return m_source; }
 
     // Passes the active components on to the pipeline.
     void applySelection();
@@ -83,11 +85,13 @@ public:
 
 private:
     void onTestMultiplex();
+    void end();
     void present(const Tune& tune);
     BroadcastSource::Result openSource(const Channel& channel, std::string& error);
     void followApplications(const Channel& channel);
     void loseService();
     Picture::View viewOf(const Tune& tune) const;
+    void receiveNeighbours();
     void startTuner(const Tune& tune, uint16_t serviceId);
     void selectService(const Tune& tune, uint16_t serviceId);
     void onPmt(const Tune& tune, const Pmt& pmt);

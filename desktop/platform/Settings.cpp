@@ -15,6 +15,7 @@ namespace {
 constexpr uint32_t kMaxAge = 18;
 constexpr uint32_t kSecondsPerDay = 86400;
 constexpr uint32_t kMaxZapDelay = 60000;
+constexpr uint32_t kMaxTuners = 3;          // for a channel and both of its neighbours
 constexpr size_t kMaxApplicationsUrl = 240; // it must fit into a descriptor
 
 const char kTestMultiplex[] = "test";
@@ -248,9 +249,12 @@ const std::vector<Setting>& settings() {
          "Number of further SD videos that could be decoded"},
         {"set", "extra-hd-video-decodes", number(&C::extraHdVideoDecodes, 0, 16), "0",
          "Number of further HD videos that could be decoded"},
+        {"set", "tuners", number(&C::tuners, 1, kMaxTuners), "1",
+         "Number of tuners. The second one, and the third, receive the multiplexes of the next and the "
+         "previous channel while a channel is on, so that changes to them are instant as well"},
         {"set", "instant-zap", flag(&C::instantZap), "true",
-         "Whether a channel change within the multiplex presents at once what has been received since the "
-         "last keyframe; if false, it waits for the next one"},
+         "Whether a channel change to a multiplex that a tuner receives presents at once what has been "
+         "received since the last keyframe; if false, it waits for the next one"},
         {"set", "zap-delay", number(&C::zapDelay, 0, kMaxZapDelay), "0",
          "Milliseconds before each tune begins, as on a slower set"},
     };

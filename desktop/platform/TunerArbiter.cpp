@@ -71,6 +71,13 @@ bool TunerArbiter::end(TELIX_JS_VB_HANDLE object, TELIX_PLAYSTATE_ENUM_T state) 
     return true;
 }
 
+void TunerArbiter::selectLocked(TELIX_JS_CM_HANDLE channel) {
+    if (channel != m_currentChannel) {
+        m_direction = channel == m_channels.neighbour(m_currentChannel, -1) ? -1 : 1;
+        m_currentChannel = channel;
+    }
+}
+
 void TunerArbiter::requestLocked(TELIX_JS_VB_HANDLE object, TELIX_JS_CM_HANDLE channel) {
     const TELIX_JS_VB_HANDLE preempted = m_tunerOwner;
     if (preempted != 0 && preempted != object) {
@@ -83,7 +90,7 @@ void TunerArbiter::requestLocked(TELIX_JS_VB_HANDLE object, TELIX_JS_CM_HANDLE c
         });
     }
     m_tunerOwner = object;
-    m_currentChannel = channel;
+    selectLocked(channel);
     m_objects[object].channel = channel;
     m_objects[object].playState = TELIX_PLAYSTATE_CONNECTING;
     m_latestTune = {m_latestTune.id + 1, object, channel};
@@ -140,7 +147,7 @@ bool TunerArbiter::zap(TELIX_JS_CM_HANDLE channel) {
     if (m_tunerOwner != 0) {
         requestLocked(m_tunerOwner, channel);
     } else {
-        m_currentChannel = channel;
+        selectLocked(channel);
         m_platform.post([this, channel] { m_listener.onChannel(channel); });
     }
     return true;
@@ -195,6 +202,12 @@ bool TunerArbiter::setPlayState(TELIX_JS_VB_HANDLE object, TELIX_PLAYSTATE_ENUM_
 TELIX_JS_CM_HANDLE TunerArbiter::currentChannel() const {
     std::lock_guard<std::mutex> lock(m_platform.mutex());
     return m_currentChannel;
+}
+
+std::array<TELIX_JS_CM_HANDLE, 2> TunerArbiter::neighbours() const {
+    std::lock_guard<std::mutex> lock(m_platform.mutex());
+    return {m_channels.neighbour(m_currentChannel, m_direction),
+            m_channels.neighbour(m_currentChannel, -m_direction)};
 }
 
 TELIX_JS_VB_HANDLE TunerArbiter::owner() const {

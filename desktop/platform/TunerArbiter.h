@@ -3,6 +3,7 @@
 #ifndef TELIX_DESKTOP_PLATFORM_TUNERARBITER_H
 #define TELIX_DESKTOP_PLATFORM_TUNERARBITER_H
 
+#include <array>
 #include <cstdint>
 #include <functional>
 #include <map>
@@ -90,6 +91,10 @@ public:
     TELIX_JS_CM_HANDLE currentChannel() const;
     TELIX_JS_CM_HANDLE currentChannelLocked() const { return m_currentChannel; }
 
+    // The channels before and after the current one, beginning with the one that comes next if the viewer
+    // goes on in the same direction.
+    std::array<TELIX_JS_CM_HANDLE, 2> neighbours() const;
+
     // The object that presents or tunes; 0 if none does.
     TELIX_JS_VB_HANDLE owner() const;
     TELIX_JS_VB_HANDLE ownerLocked() const { return m_tunerOwner; }
@@ -118,6 +123,7 @@ public:
 
 private:
     bool end(TELIX_JS_VB_HANDLE object, TELIX_PLAYSTATE_ENUM_T state);
+    void selectLocked(TELIX_JS_CM_HANDLE channel);
     void requestLocked(TELIX_JS_VB_HANDLE object, TELIX_JS_CM_HANDLE channel);
     void changeState(TELIX_JS_VB_HANDLE object, TELIX_PLAYSTATE_ENUM_T state, TELIX_ERR_STATE_ENUM_T error);
 
@@ -133,7 +139,8 @@ private:
     Picture::View m_backgroundView; // constant
     TELIX_JS_VB_HANDLE m_tunerOwner = 0;
     TELIX_JS_CM_HANDLE m_currentChannel = 0;
-    Tune m_latestTune; // object and channel are 0 after a release
+    int m_direction = 1; // in which the viewer goes through the list; -1: to its beginning
+    Tune m_latestTune;   // object and channel are 0 after a release
 };
 
 } // namespace desktop

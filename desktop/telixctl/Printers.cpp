@@ -140,6 +140,14 @@ void printPlayer(JsonObject* player) {
                            numberMember(player, "volume") + ", buffered " + numberMember(player, "buffered"));
 }
 
+void printTuner(JsonObject* tuner) {
+    const std::string multiplex = stringMember(tuner, "multiplex");
+    printRow("tuner", multiplex.empty()
+                          ? "receives nothing"
+                          : multiplex + ", " + numberMember(tuner, "keptPackets") + " bytes kept" +
+                                (booleanMember(tuner, "selected") ? ", selected" : ""));
+}
+
 std::string keysOf(JsonObject* response, const char* receiver) {
     std::string keys;
     for (const std::string& name : stringsMember(response, receiver)) {
@@ -228,6 +236,7 @@ void printState(JsonObject* response) {
     printRow("instant zap", booleanMember(response, "instantZap")
                                 ? "on, " + numberMember(response, "keptPackets") + " bytes kept"
                                 : "off");
+    forEachObject(response, "tuners", printTuner);
     printRow("zap delay", numberMember(response, "zapDelay") + " ms");
     forEachObject(response, "players", printPlayer);
     printRow("page keys", orNone(keysOf(response, "keys")));

@@ -97,6 +97,7 @@ TEST_F(ConfigurationTest, NamesFileLineAndReasonOfEveryFault) {
         {"[set]\nkeys=red;pink\n", 2, "\"pink\" is not a group of keys"},
         {"[test]\napplications=apps/\n", 2, "\"apps/\" is not an absolute URL"},
         {"[set]\ninstant-zap=maybe\n", 2, "\"maybe\" is neither true nor false"},
+        {"[set]\ntuners=4\n", 2, "tuners"},
         {"[set]\nzap-delay=60001\n", 2, "zap-delay"},
         {"[set]\ncapabilities=missing.xml\n", 2, "missing.xml"},
     };
@@ -184,6 +185,7 @@ TEST_F(ConfigurationTest, HasTheDefaultsOfTheTableWithoutAFile) {
     EXPECT_EQ(defaults.extraSdVideoDecodes, 1U);
     EXPECT_EQ(defaults.extraHdVideoDecodes, 0U);
     EXPECT_EQ(defaults.applicationsUrl, "");
+    EXPECT_EQ(defaults.tuners, 1U);
     EXPECT_TRUE(defaults.instantZap);
     EXPECT_EQ(defaults.zapDelay, 0U);
 }

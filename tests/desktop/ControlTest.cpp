@@ -249,6 +249,8 @@ TEST_F(ControlTest, SwitchesInstantChannelChanges) {
     ASSERT_TRUE(waitUntil([&] { return find(client.send(kState), "$.keptPackets") != "0"; }));
     EXPECT_EQ(find(client.send(kState), "$.instantZap"), "true");
     EXPECT_EQ(find(client.send(kState), "$.zapDelay"), "0");
+    EXPECT_THAT(find(client.send(kState), "$.tuners[0].multiplex"), HasSubstr("test-multiplex"));
+    EXPECT_EQ(find(client.send(kState), "$.tuners[0].selected"), "true");
     EXPECT_EQ(client.send(R"({"command":"instant-zap","on":false})"), kDone);
     EXPECT_EQ(find(client.send(kState), "$.instantZap"), "false");
     EXPECT_EQ(find(client.send(kState), "$.keptPackets"), "0");

@@ -12,58 +12,11 @@
 #include "desktop/platform/Broadcast.h"
 #include "desktop/platform/Multiplex.h"
 #include "telix/telix_platform.h"
-#include "tests/desktop/Received.h"
+#include "tests/desktop/LineUpTest.h"
 
 using namespace desktop;
 
 namespace {
-
-// The outcome of each tune: the channel and the error.
-Received<std::pair<TELIX_JS_CM_HANDLE, TELIX_ERR_STATE_ENUM_T>> outcomes;
-
-TELIX_RETCODE_ENUM_T onChange(TELIX_JS_VB_HANDLE, TELIX_JS_CM_HANDLE channel) {
-    return outcomes.add({channel, TELIX_ERR_STATE_NONE});
-}
-TELIX_RETCODE_ENUM_T onError(TELIX_JS_VB_HANDLE, TELIX_JS_CM_HANDLE channel, TELIX_ERR_STATE_ENUM_T error) {
-    return outcomes.add({channel, error});
-}
-
-// A platform with a channel list of its own.
-class LineUpTest : public testing::Test {
-protected:
-    void start(const std::string& lineUp, uint32_t expected) {
-        setenv("TELIX_CHANNELS", lineUp.c_str(), 1);
-        ASSERT_EQ(TELIX_JS_VB_GetHandle(&m_object), 0);
-        TELIX_JS_VB_RegisterOnChannelChangeSucceeded(onChange);
-        TELIX_JS_VB_RegisterOnChannelChangeError(onError);
-        uint32_t count = 0;
-        TELIX_JS_CM_HANDLE* handles = nullptr;
-        ASSERT_EQ(TELIX_JS_CM_GetChannelList(&count, &handles), 0);
-        ASSERT_EQ(count, expected);
-        m_channels.assign(handles, handles + count);
-    }
-
-    void TearDown() override {
-        TELIX_JS_VB_Release(m_object);
-        TELIX_JS_VB_UnRegisterOnChannelChangeSucceeded(onChange);
-        TELIX_JS_VB_UnRegisterOnChannelChangeError(onError);
-    }
-
-    // Tunes and returns the outcome.
-    TELIX_ERR_STATE_ENUM_T tune(TELIX_JS_CM_HANDLE channel) {
-        const size_t before = outcomes.all().size();
-        EXPECT_EQ(TELIX_JS_VB_SetChannel(m_object, channel, 0), 0);
-        if (!waitUntil([&] { return outcomes.all().size() > before; })) {
-            ADD_FAILURE() << "no outcome";
-            return -1;
-        }
-        EXPECT_EQ(outcomes.all()[before].first, channel);
-        return outcomes.all()[before].second;
-    }
-
-    TELIX_JS_VB_HANDLE m_object = 0;
-    std::vector<TELIX_JS_CM_HANDLE> m_channels;
-};
 
 class FilesTest : public LineUpTest {
 protected:

@@ -116,6 +116,7 @@ class Control(ToolTest):
             self.assertRegex(text, r'(?m)^object +1 presenting, owns the tuner, 1280x720 at 0,0$')
             self.assertRegex(text, rf'(?m)^audio +MPEG1_L2 deu PID {active[0]}, active, playing$')
             self.assertRegex(text, r'(?m)^picture +frame \d+, 720x576, shown 1280x720 at 0,0$')
+            self.assertRegex(text, r'(?m)^tuner +/.+/test-multiplex-1\.ts, \d+ bytes kept, selected$')
             self.assertRegex(text, r'(?m)^stream event +id 77 tag 42 offer$')
             self.assertRegex(text, r'(?m)^listeners +channelChange channelError fullScreen ratingChange ratingError '
                                    r'lowMemory drmMessageResult$')
