@@ -32,11 +32,11 @@ PAGE = '''<!DOCTYPE html><html><body style="margin: 0; background: {background}"
 </script></body></html>'''
 
 
-def make_stream(file):
+def make_stream(file, size='1280x720', rate=25, megabits=6):
     subprocess.run(
-        ['ffmpeg', '-hide_banner', '-loglevel', 'error', '-f', 'lavfi', '-i', 'testsrc2=size=1280x720:rate=25',
+        ['ffmpeg', '-hide_banner', '-loglevel', 'error', '-f', 'lavfi', '-i', f'testsrc2=size={size}:rate={rate}',
          '-f', 'lavfi', '-i', 'sine=frequency=440:sample_rate=48000', '-t', str(SECONDS + 15), '-c:v', 'mpeg2video',
-         '-b:v', '6M', '-maxrate', '8M', '-bufsize', '2M', '-g', '12', '-c:a', 'mp2', '-b:a', '192k',
+         '-b:v', f'{megabits}M', '-maxrate', f'{megabits + 2}M', '-bufsize', '2M', '-g', '12', '-c:a', 'mp2', '-b:a', '192k',
          '-muxdelay', '0.2', '-muxpreload', '0.2', '-f', 'mpegts', file], check=True)
 
 
@@ -75,9 +75,9 @@ def load(process):
     return (cpu_seconds(process) - before) / (time.monotonic() - begin)
 
 
-def television_load(television, engine, page, environment):
+def television_load(television, engine, page, environment, size='1280x720'):
     """The load from the first picture on."""
-    with television.start('--engine', engine, page, environment=environment) as process:
+    with television.start('--engine', engine, '--size', size, page, environment=environment) as process:
         try:
             for line in process.stderr:
                 if 'presenting' in line:
@@ -90,11 +90,11 @@ def television_load(television, engine, page, environment):
             process.communicate()
 
 
-def mpv_load(television, stream):
+def mpv_load(television, stream, size='1280x720'):
     """The load of a player that shows each frame of the stream in a window of the same size, with silent audio."""
     with subprocess.Popen(
             ['mpv', '--no-config', '--vo=x11', '--ao=null', '--hwdec=no', '--framedrop=no', '--no-border',
-             '--geometry=1280x720+0+0', '--msg-level=all=error,statusline=status',
+             f'--geometry={size}+0+0', '--msg-level=all=error,statusline=status',
              '--term-status-msg=${time-pos}', stream],
             env=television.environment, stdout=subprocess.PIPE, stderr=subprocess.STDOUT, text=True) as process:
         try:
