@@ -132,11 +132,13 @@ std::mt19937& randomNumbers() {
     return numbers;
 }
 
-// How a change is chosen: the position of the following channel, and what has to be there before the change.
+// A kind of change: the channel at which it may begin (the current one if possible), the one to which it
+// leads, and what has to be there before. Channels are positions in the list.
 struct Change {
     const char* name;
     bool isInstant;
-    std::function<size_t(size_t current)> next;
+    std::function<size_t(size_t current)> start;
+    std::function<size_t(size_t start)> next;
     std::function<bool()> isReady;
 };
 
@@ -149,22 +151,34 @@ bool receivesNeighbour() {
     return std::all_of(tuners.begin(), tuners.end(), [](const auto& tuner) { return tuner.keptSize > 0; });
 }
 
-// Another one of the test multiplex.
-size_t nextOfTestMultiplex(size_t current) {
-    const size_t count = desktop::testServices().size();
-    return current >= count ? 0 : (current + 1 + randomNumbers()() % (count - 1)) % count;
+size_t services() {
+    return desktop::testServices().size(); // of each multiplex
 }
 
-// The service in the middle of the following multiplex, whose neighbours are in it, too.
-size_t middleOfNextMultiplex(size_t current) {
-    const size_t count = desktop::testServices().size();
-    return (current / count + 1) % (1 + std::size(kFiles)) * count + 1;
+size_t inTestMultiplex(size_t current) {
+    return current < services() ? current : 0;
 }
 
-// To and fro between the last service of one file and the first one of the next.
-size_t neighbourInOtherMultiplex(size_t current) {
-    const size_t first = 2 * desktop::testServices().size();
-    return current == first ? first - 1 : first;
+size_t otherInTestMultiplex(size_t start) {
+    return (start + 1 + randomNumbers()() % (services() - 1)) % services();
+}
+
+// The service in the middle of a multiplex, whose neighbours are in it, too.
+size_t inTheMiddle(size_t current) {
+    return current - current % services() + 1;
+}
+
+size_t middleOfNextMultiplex(size_t start) {
+    return (start + services()) % (services() * (1 + std::size(kFiles)));
+}
+
+// The last service of one file, or the first one of the next.
+size_t atTheBorder(size_t current) {
+    return current == 2 * services() ? current : 2 * services() - 1;
+}
+
+size_t acrossTheBorder(size_t start) {
+    return start == 2 * services() ? start - 1 : 2 * services();
 }
 
 // The distance to the random access points before and after depends on the moment of the tune.
@@ -192,20 +206,20 @@ std::optional<double> changeTo(size_t channel) {
 }
 
 void tune(benchmark::State& state, const Change& change) {
-    static size_t current = 0;
+    static std::optional<size_t> current;
     desktop::Broadcast::instance().setInstantZap(change.isInstant);
-    if (g_times[change.name].empty()) { // the first one may come from elsewhere, and does not count
-        current = change.next(current);
-        changeTo(current);
-    }
     for (auto each : state) {
         (void)each;
+        const size_t start = change.start(current.value_or(0));
+        if (current != start) {
+            changeTo(start);
+        }
         if (!waitForMoment(change)) {
             state.SkipWithError("the neighbour is not received");
             return;
         }
-        current = change.next(current);
-        const auto seconds = changeTo(current);
+        current = change.next(start);
+        const auto seconds = changeTo(*current);
         if (!seconds) {
             state.SkipWithError("no frame arrived");
             return;
@@ -366,10 +380,10 @@ void registerAll(const std::filesystem::path& folder) {
         keyframeOfOtherMultiplex(state, kKeyframe, file);
     });
     for (const Change& change :
-         {Change{"changeAtNextKeyframe", false, nextOfTestMultiplex, always},
-          Change{kInstantChange, true, nextOfTestMultiplex, always},
-          Change{kOtherChange, true, middleOfNextMultiplex, always},
-          Change{kNeighbourChange, true, neighbourInOtherMultiplex, receivesNeighbour}}) {
+         {Change{"changeAtNextKeyframe", false, inTestMultiplex, otherInTestMultiplex, always},
+          Change{kInstantChange, true, inTestMultiplex, otherInTestMultiplex, always},
+          Change{kOtherChange, true, inTheMiddle, middleOfNextMultiplex, always},
+          Change{kNeighbourChange, true, atTheBorder, acrossTheBorder, receivesNeighbour}}) {
         add(change.name, [change](benchmark::State& state) { tune(state, change); });
     }
 }
@@ -377,6 +391,12 @@ void registerAll(const std::filesystem::path& folder) {
 } // namespace
 
 int main(int argc, char** argv) {
+    // In turns, so that other load of the machine affects all.
+    std::vector<char*> arguments(argv, argv + argc);
+    std::string inTurns = "--benchmark_enable_random_interleaving=true";
+    arguments.insert(arguments.begin() + 1, inTurns.data());
+    ++argc;
+    argv = arguments.data();
     benchmark::Initialize(&argc, argv);
     if (benchmark::ReportUnrecognizedArguments(argc, argv)) {
         return 2;
