@@ -1,7 +1,9 @@
 // What the keys do that no page gets.
 #include <gtest/gtest.h>
 
+#include <functional>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include "desktop/window/shared/Television.h"
@@ -43,6 +45,21 @@ protected:
         return window;
     }
 
+    Television::Timer timer() {
+        return {[this](unsigned milliseconds, std::function<void()> onEnd) {
+                    m_timerEnd = m_now + milliseconds;
+                    m_onTimerEnd = std::move(onEnd);
+                },
+                [this] { m_onTimerEnd = nullptr; }};
+    }
+
+    void pass(unsigned milliseconds) {
+        m_now += milliseconds;
+        if (m_onTimerEnd && m_now >= m_timerEnd) {
+            std::exchange(m_onTimerEnd, nullptr)();
+        }
+    }
+
     void press(const std::string& key) { m_television.onKey(*remoteKeyByName(key)); }
 
     void signalAutostart() {
@@ -58,14 +75,63 @@ protected:
     bool m_hasApplication = false;
     Strings m_calls;
     Strings m_shown;
-    Television m_television{library(), window(),
-                            [this](const std::string& text) { m_shown.push_back(text); }};
+    unsigned m_now = 0;
+    unsigned m_timerEnd = 0;
+    std::function<void()> m_onTimerEnd; // null: the timer does not run
+    Television m_television{library(), window(), [this](const std::string& text) { m_shown.push_back(text); },
+                            timer()};
 };
 
 TEST_F(TelevisionTest, ADigitSelectsAChannelAndItsNameIsShown) {
     press("2");
+    EXPECT_EQ(m_shown, Strings{"2"});
+    pass(Television::kDigitMilliseconds - 1);
+    EXPECT_EQ(m_calls, Strings{});
+    pass(1);
     EXPECT_EQ(m_calls, Strings{"tune 2"});
-    EXPECT_EQ(m_shown, Strings{"2   Name"});
+    EXPECT_EQ(m_shown, (Strings{"2", "2   Name"}));
+}
+
+TEST_F(TelevisionTest, DigitsThatFollowInTimeAreOneNumberThatIsShownAsItIsTyped) {
+    for (const char* digit : {"1", "0", "7"}) {
+        press(digit);
+        EXPECT_EQ(m_calls, Strings{});
+        pass(Television::kDigitMilliseconds - 1);
+    }
+    pass(1);
+    EXPECT_EQ(m_calls, Strings{"tune 107"});
+    EXPECT_EQ(m_shown, (Strings{"1", "10", "107", "107   Name"}));
+    press("3");
+    pass(Television::kDigitMilliseconds);
+    EXPECT_EQ(m_calls, (Strings{"tune 107", "tune 3"}));
+}
+
+TEST_F(TelevisionTest, FourDigitsAreAWholeNumber) {
+    for (const char* digit : {"0", "0", "1", "2"}) {
+        press(digit);
+    }
+    EXPECT_EQ(m_calls, Strings{"tune 12"});
+    pass(2 * Television::kDigitMilliseconds);
+    EXPECT_EQ(m_calls, Strings{"tune 12"});
+}
+
+TEST_F(TelevisionTest, OkSelectsTheTypedChannelAtOnce) {
+    press("1");
+    press("2");
+    press("ok");
+    EXPECT_EQ(m_calls, Strings{"tune 12"});
+    press("ok");
+    pass(2 * Television::kDigitMilliseconds);
+    EXPECT_EQ(m_calls, Strings{"tune 12"});
+}
+
+TEST_F(TelevisionTest, AnotherKeyDiscardsTheTypedNumber) {
+    for (const char* key : {"channel-up", "info"}) {
+        press("1");
+        press(key);
+        pass(2 * Television::kDigitMilliseconds);
+    }
+    EXPECT_EQ(m_calls, Strings{"step 1"});
 }
 
 TEST_F(TelevisionTest, ChannelKeysStepThroughTheChannels) {

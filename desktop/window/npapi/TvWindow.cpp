@@ -26,6 +26,7 @@
 #include "desktop/window/shared/CommandLine.h"
 #include "desktop/window/shared/Diagnostics.h"
 #include "desktop/window/shared/LoadCheck.h"
+#include "desktop/window/shared/MainLoopTimer.h"
 
 namespace desktop {
 
@@ -49,8 +50,10 @@ TvWindow::TvWindow(const CommandLine& commandLine)
     : m_requestOptions(commandLine.requestOptions()), m_start{commandLine.channel, commandLine.signalUrl,
                                                               std::max(commandLine.channel, kFirstChannel)},
       m_videoPlane(new VideoPlane(this)), m_display(new OnScreenDisplay(this)),
-      m_television(libraryCalls(), stackCalls(),
-                   [this](const std::string& text) { m_display->show(QString::fromStdString(text)); }),
+      m_television(
+          libraryCalls(), stackCalls(),
+          [this](const std::string& text) { m_display->show(QString::fromStdString(text)); },
+          mainLoopTimer()),
       m_network(commandLine.ignoresCertificateErrors) {
     signallingEvent();
     m_library.loadBeside(commandLine.plugin);

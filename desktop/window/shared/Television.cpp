@@ -12,48 +12,83 @@ namespace {
 constexpr uint32_t kFullVolume = 100;
 constexpr uint32_t kVolumeStep = 5;
 
-// The keys that are not digits.
-enum class Action { ChannelUp, ChannelDown, VolumeUp, VolumeDown, Mute, Exit, Start, StartUnlessRunning };
-struct KeyAction {
-    const char* key;
-    Action action;
-};
-// RED is the key with which applications announce themselves.
-constexpr KeyAction kActions[] = {{"channel-up", Action::ChannelUp},
-                                  {"channel-down", Action::ChannelDown},
-                                  {"volume-up", Action::VolumeUp},
-                                  {"volume-down", Action::VolumeDown},
-                                  {"mute", Action::Mute},
-                                  {"exit", Action::Exit},
-                                  {"text", Action::Start},
-                                  {"red", Action::StartUnlessRunning}};
+// The longest logical channel numbers have four digits.
+constexpr std::size_t kMostDigits = 4;
 
 } // namespace
 
+// The keys that are not digits. RED is the key with which applications announce themselves.
+const Television::KeyAction Television::kActions[] = {{"ok", Action::SelectTyped},
+                                                      {"channel-up", Action::ChannelUp},
+                                                      {"channel-down", Action::ChannelDown},
+                                                      {"volume-up", Action::VolumeUp},
+                                                      {"volume-down", Action::VolumeDown},
+                                                      {"mute", Action::Mute},
+                                                      {"exit", Action::Exit},
+                                                      {"text", Action::Start},
+                                                      {"red", Action::StartUnlessRunning}};
+
 Television::Television(Library library, SignalledApplications::Window window,
-                       std::function<void(const std::string& text)> display)
-    : m_library(std::move(library)), m_display(std::move(display)), m_applications(std::move(window)) {}
+                       std::function<void(const std::string& text)> display, Timer timer)
+    : m_library(std::move(library)), m_display(std::move(display)), m_timer(std::move(timer)),
+      m_applications(std::move(window)) {}
+
+Television::~Television() {
+    m_timer.stop();
+}
 
 void Television::onKey(const RemoteKey& key) {
-    const auto showChannel = [this](uint32_t number, const std::string& name) {
-        if (number > 0) {
-            m_display(std::to_string(number) + "   " + name);
-        }
-    };
     if (key.group == KeyGroupNumeric) {
-        m_library.tune(static_cast<uint32_t>(key.keyCode - '0'), showChannel);
+        onDigit(static_cast<char>(key.keyCode));
         return;
     }
     const std::string name = key.name;
     const auto* found = std::find_if(std::begin(kActions), std::end(kActions),
                                      [&name](const KeyAction& each) { return name == each.key; });
-    if (found == std::end(kActions)) {
-        return;
+    const bool isKnown = found != std::end(kActions);
+    if (!isKnown || found->action != Action::SelectTyped) {
+        m_timer.stop();
+        m_digits.clear();
     }
-    switch (found->action) {
+    if (isKnown) {
+        perform(found->action);
+    }
+}
+
+void Television::onDigit(char digit) {
+    m_digits += digit;
+    m_display(m_digits);
+    if (m_digits.size() == kMostDigits) {
+        selectTypedChannel();
+    } else {
+        m_timer.start(kDigitMilliseconds, [this] { selectTypedChannel(); });
+    }
+}
+
+void Television::selectTypedChannel() {
+    m_timer.stop();
+    const std::string digits = std::exchange(m_digits, {});
+    if (!digits.empty()) {
+        m_library.tune(static_cast<uint32_t>(std::stoul(digits)), showChannel());
+    }
+}
+
+Television::OnChannel Television::showChannel() const {
+    return [this](uint32_t number, const std::string& name) {
+        if (number > 0) {
+            m_display(std::to_string(number) + "   " + name);
+        }
+    };
+}
+
+void Television::perform(Action action) {
+    switch (action) {
+    case Action::SelectTyped:
+        selectTypedChannel();
+        break;
     case Action::ChannelUp:
     case Action::ChannelDown:
-        m_library.step(found->action == Action::ChannelUp ? 1 : -1, showChannel);
+        m_library.step(action == Action::ChannelUp ? 1 : -1, showChannel());
         break;
     case Action::VolumeUp:
         setVolume(std::min(std::max(m_volume, m_volumeBeforeMute) + kVolumeStep, kFullVolume));

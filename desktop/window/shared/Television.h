@@ -15,6 +15,16 @@ namespace desktop {
 // Main thread.
 class Television {
 public:
+    // The timer of the channel number that is being typed.
+    struct Timer {
+        // Calls `onEnd` after that time, unless it is started again or stopped before.
+        std::function<void(unsigned milliseconds, std::function<void()> onEnd)> start;
+        std::function<void()> stop;
+    };
+
+    // Digits that follow one another within this time are one number.
+    static constexpr unsigned kDigitMilliseconds = 1500;
+
     // Receives the channel that is on then; 0 and an empty name if there is none.
     using OnChannel = std::function<void(uint32_t number, const std::string& name)>;
 
@@ -30,11 +40,13 @@ public:
 
     // `display` shows a text of the on-screen display for some seconds.
     Television(Library library, SignalledApplications::Window window,
-               std::function<void(const std::string& text)> display);
+               std::function<void(const std::string& text)> display, Timer timer);
+    ~Television();
     Television(const Television&) = delete;
     Television& operator=(const Television&) = delete;
 
-    // A key that no page gets has been pressed.
+    // A key that no page gets has been pressed. The number that digits form selects a channel when no other
+    // follows in time, at the most digits that a number has, or with OK; any other key discards it.
     void onKey(const RemoteKey& key);
 
     // 0 to 100, for a library that starts again.
@@ -44,11 +56,34 @@ public:
     const SignalledApplications& applications() const { return m_applications; }
 
 private:
+    enum class Action {
+        SelectTyped,
+        ChannelUp,
+        ChannelDown,
+        VolumeUp,
+        VolumeDown,
+        Mute,
+        Exit,
+        Start,
+        StartUnlessRunning
+    };
+    struct KeyAction {
+        const char* key;
+        Action action;
+    };
+    static const KeyAction kActions[];
+
+    void onDigit(char digit);
+    void selectTypedChannel();
+    OnChannel showChannel() const;
+    void perform(Action action);
     void setVolume(uint32_t volume);
 
     Library m_library;
     std::function<void(const std::string& text)> m_display;
+    Timer m_timer;
     SignalledApplications m_applications;
+    std::string m_digits; // of the channel number that is being typed
     uint32_t m_volume = 100;
     uint32_t m_volumeBeforeMute = 0; // 0: not muted
 };

@@ -8,6 +8,7 @@
 
 #include "desktop/window/shared/CommandLine.h"
 #include "desktop/window/shared/Diagnostics.h"
+#include "desktop/window/shared/MainLoopTimer.h"
 #include "desktop/window/shared/Notice.h"
 #include "desktop/window/shared/PageGeometry.h"
 #include "desktop/window/webkit/Engine.h"
@@ -92,7 +93,9 @@ TvWindow::TvWindow(Engine& engine, PageChannel& channel, const CommandLine& comm
     : m_engine(engine), m_channel(channel), m_requestOptions(commandLine.requestOptions()),
       m_window(gtk_window_new(GTK_WINDOW_TOPLEVEL)), m_overlay(gtk_overlay_new()),
       m_keys({[this] { return m_stack.top(); }, [this](const RemoteKey& key) { m_television.onKey(key); }}),
-      m_television(libraryCalls(), stackCalls(), [this](const std::string& text) { m_display.show(text); }),
+      m_television(
+          libraryCalls(), stackCalls(), [this](const std::string& text) { m_display.show(text); },
+          mainLoopTimer()),
       m_start{commandLine.channel, commandLine.signalUrl, std::max(commandLine.channel, kFirstChannel)},
       m_calls(g_cancellable_new()) {
     engine.setTelevisionStart([this] { return televisionStart(); });
