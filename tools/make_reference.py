@@ -54,7 +54,7 @@ element is looked up.
 ## What is missing
 
 Each object names the members of OIPF DAE 1.1 and HbbTV 1.1.1 that it lacks, optional parts of the standards such as recording
-and time shift left out. There is no `oipfObjectFactory`: pages embed the elements. There are no objects of the types
+and time shift left out. `oipfObjectFactory` is the browser's, as in `telix-tv`. There are no objects of the types
 `application/oipfCodManager`, `application/oipfDownloadManager`, `application/oipfGatewayInfo`, `application/oipfIMS`,
 `application/oipfMDTF`, `application/oipfRecordingScheduler`, `application/oipfRemoteManagement`,
 `application/oipfSearchManager` and `application/oipfStatusView`.

@@ -32,6 +32,7 @@ import urllib.parse
 CONTENT_TYPES = {
     '.aac': 'audio/aac',
     '.asx': 'video/x-ms-asf',
+    '.cehtml': 'application/ce-html+xml',
     '.css': 'text/css',
     '.hbbtv': 'application/vnd.hbbtv.xhtml+xml',
     '.html': 'text/html',

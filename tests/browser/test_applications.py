@@ -65,6 +65,21 @@ class Keys(TelixTv):
             self.assertEqual(self.value(page, '--keys', key, '--eval', 'seen'),
                              [True, KEY_CODES[key], True, True, False, False, False, False])
 
+    def test_events_have_the_names_of_keys(self):
+        page = self.write('''<script>var seen = [];
+            ['keydown', 'keypress', 'keyup'].forEach(function (type) {
+                addEventListener(type, function (event) { seen.push([type, event.key, event.code]); }, false);
+            });</script>''')
+        names = {'left': ('ArrowLeft', 'ArrowLeft'), 'ok': ('Enter', 'Enter'), '7': ('7', 'Digit7'),
+                 'red': ('ColorF0Red', ''), 'back': ('GoBack', 'BrowserBack'), 'play': ('MediaPlay', ''),
+                 'stop': ('MediaStop', 'MediaStop'), 'info': ('Info', '')}
+        for key, expected in names.items():
+            seen = self.value(page, '--keys', key, '--eval', 'seen')
+            # Engines send no keypress for the arrow keys.
+            kinds = ['keydown', 'keyup'] if key == 'left' else ['keydown', 'keypress', 'keyup']
+            self.assertEqual([kind for kind, _, _ in seen], kinds, key)
+            self.assertEqual({tuple(event[1:]) for event in seen}, {expected}, key)
+
     def test_a_key_waits_for_the_page_that_the_key_before_it_opened(self):
         self.write(self.RECORDER, 'next.html')
         page = self.write('<script>onkeydown = function () { location.href = "next.html"; }</script>')

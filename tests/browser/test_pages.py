@@ -176,13 +176,14 @@ class Documents(TelixTv):
                 '<!DOCTYPE html PUBLIC "-//HbbTV//1.1.1//EN" "http://www.hbbtv.org/dtd/HbbTV-1.1.1.dtd">\n'
                 '<html xmlns="http://www.w3.org/1999/xhtml"><head><title>tele\u00e9</title></head>'
                 '<body><div id="empty"/><p>text</p></body></html>').encode()
-    FACTS = '[document.title, document.body.tagName, document.getElementById("empty").childNodes.length]'
-    XHTML = ['tele\u00e9', 'body', 0]
+    FACTS = '[document.title, document.body.tagName, document.getElementById("empty").childNodes.length, ' \
+            'document.contentType, document.createElement("i").tagName]'
+    XHTML = ['tele\u00e9', 'body', 0, 'application/xhtml+xml', 'i']
 
     def test_a_television_document_of_a_server_is_xhtml(self):
         with running_server(self.DOCUMENT) as running:
             for kind in (self.TYPE, self.TYPE + ';charset=utf-8', 'Application/VND.HbbTV.XHTML+XML ; charset="utf-8"',
-                         'application/xhtml+xml'):
+                         'application/ce-html+xml', 'Application/CE-HTML+XML; charset=utf-8', 'application/xhtml+xml'):
                 self.assertEqual(self.value(f'{running.url}/as/{urllib.parse.quote(kind)}', '--eval', self.FACTS),
                                  self.XHTML, kind)
 
@@ -194,7 +195,8 @@ class Documents(TelixTv):
 
     def test_other_types_stay_what_they_are(self):
         with running_server(self.DOCUMENT) as running:
-            self.assertEqual(self.value(f'{running.url}/as/text/html', '--eval', self.FACTS), ['tele\u00e9', 'BODY', 1])
+            self.assertEqual(self.value(f'{running.url}/as/text/html', '--eval', self.FACTS),
+                             ['tele\u00e9', 'BODY', 1, 'text/html', 'I'])
 
     def test_a_television_document_that_is_far_from_the_first_packet_is_whole(self):
         comment = b'<!-- ' + 64 * b'x' + b' -->\n'
@@ -221,7 +223,7 @@ class Documents(TelixTv):
                                               'document.documentElement.textContent'))
 
     def test_files_are_xhtml_by_their_names(self):
-        for name in ('page.xhtml', 'page.hbbtv', 'PAGE.HBBTV'):
+        for name in ('page.xhtml', 'page.hbbtv', 'PAGE.HBBTV', 'page.cehtml', 'PAGE.CEHTML'):
             page = self.write(self.DOCUMENT, name)
             self.assertEqual(self.value(page, '--eval', self.FACTS), self.XHTML, name)
 

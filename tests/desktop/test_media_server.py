@@ -26,7 +26,8 @@ CONTENT = bytes(range(256)) * 40
 TYPES = {'clip.mp4': 'video/mp4', 'tune.mp3': 'audio/mpeg', 'tune.aac': 'audio/aac', 'tune.wav': 'audio/wav',
          'list.m3u8': 'application/vnd.apple.mpegurl', 'part.ts': 'video/mp2t', 'list.asx': 'video/x-ms-asf',
          'page.html': 'text/html', 'page.xhtml': 'application/vnd.hbbtv.xhtml+xml',
-         'page.hbbtv': 'application/vnd.hbbtv.xhtml+xml', 'unheard.of': 'application/octet-stream'}
+         'page.hbbtv': 'application/vnd.hbbtv.xhtml+xml', 'page.cehtml': 'application/ce-html+xml',
+         'unheard.of': 'application/octet-stream'}
 
 
 def wait_until(condition):

@@ -233,7 +233,8 @@ void ApplicationView::updateVisibilityState() {
 }
 
 void ApplicationView::dispatchKeyEvent(const char* type, const RemoteKey& key, bool isRepeat) {
-    callPageScript(*m_page->currentFrame(), "dispatchkey", {type, key.keyCode, isRepeat});
+    m_page->currentFrame()->evaluateJavaScript(
+        QString::fromStdString(dispatchKeyScript(type, key, isRepeat)));
 }
 
 } // namespace desktop

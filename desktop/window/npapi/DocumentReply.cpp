@@ -1,37 +1,42 @@
-// The response to a request for a document, with the HbbTV content type replaced by the XHTML type, which the
-// engine supports.
+// The response to a request for a document, with the content types of televisions replaced by the XHTML type,
+// which the engine supports.
 #include "desktop/window/npapi/DocumentReply.h"
 
-#include <QFileInfo>
+#include <algorithm>
+#include <iterator>
+
+#include "desktop/window/shared/DocumentTypes.h"
 
 namespace desktop {
 
 namespace {
 
-const char kHbbtvType[] = "application/vnd.hbbtv.xhtml+xml";
 const char kXhtmlType[] = "application/xhtml+xml";
 
 // The header's value with the type replaced; parameters such as the charset stay.
 QByteArray withEngineType(const QByteArray& contentType) {
     const int separator = contentType.indexOf(';');
     const int end = separator < 0 ? contentType.size() : separator;
-    if (contentType.left(end).trimmed().toLower() != kHbbtvType) {
+    if (!isTelevisionType(contentType.left(end).trimmed().constData())) {
         return contentType;
     }
     return kXhtmlType + contentType.mid(end);
 }
 
 // A file has no content type; its name decides.
-bool isHbbtvFile(const QUrl& url) {
-    return url.isLocalFile() &&
-           QFileInfo(url.toLocalFile()).suffix().compare(QLatin1String("hbbtv"), Qt::CaseInsensitive) == 0;
+bool isTelevisionFile(const QUrl& url) {
+    const QString file = url.isLocalFile() ? url.toLocalFile() : QString();
+    return std::any_of(std::begin(kDocumentTypes), std::end(kDocumentTypes),
+                       [&file](const DocumentType& type) {
+                           return file.endsWith(QLatin1String(type.suffix), Qt::CaseInsensitive);
+                       });
 }
 
 } // namespace
 
 bool DocumentReply::mayBeDocument(const QNetworkRequest& request) {
     // The engine sends this type in Accept only when it loads a document into a window or frame.
-    return request.rawHeader("Accept").contains(kXhtmlType) || isHbbtvFile(request.url());
+    return request.rawHeader("Accept").contains(kXhtmlType) || isTelevisionFile(request.url());
 }
 
 DocumentReply::DocumentReply(QNetworkReply* reply, QObject* parent) : QNetworkReply(parent), m_reply(reply) {
@@ -90,7 +95,7 @@ void DocumentReply::copyHeaders() {
         const bool isType = header.first.compare("content-type", Qt::CaseInsensitive) == 0;
         setRawHeader(header.first, isType ? withEngineType(header.second) : header.second);
     }
-    if (isHbbtvFile(url())) {
+    if (isTelevisionFile(url())) {
         setRawHeader("Content-Type", kXhtmlType);
     }
 }

@@ -1,5 +1,5 @@
-// The response to a request for a document, with the HbbTV content type replaced by the XHTML type, which the
-// engine supports.
+// The response to a request for a document, with the content types of televisions replaced by the XHTML type,
+// which the engine supports.
 #ifndef TELIX_DESKTOP_WINDOW_NPAPI_DOCUMENTREPLY_H
 #define TELIX_DESKTOP_WINDOW_NPAPI_DOCUMENTREPLY_H
 

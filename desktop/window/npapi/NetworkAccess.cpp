@@ -1,4 +1,4 @@
-// The network access of pages: the engine's, with support for the content type of HbbTV documents.
+// The network access of pages: the engine's, with support for the documents of televisions.
 #include "desktop/window/npapi/NetworkAccess.h"
 
 #include "desktop/window/npapi/DocumentReply.h"

@@ -1,4 +1,4 @@
-// The network access of pages: the engine's, with support for the content type of HbbTV documents.
+// The network access of pages: the engine's, with support for the documents of televisions.
 #ifndef TELIX_DESKTOP_WINDOW_NPAPI_NETWORKACCESS_H
 #define TELIX_DESKTOP_WINDOW_NPAPI_NETWORKACCESS_H
 
@@ -6,8 +6,8 @@
 
 namespace desktop {
 
-// The engine does not support `application/vnd.hbbtv.xhtml+xml`. Documents of that type, and local files
-// named *.hbbtv, reach it as `application/xhtml+xml`; everything else is unchanged.
+// The engine does not support the types of DocumentTypes.h. Documents of these types, and local files named
+// like them, reach it as `application/xhtml+xml`; everything else is unchanged.
 class NetworkAccess : public QNetworkAccessManager {
     Q_OBJECT
 

@@ -18,7 +18,7 @@ PageFunctions::PageFunctions(QWebFrame& frame, ApplicationView& application, TvW
 
 void PageFunctions::install() {
     m_frame.addToJavaScriptWindowObject(QStringLiteral("telixTvBrowser"), this);
-    m_frame.evaluateJavaScript(QString::fromStdString(pageFunctionsScript()));
+    m_frame.evaluateJavaScript(QString::fromStdString(pageFunctionsScript() + "," + keyNamesScript()));
 }
 
 bool PageFunctions::createApplication(const QString& url) {

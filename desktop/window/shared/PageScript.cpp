@@ -5,6 +5,7 @@
 
 #include <cassert>
 
+#include "desktop/window/shared/DocumentTypes.h"
 #include "desktop/window/shared/RemoteControl.h"
 
 namespace desktop {
@@ -67,7 +68,28 @@ std::string pageFunctionsScript() {
         }
         codes += (codes.empty() ? "" : ",") + literal(key.constant) + ":" + std::to_string(key.keyCode);
     }
-    return functionOf("pagefunctions") + ".call(null,{" + codes + "})";
+    return functionOf("pagefunctions") + ".call(null,{" + codes + "})," + pageScriptCall("tvglobals", {});
+}
+
+std::string keyNamesScript() {
+    std::string names;
+    for (const auto& key : remoteKeys()) {
+        names += (names.empty() ? "" : ",") + std::to_string(key.keyCode) + ":[" + literal(key.domKey) + "," +
+                 literal(key.domCode) + "]";
+    }
+    return functionOf("keynames") + ".call(null,{" + names + "})";
+}
+
+std::string hbbtvDocumentScript() {
+    std::vector<ScriptValue> types;
+    for (const auto& type : kDocumentTypes) {
+        types.emplace_back(type.contentType);
+    }
+    return pageScriptCall("hbbtvdocument", types);
+}
+
+std::string dispatchKeyScript(const char* type, const RemoteKey& key, bool isRepeat) {
+    return pageScriptCall("dispatchkey", {type, key.keyCode, key.domKey, key.domCode, isRepeat});
 }
 
 std::string sessionKeysScript() {
@@ -78,7 +100,8 @@ std::string sessionKeysScript() {
             if (code != 0) {
                 keys += (keys.empty() ? "" : ",") + std::to_string(code) + ":[" + literal(key.name) + "," +
                         std::to_string(key.keyCode) + "," + std::to_string(key.group) + "," +
-                        (key.hasEngineCode ? "true" : "false") + "]";
+                        (key.hasEngineCode ? "true" : "false") + "," + literal(key.domKey) + "," +
+                        literal(key.domCode) + "]";
             }
         }
     }

@@ -7,6 +7,8 @@
 
 namespace desktop {
 
+struct RemoteKey;
+
 // A value in the source of a script.
 class ScriptValue {
 public:
@@ -28,9 +30,18 @@ std::string resourceText(const std::string& name);
 // The source of an expression that calls the function of scripts/`name`.js.
 std::string pageScriptCall(const std::string& name, const std::vector<ScriptValue>& arguments);
 
-// The source of an expression that adds the functions and key codes of scripts/pagefunctions.js to a window
-// object.
+// The source of an expression that adds the names of scripts/pagefunctions.js and scripts/tvglobals.js to a
+// window object.
 std::string pageFunctionsScript();
+
+// The source of an expression that calls the function of scripts/keynames.js with all keys.
+std::string keyNamesScript();
+
+// The source of an expression that calls the function of scripts/hbbtvdocument.js with all types.
+std::string hbbtvDocumentScript();
+
+// The source of an expression that dispatches an event of the key: "keydown", with "keypress", or "keyup".
+std::string dispatchKeyScript(const char* type, const RemoteKey& key, bool isRepeat);
 
 // The source of an expression that calls the function of scripts/sessionkeys.js with all keys.
 std::string sessionKeysScript();

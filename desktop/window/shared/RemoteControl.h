@@ -33,6 +33,10 @@ struct RemoteKey {
     int keyCode;
     // The constant of the window object that has the code; null if there is none.
     const char* constant;
+    // `key` and `code` of key events. UI Events has no codes for most keys of a remote control: those are
+    // empty.
+    const char* domKey;
+    const char* domCode;
     // Whether an engine itself produces this code for the first of `keyboardKeys`. Then the engine gets the
     // key event, and also performs the default action (moves the caret, follows a link). Otherwise the window
     // dispatches DOM events with the code.

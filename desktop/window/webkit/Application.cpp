@@ -5,6 +5,7 @@
 #include <utility>
 
 #include "desktop/window/shared/Diagnostics.h"
+#include "desktop/window/shared/DocumentTypes.h"
 #include "desktop/window/shared/PageScript.h"
 #include "desktop/window/webkit/Engine.h"
 #include "desktop/window/webkit/Messages.h"
@@ -14,7 +15,6 @@ namespace desktop {
 
 namespace {
 
-constexpr char kHbbtvType[] = "application/vnd.hbbtv.xhtml+xml";
 // A plug-in ends some of its objects on later turns of the web process's main loop.
 constexpr int kTurnsOfTeardown = 10;
 // After that the web process is taken as one that hangs.
@@ -77,13 +77,13 @@ ScriptedWindow::Evaluation evaluationOf(JSCValue* value, const GError* error) {
     return evaluation;
 }
 
-// Takes a response with an HbbTV document, whose content type the engine does not know, as a document of XML,
-// to which scripts/hbbtvdocument.js adds what XHTML has. Returns whether it is one.
-bool useHbbtvDocument(WebKitPolicyDecision& decision) {
+// Takes a response with a document of a television, whose content type the engine does not know, as a
+// document of XML, to which scripts/hbbtvdocument.js adds what XHTML has. Returns whether it is one.
+bool useTelevisionDocument(WebKitPolicyDecision& decision) {
     WebKitURIResponse* response =
         webkit_response_policy_decision_get_response(WEBKIT_RESPONSE_POLICY_DECISION(&decision));
     const char* type = webkit_uri_response_get_mime_type(response);
-    if (!type || g_ascii_strcasecmp(type, kHbbtvType) != 0) {
+    if (!type || !isTelevisionType(type)) {
         return false;
     }
     webkit_policy_decision_use(&decision);
@@ -156,7 +156,8 @@ void Application::connectSignals() {
     g_signal_connect(m_view, "decide-policy",
                      G_CALLBACK(+[](WebKitWebView*, WebKitPolicyDecision* decision,
                                     WebKitPolicyDecisionType type) -> gboolean {
-                         return type == WEBKIT_POLICY_DECISION_TYPE_RESPONSE && useHbbtvDocument(*decision);
+                         return type == WEBKIT_POLICY_DECISION_TYPE_RESPONSE &&
+                                useTelevisionDocument(*decision);
                      }),
                      nullptr);
     // A television has no menus.
@@ -252,8 +253,7 @@ void Application::sendRelease(const RemoteKey& key) {
 }
 
 void Application::dispatchKeyEvent(const char* type, const RemoteKey& key, bool isRepeat) {
-    evaluateScript(m_view, m_calls, pageScriptCall("dispatchkey", {type, key.keyCode, isRepeat}),
-                   [](JSCValue*, const GError*) {});
+    evaluateScript(m_view, m_calls, dispatchKeyScript(type, key, isRepeat), [](JSCValue*, const GError*) {});
 }
 
 // A repeated press is one that no release precedes.

@@ -1,6 +1,6 @@
 // Dispatches key events with a code that the engine does not produce, at the focused element: keyup, or keydown
 // and, unless a listener prevents it, keypress.
-(function (type, keyCode, isRepeat) {
+(function (type, keyCode, key, code, isRepeat) {
     // The element with the focus is in a frame if it is one.
     function focusedIn(document) {
         var element = document.activeElement || document.body || document.documentElement;
@@ -22,6 +22,8 @@
         // ones.
         Object.defineProperty(event, 'keyCode', { value: keyCode });
         Object.defineProperty(event, 'which', { value: keyCode });
+        Object.defineProperty(event, 'key', { value: key });
+        Object.defineProperty(event, 'code', { value: code });
         Object.defineProperty(event, 'repeat', { value: isRepeat });
         return target.dispatchEvent(event);
     }

@@ -1,7 +1,8 @@
-// Makes documents of the content type of HbbTV those of XHTML, in an engine that takes them as any other XML: their
-// elements have the namespace of XHTML. Called once per window object, before any script of the page.
+// Makes documents of the content types of televisions those of XHTML, in an engine that takes them as any other XML: their
+// elements have the namespace of XHTML. Called once per window object, before any script of the page, with the types.
 (function () {
-    var hbbtvType = 'application/vnd.hbbtv.xhtml+xml';
+    var televisionTypes = Array.prototype.slice.call(arguments);
+    var indexOf = Array.prototype.indexOf;
     var xhtmlType = 'application/xhtml+xml';
     var xhtml = 'http://www.w3.org/1999/xhtml';
     var prototype = Document.prototype;
@@ -13,7 +14,7 @@
 
     function typeOf(document) {
         var type = apply(contentType.get, document, []);
-        return apply(toLowerCase, type, []) === hbbtvType ? xhtmlType : type;
+        return apply(indexOf, televisionTypes, [apply(toLowerCase, type, [])]) >= 0 ? xhtmlType : type;
     }
 
     prototype.createElement = function (name) {

@@ -1,6 +1,7 @@
 // Makes the keys of a WebDriver session those of the remote control. The engine sends them to the page without the
 // window. Called once per window object, before any script of the page, with the function of dispatchkey.js and the keys
-// by the code of their keyboard key: [name, code in pages, group, whether the engine produces the code].
+// by the code of their keyboard key: [name, code in pages, group, whether the engine produces the code,
+// `key`, `code`].
 (function (dispatchKey, keys) {
     var remote = window.telixTvRemote;
     delete window.telixTvRemote;
@@ -21,7 +22,7 @@
         event.stopImmediatePropagation();
         event.preventDefault();
         if (isForPage) {
-            dispatchKey(event.type, key[1], event.repeat);
+            dispatchKey(event.type, key[1], key[4], key[5], event.repeat);
         } else if (isPress) {
             remote.pressTelevisionKey(name);
         }

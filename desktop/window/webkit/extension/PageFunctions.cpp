@@ -71,7 +71,7 @@ void onWindowObjectCleared(WebKitScriptWorld* world, WebKitWebPage* page, WebKit
                                            new Caller(caller), deleteCaller, G_TYPE_NONE, 0));
     }
     jsc_context_set_value(context, kHostObject, host);
-    for (const auto& script : {pageFunctionsScript(), pageScriptCall("hbbtvdocument", {})}) {
+    for (const auto& script : {pageFunctionsScript(), hbbtvDocumentScript()}) {
         g_autoptr(JSCValue) result = jsc_context_evaluate(context, script.c_str(), -1);
     }
 }
