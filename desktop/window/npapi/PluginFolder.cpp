@@ -1,17 +1,46 @@
 // A private folder for the engine's plug-in search, with a link to the one plug-in that it shall find.
 #include "desktop/window/npapi/PluginFolder.h"
 
+#include <dlfcn.h>
+
 #include <QDir>
 #include <QFile>
 
+#include <algorithm>
+#include <string>
+
+#include "desktop/window/npapi/adapter/PluginAdapter.h"
 #include "desktop/window/shared/PluginFile.h"
+#include "desktop/window/shared/ProgramFolder.h"
 
 namespace desktop {
 
-PluginFolder::PluginFolder(const PluginFile& plugin)
+namespace {
+
+bool isOfTelevision(const PluginFile& plugin) {
+    const auto& types = plugin.mimeTypes();
+    return std::find(types.begin(), types.end(), "video/broadcast") != types.end();
+}
+
+// The file of the adapter, which leads to the plug-in from now on; empty if it cannot be loaded.
+std::string adapterOf(const PluginFile& plugin) {
+    const std::string file = besideProgram("telix-tv-npapi-adapter.so");
+    void* library = dlopen(file.c_str(), RTLD_LAZY | RTLD_LOCAL);
+    const auto adapt =
+        library ? reinterpret_cast<AdaptPluginFunction>(dlsym(library, kAdaptPluginFunction)) : nullptr;
+    return adapt && adapt(plugin.path().c_str()) ? file : "";
+}
+
+} // namespace
+
+PluginFolder::PluginFolder(const PluginFile& plugin, bool isStrict)
     : m_folder(QDir::temp().filePath(QStringLiteral("telix-tv-XXXXXX"))) {
+    const std::string file = isStrict || !isOfTelevision(plugin) ? plugin.path() : adapterOf(plugin);
     const QString link = QDir(m_folder.path()).filePath(QStringLiteral("plugin.so"));
-    if (!m_folder.isValid() || !QFile::link(QFile::decodeName(plugin.path().c_str()), link)) {
+    if (file.empty()) {
+        m_failure =
+            QStringLiteral("cannot load the adapter of the plug-in: %1").arg(QString::fromUtf8(dlerror()));
+    } else if (!m_folder.isValid() || !QFile::link(QFile::decodeName(file.c_str()), link)) {
         m_failure = QStringLiteral("cannot create a link in %1").arg(m_folder.path());
     }
 }

@@ -11,8 +11,9 @@ class PluginFile;
 
 class PluginFolder {
 public:
-    // Links the plug-in into a new folder, which is removed with this object.
-    explicit PluginFolder(const PluginFile& plugin);
+    // Links the plug-in into a new folder, which is removed with this object. Unless `isStrict`, the plug-in
+    // of a television is behind an adapter: see adapter/PluginAdapter.cpp.
+    PluginFolder(const PluginFile& plugin, bool isStrict);
 
     // The reason why there is no folder; empty if there is one.
     QString failure() const { return m_failure; }

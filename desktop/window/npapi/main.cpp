@@ -120,7 +120,7 @@ int runBrowser(const CommandLine& commandLine, char** argv) {
         printError("cannot load plug-in " + commandLine.plugin + ": " + plugin.failure());
         return kExitBadInput;
     }
-    const PluginFolder folder(plugin);
+    const PluginFolder folder(plugin, commandLine.isStrict);
     if (!folder.failure().isEmpty()) {
         printError(folder.failure().toStdString());
         return kExitBadInput;

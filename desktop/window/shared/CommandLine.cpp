@@ -150,8 +150,8 @@ private:
             {"on", 0, 0, kText, &values.on, "With --signal: the channel, which is on at first, from 1.",
              "CHANNEL"},
             {"strict", 0, 0, kFlag, &values.strict,
-             "Run the plug-in as sets in the field do: events without escapes, and none for elements without "
-             "an id.",
+             "Run the plug-in as sets in the field do: events without escapes, none for elements without an "
+             "id, and with npapi no list[index].",
              nullptr},
             {"size", 0, 0, kText, &values.size,
              "Size of the window in pixels, default 1280x720. The page is scaled to it.", "WxH"},

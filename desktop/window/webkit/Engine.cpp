@@ -2,6 +2,7 @@
 #include "desktop/window/webkit/Engine.h"
 
 #include "desktop/window/shared/CommandLine.h"
+#include "desktop/window/shared/ElementId.h"
 #include "desktop/window/shared/PluginFile.h"
 #include "desktop/window/shared/ProgramFolder.h"
 #include "desktop/window/webkit/GpuDevice.h"
@@ -12,9 +13,6 @@
 namespace desktop {
 
 namespace {
-
-// The plug-in sends events only to elements with an id.
-constexpr char kIdPrefix[] = "telix-object-";
 
 // A television has no scroll bars.
 constexpr char kWindowStyle[] = "::-webkit-scrollbar { display: none !important; }\n";
@@ -164,7 +162,7 @@ void Engine::onInitializeExtensions(WebKitWebContext* context) {
     g_variant_dict_insert(&data, "automation", "b", m_isAutomated);
     g_variant_dict_insert(&data, "sound", "i", m_soundDescriptor);
     if (!m_isStrict) {
-        g_variant_dict_insert(&data, "ids", "s", kIdPrefix);
+        g_variant_dict_insert(&data, "ids", "s", kElementIdPrefix);
     }
     const TelevisionStart start = m_start ? m_start() : TelevisionStart();
     g_variant_dict_insert(&data, "tune", "u", start.channel);
