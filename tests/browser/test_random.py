@@ -30,7 +30,7 @@ class RandomSteps(unittest.TestCase):
             for seed in range(FIRST, FIRST + SEEDS):
                 with self.subTest(seed=seed):
                     url = f'{(PAGES / page).as_uri()}?{urllib.parse.urlencode(dict(query, seed=seed, steps=STEPS))}'
-                    run = television.run('--plugin', os.environ['TELIX_PLUGIN'], '--timeout', max(100, STEPS / 50), '--wait-for',
+                    run = television.run('--plugin', os.environ['TELIX_PLUGIN'], '--wait-for',
                                          'window.stepsResult', '--eval', 'window.stepsResult', url)
                     self.assertEqual(run.status, 0, str(run)[-3000:])
                     self.assertEqual(run.value['steps'], STEPS)

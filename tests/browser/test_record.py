@@ -34,7 +34,14 @@ BROADCAST = STYLE + '''<object id="tv" type="video/broadcast"></object><div></di
 CLIP = STYLE + '''<object id="player" type="video/mp4" data="%s"></object><div></div>
     <script>onload = function () { player.play(1); };</script>'''
 STOPPED = STYLE + '''<object id="tv" type="video/broadcast"></object><div></div>
-    <script>onload = function () { tv.bindToCurrentChannel(); tv.stop(); loaded = Date.now(); };</script>'''
+    <script>
+        onload = function () {
+            tv.addEventListener('PlayStateChange', function () { stopped = tv.playState === 3 && Date.now(); }, false);
+            tv.bindToCurrentChannel();
+            tv.stop();
+        };
+    </script>'''
+SECONDS_STOPPED = 'window.stopped && Date.now() - stopped > 2000'
 
 
 def run(*arguments):
@@ -110,7 +117,7 @@ class Record(TelixTv):
         self.assertLess(start / RATE, float(self.streams()['video']['duration']) - 3)
 
     def test_without_media_there_is_silence(self):
-        result = self.record(self.write(STOPPED), '--wait-for', 'window.loaded && Date.now() - loaded > 2000')
+        result = self.record(self.write(STOPPED), '--wait-for', SECONDS_STOPPED)
         self.assertEqual(result.status, 0, result)
         self.assert_playable(seconds=2)
         # The channel is heard until the page stops it.
@@ -118,7 +125,7 @@ class Record(TelixTv):
         self.assert_colour(self.last_frame(), (100, 600), (0, 0, 0))
 
     def test_a_window_of_another_size_is_recorded_with_the_size_of_the_page(self):
-        result = self.record(self.write(STOPPED), '--size', '500x300', '--wait-for', 'window.loaded && Date.now() - loaded > 2000')
+        result = self.record(self.write(STOPPED), '--size', '500x300', '--wait-for', SECONDS_STOPPED)
         self.assertEqual(result.status, 0, result)
         self.assert_playable(seconds=2)
         frame = self.last_frame()

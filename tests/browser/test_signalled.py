@@ -284,7 +284,7 @@ class RunningChannel(Television):
                          'width: 100px; height: 100px; background: rgb(0, 128, 0)"></div>')
         with self.running(own):
             self.wait_for_pattern(is_striped)
-            self.assertEqual(self.television.screen().colour(50, 50), (0, 128, 0))
+            self.television.wait_for_colour((50, 50), (0, 128, 0))
 
     def test_television_keys_change_the_channel_and_say_so(self):
         for keys in ('2', 'channel-up', 'channel-down,channel-down'):
