@@ -1,11 +1,14 @@
 #!/usr/bin/env python3
-"""Measures the CPU load of all processes of the desktop television with 720p25 video on each engine, on WebKitGTK on the video
-plane and painted by the page, compared in the same run with decoding alone and, where it is installed, with mpv in a window, and
-the time from program start to the first picture.
-Usage: television_bench.py BUILD-FOLDER"""
+"""Measures the desktop television on each engine: the time from the start of the program to the first page and picture, from
+a key to the picture of the next channel, and the frame rate of a page that moves over the video; then the CPU load of all its
+processes with 720p25 video, on WebKitGTK on the video plane and painted by the page, compared in the same run with decoding
+alone and, where it is installed, with mpv in a window. With --memory, instead, how much memory all processes need after COUNT
+channel changes and after COUNT clips, as a multiple of that before. Exits with 1 if a goal is missed."""
 
+import argparse
 import os
 import shutil
+import signal
 import statistics
 import subprocess
 import sys
@@ -14,10 +17,15 @@ import time
 TOP = os.path.dirname(os.path.dirname(os.path.abspath(__file__)))
 sys.path.insert(0, os.path.join(TOP, 'tests', 'browser'))
 from television import Television, temporary_folder  # noqa: E402
+from processes import cpu_seconds  # noqa: E402
+from window_measurements import STARTS, Failure, Window  # noqa: E402
 
 SECONDS = 15  # of each measurement
 ROUNDS = 3
-STARTS = 5
+# Goals, of medians.
+START_GOALS = {'webkit': 0.8, 'npapi': 0.5}  # seconds to the first picture
+CHANGE_GOAL = 0.15  # seconds
+FRAME_RATE_GOAL = 25  # a second, as the video
 PAGE = '''<!DOCTYPE html><html><body style="margin: 0; background: {background}">
 <object id="tv" type="video/broadcast" style="position: absolute; width: 1280px; height: 720px"></object>
 <script>
@@ -46,26 +54,6 @@ def write_page(folder, background, later):
     with open(file_name, 'w', encoding='utf-8') as file:
         file.write(PAGE.format(background=background, later=later))
     return file_name
-
-
-def stat(pid):
-    """The fields of a process after its name; None if it has ended."""
-    try:
-        with open(f'/proc/{pid}/stat', encoding='ascii', errors='replace') as file:
-            return file.read().rpartition(')')[2].split()
-    except OSError:
-        return None
-
-
-def cpu_seconds(process):
-    """Of the process and all that it has started."""
-    processes = {int(pid): stat(pid) for pid in os.listdir('/proc') if pid.isdigit()}
-    family, size = {process.pid}, 0
-    while len(family) > size:
-        size = len(family)
-        family |= {pid for pid, fields in processes.items() if fields and int(fields[1]) in family}
-    ticks = sum(int(processes[pid][11]) + int(processes[pid][12]) for pid in family if processes.get(pid))
-    return ticks / os.sysconf('SC_CLK_TCK')
 
 
 def load(process):
@@ -112,49 +100,101 @@ def decoding_load(build, stream):
     return float(run.stdout)
 
 
-def start_seconds(television, engine, page, environment):
-    """The time from program start to the first picture in the window."""
-    begin = time.time()
-    run = television.run('--engine', engine, '--wait-for-picture', '--eval', 'Date.now()', page, environment=environment)
-    if run.status != 0:
-        sys.exit(str(run))
-    return run.value / 1000 - begin
+class Report:
+    """Prints rows, and remembers whether all have met their goals."""
+
+    def __init__(self):
+        self.has_missed = False
+
+    def row(self, name, values, unit, goal=None, is_least=False):
+        """`goal`: the largest median, or with `is_least` the smallest one."""
+        median = statistics.median(values)
+        is_missed = goal is not None and (median < goal if is_least else median > goal)
+        self.has_missed = self.has_missed or is_missed
+        text = '' if goal is None else f', goal {goal:g} {unit}{": MISSED" if is_missed else ""}'
+        print(f'  {name}: median {median:.3g} {unit} ({min(values):.3g} to {max(values):.3g} {unit}){text}', flush=True)
+
+
+def measure_window(report, windows):
+    """The engines in turns, so that other load of the machine affects all."""
+    starts = [{engine: window.start() for engine, window in windows.items()} for _ in range(STARTS)]
+    print('from the start of the program, with the test multiplex:')
+    for engine in windows:
+        report.row(f'first page, {engine}', [each[engine][0] for each in starts], 's')
+        report.row(f'first picture, {engine}', [each[engine][1] for each in starts], 's', START_GOALS[engine])
+        report.row(f'CPU time of both, {engine}', [each[engine][2] for each in starts], 's')
+    print('from a key to the picture of the next channel:')
+    for engine, window in windows.items():
+        report.row(engine, window.changes(), 's', CHANGE_GOAL)
+    print('frame rate of a page over the video:')
+    rates = [{engine: (window.scroll_rate(), window.animation_rate()) for engine, window in windows.items()}
+             for _ in range(ROUNDS)]
+    for engine in windows:
+        for number, name in enumerate(('scrolling', 'animation')):
+            report.row(f'{name}, {engine}', [each[engine][number] for each in rates], '/s', FRAME_RATE_GOAL, is_least=True)
+
+
+def measure_memory(windows, count):
+    print(f'memory of all processes, after {count} times what has been named:')
+    for engine, window in windows.items():
+        for name, measure in (('channel changes', window.memory_of_tunes), ('clips', window.memory_of_clips)):
+            before, after = measure(count)
+            print(f'  {name}, {engine}: {after / before:.2f} times what it was ({before / 1e6:.0f} MB, then '
+                  f'{after / 1e6:.0f} MB)', flush=True)
+
+
+def measure_load(report, build, engines, television, folder):
+    stream = os.path.join(folder, 'stream.ts')
+    make_stream(stream)
+    page = write_page(folder, 'transparent', 'transparent')
+    opaque_pages = {'painted by the page': write_page(folder, 'gray', 'gray'),
+                    'painted by the page after the plane': write_page(folder, 'transparent', 'gray')}
+    channels = {'TELIX_CHANNELS': stream}
+    measurements = {f'television, {engine}': lambda engine=engine: television_load(television, engine, page, channels)
+                    for engine in engines}
+    if 'webkit' in engines:
+        measurements.update({
+            f'television, webkit, {name}': lambda each=each: television_load(television, 'webkit', each, channels)
+            for name, each in opaque_pages.items()})
+    measurements['decoding alone'] = lambda: decoding_load(build, stream)
+    if shutil.which('mpv'):
+        measurements['mpv --vo=x11'] = lambda: mpv_load(television, stream)
+    # In turns, so that other load of the machine affects all.
+    rounds = [{name: measure() for name, measure in measurements.items()} for _ in range(ROUNDS)]
+    print('CPU load at 720p25, of one core, without the X server:')
+    for name in measurements:
+        report.row(name, [100 * each[name] for each in rounds], '%')
+
+
+def refuse(reason):
+    print(f'television_bench.py: {reason}', file=sys.stderr)
+    sys.exit(2)
 
 
 def main():
-    if len(sys.argv) != 2 or not os.path.isfile(os.path.join(sys.argv[1], 'desktop', 'telix-tv-npapi')):
-        print(__doc__, file=sys.stderr)
-        sys.exit(2)
-    build = sys.argv[1]
-    engines = [engine for engine in ('webkit', 'npapi')
-               if os.path.isfile(os.path.join(build, 'desktop', f'telix-tv-{engine}'))]
-    with temporary_folder() as folder, Television(os.path.join(build, 'desktop', 'telix-tv')) as television:
-        stream = os.path.join(folder, 'stream.ts')
-        make_stream(stream)
-        page = write_page(folder, 'transparent', 'transparent')
-        opaque_pages = {'painted by the page': write_page(folder, 'gray', 'gray'),
-                        'painted by the page after the plane': write_page(folder, 'transparent', 'gray')}
-        channels = {'TELIX_CHANNELS': stream}
-        measurements = {f'television, {engine}': lambda engine=engine: television_load(television, engine, page, channels)
-                        for engine in engines}
-        if 'webkit' in engines:
-            measurements.update({
-                f'television, webkit, {name}': lambda each=each: television_load(television, 'webkit', each, channels)
-                for name, each in opaque_pages.items()})
-        measurements['decoding alone'] = lambda: decoding_load(build, stream)
-        if shutil.which('mpv'):
-            measurements['mpv --vo=x11'] = lambda: mpv_load(television, stream)
-        # In turns, so that other load of the machine affects all.
-        rounds = [{name: measure() for name, measure in measurements.items()} for _ in range(ROUNDS)]
-        starts = {engine: [start_seconds(television, engine, page, {}) for _ in range(STARTS)] for engine in engines}
-    print('CPU load at 720p25, of one core, without the X server:')
-    for name in measurements:
-        loads = [each[name] for each in rounds]
-        print(f'  {name}: median {100 * statistics.median(loads):.1f} % '
-              f'({100 * min(loads):.1f} to {100 * max(loads):.1f} %)')
-    print('program start to first picture, test multiplex:')
-    for engine, times in starts.items():
-        print(f'  {engine}: median {statistics.median(times):.2f} s ({min(times):.2f} to {max(times):.2f} s)')
+    parser = argparse.ArgumentParser(description=__doc__, formatter_class=argparse.RawDescriptionHelpFormatter)
+    parser.add_argument('build', metavar='BUILD-FOLDER')
+    parser.add_argument('--memory', metavar='COUNT', type=int, nargs='?', const=1000, help='default 1000')
+    arguments = parser.parse_args()
+    program = os.path.join(arguments.build, 'desktop', 'telix-tv')
+    engines = [engine for engine in START_GOALS if os.path.isfile(f'{program}-{engine}')]
+    if not engines:
+        refuse(f'{program}: No such file')
+    if arguments.memory is not None and arguments.memory < 1:
+        refuse(f'--memory: bad count {arguments.memory}')
+    signal.alarm(0)  # the time limit of test programs
+    report = Report()
+    with temporary_folder() as folder, Television(program) as television:
+        windows = {engine: Window(television, engine, folder) for engine in engines}
+        try:
+            if arguments.memory is not None:
+                measure_memory(windows, arguments.memory)
+            else:
+                measure_window(report, windows)
+                measure_load(report, arguments.build, engines, television, folder)
+        except Failure as failure:
+            sys.exit(f'television_bench.py: {failure}')
+    sys.exit(1 if report.has_missed else 0)
 
 
 if __name__ == '__main__':
