@@ -4,6 +4,7 @@
 #include <chrono>
 #include <cstdio>
 #include <mutex>
+#include <thread>
 #include <utility>
 
 namespace desktop {
@@ -23,6 +24,7 @@ ServicePresentation::ServicePresentation(const Channels& channels, TunerArbiter&
 // Not in the constructor, because the platform thread may use this object as soon as the file is there.
 void ServicePresentation::start() {
     setInstantZap(m_platform.configuration().instantZap);
+    std::thread(Tuner::loadDecoders).detach(); // while the browser loads its first page
     if (m_channels.usesTestMultiplex()) {
         m_source.makeTestMultiplexFile();
     }

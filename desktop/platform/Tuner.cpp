@@ -57,6 +57,22 @@ const char* decoderFor(const GstCaps* caps, const Decoder (&decoders)[Count]) {
     return nullptr;
 }
 
+// Those of GStreamer that have the elements.
+template <size_t Count>
+void loadPlugins(const Decoder (&decoders)[Count]) {
+    for (const Decoder& decoder : decoders) {
+        gchar** names = g_strsplit(decoder.elements, " ! ", -1);
+        for (gchar** name = names; *name; ++name) {
+            GstElementFactory* factory = gst_element_factory_find(*name);
+            GstPluginFeature* loaded =
+                factory ? gst_plugin_feature_load(GST_PLUGIN_FEATURE(factory)) : nullptr;
+            g_clear_object(&loaded);
+            g_clear_object(&factory);
+        }
+        g_strfreev(names);
+    }
+}
+
 // tsdemux names pads after type, generation and PID, as in audio_0_0111.
 uint16_t pidOfPad(GstPad* pad) {
     const char* separator = std::strrchr(GST_PAD_NAME(pad), '_');
@@ -93,6 +109,11 @@ GstPadProbeReturn probeAudio(GstPad* pad, GstPadProbeInfo* info, gpointer data) 
 
 Tuner::Tuner(uint16_t serviceId, Listener listener)
     : m_serviceId(serviceId), m_listener(std::move(listener)) {}
+
+void Tuner::loadDecoders() {
+    loadPlugins(kVideoDecoders);
+    loadPlugins(kAudioDecoders);
+}
 
 bool Tuner::start(Picture& picture, Picture::Token token, Clock::Duration age, std::string& error) {
     m_pipeline = gst_pipeline_new("tuner");

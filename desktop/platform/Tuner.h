@@ -24,6 +24,10 @@ public:
         std::function<void(uint16_t pid, uint32_t channels)> onAudioFormat; // GStreamer's thread
     };
 
+    // Loads the decoders, whose libraries take a large part of the time to the first picture, if a tune has
+    // not yet. Any thread.
+    static void loadDecoders();
+
     Tuner(uint16_t serviceId, Listener listener);
     // The listener is not called any more when this returns.
     ~Tuner();

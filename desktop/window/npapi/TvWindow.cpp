@@ -68,6 +68,7 @@ TvWindow::TvWindow(const CommandLine& commandLine)
     resize(kPageSize);
     place(*m_videoPlane);
     place(*m_display);
+    startTelevision();
 }
 
 TvWindow::~TvWindow() {

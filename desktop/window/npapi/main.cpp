@@ -129,6 +129,10 @@ int runBrowser(const CommandLine& commandLine, char** argv) {
     if (!qEnvironmentVariableIsSet("QT_QPA_PLATFORM")) {
         qputenv("QT_QPA_PLATFORM", "xcb");
     }
+    // The window draws without OpenGL, whose libraries would be loaded nevertheless, and take long.
+    if (!qEnvironmentVariableIsSet("QT_XCB_GL_INTEGRATION")) {
+        qputenv("QT_XCB_GL_INTEGRATION", "none");
+    }
     int qtArgumentCount = 1; // Qt must not interpret the options of telix-tv
     QApplication application(qtArgumentCount, argv);
     QApplication::setQuitOnLastWindowClosed(false); // Automation exits with its own status
