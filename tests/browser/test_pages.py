@@ -101,6 +101,10 @@ class Pages(TelixTv):
         run = self.run_tv(page, '--eval', '1')
         self.assertTrue(run.errors == f'{page}:1: {"x" * 1000000}\n', (run.status, len(run.errors), run.errors[:200]))
 
+    def test_debug_prints_as_the_console_does(self):
+        page = self.write('<script>\nfunction say(text) { debug(text); }\nsay("one");\n</script>')
+        self.assertEqual(self.run_tv(page, '--eval', '1').errors, f'{page}:2: one\n')
+
     def test_questions_are_printed_and_answered_with_no(self):
         page = self.write('<script>alert("a"); answers = [confirm("b"), prompt("c", "d")];</script>')
         run = self.run_tv(page, '--eval', 'answers')

@@ -23,8 +23,8 @@ REMOTE_KEYS = {
 RECORDER = '''<title>recorder</title><style>body { margin: 0; background: rgb(0, 128, 0) }</style>
     <button onclick="clicks++">press</button><p class="words">Good evening</p>
     <script>
-        codes = []; clicks = 0;
-        onkeydown = function (event) { codes.push(event.keyCode); };
+        codes = []; names = []; clicks = 0;
+        onkeydown = function (event) { codes.push(event.keyCode); names.push([event.key, event.code]); };
         onkeyup = function (event) { codes.push(-event.keyCode); };
     </script>'''
 
@@ -63,6 +63,13 @@ class Session(DrivenTv):
                 press(session, key)
                 code = KEY_CODES[name]
                 self.assertEqual(session.execute_script('return codes.splice(0)'), [code, -code], name)
+
+    def test_keys_have_names(self):
+        with self.session() as session:
+            session.get(self.url(RECORDER))
+            press(session, *(REMOTE_KEYS[name] for name in ('left', 'red', 'back', '5')))
+            self.assertEqual(session.execute_script('return names'), [
+                ['ArrowLeft', 'ArrowLeft'], ['ColorF0Red', ''], ['GoBack', 'BrowserBack'], ['5', 'Digit5']])
 
     def test_keys_in_a_row_keep_their_order(self):
         with self.session() as session:

@@ -1,16 +1,17 @@
-// A plug-in in front of the television's plug-in. Each call goes on to that one, except for two additions:
+// A plug-in in front of the television's plug-in. Each call goes on to that one, with two additions.
 //
-// - An element without an id gets one before its instance is made, because the plug-in finds elements by
-// their ids.
-// - Where the plug-in hands out a list, script gets the object that scripts/list.js makes of it. For that the
-// adapter
-//   replaces functions in the plug-in's class records. The records stay where they are, because the plug-in
-//   knows its objects by them.
+// An element without an id gets one before its instance is made, because the plug-in finds elements by their
+// ids.
+//
+// Where the plug-in hands out a list, script gets the object that scripts/list.js makes of it. For that the
+// adapter replaces functions in the plug-in's class records. The records stay where they are, because the
+// plug-in knows its objects by them.
 //
 // Main thread. The library is never unloaded, because objects of the plug-in may outlive it in the engine.
 #include "desktop/window/npapi/adapter/PluginAdapter.h"
 
 #include <dlfcn.h>
+#include <strings.h>
 
 #include <algorithm>
 #include <cstdlib>
@@ -99,8 +100,8 @@ NPObject* evaluate(NPP instance, const std::string& expression) {
 // An object that has a first element by its index. The plug-in takes indexes as names, and an empty list
 // needs no help.
 bool isList(NPObject* object) {
-    static const NPIdentifier first = browser.getstringidentifier("0");
-    static const NPIdentifier item = browser.getstringidentifier("item");
+    NPIdentifier item = browser.getstringidentifier("item");
+    NPIdentifier first = browser.getstringidentifier("0");
     return owners().count(object) > 0 && object->_class->hasMethod(object, item) &&
            object->_class->hasProperty(object, first);
 }
@@ -122,11 +123,16 @@ void adaptResult(NPP instance, NPVariant& result) {
     NPObject* function = result.type == NPVariantType_Object && isList(result.value.objectValue)
                              ? listFunction(instance)
                              : nullptr;
+    if (!function) {
+        return;
+    }
     NPVariant view{};
-    if (function && browser.invokeDefault(instance, function, &result, 1, &view)) {
+    browser.retainobject(function); // script that runs meanwhile may end the instance
+    if (browser.invokeDefault(instance, function, &result, 1, &view)) {
         browser.releasevariantvalue(&result);
         result = view;
     }
+    browser.releaseobject(function);
 }
 
 // The object, its class record and its instance may be gone after a call.
@@ -259,6 +265,8 @@ EXPORT bool telix_adapt_plugin(const char* file) {
            find(library, "NP_GetMIMEDescription", plugin.mimeDescription);
 }
 
+// NOLINTBEGIN(readability-identifier-naming): the names are those of NPAPI.
+
 EXPORT NPError NP_Initialize(NPNetscapeFuncs* browserFuncs, NPPluginFuncs* pluginFuncs) {
     std::memcpy(&browser, browserFuncs, std::min<std::size_t>(sizeof(browser), browserFuncs->size));
     ofAdapter = browser;
@@ -284,3 +292,5 @@ EXPORT NPError NP_GetValue(void* future, NPPVariable variable, void* value) {
 EXPORT const char* NP_GetMIMEDescription() {
     return plugin.mimeDescription();
 }
+
+// NOLINTEND(readability-identifier-naming)
