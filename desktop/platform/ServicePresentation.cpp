@@ -32,7 +32,9 @@ void ServicePresentation::start() {
 
 void ServicePresentation::onTestMultiplex() {
     if (m_pendingTune.id != 0) {
-        present(m_pendingTune);
+        if (!m_tuner) { // a channel of a file does not wait for the test multiplex
+            present(m_pendingTune);
+        }
     } else if (m_awaitedChannel != 0) {
         receive(m_awaitedChannel);
     }
@@ -271,8 +273,8 @@ void ServicePresentation::onPrerolled(uint64_t tuneId) {
     const Tune presented = std::exchange(m_pendingTune, {});
     m_components.updateAspectRatio();
     m_arbiter.reportPresenting(presented);
-    m_clock.callAfter(kSettled, [this, tuneId] {
-        if (m_activeTuneId == tuneId) {
+    m_clock.callAfter(kSettled, [this, id = m_activeTuneId] {
+        if (m_activeTuneId == id) {
             receiveNeighbours();
         }
     });

@@ -9,6 +9,7 @@
 #include <future>
 #include <map>
 #include <mutex>
+#include <optional>
 
 #include "desktop/platform/Broadcast.h"
 #include "desktop/platform/Multiplex.h"
@@ -260,7 +261,8 @@ TELIX_RETCODE_ENUM_T onError(TELIX_JS_VB_HANDLE, TELIX_JS_CM_HANDLE, TELIX_ERR_S
     return errors.add(error);
 }
 
-TEST(TuneTimeoutTest, EndsATuneThatShowsNothingAfterSixSeconds) {
+// A stream of one service, of which nothing can be decoded.
+Bytes makeStreamWithoutPictures() {
     constexpr uint16_t kPmtPid = 0x100;
     constexpr uint16_t kServiceId = 7;
     Pat pat;
@@ -277,7 +279,11 @@ TEST(TuneTimeoutTest, EndsATuneThatShowsNothingAfterSixSeconds) {
           makeStream(50, milliseconds(40))}) {
         stream.insert(stream.end(), part.begin(), part.end());
     }
-    const StreamFile file(stream);
+    return stream;
+}
+
+TEST(TuneTimeoutTest, EndsATuneThatShowsNothingAfterSixSeconds) {
+    const StreamFile file(makeStreamWithoutPictures());
     setenv("TELIX_CHANNELS", file.name().c_str(), 1);
     unsetenv("TELIX_CONFIG"); // the default of signal-timeout, 6 seconds
     setenv("XDG_CONFIG_HOME", "/nonexistent", 1);
@@ -311,6 +317,49 @@ TEST(TuneTimeoutTest, EndsATuneThatShowsNothingAfterSixSeconds) {
     }));
     TELIX_JS_VB_Release(object);
     TELIX_JS_VB_UnRegisterOnChannelChangeError(onError);
+}
+
+// The entries of a folder; nothing if there is no folder.
+std::optional<size_t> countEntries(const std::string& folder) {
+    GDir* dir = g_dir_open(folder.c_str(), 0, nullptr);
+    if (!dir) {
+        return std::nullopt;
+    }
+    size_t count = 0;
+    while (g_dir_read_name(dir)) {
+        ++count;
+    }
+    g_dir_close(dir);
+    return count;
+}
+
+TEST(TuneWhileTheTestMultiplexIsMadeTest, GoesOnWhenItIsThere) {
+    const StreamFile file(makeStreamWithoutPictures());
+    char* cache = g_dir_make_tmp("telix-cache-XXXXXX", nullptr);
+    setenv("XDG_CACHE_HOME", cache, 1); // has no test multiplex
+    setenv("PATH", "", 1);              // nor is there ffmpeg: it ends soon
+    setenv("TELIX_CHANNELS", (file.name() + ";test").c_str(), 1);
+    TELIX_JS_VB_HANDLE object = 0;
+    ASSERT_EQ(TELIX_JS_VB_GetHandle(&object), 0);
+    TELIX_JS_VB_RegisterOnChannelChangeError(onError);
+    ASSERT_EQ(TELIX_JS_VB_BindToCurrChannel(object), 0);
+    const std::string folder = std::string(cache) + "/telix";
+    EXPECT_TRUE(waitUntil([&] { return countEntries(folder) > size_t{0}; }));
+    EXPECT_TRUE(waitUntil([&] { return countEntries(folder) == size_t{0}; }));
+    // The tune waits for a picture still, and the channels of the test multiplex have no signal.
+    TELIX_PLAYSTATE_ENUM_T state = 0;
+    EXPECT_EQ(TELIX_JS_VB_GetPlayBackState(object, &state), 0);
+    EXPECT_EQ(state, TELIX_PLAYSTATE_CONNECTING);
+    EXPECT_TRUE(errors.all().empty());
+    TELIX_JS_CM_HANDLE before = 0;
+    ASSERT_EQ(TELIX_JS_VB_NextChannel(object, &before), 0);
+    EXPECT_TRUE(waitUntil([] { return errors.all().size() == 2; }));
+    EXPECT_EQ(errors.all(), (std::vector<TELIX_ERR_STATE_ENUM_T>{kErrorInterrupted, kErrorNoSignal}));
+    TELIX_JS_VB_Release(object);
+    TELIX_JS_VB_UnRegisterOnChannelChangeError(onError);
+    rmdir(folder.c_str());
+    rmdir(cache);
+    g_free(cache);
 }
 
 } // namespace
