@@ -181,9 +181,8 @@ size_t acrossTheBorder(size_t start) {
     return start == 2 * services() ? start - 1 : 2 * services();
 }
 
-// The distance to the random access points before and after depends on the moment of the tune.
+// At a random one, because the distance to the random access points before and after depends on it.
 bool waitForMoment(const Change& change) {
-    std::this_thread::sleep_for(kSettle + std::chrono::milliseconds(randomNumbers()() % 1000));
     const auto end = Clock::now() + kLimit;
     while (!change.isReady()) {
         if (Clock::now() > end) {
@@ -191,6 +190,7 @@ bool waitForMoment(const Change& change) {
         }
         std::this_thread::sleep_for(std::chrono::milliseconds(10));
     }
+    std::this_thread::sleep_for(kSettle + std::chrono::milliseconds(randomNumbers()() % 1000));
     return true;
 }
 

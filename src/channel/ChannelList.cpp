@@ -5,6 +5,7 @@
 
 #include <algorithm>
 #include <cstdlib>
+#include <cstring>
 #include <optional>
 
 #include "common/Log.h"
@@ -16,7 +17,7 @@ namespace {
 // The handle with this ccid. Nothing for other strings, which only a channel without a handle can have.
 std::optional<uint32_t> handleOfCcid(const std::string& ccid) {
     const auto number = static_cast<int32_t>(std::strtol(ccid.c_str(), nullptr, 10));
-    const bool isHandle = number != 0 && std::to_string(number) == ccid.c_str();
+    const bool isHandle = number != 0 && std::strcmp(std::to_string(number).c_str(), ccid.c_str()) == 0;
     return isHandle ? std::optional(static_cast<uint32_t>(number)) : std::nullopt;
 }
 
