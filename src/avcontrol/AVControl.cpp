@@ -1,10 +1,12 @@
 // The A/V control object: its kind, its creation and destruction, the display area and the play report.
 #include "src/avcontrol/AVControl.h"
 
+#include <glib.h>
 #include <strings.h>
 #include <unistd.h>
 
 #include <cstdlib>
+#include <vector>
 
 #include "common/Log.h"
 #include "common/ObjectKind.h"
@@ -27,6 +29,9 @@ const char* const kMimeTypes[] = {"audio/mpeg",
 
 constexpr int kMaxDestructionWaits = 3;
 constexpr uint32_t kLeastReportedDuration = 1000; // milliseconds
+// A step that the browser thread has not run after this time has been dropped. If it has not, because the
+// page keeps the thread busy as long, it finds its object gone.
+constexpr gint64 kLongestDelay = G_TIME_SPAN_MINUTE;
 
 AVControl& controlOf(PluginBase& model) {
     return static_cast<AVControl&>(model);
@@ -72,6 +77,15 @@ struct ReportedLength {
 
 ReportedLength reportedLength;
 
+// The end of a control's instance, in the time of g_get_monotonic_time().
+struct EndedControl {
+    LiveRef<AVControl> control;
+    gint64 time;
+};
+
+// In the order of their ends, those of the last minute at least. Browser thread.
+std::vector<EndedControl> s_endedControls;
+
 } // namespace
 
 const ObjectKind kAvControlKind = [] {
@@ -79,7 +93,10 @@ const ObjectKind kAvControlKind = [] {
     kind.id = 300;
     kind.destroyText = "AVCONTROL_OBJ_ID delete :: %p \n";
     kind.mimeTypes = kMimeTypes;
-    kind.create = [](NPP npp, unsigned short id) -> PluginBase* { return new AVControl(npp, id); };
+    kind.create = [](NPP npp, unsigned short id) -> PluginBase* {
+        AVControl::deleteAbandoned();
+        return new AVControl(npp, id);
+    };
     kind.dispose = [](PluginBase* model) { deleteAfterCalls(controlOf(*model)); };
     kind.init = [](PluginBase& model, const InstanceArguments& given) {
         return controlOf(model).initAV(given.mode, given.argc, given.argn, given.argv, given.mimeType);
@@ -220,12 +237,26 @@ int AVControl::destroyAV() {
             g_lastPlayedInstance = nullptr;
         }
     }
+    s_endedControls.push_back({m_live.ref(), g_get_monotonic_time()});
     postAsyncCallIfAlive(m_npp, m_live.ref(), destroyMediaCB);
     return 1;
 }
 
 void AVControl::destroyMediaCB(void* object) {
     deleteAfterCalls(*static_cast<AVControl*>(object));
+}
+
+// NPAPI lets an engine drop what was posted for an instance that has ended, and some do.
+void AVControl::deleteAbandoned() {
+    const gint64 now = g_get_monotonic_time();
+    while (!s_endedControls.empty() && now - s_endedControls.front().time > kLongestDelay) {
+        AVControl* const control = s_endedControls.front().control.get();
+        s_endedControls.erase(s_endedControls.begin());
+        if (control) {
+            control->m_workingAsyncCalls = 0; // dropped as well: nothing to wait for
+            deleteAfterCalls(*control);
+        }
+    }
 }
 
 bool AVControl::isBrowserThread() const {

@@ -86,6 +86,8 @@ public:
     // Releases the player and has the object deleted on a later turn of the browser thread. Always 1: the
     // caller must not delete it.
     int destroyAV();
+    // Deletes the objects whose deletion destroyAV() has posted and the browser has dropped.
+    static void deleteAbandoned();
 
     NPObject* getJSObject() override;
 

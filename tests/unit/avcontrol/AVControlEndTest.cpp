@@ -3,6 +3,8 @@
 #include <atomic>
 #include <memory>
 #include <thread>
+#include <utility>
+#include <vector>
 
 #include "src/avcontrol/AVControl.h"
 #include "tests/unit/avcontrol/AVControlTest.h"
@@ -70,6 +72,66 @@ TEST_F(AVControlLateStep, AnElementWhoseStartFailedLeavesOnlyALineInTheLog) {
         browser.pump();
     });
     EXPECT_THAT(printed, ::testing::HasSubstr(logLine("AVCONTROL", "startMediaCb", "Instance: 0x")));
+}
+
+// ---- Steps that never come
+
+// A browser that keeps what is posted while `isKeeping`, instead of running it.
+class AVControlDroppedStep : public AVControlTest {
+protected:
+    struct Step {
+        void (*function)(void*);
+        void* data;
+    };
+
+    AVControlDroppedStep() {
+        static decltype(browser.table().pluginthreadasynccall) post;
+        post = browser.table().pluginthreadasynccall;
+        browser.table().pluginthreadasynccall = [](NPP npp, void (*function)(void*), void* data) {
+            if (s_isKeeping) {
+                s_kept.push_back({function, data});
+            } else {
+                post(npp, function, data);
+            }
+        };
+    }
+    ~AVControlDroppedStep() override { runKept(); }
+
+    // An element whose end the browser does not run.
+    void endUnnoticed(const EmbeddedObject& object) {
+        s_isKeeping = true;
+        onPlatformThread([model = static_cast<AVControl*>(object.model())] {
+            model->changePlayState(PLAY_STATE_PLAYING, PLAY_STATE_ERROR);
+        });
+        object.destroy();
+        s_isKeeping = false;
+    }
+    static void runKept() {
+        for (const Step& step : std::exchange(s_kept, {})) {
+            step.function(step.data);
+        }
+    }
+
+    static inline bool s_isKeeping = false;
+    static inline std::vector<Step> s_kept;
+};
+
+TEST_F(AVControlDroppedStep, ItsObjectIsDeletedWithALaterElement) {
+    const EmbeddedObject object = video();
+    object.set("onPlayStateChange", browser.function("listener"));
+    endUnnoticed(object);
+    const auto isDeleted = [this] { return log.count("NPN_ReleaseObject listener") != 0; };
+    clock.advance(30);
+    element("video/mp4", {}).destroy();
+    EXPECT_FALSE(isDeleted()) << "the step may still come";
+    clock.advance(31);
+    element("video/mp4", {}).destroy();
+    EXPECT_TRUE(isDeleted());
+    EXPECT_EQ(clock.browserSleeps(), 0u) << "it waits for a change of state that never comes";
+    browser.pump();
+    log.clear();
+    runKept();
+    EXPECT_THAT(log.everything(), IsEmpty());
 }
 
 // ---- Monitors that the platform keeps

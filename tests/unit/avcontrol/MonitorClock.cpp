@@ -188,7 +188,13 @@ int MonitorClock::cancelThread(pthread_t thread) const {
     return m_refusesCancellation ? ESRCH : reallyCancelThread(thread);
 }
 
-// The linker leads both of this program's objects here (tests/unit/CMakeLists.txt).
+int64_t reallyGetTime() __asm__("__real_g_get_monotonic_time");
+
+int64_t MonitorClock::monotonicTime() const {
+    return reallyGetTime() + m_secondsAhead * INT64_C(1000000);
+}
+
+// The linker leads this program's objects here (tests/unit/CMakeLists.txt).
 extern "C" int __wrap_pthread_create(pthread_t* thread, const pthread_attr_t* attributes,
                                      void* (*body)(void*), void* argument) {
     return MonitorClock::instance().createThread(thread, attributes, body, argument);
@@ -196,6 +202,10 @@ extern "C" int __wrap_pthread_create(pthread_t* thread, const pthread_attr_t* at
 
 extern "C" int __wrap_pthread_cancel(pthread_t thread) {
     return MonitorClock::instance().cancelThread(thread);
+}
+
+extern "C" int64_t __wrap_g_get_monotonic_time() {
+    return MonitorClock::instance().monotonicTime();
 }
 
 extern "C" unsigned int sleep(unsigned int seconds) {

@@ -8,6 +8,7 @@
 
 #include <atomic>
 #include <cstddef>
+#include <cstdint>
 #include <functional>
 #include <utility>
 
@@ -39,10 +40,14 @@ public:
     void whenBrowserSleeps(std::function<void()> what) { m_whenBrowserSleeps = std::move(what); }
     void reset();
 
+    // Sets the monotonic time of GLib forward, for good.
+    void advance(unsigned seconds) { m_secondsAhead += seconds; }
+
     void sleepOneSecond(); // what `sleep` does
     int createThread(pthread_t* thread, const pthread_attr_t* attributes, void* (*body)(void*),
                      void* argument);         // what `pthread_create` does
     int cancelThread(pthread_t thread) const; // what `pthread_cancel` does
+    int64_t monotonicTime() const;            // what `g_get_monotonic_time` does
 
 private:
     friend class MonitorThread;
@@ -64,6 +69,7 @@ private:
     std::atomic<bool> m_refusesCancellation{false};
     unsigned m_browserSleeps = 0;
     std::function<void()> m_whenBrowserSleeps;
+    std::atomic<unsigned> m_secondsAhead{0};
 };
 
 #endif
