@@ -126,12 +126,16 @@ class Applications(TelixTv):
         self.assertIn('no application', run.errors)
 
     def test_a_page_that_opens_itself_stops_at_sixteen_applications(self):
-        page = self.write('''<script>onload = function () {
-            var created = createHbbTVApplication(location.href);
-            document.title = created ? "covered" : "last";
-            for (var i = 0; !created && i < 100; i++) { createHbbTVApplication(location.href); } }</script>''')
+        page = self.write('''<object id="manager" type="application/oipfApplicationManager"></object>
+            <script>onload = function () {
+                var owner = manager.getOwnerApplication(document);
+                var create = function () { return owner.createApplication(location.href, false); };
+                console.log("opened");
+                document.title = create() === null ? "last" : "covered";
+                for (var i = 0; document.title === "last" && i < 100; i++) { create(); } }</script>''')
         run = self.run_tv(page, '--wait-for', 'document.title === "last"', '--eval', '1')
         self.assertEqual(run.status, 0, run)
+        self.assertEqual(run.errors.count('opened'), 16, run)
         self.assertEqual(run.errors.count('16 applications'), 1, run)
 
     def test_after_the_last_application_the_screen_is_empty(self):

@@ -2,8 +2,11 @@
 the inspector."""
 
 import contextlib
+import ctypes
 import json
 import os
+import pathlib
+import re
 import signal
 import socket
 import subprocess
@@ -12,7 +15,7 @@ import urllib.request
 
 from telix_tv import PLUGIN, TelixTv
 from television import RUN_TIMEOUT, Lines, wait_for
-from patterns import has_bars
+from patterns import has_bars, is_striped
 
 DESKTOP_PLUGIN = os.environ['TELIX_DESKTOP_PLUGIN']
 READY = '<script>onload = function () { console.log("ready"); }</script>'
@@ -33,7 +36,14 @@ DRM_MESSAGE = """<object type="application/oipfDrmAgent"></object>
         };
     </script>"""
 ASSERTION = "Assertion `!id.empty()' failed."
+PLAYER = '''<object id="player" type="video/mp4" data="%s" style="width: 640px; height: 360px"></object>
+    <script>
+        player.onPlayStateChange = function () { if (player.playState === 1) { console.log("playing"); } };
+        onload = function () { player.play(1); };
+    </script>'''
 NUMERIC = 0x100
+# The threads that push data through a pipeline are named after an element and its pad.
+STREAMING_THREAD = re.compile(r'[a-z0-9]+:(src|sink)')
 
 
 class Crash(TelixTv):
@@ -42,6 +52,13 @@ class Crash(TelixTv):
         children = subprocess.run(['ps', '--ppid', str(process.pid), '-o', 'pid=,comm='], stdout=subprocess.PIPE,
                                   text=True, check=True).stdout
         return [int(line.split()[0]) for line in children.splitlines() if 'WebKitWeb' in line]
+
+    @staticmethod
+    def abort_streaming_thread(web_process):
+        """Ends a process by a thread of a pipeline, as an element does that fails a check."""
+        threads = [int(task.name) for task in pathlib.Path(f'/proc/{web_process}/task').iterdir()
+                   if STREAMING_THREAD.match((task / 'comm').read_text(encoding='utf-8'))]
+        assert ctypes.CDLL(None).tgkill(web_process, threads[0], signal.SIGABRT) == 0
 
     def channel(self):
         """The name of the channel that is on; empty while there is no platform library."""
@@ -99,6 +116,23 @@ class Crash(TelixTv):
                 process.terminate()
                 process.wait(RUN_TIMEOUT)
             self.assertEqual(process.returncode, 128 + signal.SIGTERM)
+
+    def test_a_crash_in_a_media_pipeline_leaves_the_television_and_its_applications(self):
+        page = self.write(PLAYER % pathlib.Path(os.environ['TELIX_CLIPS'], 'clip.mp4').as_uri())
+        with self.television.start('--plugin', DESKTOP_PLUGIN, page) as process:
+            messages = Lines(process.stderr)
+            self.assertTrue(messages.wait_for('playing'))
+            first, = self.web_processes(process)
+            self.abort_streaming_thread(first)
+            self.assertTrue(messages.wait_for('telix-tv: the web process has crashed'))
+            wait_for(lambda: is_striped(self.television.screen()) and self.channel() == 'Telix One', 'no channel')
+            messages.lines.clear()
+            self.television.telixctl('reload')
+            self.assertTrue(messages.wait_for('playing'))
+            self.assertIsNone(process.poll())
+            process.terminate()
+            process.communicate(timeout=RUN_TIMEOUT)
+        self.assertEqual(process.returncode, 128 + signal.SIGTERM)
 
     def test_without_an_application_the_channel_comes_back(self):
         with self.television.start('--plugin', DESKTOP_PLUGIN, '--keys', '2') as process:
