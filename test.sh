@@ -5,7 +5,7 @@ set -euo pipefail
 usage='Usage: ./test.sh [--machines | --packages]
 
 Without arguments: the unit tests with AddressSanitizer and UndefinedBehaviorSanitizer, then all tests of the release build,
-among them a choice of the tests of the plug-in on armhf and i386.
+among them a choice of the tests of the plug-in on armhf and i386 and with ThreadSanitizer.
   --machines   all tests of the plug-in on armhf, arm64, i386 and mipsel, and no others
   --packages   build the Debian packages, install them into a fresh root and start the television there; needs root'
 
