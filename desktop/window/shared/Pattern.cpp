@@ -1,8 +1,6 @@
 // Regular expressions for texts of any length, as pages may make them.
 #include "desktop/window/shared/Pattern.h"
 
-#include <glib.h>
-
 #include <cassert>
 
 namespace desktop {

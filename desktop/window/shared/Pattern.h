@@ -2,11 +2,11 @@
 #ifndef TELIX_DESKTOP_WINDOW_SHARED_PATTERN_H
 #define TELIX_DESKTOP_WINDOW_SHARED_PATTERN_H
 
+#include <glib.h>
+
 #include <optional>
 #include <string>
 #include <vector>
-
-typedef struct _GRegex GRegex;
 
 namespace desktop {
 
