@@ -233,6 +233,19 @@ TEST_F(MediaTest, GoesOnAtAPositionThatItWasGivenWhileStopped) {
     EXPECT_LT(info().playPosition, 1500U);
 }
 
+TEST_F(MediaTest, GivesTheStartPositionToTheLastOfTwoRequests) {
+    ASSERT_EQ(TELIX_JS_AV_Seek(m_player, 1500), 0);
+    {
+        PlatformThreadBlock block;
+        ASSERT_EQ(start(m_player, file("tune.mp3")), 0);
+        ASSERT_EQ(start(m_player, file("tune.wav")), 0);
+        ASSERT_EQ(TELIX_JS_AV_Pause(m_player), 0);
+    }
+    ASSERT_TRUE(waitUntil([&] { return info().state == 2; }));
+    EXPECT_TRUE(waitUntil([&] { return info().playPosition >= 1500; }));
+    EXPECT_EQ(stateOf(m_player).url, file("tune.wav"));
+}
+
 // ---- What goes wrong
 
 class MediaErrorTest : public MediaTest {

@@ -172,6 +172,24 @@ TEST(SectionFilterTest, DropsASectionWithALostPacketAndTakesTheNext) {
     EXPECT_EQ(filtered(packets), std::vector<Bytes>{section});
 }
 
+TEST(SectionFilterTest, TakesTheLongestSectionAndNoLongerOne) {
+    constexpr size_t kLongest = 4096; // of a private section
+    const auto makeSection = [](size_t size) {
+        Bytes section(size, 0);
+        section[0] = kTableIdDsmccStreamDescriptors;
+        section[1] = static_cast<uint8_t>((size - kSectionHeaderSize) >> 8); // without a CRC
+        section[2] = static_cast<uint8_t>(size - kSectionHeaderSize);
+        return section;
+    };
+    uint8_t continuity = 0;
+    Bytes packets;
+    for (const size_t size : {kLongest, kLongest + 1, size_t{100}}) {
+        const Bytes more = packetsOf(makeSection(size), kPidEit, continuity);
+        packets.insert(packets.end(), more.begin(), more.end());
+    }
+    EXPECT_EQ(filtered(packets), (std::vector<Bytes>{makeSection(kLongest), makeSection(100)}));
+}
+
 TEST(SectionFilterTest, TakesAnyDamageWithoutHarmAndLetsNoneThrough) {
     const Bytes section = pack(makeEit());
     std::mt19937 random(20261121);

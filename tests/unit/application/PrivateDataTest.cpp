@@ -296,6 +296,14 @@ TEST_F(PrivateDataTest, FreeMemoryAboveTheSignedRangeReadsNegative) {
     leftBehind(data);
 }
 
+TEST_F(PrivateDataTest, FreeMemoryIsZeroIfThePlatformWritesNothing) {
+    const ObjectRef application = newApplication();
+    const ObjectRef data = application.get("privateData").object();
+    platform.TELIX_JS_APP_GetFreeMem = [](uint32_t*) { return TELIX_RETCODE_SUCCESS; };
+    EXPECT_EQ(data.call("getFreeMem"), Value(0));
+    leftBehind(data);
+}
+
 TEST_F(PrivateDataTest, ARefusalGivesTheLastFigureAtFirstZero) {
     const ObjectRef application = newApplication();
     const ObjectRef data = application.get("privateData").object();

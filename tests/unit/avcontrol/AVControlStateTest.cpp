@@ -1,5 +1,7 @@
 // Play state and ready state: what each platform message does, which events a change of state gives, and what
 // becomes of messages and posted changes that come late.
+#include <sstream>
+
 #include "src/avcontrol/AVControl.h"
 #include "tests/unit/avcontrol/AVControlTest.h"
 
@@ -415,6 +417,16 @@ TEST_F(AVControlState, ABusyNetworkChangesNothingAndCountsAsAMessage) {
         HasSubstr("Ignored duplicated message(" + std::to_string(TELIX_AV_CB_MSG_ERR_NET_BUSY) + ")\n"));
 }
 
+TEST_F(AVControlState, MessagesOfTheNetworkAreLogged) {
+    inState(Playing);
+    for (const TELIX_AV_CB_MSG message :
+         {TELIX_AV_CB_MSG_ERR_NET_BUSY, TELIX_AV_CB_MSG_ERR_NET_CANNOT_PROCESS}) {
+        std::ostringstream number;
+        number << std::hex << message;
+        EXPECT_THAT(logOf(5, [&] { send(message); }), HasSubstr("Network message (" + number.str() + ")\n"));
+    }
+}
+
 TEST_F(AVControlState, AMessagePassesAgainWhenAnotherCameBetween) {
     const EmbeddedObject object = inState(Playing);
     send(TELIX_AV_CB_MSG_ERR_NOT_FOUND);
@@ -473,6 +485,18 @@ TEST_F(AVControlState, PositionAndLengthReadZeroFromTheEndOfAClipToTheNextStart)
     send(TELIX_AV_CB_MSG_PLAYSTART);
     EXPECT_EQ(object.get("playPosition"), 5000.0);
     EXPECT_EQ(object.get("playTime"), 60000.0);
+}
+
+TEST_F(AVControlState, NothingOfAClipThatHasEndedIsReadWhileTheNextIsUnknown) {
+    const EmbeddedObject object = inState(Playing);
+    report(info(20, 5000, 60000));
+    EXPECT_EQ(object.get("playTime"), 60000.0);
+    send(TELIX_AV_CB_MSG_PLAYEND);
+    report(info(20, 0, 0, 0, 1));
+    object.call("play", 1);
+    send(TELIX_AV_CB_MSG_PLAYSTART);
+    EXPECT_EQ(object.get("playPosition"), 0.0);
+    EXPECT_EQ(object.get("playTime"), 0.0);
 }
 
 // Several objects, late messages
