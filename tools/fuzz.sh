@@ -33,16 +33,24 @@ for target in "$@"; do
     [ -x "$folder/$target-fuzz" ] || fail "$target: unknown fuzz target"
 done
 
-# Lines of the sources under test, which the corpus reaches; the target itself does not count.
+# Rows of a table: the sources under test, their lines, and how many of them the corpus reaches. What it does not reach at all
+# is there to link; the target itself does not count.
 print_coverage() {
     local profile=$folder/$1.profraw
     LLVM_PROFILE_FILE=$profile "$folder/$1-fuzz" -runs=0 "$corpus/$1" >/dev/null 2>&1
     llvm-profdata-14 merge -o "$folder/$1.profdata" "$profile"
-    llvm-cov-14 report "$folder/$1-fuzz" -instr-profile="$folder/$1.profdata" \
-        -ignore-filename-regex='tests/fuzz|/usr/' | sed "s/^/$1: /"
+    llvm-cov-14 export "$folder/$1-fuzz" -instr-profile="$folder/$1.profdata" -summary-only \
+        -ignore-filename-regex='tests/fuzz|/usr/' | python3 -c "
+import json, os, sys
+for file in json.load(sys.stdin)['data'][0]['files']:
+    lines = file['summary']['lines']
+    if lines['covered']:
+        print(f'| $1 | \`{os.path.relpath(file[\"filename\"])}\` | {lines[\"count\"]} | {lines[\"percent\"]:.0f} % |')"
 }
 
 if [ "$minutes" = --coverage ]; then
+    echo '| Target | Source | Lines | Reached |'
+    echo '|---|---|---|---|'
     for target in "$@"; do
         print_coverage "$target"
     done

@@ -19,7 +19,8 @@ for purpose in "$@"; do
     test)
         packages+=(libgtest-dev libgmock-dev libbenchmark-dev libexpat1-dev clang-14 libclang-rt-14-dev
             clang-format-14 clang-tidy-14 libwpewebkit-1.1-dev
-            cog python3 binutils util-linux procps dpkg-dev man-db openssl webkit2gtk-driver python3-selenium)
+            cog python3 python3-clang-14 gcovr binutils util-linux procps dpkg-dev man-db openssl webkit2gtk-driver
+            python3-selenium)
         programs+=(tsc=typescript@5.4.5)
         modules+=(selenium-webdriver@4.27.0)
         ;;
