@@ -1,6 +1,6 @@
 #!/usr/bin/env bash
-# Which lines of the plug-in, the desktop platform library and the bridge their own test programs execute: a table of the areas, and with
-# --files of their files.
+# Which lines of the plug-in, the desktop platform library and the bridge their own test programs execute: a table of the
+# areas, and with --files of their files.
 # Usage: tools/coverage.sh [--files]
 # Compiles the three with counters into build-coverage. The tests themselves are those of the preset release.
 # Exit status: 0 all tests pass; 1 some fail; 2 bad arguments.
@@ -48,7 +48,7 @@ print_row() {
     gcovr --root . --add-tracefile "$build/coverage.json" "${options[@]}" --csv "$build/area.csv"
     awk -F, -v name="$name" -v files=$files '
         NR > 1 { total += $2; covered += $3 }
-        NR > 1 && files == "yes" { rows = rows sprintf("| `%s` | %d | %d | %.1f % |\n", $1, $2, $3, 100 * $3 / ($2 ? $2 : 1)) }
+        NR > 1 && files == "yes" { rows = rows sprintf("| `%s` | %d | %d | %.1f %% |\n", $1, $2, $3, 100 * $3 / ($2 ? $2 : 1)) }
         END { printf "| %s | %d | %d | %.1f %% |\n%s", name, total, covered, 100 * covered / total, rows }' "$build/area.csv"
 }
 echo '| Area | Lines | Executed | |'

@@ -271,7 +271,7 @@ class Finder:
         before, after = '(', ' + ::telix_mutation::isOn({}))'
         if cursor.kind == CursorKind.CHARACTER_LITERAL:
             before = 'char('  # no integer where a character is appended or printed
-        return enclosed('add 1', start, end, self.source, before, after, lambda text: f'{text} + 1')
+        return enclosed('add 1', start, end, self.source, before, after, lambda text: f'({text} + 1)')
 
     def _boolean(self, cursor):
         start, end = self._span(cursor)

@@ -2,7 +2,8 @@
 """Breaks the sources of an area, one place at a time, and runs the tests that reach the place: what no test notices is shown as
 a diff. Results and everything that is compiled are in BUILD/mutation/AREA; the tree is only read.
 
-The build folder has to be one of Ninja with the tests. docs/reliability.md says how to read the figures.
+The build folder has to be one of Ninja with the tests and with what they need, such as telixctl for those of the platform library
+and the engine of the pages for those of the bridge. docs/reliability.md says how to read the figures.
 Exit status: 0 every mutant is noticed or listed as equivalent; 1 some are not; 2 bad arguments or a failed build."""
 
 import argparse
@@ -415,7 +416,8 @@ def change_of(mutant, source):
 def read_equivalent(path):
     try:
         with open(path, 'rb') as file:
-            return {(each['path'], each['function'], each['before'], each['after']) for each in tomllib.load(file).get('mutant', [])}
+            listed = tomllib.load(file).get('mutant', [])
+            return {(each['path'], each['function'], each['before'], each['after']) for each in listed}
     except OSError as error:
         fail(path, error.strerror)
     except (tomllib.TOMLDecodeError, KeyError) as error:
@@ -566,7 +568,8 @@ def choose(build, work, arguments):
     count = min(arguments.count or len(found), len(found))
     if count > MAX_MUTANTS:
         fail(str(count), f'too many mutants for a build, {MAX_MUTANTS} are possible')
-    chosen = sorted(random.Random(arguments.seed).sample(found, count), key=lambda each: (each.path, each.start))
+    # In the order in which they were found, the outer ones first, as those with the same extent have to be numbered.
+    chosen = [found[index] for index in sorted(random.Random(arguments.seed).sample(range(len(found)), count))]
     print(f'{count} of {len(found)} mutants in {len(paths)} sources')
     for index, mutant in enumerate(chosen):
         mutant.number = index

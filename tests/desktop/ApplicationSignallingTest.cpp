@@ -186,4 +186,32 @@ TEST(ApplicationExportsTest, ParseXmlAitsForTheWindow) {
     telix_desktop_release_applications(&applications);
 }
 
+TEST(ApplicationExportsTest, HandOutWhatIsSignalledOfAnApplication) {
+    const std::string document =
+        "<ServiceDiscovery><ApplicationDiscovery><ApplicationList><Application><appName>Text</appName>"
+        "<applicationIdentifier><orgId>7</orgId><appId>9</appId></applicationIdentifier>"
+        "<applicationDescriptor><controlCode>PRESENT</controlCode><visibility>VISIBLE_ALL</visibility>"
+        "<serviceBound>false</serviceBound><priority>1f</priority></applicationDescriptor>"
+        "<applicationUsageDescriptor><ApplicationUsage>urn:dvb:mhp:2009:digitalText</ApplicationUsage>"
+        "</applicationUsageDescriptor><applicationBoundary><BoundaryExtension>http://b.example/"
+        "</BoundaryExtension></applicationBoundary><applicationLocation>http://a.example/"
+        "</applicationLocation></Application></ApplicationList></ApplicationDiscovery></ServiceDiscovery>";
+    telix_desktop_applications applications{};
+    ASSERT_EQ(telix_desktop_parse_xml_ait(document.data(), document.size(), &applications), 1);
+    ASSERT_EQ(applications.applicationCount, 1U);
+    const telix_desktop_application& record = applications.applications[0];
+    EXPECT_EQ(record.organisationId, 7U);
+    EXPECT_EQ(record.applicationId, 9U);
+    EXPECT_EQ(record.controlCode, 2U);
+    EXPECT_EQ(record.serviceBound, 0U);
+    EXPECT_EQ(record.visibility, 3U);
+    EXPECT_EQ(record.priority, 0x1FU);
+    EXPECT_EQ(record.usage, 1U);
+    EXPECT_STREQ(record.name, "Text");
+    EXPECT_STREQ(record.url, "http://a.example/");
+    ASSERT_EQ(record.boundaryCount, 1U);
+    EXPECT_STREQ(record.boundaries[0], "http://b.example/");
+    telix_desktop_release_applications(&applications);
+}
+
 } // namespace

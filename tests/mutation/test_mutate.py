@@ -56,8 +56,8 @@ class Found(unittest.TestCase):
         self.assertEqual(changes('bool f(bool a) { return !a; }', 'drop negation'), [('!a', 'a')])
 
     def test_constants(self):
-        self.assertEqual(changes('int f() { return 4; }', 'add'), [('4', '4 + 1')])
-        self.assertEqual(changes('void f(int a) { switch (a) { case 1: f(2); } }', 'add'), [('2', '2 + 1')])
+        self.assertEqual(changes('int f() { return 4; }', 'add'), [('4', '(4 + 1)')])
+        self.assertEqual(changes('void f(int a) { switch (a) { case 1: f(2); } }', 'add'), [('2', '(2 + 1)')])
         self.assertEqual(changes('bool f() { return true; }', 'false'), [('true', 'false')])
         self.assertEqual(changes('const char* f() { return "a"; }', 'empty'), [('"a"', '""')])
         self.assertEqual(changes('enum { a = 1 }; static_assert(a == 1);'), [])
@@ -76,7 +76,7 @@ class Found(unittest.TestCase):
             '''), [('b = TWICE(b + 3);', '')])
 
     def test_offsets_are_of_characters(self):
-        self.assertEqual(changes('// „ä“\nint f() { return 4; }', 'add'), [('4', '4 + 1')])
+        self.assertEqual(changes('// „ä“\nint f() { return 4; }', 'add'), [('4', '(4 + 1)')])
 
     def test_a_source_that_cannot_be_parsed(self):
         with self.assertRaisesRegex(ValueError, 'line 2'):
@@ -85,7 +85,7 @@ class Found(unittest.TestCase):
     def test_a_diff(self):
         mutant = next(each for each in found_in('int f() {\n    return 4;\n}\n') if each.kind == 'add 1')
         self.assertEqual(mutant.diff('int f() {\n    return 4;\n}\n').splitlines()[3:],
-                         [' int f() {', '-    return 4;', '+    return 4 + 1;', ' }'])
+                         [' int f() {', '-    return 4;', '+    return (4 + 1);', ' }'])
 
 
 class Compiled(unittest.TestCase):
