@@ -10,6 +10,7 @@ The query of a URL controls the response:
   ?cut=BYTES       closes the connection after this many bytes of the body
   ?redirect=URL    responds with a redirection to URL
   ?cookie=VALUE    adds a header Set-Cookie with VALUE
+  ?require=NAME:TEXT   responds with status 403 unless the request has a header NAME with TEXT in it; may be repeated
 
 In a playlist (.asx), whose clips need absolute URLs, @FOLDER@ stands for the URL of the folder that it is in."""
 
@@ -83,7 +84,9 @@ class ResponseOptions:
     """The options in the query of a URL."""
 
     def __init__(self, query):
-        values = dict(urllib.parse.parse_qsl(query, keep_blank_values=True))
+        pairs = urllib.parse.parse_qsl(query, keep_blank_values=True)
+        values = dict(pairs)
+        self.required = [self._requirement(value) for name, value in pairs if name == 'require']
         self.rate = self._number(values, 'rate', 1)
         self.cut = self._number(values, 'cut', 0)
         self.trickle = self._number(values, 'trickle', 0)
@@ -94,6 +97,16 @@ class ResponseOptions:
         if ranges not in ('yes', 'no'):
             raise BadRequest('ranges: must be yes or no')
         self.ranges = ranges == 'yes'
+
+    def has_required(self, headers):
+        return all(text in headers.get(name, '') for name, text in self.required)
+
+    @staticmethod
+    def _requirement(value):
+        name, _, text = value.partition(':')
+        if not name or not text:
+            raise BadRequest('require: must be of the form NAME:TEXT')
+        return name, text
 
     @staticmethod
     def _header(values, name):
@@ -136,7 +149,9 @@ class Handler(http.server.BaseHTTPRequestHandler):
             self._refuse(400, str(error), with_body)
             return
         self._cookie = options.cookie
-        if options.redirect is not None:
+        if not options.has_required(self.headers):
+            self._refuse(403, 'a header is missing', with_body)
+        elif options.redirect is not None:
             self._redirect(302, options.redirect)
         elif options.status is not None and options.status != 200:
             self._refuse(options.status, 'status as requested', with_body)

@@ -139,6 +139,14 @@ class Responses(Folder):
         for query in ('redirect=', 'cookie=a%0d%0ab'):
             self.assertEqual(self.get('/media/clip.mp4?' + query)[0], 400, query)
 
+    def test_requires_headers(self):
+        path = '/media/clip.mp4?require=Referer:http://x/&require=Cookie:a%3Db'
+        self.assertEqual(self.get(path)[0], 403)
+        self.assertEqual(self.get(path, Referer='http://x/')[0], 403)
+        self.assertEqual(self.get(path, Referer='http://x/y', Cookie='c=d; a=b')[2], CONTENT)
+        for query in ('require=', 'require=Cookie', 'require=:a'):
+            self.assertEqual(self.get('/media/clip.mp4?' + query)[0], 400, query)
+
     def test_records_requests(self):
         log = os.path.join(self._folder.name, 'log')
         with media_server.MediaServer({'media': self.media}, log=log) as server:
