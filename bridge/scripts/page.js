@@ -983,14 +983,12 @@
     }
 
     // A response that other origins keep from pages is asked for with ever less: first with the session's cookies, then
-    // without, then only whether it is there.
+    // without, then only whether it is there. The page's own origin may redirect to another one.
     function modesFor(url, method) {
-        if (urlOrigin(url) === pageOrigin) {
-            return [{ __proto__: null, credentials: 'same-origin' }];
-        }
-        const modes = [{ __proto__: null, credentials: 'include' }, { __proto__: null, credentials: 'omit' }];
+        const modes = urlOrigin(url) === pageOrigin ? [{ __proto__: null, credentials: 'same-origin' }] :
+            [{ __proto__: null, credentials: 'include' }, { __proto__: null, credentials: 'omit' }];
         if (method === 'GET') {
-            modes[2] = { __proto__: null, mode: 'no-cors', credentials: 'include' };
+            modes[modes.length] = { __proto__: null, mode: 'no-cors', credentials: 'include' };
         }
         return modes;
     }
