@@ -64,8 +64,9 @@ class DrivenTv(Recorded, TelixTv):
         finally:
             service.stop()
 
-    def start_session(self, service, *arguments, plugin=PLUGIN):
+    def start_session(self, service, *arguments, plugin=PLUGIN, accepts_any_certificate=False):
         options = options_of('--plugin', plugin, '--record', self.new_recording(), *arguments)
+        options.accept_insecure_certs = accepts_any_certificate
         return webdriver.Remote(service.service_url, options=options)
 
     @contextlib.contextmanager

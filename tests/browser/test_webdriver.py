@@ -1,4 +1,4 @@
-"""telix-tv under WebKitWebDriver: keys, elements, scripts, screenshots and the windows of its applications."""
+"""telix-tv under WebKitWebDriver: keys, elements, scripts, screenshots, certificates and the windows of its applications."""
 
 import os
 import socket
@@ -11,6 +11,7 @@ from selenium.webdriver.common.keys import Keys
 from selenium_tv import DrivenTv, press
 from telix_tv import GREEN, KEY_CODES, server, shipped
 from television import PngImage, wait_for
+from test_media_requests import CLIPS, PLAYER, PLAYING, TUNE, MediaServer, certificate_of
 
 DESKTOP_PLUGIN = os.environ['TELIX_DESKTOP_PLUGIN']
 # The keys of WebDriver that are keys of the remote control.
@@ -185,6 +186,20 @@ class RemoteControl(DrivenTv):
             session.get('file://' + shipped('first.html'))
             self.assertEqual((session.title, session.execute_script('return document.visibilityState')),
                              ('first', 'visible'))
+
+
+class Certificates(DrivenTv):
+    def test_page_and_media_of_a_session_that_accepts_any(self):
+        _, both = certificate_of(self.folder)
+        with MediaServer({'': self.folder, 'clips': CLIPS}, certificate=both) as running:
+            self.write(PLAYER.format(url=running.url + TUNE, kind='audio/mpeg', image='data:,'))
+            with self.session(plugin=DESKTOP_PLUGIN, accepts_any_certificate=True) as session:
+                session.get(running.url + '/page.html')
+                wait_for(lambda: PLAYING in session.execute_script('return states'),
+                         lambda: session.execute_script('return states'))
+            with self.session(plugin=DESKTOP_PLUGIN) as session:
+                session.get(running.url + '/page.html')
+                self.assertEqual(session.execute_script('return typeof states'), 'undefined')
 
 
 class Windows(DrivenTv):

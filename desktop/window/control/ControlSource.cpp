@@ -1,21 +1,17 @@
 // The requests of the control socket that the platform library passes on.
 #include "desktop/window/control/ControlSource.h"
 
-#include <glib.h>
-
 #include <utility>
 
 namespace desktop {
 
 ControlSource::ControlSource(Handler handler)
-    : m_handler(std::move(handler)), m_search([this] { return find(); }) {}
+    : m_handler(std::move(handler)), m_requests([this](const Request& request) { handle(request); }),
+      m_search([this] { return find(); }) {}
 
 ControlSource::~ControlSource() {
     if (m_setHandler) {
         m_setHandler(nullptr);
-    }
-    if (m_idle != 0) {
-        g_source_remove(m_idle);
     }
 }
 
@@ -35,33 +31,14 @@ bool ControlSource::find() {
 
 // Called on a thread of the platform library.
 void ControlSource::onRequest(uint64_t request, const char* line, void* source) {
-    auto* self = static_cast<ControlSource*>(source);
-    const std::lock_guard<std::mutex> lock(self->m_mutex);
-    self->m_requests.push_back({request, line});
-    if (self->m_idle == 0) {
-        self->m_idle = g_idle_add_full(
-            G_PRIORITY_DEFAULT,
-            [](gpointer data) -> gboolean {
-                static_cast<ControlSource*>(data)->handleRequests();
-                return G_SOURCE_REMOVE;
-            },
-            self, nullptr);
-    }
+    static_cast<ControlSource*>(source)->m_requests.post({request, line});
 }
 
-void ControlSource::handleRequests() {
-    std::vector<Request> requests;
-    {
-        const std::lock_guard<std::mutex> lock(m_mutex);
-        requests.swap(m_requests);
-        m_idle = 0;
-    }
-    for (const Request& each : requests) {
-        // The library stays loaded, so its function may be called after the end of this object.
-        m_handler(each.line, [answer = m_answer, id = each.id](const std::string& response) {
-            answer(id, response.c_str());
-        });
-    }
+void ControlSource::handle(const Request& request) {
+    // The library stays loaded, so its function may be called after the end of this object.
+    m_handler(request.line, [answer = m_answer, id = request.id](const std::string& response) {
+        answer(id, response.c_str());
+    });
 }
 
 } // namespace desktop

@@ -2,13 +2,13 @@
 #ifndef TELIX_DESKTOP_WINDOW_CONTROL_CONTROLSOURCE_H
 #define TELIX_DESKTOP_WINDOW_CONTROL_CONTROLSOURCE_H
 
+#include <cstdint>
 #include <functional>
-#include <mutex>
 #include <string>
-#include <vector>
 
 #include "desktop/platform/telix_control.h"
 #include "desktop/window/shared/LibrarySearch.h"
+#include "desktop/window/shared/MainThreadQueue.h"
 #include "desktop/window/shared/PlatformLibrary.h"
 
 namespace desktop {
@@ -35,13 +35,10 @@ private:
 
     static void onRequest(uint64_t request, const char* line, void* source);
     bool find();
-    void handleRequests();
+    void handle(const Request& request);
 
     Handler m_handler;
-    std::mutex m_mutex; // guards what follows
-    std::vector<Request> m_requests;
-    unsigned m_idle = 0; // the source that handles them on the main thread
-
+    MainThreadQueue<Request> m_requests;
     PlatformLibrary m_library;
     telix_desktop_set_control_handler_function m_setHandler = nullptr;
     telix_desktop_answer_control_request_function m_answer = nullptr;

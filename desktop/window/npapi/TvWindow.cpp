@@ -27,6 +27,7 @@
 #include "desktop/window/shared/Diagnostics.h"
 #include "desktop/window/shared/LoadCheck.h"
 #include "desktop/window/shared/MainLoopTimer.h"
+#include "desktop/window/shared/Referer.h"
 
 namespace desktop {
 
@@ -54,7 +55,7 @@ TvWindow::TvWindow(const CommandLine& commandLine)
           libraryCalls(), stackCalls(),
           [this](const std::string& text) { m_display->show(QString::fromStdString(text)); },
           mainLoopTimer()),
-      m_network(commandLine.ignoresCertificateErrors) {
+      m_network(commandLine.ignoresCertificateErrors), m_mediaRequests(mediaBrowser()) {
     signallingEvent();
     m_library.loadBeside(commandLine.plugin);
     // The plug-in loads another library during a call of a page on this thread, so the event loop runs after
@@ -369,6 +370,21 @@ SignalledApplications::Window TvWindow::stackCalls() {
         }
     };
     return calls;
+}
+
+// Media is played for the topmost application, with the engine's rules for what a page embeds.
+MediaRequests::Browser TvWindow::mediaBrowser() {
+    MediaRequests::Browser browser;
+    browser.onRequest = [this](const std::string& url, const MediaRequests::Identify& identify) {
+        const ApplicationView* top = m_stack.top();
+        const std::string page = top ? top->url().toString(QUrl::FullyEncoded).toStdString() : "";
+        identify({m_requestOptions.userAgent, refererOf(page, url, ReferrerPolicy::NoReferrerWhenDowngrade),
+                  m_network.cookiesFor(url), m_requestOptions.ignoresCertificateErrors});
+    };
+    browser.onCookie = [this](const std::string& url, const std::string& cookie) {
+        m_network.storeCookie(url, cookie);
+    };
+    return browser;
 }
 
 void TvWindow::updateTop() {

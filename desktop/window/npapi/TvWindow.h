@@ -10,6 +10,7 @@
 #include "desktop/window/npapi/NetworkAccess.h"
 #include "desktop/window/shared/ApplicationStack.h"
 #include "desktop/window/shared/ApplicationTarget.h"
+#include "desktop/window/shared/MediaRequests.h"
 #include "desktop/window/shared/ScriptedWindow.h"
 #include "desktop/window/shared/Television.h"
 #include "desktop/window/shared/TelevisionLibrary.h"
@@ -72,6 +73,7 @@ private:
     void startTelevision();
     Television::Library libraryCalls();
     SignalledApplications::Window stackCalls();
+    MediaRequests::Browser mediaBrowser();
     ApplicationView& push();
     ApplicationView& openSignalled(const std::string& url);
     ApplicationTarget findTarget(const std::string& url) const;
@@ -95,6 +97,7 @@ private:
     NetworkAccess m_network;
     ApplicationStack<ApplicationView> m_stack;
     QWebInspector* m_inspector = nullptr;
+    MediaRequests m_mediaRequests;
 };
 
 } // namespace desktop

@@ -24,6 +24,12 @@ constexpr char kControlMessage[] = "telix-control";
 // without parameters, comes when the plane has changed.
 constexpr char kPagePresenterMessage[] = "telix-page-presenter";
 
+// To the window's context: a request of media, with its URL (ay). The reply has what it carries: user agent,
+// Referer and cookies, and whether it accepts any certificate (ayayayb).
+constexpr char kMediaRequestMessage[] = "telix-media-request";
+// To the window's context: a response of media has set a cookie (ayay): the URL, and the value of Set-Cookie.
+constexpr char kMediaCookieMessage[] = "telix-media-cookie";
+
 } // namespace desktop
 
 #endif

@@ -17,6 +17,7 @@
 #include "desktop/window/webkit/ControlReceiver.h"
 #include "desktop/window/webkit/Engine.h"
 #include "desktop/window/webkit/InspectorServer.h"
+#include "desktop/window/webkit/MediaIdentity.h"
 #include "desktop/window/webkit/PageChannel.h"
 #include "desktop/window/webkit/Profile.h"
 #include "desktop/window/webkit/SoundChannel.h"
@@ -73,6 +74,10 @@ int runWindow(const CommandLine& commandLine, const std::string& page, const Plu
     Engine engine(commandLine, plugin, profile, output, channel);
     TvWindow window(engine, channel, commandLine);
     const ControlReceiver control(engine.context(), window);
+    const MediaIdentity mediaIdentity(engine.context(), commandLine.userAgent, [&] {
+        const auto running = window.applications();
+        return running.empty() ? "" : running.front().url;
+    });
     Recording recording(window, commandLine);
     if (recording.hasFailed()) {
         return kExitBadInput;

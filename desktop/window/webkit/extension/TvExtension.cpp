@@ -5,6 +5,7 @@
 
 #include "desktop/window/webkit/extension/ControlForwarder.h"
 #include "desktop/window/webkit/extension/FrameSender.h"
+#include "desktop/window/webkit/extension/MediaForwarder.h"
 #include "desktop/window/webkit/extension/PageFunctions.h"
 #include "desktop/window/webkit/extension/SessionKeys.h"
 #include "desktop/window/webkit/extension/SoundSender.h"
@@ -74,5 +75,6 @@ webkit_web_extension_initialize_with_user_data(WebKitWebExtension* extension, co
     desktop::sendFrames(extension);
     desktop::serveTelevision(extension, desktop::stringFrom(data, "plugin"), desktop::startFrom(data));
     desktop::forwardControlRequests(extension);
+    desktop::forwardMediaRequests(extension);
     desktop::sendSound(desktop::descriptorFrom(data, "sound"));
 }
