@@ -385,7 +385,7 @@ bool construct(NPP, NPObject* object, const NPVariant* args, uint32_t count, NPV
     return callForResult(result, object ? object->_class->construct : nullptr, object, args, count);
 }
 
-bool evaluate(NPP, NPObject* object, NPString* script, NPVariant* result) {
+bool evaluate(NPP npp, NPObject* object, NPString* script, NPVariant* result) {
     if (result) {
         *result = voidVariant();
     }
@@ -397,6 +397,9 @@ bool evaluate(NPP, NPObject* object, NPString* script, NPVariant* result) {
     NPVariant value = voidVariant();
     const CallDepth depth;
     const bool isDone = scope->engine->evaluate(scope->handle, source, kEvaluatedName, &value);
+    if (Page* const page = isDone ? nullptr : pageOf(npp)) {
+        page->warn("failed-script", source);
+    }
     if (result) {
         *result = value;
     } else {

@@ -9,7 +9,9 @@
 #include <glib.h>
 
 #include "bridge/CallDepth.h"
+#include "bridge/Identifiers.h"
 #include "bridge/Instance.h"
+#include "bridge/Page.h"
 #include "bridge/Variants.h"
 
 namespace bridge {
@@ -324,8 +326,49 @@ bool PluginObject::run(NPVariant* result, Call call) {
 
 bool PluginObject::call(NPIdentifier method, const Arguments& arguments, NPVariant* result) {
     return run(result, [&](const NPClass& calls) {
-        return calls.invoke && calls.invoke(m_object, method, arguments.data(), arguments.count(), result);
+        const bool isDone =
+            calls.invoke && calls.invoke(m_object, method, arguments.data(), arguments.count(), result);
+        if (!isDone && pendingException.empty()) {
+            warnOfRefusal(method, arguments);
+        }
+        return isDone;
     });
+}
+
+namespace {
+
+// As the author of a page would say it.
+std::string typeNameOf(const NPVariant& value) {
+    switch (value.type) {
+    case NPVariantType_Null:
+        return "null";
+    case NPVariantType_Bool:
+        return "boolean";
+    case NPVariantType_Int32:
+    case NPVariantType_Double:
+        return "number";
+    case NPVariantType_String:
+        return "string";
+    case NPVariantType_Object:
+        return "object";
+    default:
+        return "undefined";
+    }
+}
+
+} // namespace
+
+// The exception that script gets does not say which call it was, and script may catch it.
+void PluginObject::warnOfRefusal(NPIdentifier method, const Arguments& arguments) const {
+    Page* const page = m_instance ? m_instance->page() : nullptr;
+    if (!page) {
+        return;
+    }
+    std::string call = identifierOf(method).text + '(';
+    for (uint32_t i = 0; i < arguments.count(); i++) {
+        call += (i > 0 ? ", " : "") + typeNameOf(arguments.data()[i]);
+    }
+    page->warn("refused-call", call + ')');
 }
 
 bool PluginObject::callDefault(const Arguments& arguments, NPVariant* result) {

@@ -99,6 +99,7 @@ private:
     void dropWrapper();
     template <typename Call>
     bool run(NPVariant* result, Call call);
+    void warnOfRefusal(NPIdentifier method, const Arguments& arguments) const;
     bool finish(bool done, NPVariant* result);
 
     NPObject* m_object;

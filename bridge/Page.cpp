@@ -116,6 +116,13 @@ bool Page::callScript(const char* function, const Arguments& arguments, NPVarian
                                                 arguments.data(), arguments.count(), result);
 }
 
+void Page::warn(const char* what, const std::string& subject) {
+    Arguments arguments(2);
+    arguments[0] = stringVariant(what);
+    arguments[1] = stringVariant(subject);
+    callScript("warn", arguments);
+}
+
 void Page::endInstances() {
     while (!m_instances.empty()) {
         endInstance(m_instances.begin()->first);

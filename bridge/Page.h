@@ -62,6 +62,9 @@ public:
     bool callScript(const char* function, const Arguments& arguments);
     bool callScript(const char* function, const Arguments& arguments, NPVariant* result);
 
+    // Reports what the page is not told, see `warn` in scripts/page.js.
+    void warn(const char* what, const std::string& subject);
+
 private:
     Page(Plugin& plugin, std::string idPrefix)
         : m_plugin(plugin), m_idPrefix(std::move(idPrefix)), m_streams(*this) {}

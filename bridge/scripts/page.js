@@ -69,6 +69,19 @@
         }
     }
 
+    // Another function of that kind, for what the page is not told. Calls it with what it is and with what it is about:
+    //   'no-id'          an object without an id, its type
+    //   'unknown-type'   an element of a type that the plug-in does not have, the type
+    //   'refused-call'   a method that has refused its arguments without an exception, the call with their types
+    //   'failed-script'  a script of the plug-in that has thrown, its source
+    const reporter = theWindow.telixBridgeReporter;
+    deleteProperty(theWindow, 'telixBridgeReporter');
+    function warn(what, subject) {
+        if (reporter) {
+            apply(reporter, undefined, [what, subject]);
+        }
+    }
+
     const isConnected = getter(Node.prototype, 'isConnected');
     const ownerDocument = getter(Node.prototype, 'ownerDocument');
     const parentNode = getter(Node.prototype, 'parentNode');
@@ -223,8 +236,12 @@
         const record = { __proto__: null, element, number: 0, object: null, base: null, place: '' };
         // Before all else, so that what the plug-in and the page do meanwhile does not come here again.
         mapSet(recordOf, element, record);
-        if (idPrefix !== '' && !getAttribute(element, 'id')) {
-            setAttribute(element, 'id', idPrefix + ++lastId);
+        if (!getAttribute(element, 'id')) {
+            if (idPrefix === '') {
+                warn('no-id', typeOf(element));
+            } else {
+                setAttribute(element, 'id', idPrefix + ++lastId);
+            }
         }
         const values = [element, typeOf(element)];
         const parameters = parametersOf(element);
@@ -349,8 +366,16 @@
                 pending[pending.length] = elements[i];
                 guard(elements[i], false);
             } else {
+                warnOfType(elements[i]);
                 attach(elements[i]);
             }
+        }
+    }
+
+    function warnOfType(element) {
+        const type = typeOf(element);
+        if (type !== '' && !(type in types) && isHere(element)) {
+            warn('unknown-type', type);
         }
     }
 
@@ -1107,6 +1132,7 @@
             setTimer(start, 0, number, target, method, headers, body);
         },
         next: next,
-        cancel: cancel
+        cancel: cancel,
+        warn: warn
     });
 })
