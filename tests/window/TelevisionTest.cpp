@@ -134,6 +134,31 @@ TEST_F(TelevisionTest, AnotherKeyDiscardsTheTypedNumber) {
     EXPECT_EQ(m_calls, Strings{"step 1"});
 }
 
+TEST_F(TelevisionTest, APageIsToldOfItsKeysOutsideOfTheKeySet) {
+    const int application = 0;
+    const auto linesOf = [&](const char* key, const Warnings::Page& page) {
+        testing::internal::CaptureStderr();
+        m_television.onKey(*remoteKeyByName(key), page);
+        return testing::internal::GetCapturedStderr();
+    };
+    EXPECT_NE(linesOf("2", {&application, "http://example/"}).find("telix: "), std::string::npos);
+    EXPECT_EQ(linesOf("volume-up", {&application, "http://example/"}), "");
+    EXPECT_EQ(linesOf("2", {}), "");
+    m_television.onEnded(&application);
+    EXPECT_NE(linesOf("2", {&application, "http://example/"}), "");
+}
+
+TEST_F(TelevisionTest, WhatTheSignallingSkipsIsPrintedOnce) {
+    Signalling signalling;
+    signalling.channel = 3;
+    signalling.skipped = {"section: malformed"};
+    testing::internal::CaptureStderr();
+    m_television.onSignalling(signalling);
+    m_television.onSignalling(signalling);
+    EXPECT_EQ(testing::internal::GetCapturedStderr(),
+              "telix: skipped in the AIT of channel 3: section: malformed\n");
+}
+
 TEST_F(TelevisionTest, ChannelKeysStepThroughTheChannels) {
     press("channel-up");
     press("channel-down");

@@ -18,11 +18,20 @@ PageFunctions::PageFunctions(QWebFrame& frame, ApplicationView& application, TvW
 
 void PageFunctions::install() {
     m_frame.addToJavaScriptWindowObject(QStringLiteral("telixTvBrowser"), this);
-    m_frame.evaluateJavaScript(QString::fromStdString(pageFunctionsScript() + "," + keyNamesScript()));
+    for (const auto& script :
+         {pageScriptCall("watchobjects", {}), pageFunctionsScript() + "," + keyNamesScript()}) {
+        m_frame.evaluateJavaScript(QString::fromStdString(script));
+    }
 }
 
 bool PageFunctions::createApplication(const QString& url) {
     return m_window.createApplication(m_application, m_frame.baseUrl().resolved(QUrl(url)));
+}
+
+void PageFunctions::warn(const QString& name, const QString& subject) {
+    if (const auto warning = warningNamed(name.toStdString())) {
+        m_window.warn(m_application, *warning, subject.toStdString());
+    }
 }
 
 void PageFunctions::destroyApplication() {

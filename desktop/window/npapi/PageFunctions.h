@@ -25,6 +25,8 @@ public:
     Q_INVOKABLE void destroyApplication();
     Q_INVOKABLE void showApplication();
     Q_INVOKABLE void hideApplication();
+    // Called by scripts/watchobjects.js.
+    Q_INVOKABLE void warn(const QString& name, const QString& subject);
 
 private:
     void install();

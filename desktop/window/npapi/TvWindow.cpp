@@ -41,6 +41,10 @@ QEvent::Type signallingEvent() {
     return kType;
 }
 
+Warnings::Page pageOf(const ApplicationView& application) {
+    return {&application, application.url().toString(QUrl::FullyEncoded).toStdString()};
+}
+
 QUrl urlOf(const std::string& url) {
     return QUrl(QString::fromStdString(url));
 }
@@ -96,13 +100,16 @@ ApplicationView& TvWindow::push() {
     const auto addFunctions = [this, application](QWebFrame* frame) {
         new PageFunctions(*frame, *application, *this);
     };
+    // Emitted for every new window object, and before its scripts run.
+    connect(page->mainFrame(), &QWebFrame::javaScriptWindowObjectCleared, this,
+            [this, application] { m_television.warnings().forget(application); });
     addFunctions(page->mainFrame());
     connect(page, &QWebPage::frameCreated, this, addFunctions);
     connect(application, &ApplicationView::loadFailed, this, [this, application](const QString& reason) {
         onLoadFailed(*application, application->applicationPage().failedUrl(), reason);
     });
     connect(application, &ApplicationView::televisionKey, this,
-            [this](const RemoteKey& key) { m_television.onKey(key); });
+            [this, application](const RemoteKey& key) { m_television.onKey(key, pageOf(*application)); });
     m_stack.push(*application);
     updateTop();
     return *application;
@@ -150,14 +157,24 @@ bool TvWindow::createApplication(const ApplicationView& caller, const QUrl& url)
     }
     const ApplicationTarget target = findTarget(address);
     if (!target.error.empty()) {
+        warn(caller, Warning::NotCreated, address + ": " + target.error);
         return false;
     }
     openTarget(target);
     return true;
 }
 
-ApplicationTarget TvWindow::findTarget(const std::string& url) const {
-    return findApplication(url, m_requestOptions, m_television.applications().signalling().applications);
+ApplicationTarget TvWindow::findTarget(const std::string& url) {
+    ApplicationTarget target =
+        findApplication(url, m_requestOptions, m_television.applications().signalling().applications);
+    warnOfSkipped(target, url, m_television.warnings());
+    return target;
+}
+
+void TvWindow::warn(const ApplicationView& application, Warning warning, const std::string& subject) {
+    if (m_stack.has(application)) {
+        m_television.warnings().print(pageOf(application), warning, subject);
+    }
 }
 
 void TvWindow::openTarget(const ApplicationTarget& target) {
@@ -276,7 +293,7 @@ bool TvWindow::hasPicture() const {
 
 void TvWindow::remove(ApplicationView* application) {
     m_stack.remove(*application);
-    m_television.applications().onEnded(application);
+    m_television.onEnded(application);
     // Deferred, because the call may come from a script of the application.
     application->deleteLater();
     updateTop();
@@ -316,7 +333,7 @@ bool TvWindow::event(QEvent* event) {
     }
     // Reset before the signalling is read, so that a change meanwhile posts another event.
     m_wakeupPosted = false;
-    m_television.applications().update(m_library.signalling());
+    m_television.onSignalling(m_library.signalling());
     return true;
 }
 

@@ -43,6 +43,9 @@ public:
     // Ends the application that calls it; ignored if it is no longer in the stack. The window stays open
     // without an application and shows the video plane.
     void destroyApplication(ApplicationView& caller);
+    // Warns of something in the page of an application, see Warnings.h; ignored if the application is no
+    // longer in the stack.
+    void warn(const ApplicationView& application, Warning warning, const std::string& subject);
     // Opens the web inspector, which follows the topmost application.
     void inspect();
 
@@ -76,7 +79,7 @@ private:
     MediaRequests::Browser mediaBrowser();
     ApplicationView& push();
     ApplicationView& openSignalled(const std::string& url);
-    ApplicationTarget findTarget(const std::string& url) const;
+    ApplicationTarget findTarget(const std::string& url);
     void openTarget(const ApplicationTarget& target);
     void onLoadFailed(ApplicationView& application, const QUrl& url, const QString& reason);
     void remove(ApplicationView* application);

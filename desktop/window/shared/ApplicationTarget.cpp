@@ -17,7 +17,7 @@ ApplicationTarget failure(const std::string& error) {
 }
 
 ApplicationTarget checkedPage(const std::string& url, const RequestOptions& options) {
-    return {url, std::nullopt, loadError(url, options)};
+    return {url, std::nullopt, loadError(url, options), {}};
 }
 
 // The URL with a query (`?...`) and a fragment (`#...`) added, which may be empty. A query is added to one
@@ -57,6 +57,7 @@ ApplicationTarget targetOfXmlAit(const std::string& document, const RequestOptio
         }
         last.error = each.url + ": " + last.error;
     }
+    last.skipped = list->skipped;
     return last;
 }
 
@@ -84,7 +85,7 @@ ApplicationTarget findApplication(const std::string& url, const RequestOptions& 
     }
     const LoadResult result = load(url, options);
     return result.xmlAit ? targetOfXmlAit(*result.xmlAit, options)
-                         : ApplicationTarget{url, std::nullopt, result.error};
+                         : ApplicationTarget{url, std::nullopt, result.error, {}};
 }
 
 ApplicationTarget findApplicationOfXmlAit(const std::string& url, const RequestOptions& options) {
@@ -93,6 +94,14 @@ ApplicationTarget findApplicationOfXmlAit(const std::string& url, const RequestO
         return targetOfXmlAit(*result.xmlAit, options);
     }
     return failure(result.error.empty() ? "not an XML AIT" : result.error);
+}
+
+void warnOfSkipped(const ApplicationTarget& target, const std::string& url, Warnings& warnings) {
+    for (const std::string& each : target.skipped) {
+        if (each != target.error) {
+            warnings.print({}, Warning::SkippedEntry, url + ": " + each);
+        }
+    }
 }
 
 } // namespace desktop

@@ -8,6 +8,7 @@
 
 #include "desktop/platform/ApplicationInformation.h"
 #include "desktop/window/shared/LoadCheck.h"
+#include "desktop/window/shared/Warnings.h"
 
 namespace desktop {
 
@@ -17,6 +18,8 @@ struct ApplicationTarget {
     std::optional<SignalledApplication> signalled;
     // Why no application can be started; empty if one can.
     std::string error;
+    // Per entry of an XML AIT that was left out: which, and why.
+    std::vector<std::string> skipped;
 };
 
 // Follows a URL to a page that can be loaded:
@@ -31,6 +34,9 @@ ApplicationTarget findApplication(const std::string& url, const RequestOptions& 
 
 // The same for a URL that must be one of an XML AIT.
 ApplicationTarget findApplicationOfXmlAit(const std::string& url, const RequestOptions& options);
+
+// Warns of what was left out of the XML AIT that `url` has led to, but for the error.
+void warnOfSkipped(const ApplicationTarget& target, const std::string& url, Warnings& warnings);
 
 } // namespace desktop
 

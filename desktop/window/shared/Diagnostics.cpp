@@ -34,4 +34,13 @@ void printConsoleMessage(const std::string& source, int line, const std::string&
     std::fprintf(stderr, "%s%s: %s\n", file ? file : source.c_str(), place.c_str(), text.c_str());
 }
 
+void printWarning(const std::string& url, const std::string& text) {
+    const std::string warning = "telix: " + text;
+    if (url.empty()) {
+        std::fprintf(stderr, "%s\n", warning.c_str());
+    } else {
+        printConsoleMessage(url, 0, warning);
+    }
+}
+
 } // namespace desktop

@@ -23,6 +23,10 @@ void printError(const std::string& message);
 // `source` is the URL of the script; a file URL is printed as a path.
 void printConsoleMessage(const std::string& source, int line, const std::string& text);
 
+// Writes a warning of the television to standard error, in the form of a console message: `url: telix: text`.
+// Without a URL it belongs to no page.
+void printWarning(const std::string& url, const std::string& text);
+
 // `text` with all white space, line ends included, reduced to single spaces, and none at the ends.
 std::string simplified(const std::string& text);
 

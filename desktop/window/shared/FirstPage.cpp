@@ -24,6 +24,8 @@ std::optional<std::string> pageOf(const CommandLine& commandLine) {
     const ApplicationTarget target =
         commandLine.isXmlAit ? findApplicationOfXmlAit(commandLine.page, commandLine.requestOptions())
                              : findApplication(commandLine.page, commandLine.requestOptions(), {});
+    Warnings warnings;
+    warnOfSkipped(target, commandLine.page, warnings);
     return target.error.empty() ? std::optional(target.url) : refuse(commandLine.page, target.error);
 }
 

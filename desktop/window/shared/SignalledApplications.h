@@ -21,6 +21,7 @@ struct Signalling {
     uint64_t serial = 0;
     uint32_t channel = 0; // position in the channel list, from 1; 0: none
     std::vector<SignalledApplication> applications;
+    std::vector<std::string> skipped; // per entry that was left out: which, and why
 };
 
 // Keeps which of the window's applications are signalled, and follows from each change of the signalling and

@@ -37,7 +37,23 @@ Television::~Television() {
     m_timer.stop();
 }
 
-void Television::onKey(const RemoteKey& key) {
+void Television::onSignalling(Signalling signalling) {
+    const std::string channel = "channel " + std::to_string(signalling.channel);
+    for (const std::string& each : signalling.skipped) {
+        m_warnings.print({}, Warning::SkippedEntry, channel + ": " + each);
+    }
+    m_applications.update(std::move(signalling));
+}
+
+void Television::onEnded(SignalledApplications::Application application) {
+    m_warnings.forget(application);
+    m_applications.onEnded(application);
+}
+
+void Television::onKey(const RemoteKey& key, const Warnings::Page& page) {
+    if (page.application && key.group != KeyGroupTelevision) {
+        m_warnings.print(page, Warning::KeyNotInSet, key.name);
+    }
     if (key.group == KeyGroupNumeric) {
         onDigit(static_cast<char>(key.keyCode));
         return;

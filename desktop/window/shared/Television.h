@@ -1,5 +1,5 @@
 // What a television does by itself, whatever its window's toolkit: the keys that no page gets, the on-screen
-// display that answers them, and the applications that the broadcast signals.
+// display that answers them, the applications that the broadcast signals, and warnings.
 #ifndef TELIX_DESKTOP_WINDOW_SHARED_TELEVISION_H
 #define TELIX_DESKTOP_WINDOW_SHARED_TELEVISION_H
 
@@ -9,6 +9,7 @@
 
 #include "desktop/window/shared/RemoteControl.h"
 #include "desktop/window/shared/SignalledApplications.h"
+#include "desktop/window/shared/Warnings.h"
 
 namespace desktop {
 
@@ -46,14 +47,20 @@ public:
     Television& operator=(const Television&) = delete;
 
     // A key that no page gets has been pressed. The number that digits form selects a channel when no other
-    // follows in time, at the most digits that a number has, or with OK; any other key discards it.
-    void onKey(const RemoteKey& key);
+    // follows in time, at the most digits that a number has, or with OK; any other key discards it. `page`:
+    // of the topmost application.
+    void onKey(const RemoteKey& key, const Warnings::Page& page = {});
+    // The signalling has changed, or a channel is selected.
+    void onSignalling(Signalling signalling);
+    // An application has left the window's stack.
+    void onEnded(SignalledApplications::Application application);
 
     // 0 to 100, for a library that starts again.
     uint32_t volume() const { return m_volume; }
 
     SignalledApplications& applications() { return m_applications; }
     const SignalledApplications& applications() const { return m_applications; }
+    Warnings& warnings() { return m_warnings; }
 
 private:
     enum class Action {
@@ -84,6 +91,7 @@ private:
     Timer m_timer;
     SignalledApplications m_applications;
     std::string m_digits; // of the channel number that is being typed
+    Warnings m_warnings;
     uint32_t m_volume = 100;
     uint32_t m_volumeBeforeMute = 0; // 0: not muted
 };

@@ -102,6 +102,7 @@ Signalling TelevisionLibrary::signalling() const {
         application.usage = each.usage;
         signalling.applications.push_back(std::move(application));
     }
+    signalling.skipped.assign(applications.skipped, applications.skipped + applications.skippedCount);
     m_release(&applications);
     return signalling;
 }

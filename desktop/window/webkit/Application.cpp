@@ -176,6 +176,7 @@ void Application::onLoadChanged(WebKitLoadEvent event) {
         break;
     case WEBKIT_LOAD_COMMITTED:
         m_hasDocument = true;
+        m_listener.onCommitted(*this);
         break;
     case WEBKIT_LOAD_FINISHED:
         m_isLoaded = m_hasDocument;

@@ -28,6 +28,8 @@ public:
         // A document could not be loaded; the previous one stays.
         virtual void onLoadFailed(Application& application, const std::string& url,
                                   const std::string& reason) = 0;
+        // A document has taken the place of the previous one.
+        virtual void onCommitted(Application& application) = 0;
         // The web process has ended by itself.
         virtual void onCrashed(Application& application, WebKitWebProcessTerminationReason reason) = 0;
         // The WebDriver session has closed the application.

@@ -37,7 +37,7 @@ void KeyRouter::deliver(Application* application, bool isAskedFor) {
     } else if (isForPage) {
         application->sendPress(*entry.key, entry.stroke == Stroke::Repeat);
     } else if (!isRelease) {
-        m_window.onTelevisionKey(*entry.key);
+        m_window.onTelevisionKey(*entry.key, application);
     }
     if (entry.done && application) {
         application->waitForKeys(entry.done);

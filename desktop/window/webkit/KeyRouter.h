@@ -19,8 +19,8 @@ public:
     struct Window {
         // The topmost application, or null.
         std::function<Application*()> topApplication;
-        // A key that no page gets has been pressed.
-        std::function<void(const RemoteKey&)> onTelevisionKey;
+        // A key that no page gets has been pressed. `top`: the topmost application, or null.
+        std::function<void(const RemoteKey&, Application* top)> onTelevisionKey;
     };
 
     enum class Stroke { Press, Repeat, Release };

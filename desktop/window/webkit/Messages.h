@@ -30,6 +30,10 @@ constexpr char kMediaRequestMessage[] = "telix-media-request";
 // To the window's context: a response of media has set a cookie (ayay): the URL, and the value of Set-Cookie.
 constexpr char kMediaCookieMessage[] = "telix-media-cookie";
 
+// To the window's context: a warning of a page (tss): the page's id, the warning's name and subject, see
+// Warnings.h.
+constexpr char kWarningMessage[] = "telix-warning";
+
 } // namespace desktop
 
 #endif

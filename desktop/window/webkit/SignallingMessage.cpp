@@ -6,8 +6,9 @@ namespace desktop {
 namespace {
 
 // State, service, serial and channel; then of each application: ids, control code, whether it is
-// service-bound, priority, name and URL.
-constexpr char kFormat[] = "(uttua(uqybyss))";
+// service-bound, priority, name and URL; then what was left out.
+constexpr char kFormat[] = "(uttua(uqybyss)as)";
+constexpr char kSkipped[] = "as";
 constexpr char kApplications[] = "a(uqybyss)";
 constexpr char kApplication[] = "(uqybyss)";
 constexpr char kApplicationValues[] = "(uqyby&s&s)";
@@ -22,16 +23,22 @@ GVariant* variantOf(const Signalling& signalling) {
                               each.controlCode, each.isServiceBound, each.priority, each.name.c_str(),
                               each.url.c_str());
     }
+    GVariantBuilder skipped;
+    g_variant_builder_init(&skipped, G_VARIANT_TYPE(kSkipped));
+    for (const std::string& each : signalling.skipped) {
+        g_variant_builder_add(&skipped, "s", each.c_str());
+    }
     return g_variant_new(kFormat, static_cast<guint32>(signalling.state), signalling.service,
-                         signalling.serial, signalling.channel, &applications);
+                         signalling.serial, signalling.channel, &applications, &skipped);
 }
 
 Signalling signallingOf(GVariant* variant) {
     Signalling signalling;
     guint32 state = 0;
     GVariantIter* applications = nullptr;
+    GVariantIter* skipped = nullptr;
     g_variant_get(variant, kFormat, &state, &signalling.service, &signalling.serial, &signalling.channel,
-                  &applications);
+                  &applications, &skipped);
     signalling.state = static_cast<telix_desktop_signalling_state>(state);
     SignalledApplication each;
     gboolean isServiceBound = FALSE;
@@ -45,6 +52,10 @@ Signalling signallingOf(GVariant* variant) {
         signalling.applications.push_back(each);
     }
     g_variant_iter_free(applications);
+    while (g_variant_iter_next(skipped, "&s", &name)) {
+        signalling.skipped.emplace_back(name);
+    }
+    g_variant_iter_free(skipped);
     return signalling;
 }
 

@@ -87,12 +87,19 @@ void findTarget(TargetSearch search, GCancellable* calls) {
     });
 }
 
+// Null for none.
+Warnings::Page pageOf(const Application* application) {
+    const char* url = application ? webkit_web_view_get_uri(application->view()) : nullptr;
+    return {application, url ? url : ""};
+}
+
 } // namespace
 
 TvWindow::TvWindow(Engine& engine, PageChannel& channel, const CommandLine& commandLine)
     : m_engine(engine), m_channel(channel), m_requestOptions(commandLine.requestOptions()),
       m_window(gtk_window_new(GTK_WINDOW_TOPLEVEL)), m_overlay(gtk_overlay_new()),
-      m_keys({[this] { return m_stack.top(); }, [this](const RemoteKey& key) { m_television.onKey(key); }}),
+      m_keys({[this] { return m_stack.top(); },
+              [this](const RemoteKey& key, Application* top) { m_television.onKey(key, pageOf(top)); }}),
       m_television(
           libraryCalls(), stackCalls(), [this](const std::string& text) { m_display.show(text); },
           mainLoopTimer()),
@@ -162,15 +169,33 @@ TvWindow::~TvWindow() {
 
 // Returns whether the message is the window's.
 bool TvWindow::onMessage(WebKitUserMessage& message) {
-    if (g_strcmp0(webkit_user_message_get_name(&message), kSignallingMessage) != 0) {
+    GVariant* parameters = webkit_user_message_get_parameters(&message);
+    const char* kind = webkit_user_message_get_name(&message);
+    if (g_strcmp0(kind, kWarningMessage) == 0 && g_variant_is_of_type(parameters, G_VARIANT_TYPE("(tss)"))) {
+        guint64 page = 0;
+        const char* name = nullptr;
+        const char* subject = nullptr;
+        g_variant_get(parameters, "(t&s&s)", &page, &name, &subject);
+        onWarning(page, name, subject);
+        return true;
+    }
+    if (g_strcmp0(kind, kSignallingMessage) != 0) {
         return false;
     }
-    Signalling signalling = signallingOf(webkit_user_message_get_parameters(&message));
+    Signalling signalling = signallingOf(parameters);
     if (signalling.channel != 0) {
         m_start.channel = signalling.channel;
     }
-    m_television.applications().update(std::move(signalling));
+    m_television.onSignalling(std::move(signalling));
     return true;
+}
+
+void TvWindow::onWarning(uint64_t page, const std::string& name, const std::string& subject) {
+    const Application* application = applicationOf(page);
+    const std::optional<Warning> warning = warningNamed(name);
+    if (application && warning) {
+        m_television.warnings().print(pageOf(application), *warning, subject);
+    }
 }
 
 void TvWindow::show(const CommandLine& commandLine) {
@@ -308,7 +333,7 @@ void TvWindow::onPageCall(uint64_t page, const std::string& function, const std:
     } else if (function == "show" || function == "hide") {
         caller->setShown(function == "show");
     } else if (const RemoteKey* key = function == "key" ? remoteKeyByName(argument) : nullptr) {
-        m_television.onKey(*key);
+        m_television.onKey(*key, pageOf(caller));
     }
     reply(true);
 }
@@ -325,10 +350,15 @@ void TvWindow::createApplication(uint64_t caller, const std::string& url, const 
                 m_requestOptions,
                 m_television.applications().signalling().applications,
                 {},
-                [this, caller, reply](const ApplicationTarget& target) {
-                    const bool isCreated = target.error.empty() && applicationOf(caller);
+                [this, caller, url, reply](const ApplicationTarget& target) {
+                    const Application* creator = applicationOf(caller);
+                    const bool isCreated = target.error.empty() && creator;
+                    warnOfSkipped(target, url, m_television.warnings());
                     if (isCreated) {
                         openTarget(target);
+                    } else if (creator) {
+                        m_television.warnings().print(pageOf(creator), Warning::NotCreated,
+                                                      url + ": " + target.error);
                     }
                     reply(isCreated);
                 }},
@@ -352,7 +382,7 @@ void TvWindow::removeFrom(const Application& lowest) {
 
 void TvWindow::remove(Application& application) {
     m_stack.remove(application);
-    m_television.applications().onEnded(&application);
+    m_television.onEnded(&application);
     updateInspector();
     application.unload([this, &application] { erase(application); });
 }
@@ -399,6 +429,10 @@ void TvWindow::onLoadFailed(Application& application, const std::string& url, co
     }
 }
 
+void TvWindow::onCommitted(Application& application) {
+    m_television.warnings().forget(&application);
+}
+
 void TvWindow::onCrashed(Application& application, WebKitWebProcessTerminationReason reason) {
     m_video.dropFrames();
     m_television.applications().onLibraryEnded();
@@ -415,7 +449,7 @@ void TvWindow::onCrashed(Application& application, WebKitWebProcessTerminationRe
 // The driver kills the television when this returns and no application is left.
 void TvWindow::onClosed(Application& application) {
     m_stack.remove(application);
-    m_television.applications().onEnded(&application);
+    m_television.onEnded(&application);
     updateInspector();
     runUntilDone([&application](std::function<void()> done) { application.unload(std::move(done)); },
                  kCloseTimeoutMs);
@@ -554,7 +588,8 @@ void TvWindow::open(const std::string& url, std::function<void(const std::string
                 m_requestOptions,
                 m_television.applications().signalling().applications,
                 {},
-                [this, done = std::move(done)](const ApplicationTarget& target) {
+                [this, url, done = std::move(done)](const ApplicationTarget& target) {
+                    warnOfSkipped(target, url, m_television.warnings());
                     if (!target.error.empty()) {
                         done(target.error);
                         return;

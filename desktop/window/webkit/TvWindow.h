@@ -77,6 +77,7 @@ public:
 
 private:
     void onLoadFailed(Application& application, const std::string& url, const std::string& reason) override;
+    void onCommitted(Application& application) override;
     void onCrashed(Application& application, WebKitWebProcessTerminationReason reason) override;
     void onClosed(Application& application) override;
     void onPageCall(uint64_t page, const std::string& function, const std::string& argument,
@@ -84,6 +85,7 @@ private:
     void removeFrom(const Application& lowest);
     void createApplication(uint64_t caller, const std::string& url, const PageChannel::Reply& reply);
     bool onMessage(WebKitUserMessage& message);
+    void onWarning(uint64_t page, const std::string& name, const std::string& subject);
     bool onKey(const GdkEventKey& event);
     Television::Library libraryCalls();
     SignalledApplications::Window stackCalls();

@@ -10,6 +10,7 @@
 #include "desktop/window/webkit/extension/SessionKeys.h"
 #include "desktop/window/webkit/extension/SoundSender.h"
 #include "desktop/window/webkit/extension/ViewerMessages.h"
+#include "desktop/window/webkit/extension/WarningForwarder.h"
 
 namespace desktop {
 
@@ -76,5 +77,6 @@ webkit_web_extension_initialize_with_user_data(WebKitWebExtension* extension, co
     desktop::serveTelevision(extension, desktop::stringFrom(data, "plugin"), desktop::startFrom(data));
     desktop::forwardControlRequests(extension);
     desktop::forwardMediaRequests(extension);
+    desktop::forwardWarnings(extension);
     desktop::sendSound(desktop::descriptorFrom(data, "sound"));
 }
