@@ -3,7 +3,7 @@
 import os
 import unittest
 
-from telix_tv import IS_NPAPI, PLUGIN
+from telix_tv import PLUGIN
 from television import wait_for
 from test_signalled import XML_AIT, XML_AIT_TYPE, Television, page
 
@@ -38,8 +38,8 @@ class Objects(Warned):
         arguments = self.loaded('<object type="video/broadcast"></object><object type="Video/Broadcast"></object>' +
                                 self.DONE)
         self.assertEqual(self.warnings('--strict', *arguments), [(arguments[-1], NO_ID)])
-        # The window gives it an id in the other engine.
-        self.assertEqual(self.warnings(*arguments), [(arguments[-1], NO_ID)] if IS_NPAPI else [])
+        # The window gives it an id.
+        self.assertEqual(self.warnings(*arguments), [])
 
     def test_an_object_that_script_makes(self):
         arguments = self.loaded('''<body><script>onload = function () {
@@ -93,8 +93,7 @@ class Objects(Warned):
                 done = refused === 4;
             };</script>''')
         found = self.warnings(*arguments)
-        # The NPAPI engine tells nobody but the page.
-        self.assertEqual(found, [] if IS_NPAPI else [
+        self.assertEqual(found, [
             (arguments[-1], f'{call}: the method refuses these arguments')
             for call in ('setChannel(string, boolean)', 'createChannelObject(null)')])
 
@@ -109,8 +108,7 @@ class Objects(Warned):
             for data in ('say "hello"', 'say "it"', 'plain'):
                 self.television.telixctl('stream-event', '--name', 'offer', '--data', data)
             self.assertTrue(messages.wait_for('event plain'))
-            # The NPAPI engine runs such scripts without a word.
-            self.assertEqual(self.parse(messages.lines), [] if IS_NPAPI else [
+            self.assertEqual(self.parse(messages.lines), [
                 (own, 'the script that dispatches StreamEvent offer has failed, so the event is lost')])
         with self.running(own) as messages:
             self.assertTrue(messages.wait_for('ready'))
@@ -138,7 +136,7 @@ class Keys(Warned):
                           for key in ('7', 'play')])
 
     def test_without_a_page_there_is_nobody_to_warn(self):
-        with self.running('--keys', '7,2') as messages:
+        with self.running('--keys', '7,ok,2,ok') as messages:
             wait_for(lambda: self.television.leftovers() and self.channel() == 'Telix Two', 'another channel')
             self.assertEqual(self.parse(messages.lines), [])
 

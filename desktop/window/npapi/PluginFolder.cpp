@@ -23,19 +23,27 @@ bool isOfTelevision(const PluginFile& plugin) {
 }
 
 // The file of the adapter, which leads to the plug-in from now on; empty if it cannot be loaded.
-std::string adapterOf(const PluginFile& plugin) {
+std::string adapterOf(const PluginFile& plugin, bool isStrict, ReportWarningFunction report, void* data) {
     const std::string file = besideProgram("telix-tv-npapi-adapter.so");
     void* library = dlopen(file.c_str(), RTLD_LAZY | RTLD_LOCAL);
     const auto adapt =
         library ? reinterpret_cast<AdaptPluginFunction>(dlsym(library, kAdaptPluginFunction)) : nullptr;
-    return adapt && adapt(plugin.path().c_str()) ? file : "";
+    return adapt && adapt({plugin.path().c_str(), isStrict, report, data}) ? file : "";
 }
 
 } // namespace
 
 PluginFolder::PluginFolder(const PluginFile& plugin, bool isStrict)
     : m_folder(QDir::temp().filePath(QStringLiteral("telix-tv-XXXXXX"))) {
-    const std::string file = isStrict || !isOfTelevision(plugin) ? plugin.path() : adapterOf(plugin);
+    const auto report = [](const char* page, const char* warning, const char* subject, void* data) {
+        const auto* self = static_cast<const PluginFolder*>(data);
+        const auto found = warningNamed(warning);
+        if (self->m_reporter && found) {
+            self->m_reporter(page, *found, subject);
+        }
+    };
+    const std::string file =
+        isOfTelevision(plugin) ? adapterOf(plugin, isStrict, report, this) : plugin.path();
     const QString link = QDir(m_folder.path()).filePath(QStringLiteral("plugin.so"));
     if (file.empty()) {
         m_failure =

@@ -52,8 +52,9 @@ QUrl urlOf(const std::string& url) {
 } // namespace
 
 TvWindow::TvWindow(const CommandLine& commandLine)
-    : m_requestOptions(commandLine.requestOptions()), m_start{commandLine.channel, commandLine.signalUrl,
-                                                              std::max(commandLine.channel, kFirstChannel)},
+    : m_requestOptions(commandLine.requestOptions()),
+      m_isStrict(commandLine.isStrict), m_start{commandLine.channel, commandLine.signalUrl,
+                                                std::max(commandLine.channel, kFirstChannel)},
       m_videoPlane(new VideoPlane(this)), m_display(new OnScreenDisplay(this)),
       m_television(
           libraryCalls(), stackCalls(),
@@ -172,8 +173,19 @@ ApplicationTarget TvWindow::findTarget(const std::string& url) {
 }
 
 void TvWindow::warn(const ApplicationView& application, Warning warning, const std::string& subject) {
-    if (m_stack.has(application)) {
+    // Without strictness the adapter of the plug-in gives each element an id.
+    const bool isCured = warning == Warning::NoId && !m_isStrict;
+    if (!isCured && m_stack.has(application)) {
         m_television.warnings().print(pageOf(application), warning, subject);
+    }
+}
+
+void TvWindow::warn(const std::string& page, Warning warning, const std::string& subject) {
+    for (const ApplicationView* each : m_stack.all()) {
+        if (pageOf(*each).url == page) {
+            m_television.warnings().print(pageOf(*each), warning, subject);
+            return;
+        }
     }
 }
 

@@ -46,6 +46,8 @@ public:
     // Warns of something in the page of an application, see Warnings.h; ignored if the application is no
     // longer in the stack.
     void warn(const ApplicationView& application, Warning warning, const std::string& subject);
+    // The same for the application whose document has that URL.
+    void warn(const std::string& page, Warning warning, const std::string& subject);
     // Opens the web inspector, which follows the topmost application.
     void inspect();
 
@@ -88,6 +90,7 @@ private:
     void place(QWidget& view) const;
 
     RequestOptions m_requestOptions;
+    bool m_isStrict;
     TelevisionStart m_start;
     TelevisionLibrary m_library;
     QMetaObject::Connection m_searchConnection;

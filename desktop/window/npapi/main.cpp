@@ -58,9 +58,12 @@ gboolean onTermination(gpointer signalNumber) {
 
 // Runs the window until it exits, and destroys it with all pages. `page`: to open; empty for the channel
 // alone. `evaluated` receives the value of --eval.
-int runWindow(const CommandLine& commandLine, const std::string& page,
+int runWindow(const CommandLine& commandLine, const std::string& page, PluginFolder& folder,
               std::optional<std::string>& evaluated) {
     TvWindow window(commandLine);
+    folder.reportTo([&window](const std::string& url, Warning warning, const std::string& subject) {
+        window.warn(url, warning, subject);
+    });
     WindowCommands commands(window);
     const ControlSource control([&](const std::string& line, const ControlSource::Respond& respond) {
         commands.handle(line, respond);
@@ -120,7 +123,7 @@ int runBrowser(const CommandLine& commandLine, char** argv) {
         printError("cannot load plug-in " + commandLine.plugin + ": " + plugin.failure());
         return kExitBadInput;
     }
-    const PluginFolder folder(plugin, commandLine.isStrict);
+    PluginFolder folder(plugin, commandLine.isStrict);
     if (!folder.failure().isEmpty()) {
         printError(folder.failure().toStdString());
         return kExitBadInput;
@@ -149,7 +152,8 @@ int runBrowser(const CommandLine& commandLine, char** argv) {
     configureEngine(plugin, folder, commandLine.inspect);
 
     std::optional<std::string> evaluated;
-    const int exitStatus = runWindow(commandLine, *page, evaluated);
+    const int exitStatus = runWindow(commandLine, *page, folder, evaluated);
+    folder.reportTo(nullptr);
     // Runs callbacks that the plug-in has deferred to the event loop.
     QCoreApplication::processEvents();
     // The last line of the output, after what the plug-in logs in its teardown.

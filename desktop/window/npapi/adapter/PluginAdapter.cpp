@@ -1,4 +1,5 @@
-// A plug-in in front of the television's plug-in. Each call goes on to that one, with two additions.
+// A plug-in in front of the television's plug-in. Each call goes on to that one, with three additions, of
+// which a strict adapter has the last one only.
 //
 // An element without an id gets one before its instance is made, because the plug-in finds elements by their
 // ids.
@@ -6,6 +7,8 @@
 // Where the plug-in hands out a list, script gets the object that scripts/list.js makes of it. For that the
 // adapter replaces functions in the plug-in's class records. The records stay where they are, because the
 // plug-in knows its objects by them.
+//
+// A script of the plug-in that fails, and a method that refuses its arguments, are reported.
 //
 // Main thread. The library is never unloaded, because objects of the plug-in may outlive it in the engine.
 #include "desktop/window/npapi/adapter/PluginAdapter.h"
@@ -39,10 +42,12 @@ struct EntryPoints {
 };
 
 EntryPoints plugin;
+PluginAdapterSettings settings;
 NPP_NewProcPtr newInstanceOfPlugin;
 NPP_DestroyProcPtr destroyInstanceOfPlugin;
 NPNetscapeFuncs browser;   // what the engine has
 NPNetscapeFuncs ofAdapter; // what the plug-in gets
+bool hasException;         // whether the plug-in has told script why the last method failed
 
 // The functions that the records of the plug-in's classes had.
 std::map<NPClass*, NPClass>& originals() {
@@ -95,6 +100,77 @@ NPObject* evaluate(NPP instance, const std::string& expression) {
     return nullptr;
 }
 
+// ---- Warnings
+
+void report(NPP instance, const char* warning, const std::string& subject) {
+    NPObject* window = nullptr;
+    if (browser.getvalue(instance, NPNVWindowNPObject, &window) != NPERR_NO_ERROR || !window) {
+        return;
+    }
+    constexpr char kPage[] = "top.location.href";
+    NPString script = {kPage, sizeof(kPage) - 1};
+    NPVariant page{};
+    if (browser.evaluate(instance, window, &script, &page)) {
+        if (page.type == NPVariantType_String) {
+            const NPString& url = page.value.stringValue;
+            settings.report(std::string(url.UTF8Characters, url.UTF8Length).c_str(), warning, subject.c_str(),
+                            settings.data);
+        }
+        browser.releasevariantvalue(&page);
+    }
+    browser.releaseobject(window);
+}
+
+// The engine takes a script that throws for one that yields nothing. One that dispatches an event yields
+// whether it has not been cancelled.
+bool hasFailed(const std::string& source, const NPVariant& result) {
+    return source.find("dispatchEvent(") != std::string::npos && result.type != NPVariantType_Bool;
+}
+
+bool evaluateOfPlugin(NPP instance, NPObject* object, NPString* script, NPVariant* result) {
+    const std::string source(script->UTF8Characters, script->UTF8Length);
+    const bool isDone = browser.evaluate(instance, object, script, result);
+    if (!isDone || hasFailed(source, *result)) {
+        report(instance, "failed-script", source);
+    }
+    return isDone;
+}
+
+void setException(NPObject* object, const char* message) {
+    hasException = true;
+    browser.setexception(object, message);
+}
+
+// As the author of a page would say it.
+const char* typeNameOf(const NPVariant& value) {
+    switch (value.type) {
+    case NPVariantType_Null:
+        return "null";
+    case NPVariantType_Bool:
+        return "boolean";
+    case NPVariantType_Int32:
+    case NPVariantType_Double:
+        return "number";
+    case NPVariantType_String:
+        return "string";
+    case NPVariantType_Object:
+        return "object";
+    default:
+        return "undefined";
+    }
+}
+
+// The exception that script gets does not say which call it was, and script may catch it.
+void reportRefusal(NPP instance, NPIdentifier method, const NPVariant* args, uint32_t argCount) {
+    char* name = browser.utf8fromidentifier(method);
+    std::string call = std::string(name ? name : "") + '(';
+    for (uint32_t i = 0; i < argCount; ++i) {
+        call += (i > 0 ? ", " : "") + std::string(typeNameOf(args[i]));
+    }
+    browser.memfree(name);
+    report(instance, "refused-call", call + ')');
+}
+
 // ---- Lists
 
 // An object that has a first element by its index. The plug-in takes indexes as names, and an empty list
@@ -120,9 +196,10 @@ NPObject* listFunction(NPP instance) {
 
 // Replaces a result that is a list by the object that script gets.
 void adaptResult(NPP instance, NPVariant& result) {
-    NPObject* function = result.type == NPVariantType_Object && isList(result.value.objectValue)
-                             ? listFunction(instance)
-                             : nullptr;
+    NPObject* function =
+        !settings.isStrict && result.type == NPVariantType_Object && isList(result.value.objectValue)
+            ? listFunction(instance)
+            : nullptr;
     if (!function) {
         return;
     }
@@ -140,9 +217,12 @@ bool invoke(NPObject* object, NPIdentifier name, const NPVariant* args, uint32_t
             NPVariant* result) {
     const auto original = originals()[object->_class].invoke;
     NPP instance = owners()[object];
+    hasException = false;
     const bool isDone = original(object, name, args, argCount, result);
     if (isDone) {
         adaptResult(instance, *result);
+    } else if (instance && !hasException) {
+        reportRefusal(instance, name, args, argCount);
     }
     return isDone;
 }
@@ -228,7 +308,7 @@ NPError newInstance(NPMIMEType type, NPP instance, uint16_t mode, int16_t argc, 
     std::string id = kElementIdPrefix + std::to_string(lastId + 1);
     const bool hasId = std::any_of(names.begin(), names.end(),
                                    [&idName](const char* name) { return strcasecmp(name, idName) == 0; });
-    if (!hasId && setId(instance, id)) {
+    if (!settings.isStrict && !hasId && setId(instance, id)) {
         ++lastId;
         names.insert(names.begin(), idName);
         values.insert(values.begin(), id.data());
@@ -258,8 +338,9 @@ bool find(void* library, const char* name, Function& function) {
 
 using namespace desktop;
 
-EXPORT bool telix_adapt_plugin(const char* file) {
-    void* library = dlopen(file, RTLD_LAZY | RTLD_LOCAL);
+EXPORT bool telix_adapt_plugin(const PluginAdapterSettings& given) {
+    settings = given;
+    void* library = dlopen(settings.file, RTLD_LAZY | RTLD_LOCAL);
     return library && find(library, "NP_Initialize", plugin.initialize) &&
            find(library, "NP_Shutdown", plugin.shutdown) && find(library, "NP_GetValue", plugin.getValue) &&
            find(library, "NP_GetMIMEDescription", plugin.mimeDescription);
@@ -271,6 +352,8 @@ EXPORT NPError NP_Initialize(NPNetscapeFuncs* browserFuncs, NPPluginFuncs* plugi
     std::memcpy(&browser, browserFuncs, std::min<std::size_t>(sizeof(browser), browserFuncs->size));
     ofAdapter = browser;
     ofAdapter.createobject = createObject;
+    ofAdapter.evaluate = evaluateOfPlugin;
+    ofAdapter.setexception = setException;
     const NPError error = plugin.initialize(&ofAdapter, pluginFuncs);
     if (error == NPERR_NO_ERROR) {
         newInstanceOfPlugin = pluginFuncs->newp;
