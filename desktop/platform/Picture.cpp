@@ -84,15 +84,13 @@ Picture::Token Picture::acquire(const View& view, std::function<void()> onPreemp
     return token;
 }
 
-void Picture::release(Token token) {
+bool Picture::release(Token token) {
     GstSample* oldSample = nullptr;
-    std::function<void()> onFree;
     {
         std::lock_guard<std::mutex> lock(m_mutex);
         if (!isCurrentLocked(token)) {
-            return;
+            return false;
         }
-        onFree = m_onFree;
         m_current = 0;
         m_onPreempted = nullptr;
         m_onFirstFrame = nullptr;
@@ -100,7 +98,16 @@ void Picture::release(Token token) {
     }
     unref(oldSample);
     wakeUp();
-    if (onFree) {
+    return true;
+}
+
+void Picture::leave(Token token) {
+    std::function<void()> onFree;
+    {
+        std::lock_guard<std::mutex> lock(m_mutex);
+        onFree = m_onFree;
+    }
+    if (release(token) && onFree) {
         onFree();
     }
 }

@@ -41,14 +41,18 @@ public:
     Token acquire(const View& view, std::function<void()> onPreempted,
                   std::function<void()> onFirstFrame = nullptr);
 
-    // Ends a presentation; the video plane becomes black and `onPreempted` does not run. Platform thread.
-    void release(Token token);
+    // Ends a presentation; the video plane becomes black and `onPreempted` does not run. Returns whether it
+    // has not been preempted. Platform thread.
+    bool release(Token token);
+
+    // The same for a presentation that has taken the picture from the running channel, which may have it
+    // back.
+    void leave(Token token);
 
     // Whether there is no presentation. Any thread.
     bool isFree() const;
 
-    // Called from now on at the end of each presentation that no other one has preempted, on the platform
-    // thread. Any thread.
+    // Called from now on when a presentation leaves the picture, on the platform thread. Any thread.
     void setOnFree(std::function<void()> onFree);
 
     // Any thread, as the next two.

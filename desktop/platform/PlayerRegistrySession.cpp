@@ -78,7 +78,7 @@ void PlayerRegistry::stopPipeline() {
         std::lock_guard<std::mutex> lock(m_platform.mutex());
         token = std::exchange(m_token, Picture::Token{0});
     }
-    m_platform.picture().release(token);
+    m_platform.picture().leave(token);
 }
 
 // By broadcast.

@@ -22,7 +22,10 @@ class AllObjects(unittest.TestCase):
         others = [line for line in lines
                   if not line.startswith('*') and ':: ORDA ::' not in line and ':: VERSION:' not in line]
         self.assertEqual(set(others), {'libtelix.so library will load for first time now.'})
-        self.assertEqual([line for line in run.errors.splitlines() if line and 'libtelix.so, not found' not in line], [])
+        self.assertEqual([
+            line for line in run.errors.splitlines()
+            # What the window says of refused calls is not the plug-in's.
+            if line and 'libtelix.so, not found' not in line and ': telix: ' not in line], [])
 
 
 if __name__ == '__main__':

@@ -11,6 +11,7 @@
 #include "desktop/platform/telix_viewer.h"
 #include "telix/telix_platform.h"
 #include "tests/desktop/ManualClock.h"
+#include "tests/desktop/PlatformThread.h"
 #include "tests/desktop/Received.h"
 
 using namespace desktop;
@@ -108,13 +109,6 @@ double difference(const Shot& left, const Shot& right, double from, double to) {
         }
     }
     return static_cast<double>(count) / static_cast<double>(end - begin);
-}
-
-// Waits until the platform thread has done what was posted to it before.
-void flushPlatformThread() {
-    std::promise<void> isDone;
-    Platform::instance().post([&] { isDone.set_value(); });
-    isDone.get_future().wait();
 }
 
 class BroadcastTest : public Test {

@@ -6,17 +6,19 @@
 #include <unistd.h>
 
 #include <cstdlib>
-#include <future>
 #include <map>
 #include <mutex>
 #include <optional>
 
 #include "desktop/platform/Broadcast.h"
 #include "desktop/platform/Multiplex.h"
+#include "desktop/platform/Picture.h"
 #include "desktop/platform/Playout.h"
 #include "desktop/platform/Restamper.h"
 #include "desktop/platform/Sections.h"
+#include "desktop/platform/telix_viewer.h"
 #include "tests/desktop/ManualClock.h"
+#include "tests/desktop/PlatformThread.h"
 #include "tests/desktop/Received.h"
 
 using namespace desktop;
@@ -302,9 +304,7 @@ TEST(TuneTimeoutTest, EndsATuneThatShowsNothingAfterSixSeconds) {
                count == 1;
     }));
     clock->advance(milliseconds(5999));
-    std::promise<void> isFlushed;
-    Platform::instance().post([&] { isFlushed.set_value(); });
-    isFlushed.get_future().wait();
+    flushPlatformThread();
     EXPECT_TRUE(errors.all().empty());
     TELIX_PLAYSTATE_ENUM_T state = 0;
     EXPECT_EQ(TELIX_JS_VB_GetPlayBackState(object, &state), 0);
@@ -317,6 +317,25 @@ TEST(TuneTimeoutTest, EndsATuneThatShowsNothingAfterSixSeconds) {
     }));
     TELIX_JS_VB_Release(object);
     TELIX_JS_VB_UnRegisterOnChannelChangeError(onError);
+}
+
+TEST(TuneOfTheSetTest, IsNotRepeatedWhenItFails) {
+    const StreamFile file(makeStreamWithoutPictures());
+    setenv("TELIX_CHANNELS", file.name().c_str(), 1);
+    static auto* const clock = new BroadcastClock(kUtcStart); // broadcast uses it until the process ends
+    Broadcast::useClock(*clock);
+    const Picture& picture = Platform::instance().picture();
+    telix_desktop_present_channel();
+    EXPECT_TRUE(waitUntil([&] { return !picture.isFree(); }));
+    EXPECT_TRUE(waitUntil([&] {
+        clock->advance(milliseconds(100));
+        return picture.isFree();
+    }));
+    for (int turn = 0; turn < 5; ++turn) {
+        flushPlatformThread();
+        EXPECT_TRUE(picture.isFree());
+        clock->advance(milliseconds(10));
+    }
 }
 
 // The entries of a folder; nothing if there is no folder.
