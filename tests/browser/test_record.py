@@ -186,7 +186,10 @@ class Record(TelixTv):
         with temporary_folder() as empty:
             result = self.record(self.write(STOPPED), environment={
                 'GST_PLUGIN_SYSTEM_PATH': empty, 'GST_REGISTRY': os.path.join(empty, 'registry')})
-        self.assert_refused(result, f'--record {self.file}: the GStreamer element x264enc is not installed')
+        # The platform library, which has no elements either, may have started already.
+        own = [line for line in result.errors.splitlines() if line != 'libtelix: channel: a GStreamer element is missing']
+        self.assertEqual((result.status, own), (
+            2, [f'telix-tv: --record {self.file}: the GStreamer element x264enc is not installed']), result)
         self.assertFalse(os.path.exists(self.file))
 
 

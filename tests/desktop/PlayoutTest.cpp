@@ -322,6 +322,8 @@ TEST(TuneTimeoutTest, EndsATuneThatShowsNothingAfterSixSeconds) {
 TEST(TuneOfTheSetTest, IsNotRepeatedWhenItFails) {
     const StreamFile file(makeStreamWithoutPictures());
     setenv("TELIX_CHANNELS", file.name().c_str(), 1);
+    unsetenv("TELIX_CONFIG"); // the default of signal-timeout, 6 seconds
+    setenv("XDG_CONFIG_HOME", "/nonexistent", 1);
     static auto* const clock = new BroadcastClock(kUtcStart); // broadcast uses it until the process ends
     Broadcast::useClock(*clock);
     const Picture& picture = Platform::instance().picture();
