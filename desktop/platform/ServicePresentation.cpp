@@ -14,6 +14,19 @@ namespace {
 // A viewer who goes through the channels does not stay that long on any of them.
 constexpr auto kSettled = std::chrono::seconds(1);
 
+// A thread that loads the decoders. The process waits for it when it ends: libraries that are loaded
+// afterwards would find those that they need without their state.
+class DecoderLoader {
+public:
+    DecoderLoader() : m_thread(Tuner::loadDecoders) {}
+    ~DecoderLoader() { m_thread.join(); }
+    DecoderLoader(const DecoderLoader&) = delete;
+    DecoderLoader& operator=(const DecoderLoader&) = delete;
+
+private:
+    std::thread m_thread;
+};
+
 } // namespace
 
 ServicePresentation::ServicePresentation(const Channels& channels, TunerArbiter& arbiter,
@@ -24,7 +37,7 @@ ServicePresentation::ServicePresentation(const Channels& channels, TunerArbiter&
 // Not in the constructor, because the platform thread may use this object as soon as the file is there.
 void ServicePresentation::start() {
     setInstantZap(m_platform.configuration().instantZap);
-    std::thread(Tuner::loadDecoders).detach(); // while the browser loads its first page
+    static const DecoderLoader kLoader; // while the browser loads its first page
     if (m_channels.usesTestMultiplex()) {
         m_source.makeTestMultiplexFile();
     }
