@@ -51,7 +51,8 @@ std::string installed(const char* const (&encoders)[Count], std::string& error) 
 }
 
 // Frames are dropped before the encoder if it is too slow, and then repeated by videorate. The file is one of
-// fragments until it is complete.
+// fragments until it is complete. A fragment has one frame: in longer ones, where sound and picture
+// alternate, mp4mux (1.22) may leave a size out, and the file cannot be read.
 GstElement* newPipeline(std::string& error) {
     const std::string picture = installed(kPictureEncoders, error);
     const std::string sound = picture.empty() ? "" : installed(kSoundEncoders, error);
@@ -71,7 +72,7 @@ GstElement* newPipeline(std::string& error) {
         std::to_string(TELIX_DESKTOP_SOUND_RATE) +
         ",channels=" + std::to_string(TELIX_DESKTOP_SOUND_CHANNELS) + " ! audioconvert ! " + sound +
         " ! aacparse" + toFile +
-        "mp4mux name=mux fragment-duration=1000 fragment-mode=first-moov-then-finalise ! "
+        "mp4mux name=mux fragment-duration=40 fragment-mode=first-moov-then-finalise ! "
         "filesink name=file sync=false";
     GError* failure = nullptr;
     GstElement* pipeline =
