@@ -60,7 +60,7 @@ class Objects(Warned):
             <embed type="application/x-unknown; version=2">
             <object type="image/png" data="none.png"></object><object></object>''' + self.DONE)
         self.assertEqual(sorted(self.warnings(*arguments)),
-                         [(arguments[-1], f'there is no object of type application/{name}')
+                         [(arguments[-1], f'unknown object type application/{name}')
                           for name in ('oipfsearchmanager', 'x-unknown')])
 
     def test_each_document_gets_the_line(self):

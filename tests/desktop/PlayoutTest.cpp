@@ -284,13 +284,20 @@ Bytes makeStreamWithoutPictures() {
     return stream;
 }
 
-TEST(TuneTimeoutTest, EndsATuneThatShowsNothingAfterSixSeconds) {
-    const StreamFile file(makeStreamWithoutPictures());
+// Lets the channel list be that of the file, with the default of signal-timeout, 6 seconds. Returns the clock
+// of broadcast.
+ManualClock& useBroadcastOf(const StreamFile& file) {
     setenv("TELIX_CHANNELS", file.name().c_str(), 1);
-    unsetenv("TELIX_CONFIG"); // the default of signal-timeout, 6 seconds
+    unsetenv("TELIX_CONFIG");
     setenv("XDG_CONFIG_HOME", "/nonexistent", 1);
     static auto* const clock = new BroadcastClock(kUtcStart); // broadcast uses it until the process ends
     Broadcast::useClock(*clock);
+    return *clock;
+}
+
+TEST(TuneTimeoutTest, EndsATuneThatShowsNothingAfterSixSeconds) {
+    const StreamFile file(makeStreamWithoutPictures());
+    ManualClock& clock = useBroadcastOf(file);
 
     TELIX_JS_VB_HANDLE object = 0;
     ASSERT_EQ(TELIX_JS_VB_GetHandle(&object), 0);
@@ -303,13 +310,13 @@ TEST(TuneTimeoutTest, EndsATuneThatShowsNothingAfterSixSeconds) {
         return TELIX_JS_VB_GetComponents(object, TELIX_JS_AVCOMPTYPE_VIDEO, &components, &count) == 0 &&
                count == 1;
     }));
-    clock->advance(milliseconds(5999));
+    clock.advance(milliseconds(5999));
     flushPlatformThread();
     EXPECT_TRUE(errors.all().empty());
     TELIX_PLAYSTATE_ENUM_T state = 0;
     EXPECT_EQ(TELIX_JS_VB_GetPlayBackState(object, &state), 0);
     EXPECT_EQ(state, TELIX_PLAYSTATE_CONNECTING);
-    clock->advance(milliseconds(1));
+    clock.advance(milliseconds(1));
     ASSERT_TRUE(waitUntil([] { return !errors.all().empty(); }));
     EXPECT_EQ(errors.all(), std::vector<TELIX_ERR_STATE_ENUM_T>{kErrorNoSignal});
     EXPECT_TRUE(waitUntil([&] {
@@ -321,22 +328,18 @@ TEST(TuneTimeoutTest, EndsATuneThatShowsNothingAfterSixSeconds) {
 
 TEST(TuneOfTheSetTest, IsNotRepeatedWhenItFails) {
     const StreamFile file(makeStreamWithoutPictures());
-    setenv("TELIX_CHANNELS", file.name().c_str(), 1);
-    unsetenv("TELIX_CONFIG"); // the default of signal-timeout, 6 seconds
-    setenv("XDG_CONFIG_HOME", "/nonexistent", 1);
-    static auto* const clock = new BroadcastClock(kUtcStart); // broadcast uses it until the process ends
-    Broadcast::useClock(*clock);
+    ManualClock& clock = useBroadcastOf(file);
     const Picture& picture = Platform::instance().picture();
     telix_desktop_present_channel();
     EXPECT_TRUE(waitUntil([&] { return !picture.isFree(); }));
     EXPECT_TRUE(waitUntil([&] {
-        clock->advance(milliseconds(100));
+        clock.advance(milliseconds(100));
         return picture.isFree();
     }));
     for (int turn = 0; turn < 5; ++turn) {
         flushPlatformThread();
         EXPECT_TRUE(picture.isFree());
-        clock->advance(milliseconds(10));
+        clock.advance(milliseconds(10));
     }
 }
 

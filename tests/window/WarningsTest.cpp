@@ -65,7 +65,7 @@ TEST_F(WarningsTest, WhatNobodyMissesHasNoLine) {
 
 TEST_F(WarningsTest, ASubjectIsAShortPartOfOneLine) {
     EXPECT_EQ(linesOf(Warning::UnknownType, "a\nb\x1B[2J\xFF"),
-              "telix: there is no object of type ab[2J\xEF\xBF\xBD\n");
+              "telix: unknown object type ab[2J\xEF\xBF\xBD\n");
     EXPECT_LT(linesOf(Warning::UnknownType, std::string(100000, 'x')).size(), 300U);
 }
 

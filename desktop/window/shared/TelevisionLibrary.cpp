@@ -52,7 +52,7 @@ std::string TelevisionLibrary::start(const TelevisionStart& start, telix_desktop
         error =
             "no channel " + std::to_string(start.channel) + ", there are " + std::to_string(m_channelCount());
     } else if (!start.signalUrl.empty() && m_signal(start.signalUrl.c_str(), start.signalChannel) == 0) {
-        error = "cannot signal " + start.signalUrl + ": there is no channel";
+        error = "cannot signal " + start.signalUrl + ": no channel";
     }
     m_setVolume(start.volume);
     m_setWakeup(wakeup, data);

@@ -23,7 +23,7 @@ struct Row {
 };
 constexpr Row kRows[] = {
     {Warning::NoId, "no-id", "the object of type ", " has no id, so it gets no events"},
-    {Warning::UnknownType, "unknown-type", "there is no object of type ", ""},
+    {Warning::UnknownType, "unknown-type", "unknown object type ", ""},
     {Warning::RefusedCall, "refused-call", "", ": the method refuses these arguments"},
     {Warning::FailedScript, "failed-script", "the script that dispatches ",
      " has failed, so the event is lost"},

@@ -12,7 +12,7 @@ namespace desktop {
 
 enum class Warning {
     NoId,         // an object without an id gets no events; the subject is its type
-    UnknownType,  // there is no object of that type; the subject is the type
+    UnknownType,  // no plug-in and no engine has objects of that type; the subject is the type
     RefusedCall,  // a method has refused its arguments; the subject is the call with their types
     FailedScript, // an event is lost, because the script that dispatches it has failed; the subject is its
                   // source
