@@ -89,7 +89,8 @@ def slope(points):
 def run(build, engine, work, count):
     """What has been measured at each collection: the number of loads or plays, and the least memory since the one before."""
     samples = []
-    environment = {'TELIX_CONFIG': os.path.join(TOP, 'tests', 'desktop', 'tv.conf'), 'PULSE_SERVER': 'none'}
+    environment = {'TELIX_CONFIG': os.path.join(TOP, 'tests', 'desktop', 'tv.conf'), 'PULSE_SERVER': 'none',
+                   'JSC_useGenerationalGC': '0'}  # or else WebKit leaves old garbage for hundreds of loads
     with MediaServer({'': os.path.join(TOP, 'bench', 'pages'), 'media': os.path.join(build, 'tests', 'desktop', 'clips')}) \
             as server, Television(os.path.join(build, 'desktop', 'telix-tv')) as television:
         url = f'{server.url}/soak.html?work={work}&count={count}&interval={count // COLLECTIONS}'

@@ -113,7 +113,7 @@ void BroadcastComponents::onPmt(TELIX_JS_CM_HANDLE channel, const Pmt& pmt) {
     for (const ElementaryStream& stream : pmt.streams) {
         if (const auto component = componentOf(channel, pmt, stream)) {
             const TELIX_JS_AVCOMPHANDLE handle = m_table.intern(*component);
-            m_selection.add(handle, m_table.at(handle));
+            m_selection.add(handle, m_table.share(handle));
         }
     }
     m_selection.selectDefaults(m_platform.configuration().audioLanguage);

@@ -1,6 +1,8 @@
 // The active component of each type: defaults and selection.
 #include "desktop/platform/ComponentTable.h"
 
+#include <utility>
+
 namespace desktop {
 
 void ComponentSelection::clear() {
@@ -8,8 +10,8 @@ void ComponentSelection::clear() {
     m_active = {};
 }
 
-void ComponentSelection::add(TELIX_JS_AVCOMPHANDLE handle, const ComponentTraits& traits) {
-    m_available.push_back({handle, &traits});
+void ComponentSelection::add(TELIX_JS_AVCOMPHANDLE handle, std::shared_ptr<const ComponentTraits> traits) {
+    m_available.push_back({handle, std::move(traits)});
 }
 
 void ComponentSelection::selectDefaults(const std::string& audioLanguage) {

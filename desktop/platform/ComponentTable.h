@@ -8,7 +8,8 @@
 
 #include <algorithm>
 #include <array>
-#include <deque>
+#include <map>
+#include <memory>
 #include <string>
 #include <vector>
 
@@ -16,34 +17,59 @@
 
 namespace desktop {
 
-// Every component there ever was. A handle is valid for the life of the process, because the plug-in keeps
+// Components by handle. A handle outlives the presentation of its component, because the plug-in keeps
 // handles of media that is not presented any more; equal components have the same handle, because pages
 // compare them. `Component` is derived from ComponentTraits; its operator== says what a page takes for equal.
+// What a broadcast or a page makes is without end, so of the components in no selection only the last
+// kMaxComponents are kept. A handle is not given to another component.
 template <typename Component>
 class ComponentTable {
 public:
+    static constexpr size_t kMaxComponents = 1024;
+
     // The handle of `component`, which is added if the table has no equal one. Never 0.
     TELIX_JS_AVCOMPHANDLE intern(const Component& component) {
-        const auto found = std::find(m_components.begin(), m_components.end(), component);
-        const auto index = found - m_components.begin();
-        if (found == m_components.end()) {
-            m_components.push_back(component);
+        const auto found = std::find_if(m_components.begin(), m_components.end(),
+                                        [&](const auto& each) { return *each.second == component; });
+        if (found != m_components.end()) {
+            return found->first;
         }
-        return static_cast<TELIX_JS_AVCOMPHANDLE>(index + 1);
+        forgetTheOldest();
+        m_components.emplace_hint(m_components.end(), ++m_lastHandle, std::make_shared<Component>(component));
+        return m_lastHandle;
     }
 
-    // For a handle from the plug-in: null if no component of this type has it.
+    // For a handle from the plug-in: null if no component of this type has it. Valid until the next intern().
     const Component* find(TELIX_JS_AVCOMPHANDLE handle, TELIX_JS_AVCOMPTYPE type) const {
-        const bool isValid = handle != 0 && handle <= m_components.size() && at(handle).type == type;
-        return isValid ? &at(handle) : nullptr;
+        const auto found = m_components.find(handle);
+        return found != m_components.end() && found->second->type == type ? found->second.get() : nullptr;
     }
 
-    // For a handle from intern(). The reference stays valid.
-    const Component& at(TELIX_JS_AVCOMPHANDLE handle) const { return m_components[handle - 1]; }
-    Component& at(TELIX_JS_AVCOMPHANDLE handle) { return m_components[handle - 1]; }
+    // For a handle from the last intern(), or in a selection: what a selection takes, and so keeps in the
+    // table.
+    std::shared_ptr<const Component> share(TELIX_JS_AVCOMPHANDLE handle) const {
+        return m_components.at(handle);
+    }
+
+    // For such a handle. The reference stays valid while a selection has the component.
+    const Component& at(TELIX_JS_AVCOMPHANDLE handle) const { return *m_components.at(handle); }
+    Component& at(TELIX_JS_AVCOMPHANDLE handle) { return *m_components.at(handle); }
 
 private:
-    std::deque<Component> m_components; // by handle - 1; a deque, because it never moves its elements
+    // Makes room for one, unless selections have all of them.
+    void forgetTheOldest() {
+        if (m_components.size() < kMaxComponents) {
+            return;
+        }
+        const auto oldest = std::find_if(m_components.begin(), m_components.end(),
+                                         [](const auto& each) { return each.second.use_count() == 1; });
+        if (oldest != m_components.end()) {
+            m_components.erase(oldest);
+        }
+    }
+
+    std::map<TELIX_JS_AVCOMPHANDLE, std::shared_ptr<Component>> m_components; // the oldest first
+    TELIX_JS_AVCOMPHANDLE m_lastHandle = 0;
 };
 
 // The components of one piece of media: which are available, and of each type the active one.
@@ -53,13 +79,13 @@ public:
 
     struct Available {
         TELIX_JS_AVCOMPHANDLE handle;
-        const ComponentTraits* traits; // in the table
+        std::shared_ptr<const ComponentTraits> traits; // shared with the table
     };
 
     void clear();
 
-    // `traits` belong to the table, which keeps them. The component is not active yet.
-    void add(TELIX_JS_AVCOMPHANDLE handle, const ComponentTraits& traits);
+    // `traits` are what the table shares. The component is not active yet.
+    void add(TELIX_JS_AVCOMPHANDLE handle, std::shared_ptr<const ComponentTraits> traits);
 
     // Activates the first video, and the first audio in the language (ISO 639-2) that is made for everybody,
     // or else the first audio. Subtitles are off until a page selects them.

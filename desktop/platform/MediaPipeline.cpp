@@ -19,7 +19,8 @@ namespace {
 
 // "download" keeps what comes from a network in a temporary file: only then does playbin report what is
 // buffered, and only then can such media be played backward.
-constexpr const char* kPlaybinFlags = "video+audio+text+soft-volume+download";
+// Without "soft-volume": the element that playbin makes for it is never freed (GStreamer 1.22).
+constexpr const char* kPlaybinFlags = "video+audio+text+download";
 
 constexpr const char* kDownloadBufferElement = "downloadbuffer";
 
@@ -34,10 +35,13 @@ void dropElement(GstElement* element) {
 MediaPipeline::MediaPipeline(Listener listener) : m_listener(std::move(listener)) {}
 
 MediaPipeline::~MediaPipeline() {
+    if (m_volumeFilter) {
+        OutputVolume::instance().remove(m_volumeFilter);
+        gst_object_unref(m_volumeFilter);
+    }
     if (!m_playbin) {
         return;
     }
-    OutputVolume::instance().remove(m_playbin);
     GstBus* bus = gst_element_get_bus(m_playbin);
     gst_bus_remove_watch(bus);
     gst_bus_set_flushing(bus, TRUE);
@@ -78,10 +82,13 @@ bool MediaPipeline::createPlaybin(Picture& picture, Picture::Token token, std::s
     m_playbin = gst_element_factory_make("playbin", nullptr);
     GstElement* videoSink = picture.makeSink(token);
     GstElement* audioSink = makeAudioSink();
-    if (m_playbin) {
-        gst_object_ref_sink(m_playbin); // kept until the teardown
+    m_volumeFilter = gst_element_factory_make("volume", nullptr);
+    for (GstElement* kept : {m_playbin, m_volumeFilter}) {
+        if (kept) {
+            gst_object_ref_sink(kept); // until the teardown
+        }
     }
-    if (!m_playbin || !videoSink || !audioSink) {
+    if (!m_playbin || !videoSink || !audioSink || !m_volumeFilter) {
         dropElement(videoSink);
         dropElement(audioSink);
         error = "a GStreamer element is missing";
@@ -89,8 +96,8 @@ bool MediaPipeline::createPlaybin(Picture& picture, Picture::Token token, std::s
     }
     tapSound(audioSink);
     gst_util_set_object_arg(G_OBJECT(m_playbin), "flags", kPlaybinFlags);
-    g_object_set(m_playbin, "video-sink", videoSink, "audio-sink", audioSink, "buffer-duration",
-                 static_cast<gint64>(kBufferDuration), nullptr);
+    g_object_set(m_playbin, "video-sink", videoSink, "audio-sink", audioSink, "audio-filter", m_volumeFilter,
+                 "buffer-duration", static_cast<gint64>(kBufferDuration), nullptr);
     return true;
 }
 

@@ -190,6 +190,7 @@ private:
 
     Listener m_listener;
     GstElement* m_playbin = nullptr;
+    GstElement* m_volumeFilter = nullptr; // of playbin
     State m_state = State::Null;
     Source m_source;
     PendingSeek m_pendingSeek;

@@ -93,8 +93,8 @@ MediaPipeline::Output MediaPipeline::output() const {
     }
     gst_query_unref(query);
     gboolean isMuted = FALSE;
-    g_object_get(m_playbin, "current-audio", &output.audioStream, "volume", &output.volume, "mute", &isMuted,
-                 nullptr);
+    g_object_get(m_playbin, "current-audio", &output.audioStream, nullptr);
+    g_object_get(m_volumeFilter, "volume", &output.volume, "mute", &isMuted, nullptr);
     output.isMuted = isMuted != FALSE;
     return output;
 }

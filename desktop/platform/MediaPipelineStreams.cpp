@@ -180,8 +180,8 @@ void MediaPipeline::selectAudio(std::optional<int> stream) {
 
 // Audio is muted at any speed but 1.
 void MediaPipeline::applyAudio() {
-    OutputVolume::instance().apply(m_playbin, m_volume);
-    g_object_set(m_playbin, "mute", m_isAudioSelected && m_speed == 1 ? FALSE : TRUE, nullptr);
+    OutputVolume::instance().apply(m_volumeFilter, m_volume);
+    g_object_set(m_volumeFilter, "mute", m_isAudioSelected && m_speed == 1 ? FALSE : TRUE, nullptr);
 }
 
 void MediaPipeline::selectSubtitle(std::optional<int> stream) {

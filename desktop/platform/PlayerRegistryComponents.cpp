@@ -9,7 +9,7 @@ void PlayerRegistry::setComponentsLocked(Entry& entry, const std::vector<MediaPi
     entry.components.clear();
     for (const MediaPipeline::Stream& stream : streams) {
         const TELIX_JS_AVCOMPHANDLE handle = m_components.intern({stream, m_owner, entry.url});
-        entry.components.add(handle, m_components.at(handle));
+        entry.components.add(handle, m_components.share(handle));
     }
     entry.components.selectDefaults(m_platform.configuration().audioLanguage);
 }

@@ -29,7 +29,7 @@ class ComponentTableTest : public testing::Test {
 protected:
     TELIX_JS_AVCOMPHANDLE add(const Stream& stream) {
         const TELIX_JS_AVCOMPHANDLE handle = m_table.intern(stream);
-        m_selection.add(handle, m_table.at(handle));
+        m_selection.add(handle, m_table.share(handle));
         return handle;
     }
 
@@ -56,11 +56,31 @@ TEST_F(ComponentTableTest, FindsAComponentByHandleAndType) {
 }
 
 TEST_F(ComponentTableTest, KeepsReferencesWhileItGrows) {
-    const Stream& first = m_table.at(m_table.intern(Stream(kAudio, 0)));
+    const Stream& first = m_table.at(add(Stream(kAudio, 0)));
     for (int number = 1; number < 1000; ++number) {
         m_table.intern(Stream(kAudio, number));
     }
     EXPECT_EQ(&m_table.at(1), &first);
+}
+
+TEST_F(ComponentTableTest, ForgetsTheOldestOfThoseThatNoSelectionHas) {
+    constexpr int kMax = ComponentTable<Stream>::kMaxComponents;
+    const auto selected = add(Stream(kAudio, 0));
+    const auto oldest = m_table.intern(Stream(kAudio, 1));
+    const auto second = m_table.intern(Stream(kAudio, 2));
+    for (int number = 3; number < kMax; ++number) {
+        m_table.intern(Stream(kAudio, number));
+    }
+    EXPECT_TRUE(m_table.find(oldest, kAudio));
+    const auto last = m_table.intern(Stream(kAudio, kMax));
+    EXPECT_FALSE(m_table.find(oldest, kAudio));
+    EXPECT_TRUE(m_table.find(selected, kAudio));
+    EXPECT_TRUE(m_table.find(second, kAudio));
+    EXPECT_TRUE(m_table.find(last, kAudio));
+    EXPECT_GT(m_table.intern(Stream(kAudio, 1)), last); // a handle that was forgotten is not used again
+    m_selection.clear();
+    m_table.intern(Stream(kAudio, kMax + 1));
+    EXPECT_FALSE(m_table.find(selected, kAudio));
 }
 
 TEST_F(ComponentTableTest, ActivatesTheFirstVideoTheViewersLanguageAndNoSubtitle) {
