@@ -5,7 +5,6 @@
 
 #include "bridge/Identifiers.h"
 #include "bridge/Objects.h"
-#include "bridge/Text.h"
 #include "tests/bridge/ScriptHost.h"
 
 using namespace bridge;
@@ -257,19 +256,6 @@ TEST_P(BrowserFunctions, TimersEndWithTheirInstance) {
     g_usleep(5000);
     runMainLoop();
     EXPECT_EQ(s_timerRuns, 0);
-}
-
-TEST(BridgeText, IsReplacedWhereItIsInvalid) {
-    EXPECT_EQ(utf8From(u"a\u00e4\u20ac\U0001F600"), "a\u00e4\u20ac\U0001F600");
-    const char16_t lone[] = {u'a', 0xD83D, u'b', 0xDE00, 0};
-    EXPECT_EQ(utf8From(std::u16string_view(lone, 4)), "a\uFFFDb\uFFFD");
-    EXPECT_EQ(utf16From("a\u00e4\u20ac\U0001F600"), u"a\u00e4\u20ac\U0001F600");
-    EXPECT_EQ(utf16From("a\xFFz"), u"a\uFFFDz");
-    EXPECT_EQ(utf16From("\xC0\x80"), u"\uFFFD\uFFFD");                // overlong
-    EXPECT_EQ(utf16From("\xED\xA0\x80"), u"\uFFFD\uFFFD\uFFFD");      // a surrogate
-    EXPECT_EQ(utf16From("\xF4\x90\x80\x80").substr(0, 1), u"\uFFFD"); // above Unicode
-    EXPECT_EQ(utf16From("\xE2\x82"), u"\uFFFD\uFFFD");                // cut off
-    EXPECT_EQ(utf16From(std::string_view("a\0b", 3)).size(), 3U);
 }
 
 TEST(BridgePlugin, ItsTypesAreReadFromItsDescription) {
