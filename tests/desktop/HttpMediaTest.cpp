@@ -191,7 +191,7 @@ TEST_F(HttpMediaTest, WaitsForTheWindowUntilItAnswersOrThePlayerStops) {
     ASSERT_EQ(start(m_player, server("tune.mp3")), 0);
     ASSERT_TRUE(waitUntil([&] { return window.asked.all().size() == 1; }));
     ASSERT_EQ(TELIX_JS_AV_Stop(m_player), 0);
-    waitForPlatformThread();
+    flushPlatformThread();
     EXPECT_TRUE(requests().empty());
     telix_desktop_answer_http_request(window.asked.all()[0].request, &window.identity); // too late
     telix_desktop_answer_http_request(4711, nullptr);
@@ -288,7 +288,7 @@ TEST_F(HttpMediaTest, DropsTheConnectionAtOnceWhenItStops) {
     ASSERT_LT(recv(connection, &byte, 1, MSG_DONTWAIT), 0);
     const auto before = std::chrono::steady_clock::now();
     ASSERT_EQ(TELIX_JS_AV_Stop(m_player), 0);
-    waitForPlatformThread();
+    flushPlatformThread();
     EXPECT_TRUE(waitUntil([&] { return recv(connection, &byte, 1, MSG_DONTWAIT) == 0; }));
     EXPECT_LT(std::chrono::steady_clock::now() - before, std::chrono::seconds(10)) << "the request timed out";
     close(connection);
@@ -350,7 +350,7 @@ TEST_F(HttpMediaTest, SurvivesStopsAtRandomTimes) {
             TELIX_JS_AV_Seek(m_player, 4000);
         }
         ASSERT_EQ(TELIX_JS_AV_Stop(m_player), 0);
-        waitForPlatformThread();
+        flushPlatformThread();
         if (stop % 1000 == 999) {
             std::fprintf(stderr, "%lu stops\n", stop + 1);
         }

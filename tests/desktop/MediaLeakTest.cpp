@@ -11,7 +11,7 @@ protected:
 
     void SetUp() override {
         MediaTest::SetUp();
-        waitForPlatformThread();
+        flushPlatformThread();
         m_tracers = gst_tracing_get_active_tracers();
         ASSERT_TRUE(m_tracers);
         g_signal_emit_by_name(m_tracers->data, "activity-start-tracking");
@@ -52,7 +52,7 @@ TEST_F(MediaLeakTest, AClipThatHasEndedLeavesNoElement) {
     play(file("clip.mp4"));
     EXPECT_GT(liveElements(), 10); // of the pipeline
     ASSERT_EQ(TELIX_JS_AV_Stop(m_player), 0);
-    waitForPlatformThread();
+    flushPlatformThread();
     EXPECT_TRUE(waitUntil([this] { return liveElements() == 0; })) << liveElements() << " are alive";
 }
 

@@ -497,7 +497,7 @@ TEST_F(MediaTest, AnswersOtherThreadsWhileItPlays) {
         TELIX_JS_AV_SetPlaySpeed(m_player, 1, 2, 0);
         const unsigned int before = calls;
         EXPECT_TRUE(waitUntil([&] { return calls > before + 10; })) << "the calls do not return";
-        waitForPlatformThread();
+        flushPlatformThread();
     }
     TELIX_JS_AV_PLAY_INFO* record = nullptr;
     ASSERT_EQ(TELIX_JS_AV_GetPlayInfo(m_player, &record), 0);
@@ -525,7 +525,7 @@ TEST_F(MediaTest, TakesThePipelineFromAnotherPlayer) {
     EXPECT_EQ(stateOf(m_player).state, "stopped");
     EXPECT_NE(TELIX_JS_AV_Pause(m_player), 0);
     EXPECT_EQ(TELIX_JS_AV_Stop(m_player), 0); // of one that has nothing
-    waitForPlatformThread();
+    flushPlatformThread();
     EXPECT_EQ(stateOf(other).state, "playing");
     ASSERT_EQ(TELIX_JS_AV_DestroyPlayer(m_player), 0);
     TELIX_JS_AV_UnregisterOnPlayStateChange(onMessage); // the other goes on expecting its messages

@@ -18,6 +18,7 @@
 #include "desktop/platform/PlayerRegistry.h"
 #include "desktop/platform/telix_picture.h"
 #include "telix/telix_platform.h"
+#include "tests/desktop/PlatformThread.h"
 #include "tests/desktop/Received.h"
 
 constexpr TELIX_AV_CB_MSG kPlayStart = TELIX_AV_CB_MSG_PLAYSTART;
@@ -48,11 +49,6 @@ auto runOnPlatformThread(Function function) {
     std::promise<decltype(function())> result;
     desktop::Platform::instance().post([&] { result.set_value(function()); });
     return result.get_future().get();
-}
-
-// Returns when what was posted before has run.
-inline void waitForPlatformThread() {
-    runOnPlatformThread([] { return true; });
 }
 
 // Lets the platform thread work for some time, in which something must not happen. It reads the progress at
