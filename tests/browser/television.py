@@ -230,6 +230,13 @@ class Process(subprocess.Popen):
         super().__exit__(kind, *details)
 
 
+def web_processes(process):
+    """The ids of the web processes of a telix-tv, also of one that is still being removed after its end."""
+    children = subprocess.run(['ps', '--ppid', str(process.pid), '-o', 'pid=,comm='], stdout=subprocess.PIPE, text=True,
+                              check=True).stdout
+    return [int(line.split()[0]) for line in children.splitlines() if 'WebKitWeb' in line]
+
+
 class Run:
     """The exit status and the output of a run of telix-tv."""
 

@@ -9,12 +9,11 @@ import pathlib
 import re
 import signal
 import socket
-import subprocess
 import unittest
 import urllib.request
 
 from telix_tv import PLUGIN, TelixTv
-from television import RUN_TIMEOUT, Lines, wait_for
+from television import RUN_TIMEOUT, Lines, wait_for, web_processes
 from patterns import has_bars, is_striped
 
 DESKTOP_PLUGIN = os.environ['TELIX_DESKTOP_PLUGIN']
@@ -47,12 +46,6 @@ STREAMING_THREAD = re.compile(r'[a-z0-9]+:(src|sink)')
 
 
 class Crash(TelixTv):
-    def web_processes(self, process):
-        """Their process ids, also of one that is still being removed after its end."""
-        children = subprocess.run(['ps', '--ppid', str(process.pid), '-o', 'pid=,comm='], stdout=subprocess.PIPE,
-                                  text=True, check=True).stdout
-        return [int(line.split()[0]) for line in children.splitlines() if 'WebKitWeb' in line]
-
     @staticmethod
     def abort_streaming_thread(web_process):
         """Ends a process by a thread of a pipeline, as an element does that fails a check."""
@@ -70,7 +63,7 @@ class Crash(TelixTv):
         page = self.write(READY)
         with self.television.start('--plugin', DESKTOP_PLUGIN, '--wait-for', 'false', page) as process:
             self.assertIn('ready', process.stderr.readline())
-            web_process, = self.web_processes(process)
+            web_process, = web_processes(process)
             os.kill(web_process, signal.SIGKILL)
             _, errors = process.communicate(timeout=RUN_TIMEOUT)
         self.assertEqual((process.returncode, errors), (3, 'telix-tv: the web process has crashed\n'))
@@ -80,12 +73,12 @@ class Crash(TelixTv):
         with self.television.start('--plugin', DESKTOP_PLUGIN, page) as process:
             messages = Lines(process.stderr)
             self.assertTrue(messages.wait_for('tuned'))
-            first, = self.web_processes(process)
+            first, = web_processes(process)
             os.kill(first, signal.SIGKILL)
             self.assertTrue(messages.wait_for('telix-tv: the web process has crashed'))
             # The library in the new web process.
             wait_for(lambda: has_bars(self.television.screen()) and self.channel() == 'Telix Two', 'another channel')
-            self.assertTrue(set(self.web_processes(process)) - {first})
+            self.assertTrue(set(web_processes(process)) - {first})
             self.assertIsNone(process.poll())
             process.terminate()
             process.communicate(timeout=RUN_TIMEOUT)
@@ -122,7 +115,7 @@ class Crash(TelixTv):
         with self.television.start('--plugin', DESKTOP_PLUGIN, page) as process:
             messages = Lines(process.stderr)
             self.assertTrue(messages.wait_for('playing'))
-            first, = self.web_processes(process)
+            first, = web_processes(process)
             self.abort_streaming_thread(first)
             self.assertTrue(messages.wait_for('telix-tv: the web process has crashed'))
             wait_for(lambda: is_striped(self.television.screen()) and self.channel() == 'Telix One', 'no channel')
@@ -137,9 +130,9 @@ class Crash(TelixTv):
     def test_without_an_application_the_channel_comes_back(self):
         with self.television.start('--plugin', DESKTOP_PLUGIN, '--keys', '2') as process:
             wait_for(lambda: has_bars(self.television.screen()), 'no picture')
-            first, = self.web_processes(process)
+            first, = web_processes(process)
             os.kill(first, signal.SIGKILL)
-            wait_for(lambda: set(self.web_processes(process)) - {first}, 'no web process')
+            wait_for(lambda: set(web_processes(process)) - {first}, 'no web process')
             wait_for(lambda: has_bars(self.television.screen()) and self.channel() == 'Telix Two', 'another channel')
             process.terminate()
             _, errors = process.communicate(timeout=RUN_TIMEOUT)

@@ -286,6 +286,16 @@ class RunningChannel(Television):
             self.wait_for_pattern(is_striped)
             self.television.wait_for_colour((50, 50), (0, 128, 0))
 
+    def test_the_channel_shows_through_such_a_page_as_soon_as_it_is_transparent(self):
+        for change in ("document.body.style.background = 'transparent'", "document.body.className = 'clear'",
+                       "document.styleSheets[0].deleteRule(0)"):
+            own = self.write('<style>body { background: rgb(0, 128, 0) } .clear { background: transparent }</style><body>'
+                             f'<script>onkeydown = function () {{ {change} }}</script>')
+            with self.subTest(change), self.running(own):
+                self.television.wait_for_colour((50, 50), (0, 128, 0))
+                self.television.press_key('Return')
+                self.wait_for_pattern(is_striped)
+
     def test_television_keys_change_the_channel_and_say_so(self):
         for keys in ('2', 'channel-up', 'channel-down,channel-down'):
             with self.running('--keys', keys):

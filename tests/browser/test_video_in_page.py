@@ -1,11 +1,13 @@
 """The video where the page puts its object, in the stacking order of the page: on the video plane or painted by the page."""
 
 import contextlib
+import glob
+import pathlib
 import signal
 import unittest
 
 from telix_tv import BLACK, BLUE, GREEN, PLUGIN
-from television import RUN_TIMEOUT, Lines, wait_for
+from television import RUN_TIMEOUT, Lines, wait_for, web_processes
 from test_screen import VideoPlanePages
 
 GREY = (128, 128, 128)
@@ -219,6 +221,19 @@ class VideoInPage(VideoPlanePages):
                           "[tv.childNodes.length, tv.getAttribute('style').indexOf('canvas'), tv.attributes.length, "
                           "'telixBridgeObserver' in window, document.querySelectorAll('canvas').length]")
         self.assertEqual(run.value, [0, -1, 3, False, 0], run)
+
+    @unittest.skipIf(glob.glob('/dev/dri/renderD*'), 'the engine uses OpenGL from the start')
+    def test_opengl_begins_with_the_first_transparent_page(self):
+        def has_opengl(process):
+            return any('libGLESv2' in pathlib.Path(f'/proc/{each}/maps').read_text(encoding='utf-8')
+                       for each in web_processes(process))
+        page = self.on_grey(script="onkeydown = function () { document.body.style.background = 'transparent' }")
+        with self.running(page) as process:
+            self.wait_for_colours({**self.quadrants(), **self.around(GREY)})
+            self.assertFalse(has_opengl(process))
+            self.television.press_key('Return')
+            self.wait_for_colours({**self.quadrants(), **self.around(BLACK)})
+            wait_for(lambda: has_opengl(process), 'no OpenGL under a transparent page')
 
     def test_a_change_of_the_way_shows_no_wrong_frame(self):
         # The background of the page changes as soon as the video is shown the other way.

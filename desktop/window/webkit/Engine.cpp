@@ -3,6 +3,7 @@
 
 #include "desktop/window/shared/CommandLine.h"
 #include "desktop/window/shared/ElementId.h"
+#include "desktop/window/shared/PageScript.h"
 #include "desktop/window/shared/PluginFile.h"
 #include "desktop/window/shared/ProgramFolder.h"
 #include "desktop/window/webkit/GpuDevice.h"
@@ -19,6 +20,8 @@ constexpr char kWindowStyle[] = "::-webkit-scrollbar { display: none !important;
 
 constexpr GdkRGBA kTransparent{0, 0, 0, 0};
 constexpr GdkRGBA kBlack{0, 0, 0, 1};
+// The script world of scripts/transparentpage.js.
+constexpr char kBackgroundWorld[] = "telix-tv-background";
 
 // Of an object of the plug-in: nothing of its content, and as background nothing but the video when the page
 // paints it, see scripts/videoplacement.js.
@@ -121,9 +124,11 @@ Engine::Engine(const CommandLine& commandLine, const PluginFile& plugin, const P
         style.c_str(), WEBKIT_USER_CONTENT_INJECT_ALL_FRAMES, WEBKIT_USER_STYLE_LEVEL_USER, nullptr, nullptr);
     webkit_user_content_manager_add_style_sheet(m_content, sheet);
     webkit_user_style_sheet_unref(sheet);
+    watchBackgrounds();
 }
 
 Engine::~Engine() {
+    g_signal_handlers_disconnect_by_data(m_content, this);
     g_signal_handlers_disconnect_by_data(m_context, this);
     g_object_unref(m_content);
     g_object_unref(m_settings);
@@ -143,6 +148,22 @@ WebKitWebView* Engine::newView(WebKitWebView* related) const {
                           WEBKIT_HARDWARE_ACCELERATION_POLICY_NEVER;
     webkit_web_view_set_background_color(view, isOpaque ? &kBlack : &kTransparent);
     return view;
+}
+
+void Engine::watchBackgrounds() {
+    const auto onMessage = +[](WebKitUserContentManager*, WebKitJavascriptResult*, gpointer engine) {
+        if (const auto& onTransparentPage = static_cast<Engine*>(engine)->m_onTransparentPage) {
+            onTransparentPage();
+        }
+    };
+    g_signal_connect(m_content, "script-message-received::transparentPage", G_CALLBACK(onMessage), this);
+    webkit_user_content_manager_register_script_message_handler_in_world(m_content, "transparentPage",
+                                                                         kBackgroundWorld);
+    WebKitUserScript* script = webkit_user_script_new_for_world(
+        pageScriptCall("transparentpage", {}).c_str(), WEBKIT_USER_CONTENT_INJECT_TOP_FRAME,
+        WEBKIT_USER_SCRIPT_INJECT_AT_DOCUMENT_END, kBackgroundWorld, nullptr, nullptr);
+    webkit_user_content_manager_add_script(m_content, script);
+    webkit_user_script_unref(script);
 }
 
 void Engine::makeTransparent(WebKitWebView* view) const {

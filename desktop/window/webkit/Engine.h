@@ -41,6 +41,10 @@ public:
     // or null. One process for all applications of a window: the platform library is in it.
     WebKitWebView* newView(WebKitWebView* related) const;
 
+    // Called when a page that lets the video plane be seen is visible, see scripts/transparentpage.js.
+    void setOnTransparentPage(std::function<void()> onTransparentPage) {
+        m_onTransparentPage = std::move(onTransparentPage);
+    }
     // Lets the video plane show through a view. Without a GPU a view begins without OpenGL and opaque,
     // because without OpenGL the engine leaves in the window what a page has drawn where it becomes
     // transparent. The engine starts to use OpenGL at any time, but does not cease to.
@@ -48,6 +52,7 @@ public:
 
 private:
     void onInitializeExtensions(WebKitWebContext* context);
+    void watchBackgrounds();
 
     const PluginFile& m_plugin;
     WebProcessOutput& m_output;
@@ -55,6 +60,7 @@ private:
     const bool m_isAutomated;
     const bool m_isStrict;
     std::function<TelevisionStart()> m_start;
+    std::function<void()> m_onTransparentPage;
     int m_soundDescriptor = -1;
     WebKitWebContext* m_context;
     WebKitSettings* m_settings;

@@ -19,9 +19,8 @@ constexpr char kSignallingMessage[] = "telix-signalling";
 // To the window's context: a request of the control socket (s). The reply has the response (s).
 constexpr char kControlMessage[] = "telix-control";
 
-// To the window's context (tb): the page shows the video of the object with that number of telix_picture.h,
-// which the video plane leaves out, or 0; whether the plane is to be seen through the pages. The reply,
-// without parameters, comes when the plane has changed.
+// To the window's context (t): the page shows the video of the object with that number of telix_picture.h,
+// which the video plane leaves out, or 0. The reply, without parameters, comes when the plane has changed.
 constexpr char kPagePresenterMessage[] = "telix-page-presenter";
 
 // To the window's context: a request of media, with its URL (ay). The reply has what it carries: user agent,

@@ -112,7 +112,7 @@ TvWindow::TvWindow(Engine& engine, PageChannel& channel, const CommandLine& comm
     gtk_window_set_title(GTK_WINDOW(m_window), kTitle);
     gtk_container_add(GTK_CONTAINER(m_window), m_overlay);
     gtk_container_add(GTK_CONTAINER(m_overlay), newBlackArea());
-    m_video.setOnPlane([this] {
+    engine.setOnTransparentPage([this] {
         for (const auto& application : m_applications) {
             m_engine.makeTransparent(application->view());
         }
@@ -156,6 +156,7 @@ TvWindow::~TvWindow() {
     g_object_unref(m_calls);
     m_channel.setHandler(nullptr);
     m_engine.setTelevisionStart(nullptr);
+    m_engine.setOnTransparentPage(nullptr);
     m_stack.clear();
     for (const auto& application : m_applications) {
         application->forgetCalls();

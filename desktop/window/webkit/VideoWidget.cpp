@@ -43,7 +43,6 @@ public:
     void dropFrames();
     bool hasFrame() const { return frame().visible != 0; }
     void setOnChange(std::function<void()> onChange) { m_onChange = std::move(onChange); }
-    void setOnPlane(std::function<void()> onPlane) { m_onPlane = std::move(onPlane); }
     void paint(cairo_t* context, int width, int height) const;
 
 private:
@@ -72,7 +71,6 @@ private:
     uint64_t m_pagePresenter = 0;         // whose video the page shows; 0: none
     std::unique_ptr<GlPainter> m_painter; // null: paint with cairo
     std::function<void()> m_onChange;
-    std::function<void()> m_onPlane;
 };
 
 // ---- The widget
@@ -86,7 +84,6 @@ VideoWidget::Private::Private() : m_widget(gtk_drawing_area_new()) {
 
 VideoWidget::Private::~Private() {
     m_onChange = nullptr;
-    m_onPlane = nullptr;
     replaceReader(nullptr);
     if (m_context) {
         g_signal_handler_disconnect(m_context, m_messageHandler);
@@ -149,12 +146,8 @@ gboolean VideoWidget::Private::onMessage(WebKitWebContext*, WebKitUserMessage* m
     const char* name = webkit_user_message_get_name(message);
     if (g_strcmp0(name, kPagePresenterMessage) == 0) {
         uint64_t presenter = 0;
-        gboolean isOnPlane = FALSE;
-        g_variant_get(webkit_user_message_get_parameters(message), "(tb)", &presenter, &isOnPlane);
+        g_variant_get(webkit_user_message_get_parameters(message), "(t)", &presenter);
         video.leaveToPage(presenter);
-        if (isOnPlane && video.m_onPlane) {
-            video.m_onPlane();
-        }
         webkit_user_message_send_reply(message, webkit_user_message_new(kPagePresenterMessage, nullptr));
         return TRUE;
     }
@@ -269,9 +262,6 @@ bool VideoWidget::hasFrame() const {
 }
 void VideoWidget::setOnChange(std::function<void()> onChange) {
     m_private->setOnChange(std::move(onChange));
-}
-void VideoWidget::setOnPlane(std::function<void()> onPlane) {
-    m_private->setOnPlane(std::move(onPlane));
 }
 void VideoWidget::paint(cairo_t* context, int width, int height) const {
     m_private->paint(context, width, height);

@@ -38,9 +38,6 @@ public:
     // Called after each change of frame or place.
     void setOnChange(std::function<void()> onChange);
 
-    // Called when the video on the plane is to be seen through the pages.
-    void setOnPlane(std::function<void()> onPlane);
-
     // Paints the video, black around it, into a rectangle of that size at the origin of `context`: for
     // screenshots and recordings.
     void paint(cairo_t* context, int width, int height) const;

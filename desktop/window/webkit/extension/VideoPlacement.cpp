@@ -47,7 +47,7 @@ void fill(JSCValue* image, const telix_desktop_frame& frame) {
 struct VideoPlacement::Request {
     VideoPlacement* placement;
     unsigned number;
-    Place place;
+    bool isInPage;
 };
 
 VideoPlacement::VideoPlacement(WebKitWebExtension* extension, FramePublisher& publisher)
@@ -96,7 +96,6 @@ void VideoPlacement::start(uint64_t presenter, bool isFullScreen) {
     JSCValue* element = m_elements.find(presenter);
     // Full screen lies behind the page, whatever the element.
     if (isFullScreen || !element) {
-        sendToWindow(Place::Plane);
         return;
     }
     JSCContext* context = jsc_value_get_context(element);
@@ -120,9 +119,7 @@ JSCValue* VideoPlacement::newHost(JSCContext* context) {
     const auto watch = +[](gboolean on, gpointer self) { static_cast<VideoPlacement*>(self)->watch(on); };
     add("watch", jsc_value_new_function(context, "watch", G_CALLBACK(watch), this, nullptr, G_TYPE_NONE, 1,
                                         G_TYPE_BOOLEAN));
-    const auto set = +[](gboolean on, gpointer self) {
-        static_cast<VideoPlacement*>(self)->sendToWindow(on ? Place::Page : Place::Plane);
-    };
+    const auto set = +[](gboolean on, gpointer self) { static_cast<VideoPlacement*>(self)->setInPage(on); };
     add("setInPage", jsc_value_new_function(context, "setInPage", G_CALLBACK(set), this, nullptr, G_TYPE_NONE,
                                             1, G_TYPE_BOOLEAN));
     return host;
@@ -133,7 +130,7 @@ void VideoPlacement::stop() {
     if (JSCValue* script = std::exchange(m_script, nullptr)) {
         g_autoptr(JSCValue) result = jsc_value_object_invoke_method(script, "stop", G_TYPE_NONE);
         g_object_unref(script);
-        sendToWindow(Place::Nowhere);
+        setInPage(false);
     }
 }
 
@@ -159,15 +156,14 @@ void VideoPlacement::watch(bool isWatched) {
 
 // The connection keeps the order: what the page has drawn before arrives before the message, and what it
 // draws after the reply arrives after the plane is shown.
-void VideoPlacement::sendToWindow(Place place) {
-    if (place != Place::Page) {
+void VideoPlacement::setInPage(bool isInPage) {
+    if (!isInPage) {
         m_publisher.leaveOut(0);
     }
-    auto* request = new Request{this, ++m_lastRequest, place};
-    const guint64 pagePresenter = place == Place::Page ? m_presenter : 0;
-    WebKitUserMessage* message = webkit_user_message_new(
-        kPagePresenterMessage,
-        g_variant_new("(tb)", pagePresenter, gboolean(place == Place::Plane && m_presenter != 0)));
+    auto* request = new Request{this, ++m_lastRequest, isInPage};
+    const guint64 pagePresenter = isInPage ? m_presenter : 0;
+    WebKitUserMessage* message =
+        webkit_user_message_new(kPagePresenterMessage, g_variant_new("(t)", pagePresenter));
     webkit_web_extension_send_message_to_context(
         m_extension, message, nullptr,
         [](GObject* extension, GAsyncResult* result, gpointer data) {
@@ -175,16 +171,16 @@ void VideoPlacement::sendToWindow(Place place) {
             WebKitUserMessage* reply = webkit_web_extension_send_message_to_context_finish(
                 WEBKIT_WEB_EXTENSION(extension), result, nullptr);
             g_clear_object(&reply);
-            request->placement->onWindowReply(request->number, request->place);
+            request->placement->onWindowReply(request->number, request->isInPage);
         },
         request);
 }
 
-void VideoPlacement::onWindowReply(unsigned request, Place place) {
+void VideoPlacement::onWindowReply(unsigned request, bool isInPage) {
     if (request != m_lastRequest || !m_script) {
         return;
     }
-    if (place == Place::Page) {
+    if (isInPage) {
         m_publisher.leaveOut(m_presenter);
     } else {
         g_autoptr(JSCValue) result = jsc_value_object_invoke_method(m_script, "planeShown", G_TYPE_NONE);

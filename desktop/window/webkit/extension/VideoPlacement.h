@@ -28,8 +28,6 @@ public:
     void onChange();
 
 private:
-    // Where the video of the object that presents is seen.
-    enum class Place { Nowhere, Plane, Page };
     struct Request;
 
     void update();
@@ -37,8 +35,8 @@ private:
     void stop();
     void paint();
     void watch(bool isWatched);
-    void sendToWindow(Place place);
-    void onWindowReply(unsigned request, Place place);
+    void setInPage(bool isInPage);
+    void onWindowReply(unsigned request, bool isInPage);
     JSCValue* newHost(JSCContext* context);
 
     WebKitWebExtension* m_extension;
