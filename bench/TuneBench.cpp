@@ -236,18 +236,19 @@ void keyframeOfOtherMultiplex(benchmark::State& state, const std::string& name, 
         std::promise<Clock::time_point> arrival;
         bool hasBegun = false;
         bool hasEnded = false;
-        desktop::Playout playout(desktop::Clock::real(), [&](const uint8_t* packets, size_t size) {
-            for (size_t at = 0; at < size && !hasEnded; at += desktop::kPacketSize) {
-                const uint8_t* packet = packets + at;
-                const bool isStart = desktop::pidOf(packet) == video.pid &&
-                                     (packet[1] & desktop::kPayloadUnitStartIndicator) != 0;
-                if (isStart && hasBegun) {
-                    hasEnded = true;
-                    arrival.set_value(Clock::now());
+        desktop::Playout playout(
+            desktop::Clock::real(), [&](const uint8_t* packets, size_t size, desktop::Clock::Duration) {
+                for (size_t at = 0; at < size && !hasEnded; at += desktop::kPacketSize) {
+                    const uint8_t* packet = packets + at;
+                    const bool isStart = desktop::pidOf(packet) == video.pid &&
+                                         (packet[1] & desktop::kPayloadUnitStartIndicator) != 0;
+                    if (isStart && hasBegun) {
+                        hasEnded = true;
+                        arrival.set_value(Clock::now());
+                    }
+                    hasBegun = hasBegun || (isStart && desktop::isRandomAccessPoint(packet, video.type));
                 }
-                hasBegun = hasBegun || (isStart && desktop::isRandomAccessPoint(packet, video.type));
-            }
-        });
+            });
         std::string error;
         const auto begin = Clock::now();
         auto future = arrival.get_future();
@@ -299,7 +300,8 @@ void receive(benchmark::State& state, const std::string& file, bool isKeeping) {
         (void)each;
         for (size_t at = 0; at < packets.size(); at += kPacketsAtOnce * desktop::kPacketSize) {
             receiver.push(packets.data() + at,
-                          std::min(kPacketsAtOnce * desktop::kPacketSize, packets.size() - at));
+                          std::min(kPacketsAtOnce * desktop::kPacketSize, packets.size() - at),
+                          desktop::Clock::Duration::zero());
         }
     }
     state.SetBytesProcessed(static_cast<int64_t>(state.iterations() * packets.size()));

@@ -11,8 +11,9 @@
 namespace desktop {
 
 BroadcastSource::Frontend::Frontend(Clock& clock)
-    : receiver(clock),
-      playout(clock, [this](const uint8_t* packets, size_t size) { receiver.push(packets, size); }) {}
+    : receiver(clock), playout(clock, [this](const uint8_t* packets, size_t size, Clock::Duration age) {
+          receiver.push(packets, size, age);
+      }) {}
 
 BroadcastSource::BroadcastSource(Clock& clock, std::function<void()> onTestMultiplex)
     : m_platform(Platform::instance()), m_onTestMultiplex(std::move(onTestMultiplex)) {

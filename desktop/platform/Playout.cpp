@@ -136,7 +136,7 @@ private:
 class Playout::Run {
 public:
     Run(Playout& playout, Stream& stream)
-        : m_playout(playout), m_stream(stream), m_due(playout.m_clock.now()) {}
+        : m_playout(playout), m_stream(stream), m_due(playout.m_clock.now() - kHeadStart) {}
 
     void send() {
         while (sendFile()) {
@@ -154,7 +154,7 @@ private:
         m_ticksPerPacket = 0;
         size_t at = m_stream.findPcr(0);
         for (size_t index = 0; index < at; ++index) {
-            append(index);
+            append(index, m_due);
         }
         while (at < m_stream.count()) {
             const size_t next = m_stream.findPcr(at + 1);
@@ -179,16 +179,17 @@ private:
             const double share = static_cast<double>(index - begin) / static_cast<double>(end - begin);
             const Clock::Instant when =
                 m_due + durationOf(static_cast<int64_t>(share * static_cast<double>(gap)));
-            if (when > m_playout.m_clock.now()) {
+            const bool isEarly = when > m_playout.m_clock.now();
+            if (isEarly || (!m_batch.empty() && when - m_batchDue >= kStep)) {
                 flush();
-                if (isWithdrawnAt(std::max(when, m_playout.m_clock.now() + kStep))) {
-                    return false;
-                }
+            }
+            if (isEarly && isWithdrawnAt(std::max(when, m_playout.m_clock.now() + kStep))) {
+                return false;
             }
             if (m_stream.isPcrPid(pidOf(m_stream.packet(index)))) {
                 m_frames.add(m_stream.packet(index));
             }
-            append(index);
+            append(index, when);
         }
         m_due += durationOf(gap);
         m_elapsed += gap;
@@ -212,20 +213,23 @@ private:
         return gap;
     }
 
-    void append(size_t index) {
+    void append(size_t index, Clock::Instant due) {
         const uint8_t* packet = m_stream.packet(index);
         if (m_stream.passes(packet)) {
+            m_batchDue = m_batch.empty() ? due : m_batchDue;
             m_batch.insert(m_batch.end(), packet, packet + kPacketSize);
             m_restamper.restamp(m_batch.data() + m_batch.size() - kPacketSize);
         }
     }
 
     void flush() {
+        const Clock::Instant now = m_playout.m_clock.now();
+        const Clock::Duration age = m_batch.empty() ? Clock::Duration::zero() : now - m_batchDue;
         if (TableInjector* injector = m_stream.injector()) {
-            injector->appendDue(m_playout.m_clock.now(), m_playout.m_clock.utcSeconds(), m_batch);
+            injector->appendDue(now, m_playout.m_clock.utcSeconds(), m_batch);
         }
         if (!m_batch.empty()) {
-            m_playout.m_sink(m_batch.data(), m_batch.size());
+            m_playout.m_sink(m_batch.data(), m_batch.size(), age);
             m_batch.clear();
         }
     }
@@ -241,6 +245,7 @@ private:
     Restamper m_restamper;
     FrameCount m_frames;
     Bytes m_batch;               // packets that are due and not sent yet
+    Clock::Instant m_batchDue;   // of the first of them
     Clock::Instant m_due;        // of the packet with the PCR that was reached last
     int64_t m_elapsed = 0;       // 27 MHz, since the first PCR of this repetition
     double m_ticksPerPacket = 0; // between the last two PCRs

@@ -34,9 +34,9 @@ std::set<uint16_t> fedPidsOf(const Pmt& pmt) {
 
 } // namespace
 
-void Receiver::push(const uint8_t* packets, size_t size) {
+void Receiver::push(const uint8_t* packets, size_t size, Clock::Duration age) {
     std::lock_guard<std::mutex> lock(m_mutex);
-    const Clock::Instant now = m_clock.now();
+    const Clock::Instant arrival = m_clock.now() - age;
     if (!m_isFilteringTables) {
         m_isFilteringTables = true;
         m_sections.add(kPidPat);
@@ -46,14 +46,14 @@ void Receiver::push(const uint8_t* packets, size_t size) {
         const uint8_t* packet = packets + at;
         m_sections.push(packet);
         if (m_isKeeping) {
-            m_recent.push(packet, now);
+            m_recent.push(packet, arrival);
         }
         if (m_isFeeding && m_fedPids.count(pidOf(packet)) != 0) {
             m_batch.insert(m_batch.end(), packet, packet + kPacketSize);
         }
     }
     if (m_isFeeding && !m_batch.empty()) {
-        m_service->feed(m_batch, Clock::Duration::zero());
+        m_service->feed(m_batch, age);
         m_batch.clear();
     }
 }

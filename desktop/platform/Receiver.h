@@ -37,8 +37,8 @@ public:
     // `clock` must outlive the receiver.
     explicit Receiver(Clock& clock) : m_clock(clock) {}
 
-    // Takes packets of the multiplex. Playout thread.
-    void push(const uint8_t* packets, size_t size);
+    // Takes packets of the multiplex that arrived `age` ago. Playout thread.
+    void push(const uint8_t* packets, size_t size, Clock::Duration age);
 
     // Whether packets of all services are kept, so that a service that is selected is fed from its last
     // random access point on. Off at first.

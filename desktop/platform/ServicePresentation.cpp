@@ -1,6 +1,7 @@
 // The steps of a tune.
 #include "desktop/platform/ServicePresentation.h"
 
+#include <algorithm>
 #include <chrono>
 #include <cstdio>
 #include <mutex>
@@ -226,7 +227,8 @@ void ServicePresentation::startTuner(const Tune& tune, uint16_t serviceId) {
         m_pictureToken = token;
     }
     std::string error;
-    const Clock::Duration age = m_source.receiver().keptAge(serviceId);
+    // What has not arrived yet may be that old if the transmission begins now.
+    const Clock::Duration age = std::max(m_source.receiver().keptAge(serviceId), Playout::kHeadStart);
     if (!m_tuner->start(m_platform.picture(), token, age, error)) {
         fail(tune.id, kErrorNoSignal, error);
         return;

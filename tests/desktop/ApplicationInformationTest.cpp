@@ -281,7 +281,7 @@ protected:
 
     void push(const Bytes& section, uint16_t pid) {
         const Bytes packets = packetsOf(section, pid, m_continuity[pid]);
-        m_receiver.push(packets.data(), packets.size());
+        m_receiver.push(packets.data(), packets.size(), Clock::Duration::zero());
     }
 
     void pushPat() {

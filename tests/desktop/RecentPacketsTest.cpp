@@ -166,7 +166,9 @@ protected:
 
     void pushSection(const Bytes& section, uint16_t pid) { push(packetsOf(section, pid, m_continuity[pid])); }
 
-    void push(const Bytes& packets) { m_receiver.push(packets.data(), packets.size()); }
+    void push(const Bytes& packets, Clock::Duration age = Clock::Duration::zero()) {
+        m_receiver.push(packets.data(), packets.size(), age);
+    }
 
     void select() {
         Receiver::Service service;
@@ -220,6 +222,19 @@ TEST_F(ReceiverFeedTest, BeginsWithTheKeptPacketsAndGoesOnWithoutGap) {
     m_fed.clear();
     select(); // again: from the same random access point
     EXPECT_EQ(fedStreams(), joined({makeKeyframe(1), makePacket(kVideoPid, 2), makePacket(kAudioPid, 3)}));
+}
+
+TEST_F(ReceiverFeedTest, TellsHowLongAgoPacketsArrivedBeforeTheyWerePushed) {
+    push(makeKeyframe(1), milliseconds(400));
+    EXPECT_EQ(m_receiver.keptAge(kServiceId), milliseconds(400));
+    push(makePacket(kVideoPid, 2), milliseconds(360));
+    m_clock.advance(milliseconds(5));
+    select();
+    push(makePacket(kAudioPid, 3), milliseconds(320));
+    ASSERT_EQ(m_fed.size(), 3U);
+    EXPECT_EQ(m_fed[0].age, 405);
+    EXPECT_EQ(m_fed[1].age, 365);
+    EXPECT_EQ(m_fed[2].age, 320);
 }
 
 TEST_F(ReceiverFeedTest, BeginsWithTheNextPacketsIfNothingIsKept) {

@@ -127,7 +127,7 @@ private:
     void pushPacket() {
         Bytes packet = take(desktop::kPacketSize);
         packet.resize(desktop::kPacketSize, desktop::kStuffingByte);
-        m_receiver.push(packet.data(), packet.size());
+        m_receiver.push(packet.data(), packet.size(), desktop::Clock::Duration::zero());
     }
 
     // The CRC is appended, because no input would get past its check otherwise.
@@ -144,7 +144,7 @@ private:
             section.push_back(static_cast<uint8_t>(crc >> shift));
         }
         const Bytes packets = desktop::packetsOf(section, pid, m_continuity[pid]);
-        m_receiver.push(packets.data(), packets.size());
+        m_receiver.push(packets.data(), packets.size(), desktop::Clock::Duration::zero());
     }
 
     const uint8_t* m_at;
