@@ -21,6 +21,7 @@ from television import Television, temporary_folder  # noqa: E402
 
 ROUNDS = 9
 TIMEOUT = 60  # seconds, for each picture
+END_TIMEOUT = 5  # seconds
 INTERVAL = 0.001  # seconds between two looks at the screen
 SETTLED = 2  # seconds that a clip plays before the seek
 SIZE = '1280x720'
@@ -75,6 +76,16 @@ def wait_for(condition, what):
     return time.monotonic()
 
 
+def end(process):
+    """Ends a program; ffplay sometimes hangs when it is asked to end."""
+    process.terminate()
+    try:
+        process.communicate(timeout=END_TIMEOUT)
+    except subprocess.TimeoutExpired:
+        process.kill()
+        process.communicate()
+
+
 class Bench:
     """The display, and the server with the clip."""
 
@@ -116,8 +127,7 @@ class Bench:
                 self._television.press_key('Right')
                 return first, wait_for(lambda: self._shows(SECOND), 'picture after the seek') - begin
             finally:
-                process.terminate()
-                process.communicate()
+                end(process)
 
 
 def players(bench, engines, folder):
@@ -138,6 +148,15 @@ def players(bench, engines, folder):
                                                   SIZE.split('x', maxsplit=1)[0], '-y', SIZE.split('x')[1],
                                                   '-seek_interval', str(TARGET))
     return programs
+
+
+def measure_round(bench, programs, number):
+    """The seconds of each program once; they are printed as they come."""
+    times = {}
+    for name, start in programs.items():
+        times[name] = bench.measure(start)
+        print(f'round {number}: {name}: {times[name][0]:.3f} s, seek {times[name][1]:.3f} s', flush=True)
+    return times
 
 
 def report(name, times):
@@ -170,7 +189,7 @@ def main():
             # In turns, so that other load of the machine affects all.
             try:
                 programs = players(bench, engines, folder)
-                rounds = [{name: bench.measure(start) for name, start in programs.items()} for _ in range(ROUNDS)]
+                rounds = [measure_round(bench, programs, number) for number in range(1, ROUNDS + 1)]
             except Failure as failure:
                 sys.exit(f'clip_bench: {failure}')
     missed = [row for number, name in enumerate(('request to first picture', 'key to the picture after a seek'))
