@@ -230,7 +230,7 @@ void TunerArbiter::reportConnecting(const Tune& tune) {
 
 void TunerArbiter::reportPresenting(const Tune& tune) {
     if (tune.object != 0) {
-        changeState(tune.object, TELIX_PLAYSTATE_PRESENTING, TELIX_ERR_STATE_NONE);
+        reportOutcome(tune, TELIX_PLAYSTATE_PRESENTING, TELIX_ERR_STATE_NONE);
         m_callbacks.onChannelChange.call(tune.object, tune.channel);
     }
 }
@@ -244,7 +244,7 @@ void TunerArbiter::reportAborted(const Tune& tune) {
 void TunerArbiter::reportFailed(const Tune& tune, TELIX_ERR_STATE_ENUM_T error) {
     if (tune.object != 0) {
         m_callbacks.onChannelError.call(tune.object, tune.channel, error);
-        changeState(tune.object, TELIX_PLAYSTATE_UNREALIZED, error);
+        reportOutcome(tune, TELIX_PLAYSTATE_UNREALIZED, error);
     }
 }
 
@@ -260,6 +260,19 @@ void TunerArbiter::preemptLocked(TELIX_JS_VB_HANDLE object) {
 
 void TunerArbiter::reportPreempted(TELIX_JS_VB_HANDLE object) {
     changeState(object, TELIX_PLAYSTATE_STOPPED, TELIX_ERR_STATE_NONE);
+}
+
+// After a later request, which has set the state that it leads to, only the plug-in is told.
+void TunerArbiter::reportOutcome(const Tune& tune, TELIX_PLAYSTATE_ENUM_T state,
+                                 TELIX_ERR_STATE_ENUM_T error) {
+    {
+        std::lock_guard<std::mutex> lock(m_platform.mutex());
+        Object* found = findLocked(tune.object);
+        if (found && m_latestTune.id == tune.id) {
+            found->playState = state;
+        }
+    }
+    m_callbacks.onPlayState.call(tune.object, 0U, state, error);
 }
 
 void TunerArbiter::changeState(TELIX_JS_VB_HANDLE object, TELIX_PLAYSTATE_ENUM_T state,

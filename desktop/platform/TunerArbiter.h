@@ -125,6 +125,7 @@ private:
     bool end(TELIX_JS_VB_HANDLE object, TELIX_PLAYSTATE_ENUM_T state);
     void selectLocked(TELIX_JS_CM_HANDLE channel);
     void requestLocked(TELIX_JS_VB_HANDLE object, TELIX_JS_CM_HANDLE channel);
+    void reportOutcome(const Tune& tune, TELIX_PLAYSTATE_ENUM_T state, TELIX_ERR_STATE_ENUM_T error);
     void changeState(TELIX_JS_VB_HANDLE object, TELIX_PLAYSTATE_ENUM_T state, TELIX_ERR_STATE_ENUM_T error);
 
     Platform& m_platform;

@@ -48,6 +48,14 @@ TELIX_RETCODE_ENUM_T onState(TELIX_JS_VB_HANDLE object, uint32_t, TELIX_PLAYSTAT
                              TELIX_ERR_STATE_ENUM_T error) {
     return events.add({"state", object, state, error, ""});
 }
+// Stops as soon as the tune begins.
+TELIX_RETCODE_ENUM_T stopWhenConnecting(TELIX_JS_VB_HANDLE object, uint32_t session,
+                                        TELIX_PLAYSTATE_ENUM_T state, TELIX_ERR_STATE_ENUM_T error) {
+    if (state == TELIX_PLAYSTATE_CONNECTING) {
+        EXPECT_EQ(TELIX_JS_VB_Stop(object), 0);
+    }
+    return onState(object, session, state, error);
+}
 TELIX_RETCODE_ENUM_T onProgrammes(TELIX_JS_VB_HANDLE object) {
     return events.add({"programmes", object, 0, 0, ""});
 }
@@ -312,6 +320,27 @@ TEST_F(BroadcastTest, KeepsThePictureFromAnObjectToTheSetAndToTheNextObject) {
     TELIX_PLAYSTATE_ENUM_T state = TELIX_PLAYSTATE_PRESENTING;
     EXPECT_EQ(TELIX_JS_VB_GetPlayBackState(next, &state), 0);
     EXPECT_EQ(state, TELIX_PLAYSTATE_UNREALIZED);
+}
+
+TEST_F(BroadcastTest, AStopStaysInForceWhateverTheTuneBeforeItReports) {
+    tune(m_channels[0]);
+    TELIX_JS_VB_HANDLE next = 0;
+    ASSERT_EQ(TELIX_JS_VB_GetHandle(&next), 0);
+    TELIX_JS_VB_RegisterOnPlayStateChange(stopWhenConnecting);
+    events.clear();
+    ASSERT_EQ(TELIX_JS_VB_BindToCurrChannel(next), 0); // takes over a picture that is there already
+    ASSERT_TRUE(waitUntil([&] {
+        const auto states = ofKind("state");
+        return !states.empty() && states.back().object == next &&
+               states.back().first == TELIX_PLAYSTATE_STOPPED;
+    }));
+    flushPlatformThread();
+    TELIX_PLAYSTATE_ENUM_T state = 0;
+    EXPECT_EQ(TELIX_JS_VB_GetPlayBackState(next, &state), 0);
+    EXPECT_EQ(state, TELIX_PLAYSTATE_STOPPED);
+    EXPECT_FALSE(takeShot().visible);
+    TELIX_JS_VB_UnRegisterOnPlayStateChange(stopWhenConnecting);
+    TELIX_JS_VB_Release(next);
 }
 
 TEST_F(BroadcastTest, SelectsTheDefaultAudioForTheNextObject) {
