@@ -151,13 +151,13 @@ WebKitWebView* Engine::newView(WebKitWebView* related) const {
 }
 
 void Engine::watchBackgrounds() {
-    const auto onMessage = +[](WebKitUserContentManager*, WebKitJavascriptResult*, gpointer engine) {
-        if (const auto& onTransparentPage = static_cast<Engine*>(engine)->m_onTransparentPage) {
-            onTransparentPage();
+    const auto onMessage = +[](WebKitUserContentManager*, WebKitJavascriptResult* message, gpointer engine) {
+        if (const auto& onBackground = static_cast<Engine*>(engine)->m_onBackground) {
+            onBackground(jsc_value_to_boolean(webkit_javascript_result_get_js_value(message)));
         }
     };
-    g_signal_connect(m_content, "script-message-received::transparentPage", G_CALLBACK(onMessage), this);
-    webkit_user_content_manager_register_script_message_handler_in_world(m_content, "transparentPage",
+    g_signal_connect(m_content, "script-message-received::background", G_CALLBACK(onMessage), this);
+    webkit_user_content_manager_register_script_message_handler_in_world(m_content, "background",
                                                                          kBackgroundWorld);
     WebKitUserScript* script = webkit_user_script_new_for_world(
         pageScriptCall("transparentpage", {}).c_str(), WEBKIT_USER_CONTENT_INJECT_TOP_FRAME,

@@ -41,9 +41,10 @@ public:
     // or null. One process for all applications of a window: the platform library is in it.
     WebKitWebView* newView(WebKitWebView* related) const;
 
-    // Called when a page that lets the video plane be seen is visible, see scripts/transparentpage.js.
-    void setOnTransparentPage(std::function<void()> onTransparentPage) {
-        m_onTransparentPage = std::move(onTransparentPage);
+    // Called with what is seen first of the background of a visible page, and when it becomes transparent,
+    // see scripts/transparentpage.js.
+    void setOnBackground(std::function<void(bool isTransparent)> onBackground) {
+        m_onBackground = std::move(onBackground);
     }
     // Lets the video plane show through a view. Without a GPU a view begins without OpenGL and opaque,
     // because without OpenGL the engine leaves in the window what a page has drawn where it becomes
@@ -60,7 +61,7 @@ private:
     const bool m_isAutomated;
     const bool m_isStrict;
     std::function<TelevisionStart()> m_start;
-    std::function<void()> m_onTransparentPage;
+    std::function<void(bool isTransparent)> m_onBackground;
     int m_soundDescriptor = -1;
     WebKitWebContext* m_context;
     WebKitSettings* m_settings;

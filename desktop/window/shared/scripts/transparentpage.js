@@ -1,8 +1,9 @@
 // Tells when a page lets the video plane be seen, because its background is not opaque. Runs in a script world of its own, so
 // that nothing the page does to its script objects matters here.
 //
-// Is called when a document has been parsed. Posts a message to the handler transparentPage once, as soon as the document is
-// visible and transparent, and looks no longer then. What is not known to be opaque counts as transparent.
+// Is called when a document has been parsed. Posts to the handler named background, as soon as the document is visible, whether
+// it is transparent; if not, posts true when it is, and looks no longer then. What is not known to be opaque counts as
+// transparent.
 (function () {
     'use strict';
 
@@ -29,13 +30,22 @@
             });
     }
 
+    var isPosted = false;
+
     function check() {
-        if (!document.hidden && document.documentElement && isStyled() && isTransparent()) {
+        if (document.hidden || !document.documentElement || !isStyled()) {
+            return;
+        }
+        var isSeenThrough = isTransparent();
+        if (isSeenThrough) {
             observer.disconnect();
             window.clearInterval(interval);
             document.removeEventListener('visibilitychange', check);
             window.removeEventListener('load', check);
-            window.webkit.messageHandlers.transparentPage.postMessage(null);
+        }
+        if (isSeenThrough || !isPosted) {
+            isPosted = true;
+            window.webkit.messageHandlers.background.postMessage(isSeenThrough);
         }
     }
 
