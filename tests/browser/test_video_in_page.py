@@ -227,8 +227,14 @@ class VideoInPage(VideoPlanePages):
         def has_opengl(process):
             return any('libGLESv2' in pathlib.Path(f'/proc/{each}/maps').read_text(encoding='utf-8')
                        for each in web_processes(process))
-        page = self.on_grey(script="onkeydown = function () { document.body.style.background = 'transparent' }")
+        # The picture comes when the page is there: the other way round OpenGL would begin with it.
+        page = self.on_grey(frame='16, 9, 0', script="""steps = [
+            function () { tv.setChannelByTriplet(16, 9, 1); },
+            function () { document.body.style.background = 'transparent'; }];
+            onkeydown = function () { steps.shift()(); }""")
         with self.running(page) as process:
+            self.wait_for_colours(self.around(GREY))
+            self.television.press_key('Return')
             self.wait_for_colours({**self.quadrants(), **self.around(GREY)})
             self.assertFalse(has_opengl(process))
             self.television.press_key('Return')
