@@ -232,9 +232,18 @@ class Process(subprocess.Popen):
 
 def web_processes(process):
     """The ids of the web processes of a telix-tv, also of one that is still being removed after its end."""
+    # It fails if there are none.
     children = subprocess.run(['ps', '--ppid', str(process.pid), '-o', 'pid=,comm='], stdout=subprocess.PIPE, text=True,
-                              check=True).stdout
+                              check=False).stdout
     return [int(line.split()[0]) for line in children.splitlines() if 'WebKitWeb' in line]
+
+
+def has_opengl(process):
+    """Whether a web process of a telix-tv has loaded OpenGL."""
+    def maps(pid):
+        with open(f'/proc/{pid}/maps', encoding='utf-8') as file:
+            return file.read()
+    return any('libGLESv2' in maps(pid) for pid in web_processes(process))
 
 
 class Run:

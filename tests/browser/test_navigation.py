@@ -1,11 +1,16 @@
-"""The picture of the channel while an application goes from one page to another, as a recording has it."""
+"""The picture of the channel while an application begins and while it goes from one page to another, as a recording has it."""
 
+import glob
+import http.server
 import os
 import subprocess
+import threading
+import time
 import unittest
 
-from telix_tv import TelixTv
-from television import RUN_TIMEOUT
+from patterns import is_striped
+from telix_tv import GREEN, TelixTv
+from television import RUN_TIMEOUT, Lines, has_opengl, wait_for
 
 PLUGIN = os.environ['TELIX_DESKTOP_PLUGIN']
 NAVIGATIONS = 6
@@ -29,6 +34,13 @@ PAGE = '''<!DOCTYPE html><html><head><title>%(title)s</title><style>
         tv.bindToCurrentChannel();
     };
 </script></body></html>'''
+# A page that comes in two parts. Without a background of its own the channel shows through it.
+SLOW_BEGINNING = '<!DOCTYPE html><html><head><title>slow</title></head>'
+SLOW_END = '''<body style="margin: 0; background: %s"><div style="position: absolute; left: 1080px; top: 620px; width: 200px;
+    height: 100px; background: rgb(0, 128, 0)"></div><script>onload = function () {
+        setTimeout(function () { console.log("there") }, 1000);
+    };</script></body></html>'''
+SLOWNESS = 2.5  # seconds between the parts; the longer, the surer a frame shows what is wrong in between
 # The frames are looked at in this size. A point of it is 20 by 20 pixels of the page.
 WIDTH, HEIGHT = 64, 36
 # The stripes of the first channel, of which something moving covers a part, and the badge.
@@ -43,6 +55,107 @@ def is_near(colour, expected):
     return all(abs(part - other) < TOLERANCE for part, other in zip(colour, expected))
 
 
+def frames_of(recording):
+    """The frames of a recording, as functions of a point."""
+    data = subprocess.run(['ffmpeg', '-v', 'error', '-i', recording, '-vf', f'scale={WIDTH}:{HEIGHT}:flags=area',
+                           '-f', 'rawvideo', '-pix_fmt', 'rgb24', '-'], stdin=subprocess.DEVNULL,
+                          capture_output=True, check=True, timeout=RUN_TIMEOUT).stdout
+    size = 3 * WIDTH * HEIGHT
+
+    def frame_at(start):
+        def colour(point):
+            offset = start + 3 * (point[1] * WIDTH + point[0])
+            return tuple(data[offset:offset + 3])
+        return colour
+    return [frame_at(start) for start in range(0, len(data), size)]
+
+
+def columns(frame):
+    """The median colours of the columns of the stripes."""
+    def median(values):
+        return sorted(values)[len(values) // 2]
+    return {x: tuple(median([frame((x, y))[part] for y in ROWS]) for part in range(3)) for x in STRIPES}
+
+
+def shows_channel(frame):
+    colours = columns(frame)
+    return all(is_near(colours[x], stripe) for x, stripe in STRIPES.items())
+
+
+class SlowPage(http.server.BaseHTTPRequestHandler):
+    """Serves the server's `parts` of a document, with a pause between them."""
+
+    def do_GET(self):  # pylint: disable=invalid-name
+        self.send_response(200)
+        self.send_header('Content-Type', 'text/html')
+        self.end_headers()
+        beginning, end = self.server.parts
+        try:
+            self.wfile.write(beginning.encode())
+            time.sleep(SLOWNESS)
+            self.wfile.write(end.encode())
+        except ConnectionError:
+            pass
+
+    def log_message(self, *_):
+        pass
+
+
+class FirstPage(TelixTv):
+    """An application begins while the channel is on."""
+
+    def open_over_channel(self, url):
+        """Opens the page while the channel is on and returns, when it is there, the frames from the first one of the channel
+        on, and whether the engine uses OpenGL."""
+        recording = os.path.join(self.folder, 'run.mp4')
+        process = self.television.start('--plugin', PLUGIN, '--record', recording)
+        self.addCleanup(process.__exit__, None, None, None)
+        self.addCleanup(process.kill)
+        messages = Lines(process.stderr)
+        wait_for(lambda: is_striped(self.television.screen()), 'no channel')
+        self.television.telixctl('open', url)
+        self.assertTrue(messages.wait_for('there'), messages.lines)
+        uses_opengl = has_opengl(process)
+        process.terminate()
+        process.wait(timeout=RUN_TIMEOUT)
+        frames = frames_of(recording)
+        return frames[[shows_channel(frame) for frame in frames].index(True):], uses_opengl
+
+    def serve(self, background):
+        """Serves the slow page; returns its URL."""
+        server = http.server.ThreadingHTTPServer(('127.0.0.1', 0), SlowPage)
+        server.parts = SLOW_BEGINNING, SLOW_END % background
+        thread = threading.Thread(target=server.serve_forever)
+        thread.start()
+        self.addCleanup(thread.join)
+        self.addCleanup(server.server_close)
+        self.addCleanup(server.shutdown)
+        return f'http://127.0.0.1:{server.server_port}/'
+
+    def test_the_channel_stays_under_a_transparent_page(self):
+        frames, _ = self.open_over_channel(self.serve('transparent'))
+        self.assertEqual([(index, columns(frame)) for index, frame in enumerate(frames) if not shows_channel(frame)], [])
+        self.assertTrue(is_near(frames[-1](BADGE), GREEN))
+
+    def assert_channel_then_green(self, frames):
+        is_green = [all(is_near(colour, GREEN) for colour in columns(frame).values()) for frame in frames]
+        first = is_green.index(True)
+        self.assertEqual([(index, columns(frame)) for index, frame in enumerate(frames[:first])
+                          if not shows_channel(frame)], [])
+        self.assertEqual(is_green[first:], [True] * (len(frames) - first))
+
+    def test_the_channel_stays_until_an_opaque_page_is_there(self):
+        frames, _ = self.open_over_channel(self.serve('rgb(0, 128, 0)'))
+        self.assert_channel_then_green(frames)
+
+    @unittest.skipIf(glob.glob('/dev/dri/renderD*'), 'the engine uses OpenGL from the start')
+    def test_an_opaque_page_needs_no_opengl(self):
+        page = self.write(SLOW_BEGINNING + SLOW_END % 'rgb(0, 128, 0)', 'opaque.html')
+        frames, uses_opengl = self.open_over_channel(page)
+        self.assert_channel_then_green(frames)
+        self.assertFalse(uses_opengl)
+
+
 class Navigation(TelixTv):
     def setUp(self):
         super().setUp()
@@ -51,40 +164,19 @@ class Navigation(TelixTv):
                                'colour': 'rgb(%d, %d, %d)' % COLOURS[title]}, f'{title}.html')
 
     def recorded_frames(self):
-        """The frames of a run through all pages, as functions of a point."""
+        """The frames of a run through all pages."""
         file_name = os.path.join(self.folder, 'run.mp4')
         run = self.television.run('--plugin', PLUGIN, '--record', file_name, '--wait-for', 'window.done',
                                   f'file://{self.folder}/first.html?0')
         self.assertEqual((run.status, run.errors), (0, ''), run)
-        data = subprocess.run(['ffmpeg', '-v', 'error', '-i', file_name, '-vf', f'scale={WIDTH}:{HEIGHT}:flags=area',
-                               '-f', 'rawvideo', '-pix_fmt', 'rgb24', '-'], stdin=subprocess.DEVNULL,
-                              capture_output=True, check=True, timeout=RUN_TIMEOUT).stdout
-        size = 3 * WIDTH * HEIGHT
-
-        def frame_at(start):
-            def colour(point):
-                offset = start + 3 * (point[1] * WIDTH + point[0])
-                return tuple(data[offset:offset + 3])
-            return colour
-        return [frame_at(start) for start in range(0, len(data), size)]
-
-    @staticmethod
-    def columns(frame):
-        """The median colours of the columns of the stripes."""
-        def median(values):
-            return sorted(values)[len(values) // 2]
-        return {x: tuple(median([frame((x, y))[part] for y in ROWS]) for part in range(3)) for x in STRIPES}
-
-    def shows_channel(self, frame):
-        columns = self.columns(frame)
-        return all(is_near(columns[x], stripe) for x, stripe in STRIPES.items())
+        return frames_of(file_name)
 
     def test_no_frame_is_without_the_channel_from_the_first_page_to_the_last(self):
         frames = self.recorded_frames()
-        shown = [self.shows_channel(frame) for frame in frames]
+        shown = [shows_channel(frame) for frame in frames]
         self.assertIn(True, shown)
         start = shown.index(True)
-        without = [(index, self.columns(frame)) for index, frame in enumerate(frames)
+        without = [(index, columns(frame)) for index, frame in enumerate(frames)
                    if index > start and not shown[index]]
         self.assertEqual(without, [], f'of {len(frames)} frames from {start} on')
         # The recording has both pages, and the channel under them.

@@ -16,9 +16,6 @@ namespace desktop {
 
 class Engine;
 
-// A page without anything.
-constexpr char kEmptyPage[] = "about:blank";
-
 // Main thread. Callbacks are not called after the destruction, and in it only where the function says so.
 class Application {
 public:
@@ -53,9 +50,6 @@ public:
     void load(const std::string& url) { webkit_web_view_load_uri(m_view, url.c_str()); }
     // Whether a document is loaded and no other is being loaded.
     bool isLoaded() const { return m_isLoaded; }
-    // Whether the background of a document has been seen to be transparent or opaque.
-    bool isBackgroundKnown() const { return m_isBackgroundKnown; }
-    void setBackgroundKnown() { m_isBackgroundKnown = true; }
     // Whether there is a document, even if the next one is being loaded or could not be loaded.
     bool hasDocument() const { return m_hasDocument; }
 
@@ -115,7 +109,6 @@ private:
     // What the destructor calls.
     OnGone m_onGone;
     bool m_isLoaded = false;
-    bool m_isBackgroundKnown = false;
     bool m_hasDocument = false;
     bool m_isOnTop = false;
     bool m_isShown = true;

@@ -19,7 +19,8 @@ namespace {
 constexpr char kWindowStyle[] = "::-webkit-scrollbar { display: none !important; }\n";
 
 constexpr GdkRGBA kTransparent{0, 0, 0, 0};
-constexpr GdkRGBA kBlack{0, 0, 0, 1};
+// Looks the same. The engine begins with OpenGL when it draws a page again, as for another background.
+constexpr GdkRGBA kTransparentWhite{1, 1, 1, 0};
 // The script world of scripts/transparentpage.js.
 constexpr char kBackgroundWorld[] = "telix-tv-background";
 
@@ -144,31 +145,29 @@ WebKitWebView* Engine::newView(WebKitWebView* related) const {
                                                m_settings, "user-content-manager", m_content,
                                                "is-controlled-by-automation", m_isAutomated, nullptr));
     // Where a page has no background, the video plane shows through.
-    const bool isOpaque = webkit_settings_get_hardware_acceleration_policy(m_settings) ==
-                          WEBKIT_HARDWARE_ACCELERATION_POLICY_NEVER;
-    webkit_web_view_set_background_color(view, isOpaque ? &kBlack : &kTransparent);
+    webkit_web_view_set_background_color(view, &kTransparent);
     return view;
 }
 
 void Engine::watchBackgrounds() {
-    const auto onMessage = +[](WebKitUserContentManager*, WebKitJavascriptResult* message, gpointer engine) {
-        if (const auto& onBackground = static_cast<Engine*>(engine)->m_onBackground) {
-            onBackground(jsc_value_to_boolean(webkit_javascript_result_get_js_value(message)));
+    const auto onMessage = +[](WebKitUserContentManager*, WebKitJavascriptResult*, gpointer engine) {
+        if (const auto& onTransparentPage = static_cast<Engine*>(engine)->m_onTransparentPage) {
+            onTransparentPage();
         }
     };
-    g_signal_connect(m_content, "script-message-received::background", G_CALLBACK(onMessage), this);
-    webkit_user_content_manager_register_script_message_handler_in_world(m_content, "background",
+    g_signal_connect(m_content, "script-message-received::transparentPage", G_CALLBACK(onMessage), this);
+    webkit_user_content_manager_register_script_message_handler_in_world(m_content, "transparentPage",
                                                                          kBackgroundWorld);
     WebKitUserScript* script = webkit_user_script_new_for_world(
-        pageScriptCall("transparentpage", {}).c_str(), WEBKIT_USER_CONTENT_INJECT_TOP_FRAME,
+        pageScriptCall("transparentpage", {kEmptyPage}).c_str(), WEBKIT_USER_CONTENT_INJECT_TOP_FRAME,
         WEBKIT_USER_SCRIPT_INJECT_AT_DOCUMENT_END, kBackgroundWorld, nullptr, nullptr);
     webkit_user_content_manager_add_script(m_content, script);
     webkit_user_script_unref(script);
 }
 
-void Engine::makeTransparent(WebKitWebView* view) const {
+void Engine::useOpenGl(WebKitWebView* view) const {
     webkit_settings_set_hardware_acceleration_policy(m_settings, WEBKIT_HARDWARE_ACCELERATION_POLICY_ALWAYS);
-    webkit_web_view_set_background_color(view, &kTransparent);
+    webkit_web_view_set_background_color(view, &kTransparentWhite);
 }
 
 // Emitted after each start of a web process, which waits for the data.

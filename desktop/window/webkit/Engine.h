@@ -19,6 +19,9 @@ class WebProcessOutput;
 struct CommandLine;
 struct EngineInformation;
 
+// The window's own page without anything.
+constexpr char kEmptyPage[] = "about:blank";
+
 // The engine's versions and user agent. Needs no display.
 EngineInformation engineInformation();
 
@@ -41,15 +44,14 @@ public:
     // or null. One process for all applications of a window: the platform library is in it.
     WebKitWebView* newView(WebKitWebView* related) const;
 
-    // Called with what is seen first of the background of a visible page, and when it becomes transparent,
-    // see scripts/transparentpage.js.
-    void setOnBackground(std::function<void(bool isTransparent)> onBackground) {
-        m_onBackground = std::move(onBackground);
+    // Called when a page that lets the video plane be seen is visible, see scripts/transparentpage.js.
+    void setOnTransparentPage(std::function<void()> onTransparentPage) {
+        m_onTransparentPage = std::move(onTransparentPage);
     }
-    // Lets the video plane show through a view. Without a GPU a view begins without OpenGL and opaque,
-    // because without OpenGL the engine leaves in the window what a page has drawn where it becomes
-    // transparent. The engine starts to use OpenGL at any time, but does not cease to.
-    void makeTransparent(WebKitWebView* view) const;
+    // Uses OpenGL from now on, which a view without a GPU begins without: without it the engine leaves in the
+    // window what a page has drawn where it becomes transparent. The engine starts to use OpenGL at any time,
+    // but does not cease to.
+    void useOpenGl(WebKitWebView* view) const;
 
 private:
     void onInitializeExtensions(WebKitWebContext* context);
@@ -61,7 +63,7 @@ private:
     const bool m_isAutomated;
     const bool m_isStrict;
     std::function<TelevisionStart()> m_start;
-    std::function<void(bool isTransparent)> m_onBackground;
+    std::function<void()> m_onTransparentPage;
     int m_soundDescriptor = -1;
     WebKitWebContext* m_context;
     WebKitSettings* m_settings;

@@ -6,7 +6,6 @@
 struct TelixScaledBin {
     GtkBin parent;
     GdkWindow* offscreen;
-    gboolean isShown;
 };
 
 struct TelixScaledBinClass {
@@ -128,7 +127,7 @@ void addChild(GtkContainer* container, GtkWidget* child) {
 gboolean draw(GtkWidget* widget, cairo_t* context) {
     GdkWindow* offscreen = self(widget)->offscreen;
     const bool isOwn = gtk_cairo_should_draw_window(context, gtk_widget_get_window(widget));
-    if (isOwn && self(widget)->isShown) {
+    if (isOwn) {
         cairo_save(context);
         cairo_scale(context, scaleX(widget), scaleY(widget));
         cairo_set_source_surface(context, gdk_offscreen_window_get_surface(offscreen), 0, 0);
@@ -167,16 +166,10 @@ GtkWidget* newScaledBin() {
     return GTK_WIDGET(g_object_new(telix_scaled_bin_get_type(), nullptr));
 }
 
-void setScaledBinShown(GtkWidget* bin, bool isShown) {
-    self(bin)->isShown = isShown;
-    gtk_widget_queue_draw(bin);
-}
-
 } // namespace desktop
 
 static void telix_scaled_bin_init(TelixScaledBin* bin) {
     gtk_widget_set_has_window(GTK_WIDGET(bin), TRUE);
-    bin->isShown = TRUE;
 }
 
 static void telix_scaled_bin_class_init(TelixScaledBinClass* type) {

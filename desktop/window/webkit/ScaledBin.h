@@ -11,9 +11,6 @@ namespace desktop {
 // container. Pointer positions are scaled back.
 GtkWidget* newScaledBin();
 
-// Whether the container shows its child. The child's state is the same either way.
-void setScaledBinShown(GtkWidget* bin, bool isShown);
-
 } // namespace desktop
 
 #endif

@@ -112,8 +112,11 @@ TvWindow::TvWindow(Engine& engine, PageChannel& channel, const CommandLine& comm
     gtk_window_set_title(GTK_WINDOW(m_window), kTitle);
     gtk_container_add(GTK_CONTAINER(m_window), m_overlay);
     gtk_container_add(GTK_CONTAINER(m_overlay), newBlackArea());
-    engine.setOnBackground([this](bool isTransparent) { onBackground(isTransparent); });
-    m_video.setOnChange([this] { keepPicture(); });
+    engine.setOnTransparentPage([this] {
+        for (const auto& application : m_applications) {
+            m_engine.useOpenGl(application->view());
+        }
+    });
     m_video.showFramesOf(engine.context());
     gtk_overlay_add_overlay(GTK_OVERLAY(m_overlay), m_video.widget());
     gtk_overlay_add_overlay(GTK_OVERLAY(m_overlay), m_display.widget());
@@ -153,7 +156,7 @@ TvWindow::~TvWindow() {
     g_object_unref(m_calls);
     m_channel.setHandler(nullptr);
     m_engine.setTelevisionStart(nullptr);
-    m_engine.setOnBackground(nullptr);
+    m_engine.setOnTransparentPage(nullptr);
     m_stack.clear();
     for (const auto& application : m_applications) {
         application->forgetCalls();
@@ -429,31 +432,6 @@ void TvWindow::onLoadFailed(Application& application, const std::string& url, co
 
 void TvWindow::onCommitted(Application& application) {
     m_television.warnings().forget(&application);
-    keepPicture();
-}
-
-void TvWindow::onBackground(bool isTransparent) {
-    if (Application* top = m_stack.top()) {
-        top->setBackgroundKnown();
-    }
-    if (isTransparent) {
-        makeTransparent();
-    }
-}
-
-void TvWindow::makeTransparent() {
-    for (const auto& application : m_applications) {
-        m_engine.makeTransparent(application->view());
-    }
-}
-
-// A new page over a picture that is there already would cover it until it is known to be transparent and
-// OpenGL has begun.
-void TvWindow::keepPicture() {
-    const Application* top = m_stack.top();
-    if (top && !top->isBackgroundKnown() && m_video.hasFrame()) {
-        makeTransparent();
-    }
 }
 
 void TvWindow::onCrashed(Application& application, WebKitWebProcessTerminationReason reason) {

@@ -85,9 +85,6 @@ private:
     void removeFrom(const Application& lowest);
     void createApplication(uint64_t caller, const std::string& url, const PageChannel::Reply& reply);
     bool onMessage(WebKitUserMessage& message);
-    void onBackground(bool isTransparent);
-    void makeTransparent();
-    void keepPicture();
     void onWarning(uint64_t page, const std::string& name, const std::string& subject);
     bool onKey(const GdkEventKey& event);
     Television::Library libraryCalls();

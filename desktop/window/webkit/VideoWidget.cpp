@@ -42,7 +42,6 @@ public:
     void showFramesOf(WebKitWebContext* context);
     void dropFrames();
     bool hasFrame() const { return frame().visible != 0; }
-    void setOnChange(std::function<void()> onChange) { m_onChange = std::move(onChange); }
     void paint(cairo_t* context, int width, int height) const;
 
 private:
@@ -61,7 +60,6 @@ private:
     void replaceReader(std::unique_ptr<FrameReader> reader);
     void takeNewestFrame();
     void repaint(const PixelRect& area);
-    void notifyChange();
 
     GtkWidget* m_widget;                   // owns a reference
     WebKitWebContext* m_context = nullptr; // owns a reference
@@ -70,7 +68,6 @@ private:
     guint m_watch = 0;
     uint64_t m_pagePresenter = 0;         // whose video the page shows; 0: none
     std::unique_ptr<GlPainter> m_painter; // null: paint with cairo
-    std::function<void()> m_onChange;
 };
 
 // ---- The widget
@@ -83,7 +80,6 @@ VideoWidget::Private::Private() : m_widget(gtk_drawing_area_new()) {
 }
 
 VideoWidget::Private::~Private() {
-    m_onChange = nullptr;
     replaceReader(nullptr);
     if (m_context) {
         g_signal_handler_disconnect(m_context, m_messageHandler);
@@ -184,7 +180,6 @@ void VideoWidget::Private::leaveToPage(uint64_t presenter) {
     }
     repaint(before);
     repaint(areaInWidget());
-    notifyChange();
 }
 
 void VideoWidget::Private::dropFrames() {
@@ -210,7 +205,6 @@ void VideoWidget::Private::replaceReader(std::unique_ptr<FrameReader> reader) {
     }
     repaint(before);
     repaint(areaInWidget());
-    notifyChange();
 }
 
 gboolean VideoWidget::Private::onPublished(gint, GIOCondition, gpointer self) {
@@ -228,18 +222,11 @@ void VideoWidget::Private::takeNewestFrame() {
     }
     repaint(before);
     repaint(now);
-    notifyChange();
 }
 
 void VideoWidget::Private::repaint(const PixelRect& area) {
     if (!area.isEmpty()) {
         gtk_widget_queue_draw_area(m_widget, area.x, area.y, area.width, area.height);
-    }
-}
-
-void VideoWidget::Private::notifyChange() {
-    if (m_onChange) {
-        m_onChange();
     }
 }
 
@@ -259,9 +246,6 @@ void VideoWidget::dropFrames() {
 }
 bool VideoWidget::hasFrame() const {
     return m_private->hasFrame();
-}
-void VideoWidget::setOnChange(std::function<void()> onChange) {
-    m_private->setOnChange(std::move(onChange));
 }
 void VideoWidget::paint(cairo_t* context, int width, int height) const {
     m_private->paint(context, width, height);

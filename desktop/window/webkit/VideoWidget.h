@@ -5,7 +5,6 @@
 #include <gtk/gtk.h>
 #include <webkit2/webkit2.h>
 
-#include <functional>
 #include <memory>
 
 #include "desktop/platform/telix_picture.h"
@@ -34,9 +33,6 @@ public:
 
     // Whether a frame is shown.
     bool hasFrame() const;
-
-    // Called after each change of frame or place.
-    void setOnChange(std::function<void()> onChange);
 
     // Paints the video, black around it, into a rectangle of that size at the origin of `context`: for
     // screenshots and recordings.

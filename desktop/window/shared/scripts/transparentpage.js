@@ -1,10 +1,10 @@
 // Tells when a page lets the video plane be seen, because its background is not opaque. Runs in a script world of its own, so
 // that nothing the page does to its script objects matters here.
 //
-// Is called when a document has been parsed. Posts to the handler named background, as soon as the document is visible, whether
-// it is transparent; if not, posts true when it is, and looks no longer then. What is not known to be opaque counts as
-// transparent.
-(function () {
+// Is called when a document has been parsed. Posts a message to the handler transparentPage once, as soon as the document is
+// visible and transparent, and looks no longer then. What is not known to be opaque counts as transparent. `emptyPage`: the URL
+// of the window's own page, which nothing is drawn in.
+(function (emptyPage) {
     'use strict';
 
     var checkInterval = 1000; // milliseconds, for changes that nothing reports, such as those of style sheets
@@ -30,25 +30,19 @@
             });
     }
 
-    var isPosted = false;
-
     function check() {
-        if (document.hidden || !document.documentElement || !isStyled()) {
-            return;
-        }
-        var isSeenThrough = isTransparent();
-        if (isSeenThrough) {
+        if (!document.hidden && document.documentElement && isStyled() && isTransparent()) {
             observer.disconnect();
             window.clearInterval(interval);
             document.removeEventListener('visibilitychange', check);
             window.removeEventListener('load', check);
-        }
-        if (isSeenThrough || !isPosted) {
-            isPosted = true;
-            window.webkit.messageHandlers.background.postMessage(isSeenThrough);
+            window.webkit.messageHandlers.transparentPage.postMessage(null);
         }
     }
 
+    if (document.URL === emptyPage) {
+        return;
+    }
     var observer = new MutationObserver(check);
     var interval = window.setInterval(check, checkInterval);
     [document.documentElement, document.body].forEach(function (node) {
