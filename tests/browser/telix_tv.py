@@ -12,6 +12,7 @@ from television import PngImage, Television, temporary_folder
 PAGES = os.path.join(os.path.dirname(os.path.abspath(__file__)), 'pages')
 PLUGIN = os.environ['TELIX_PLUGIN']
 IS_NPAPI = os.environ['TELIX_ENGINE'] == 'npapi'  # else WebKitGTK
+SLOWNESS = 2.5  # seconds between the parts of /slow; the longer, the surer a test sees what is wrong in between
 BLACK, GREEN, BLUE = (0, 0, 0), (0, 128, 0), (0, 0, 255)
 
 # The keys of the remote control with their key codes in pages.
@@ -76,7 +77,8 @@ class TelixTv(unittest.TestCase):
 
 class Server(http.server.BaseHTTPRequestHandler):
     """/page: a page. /error: status 404. /silence: no response. /elsewhere: a redirection. /as/TYPE: the server's
-    `document` with that content type. Records the user agents of the requests."""
+    `document` with that content type. /slow: the document as a page, with a pause before its body. Records the user agents
+    of the requests."""
 
     def do_GET(self):  # pylint: disable=invalid-name
         self.server.agents.append(self.headers['User-Agent'])
@@ -85,6 +87,16 @@ class Server(http.server.BaseHTTPRequestHandler):
             self.send_header('Content-Type', urllib.parse.unquote(self.path[len('/as/'):]))
             self.end_headers()
             self.wfile.write(self.server.document)
+            return
+        if self.path == '/slow':
+            self.send_response(200)
+            self.send_header('Content-Type', 'text/html')
+            self.end_headers()
+            body = self.server.document.index(b'<body')
+            with contextlib.suppress(ConnectionError):
+                self.wfile.write(self.server.document[:body])
+                self.server.closing.wait(SLOWNESS)
+                self.wfile.write(self.server.document[body:])
             return
         if self.path == '/silence':
             self.server.closing.wait()

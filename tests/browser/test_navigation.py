@@ -1,15 +1,13 @@
 """The picture of the channel while an application begins and while it goes from one page to another, as a recording has it."""
 
 import glob
-import http.server
 import os
 import subprocess
-import threading
 import time
 import unittest
 
 from patterns import is_striped
-from telix_tv import GREEN, TelixTv
+from telix_tv import GREEN, TelixTv, running_server
 from television import RUN_TIMEOUT, has_opengl, wait_for
 
 PLUGIN = os.environ['TELIX_DESKTOP_PLUGIN']
@@ -34,11 +32,11 @@ PAGE = '''<!DOCTYPE html><html><head><title>%(title)s</title><style>
         tv.bindToCurrentChannel();
     };
 </script></body></html>'''
-# A page that comes in two parts. Without a background of its own the channel shows through it.
-SLOW_BEGINNING = '<!DOCTYPE html><html><head><title>slow</title></head>'
-SLOW_END = '''<body style="margin: 0; background: %s"><div style="position: absolute; left: 1080px; top: 620px; width: 200px;
+# An opaque page, or one that the channel shows through.
+FIRST_PAGE = '''<!DOCTYPE html><html><head><title>first</title></head>
+    <body style="margin: 0; background: %s"><div style="position: absolute; left: 1080px; top: 620px; width: 200px;
     height: 100px; background: rgb(0, 128, 0)"></div></body></html>'''
-SLOWNESS = 2.5  # seconds between the parts; the longer, the surer a frame shows what is wrong in between
+OPAQUE = 'rgb(0, 128, 0)'
 # The frames are looked at in this size. A point of it is 20 by 20 pixels of the page.
 WIDTH, HEIGHT = 64, 36
 # The stripes of the first channel, of which something moving covers a part, and the badge.
@@ -80,25 +78,6 @@ def shows_channel(frame):
     return all(is_near(colours[x], stripe) for x, stripe in STRIPES.items())
 
 
-class SlowPage(http.server.BaseHTTPRequestHandler):
-    """Serves the server's `parts` of a document, with a pause between them."""
-
-    def do_GET(self):  # pylint: disable=invalid-name
-        self.send_response(200)
-        self.send_header('Content-Type', 'text/html')
-        self.end_headers()
-        beginning, end = self.server.parts
-        try:
-            self.wfile.write(beginning.encode())
-            time.sleep(SLOWNESS)
-            self.wfile.write(end.encode())
-        except ConnectionError:
-            pass
-
-    def log_message(self, *_):
-        pass
-
-
 class FirstPage(TelixTv):
     """An application begins while the channel is on."""
 
@@ -106,32 +85,24 @@ class FirstPage(TelixTv):
         """Opens the page while the channel is on and returns, a second after it is there, the frames from the first one of the
         channel on, and whether the engine uses OpenGL."""
         recording = os.path.join(self.folder, 'run.mp4')
-        process = self.television.start('--plugin', PLUGIN, '--record', recording)
-        self.addCleanup(process.__exit__, None, None, None)
-        self.addCleanup(process.kill)
-        wait_for(lambda: is_striped(self.television.screen()), 'no channel')
-        self.television.telixctl('open', url)
-        self.television.wait_for_colour((1180, 670), GREEN)
-        time.sleep(1)
-        uses_opengl = has_opengl(process)
-        process.terminate()
-        process.communicate(timeout=RUN_TIMEOUT)
+        with self.television.start('--plugin', PLUGIN, '--record', recording) as process:
+            wait_for(lambda: is_striped(self.television.screen()), 'no channel')
+            self.television.telixctl('open', url)
+            self.television.wait_for_colour((1180, 670), GREEN)
+            time.sleep(1)
+            uses_opengl = has_opengl(process)
+            process.terminate()
+            process.communicate(timeout=RUN_TIMEOUT)
         frames = frames_of(recording)
         return frames[[shows_channel(frame) for frame in frames].index(True):], uses_opengl
 
-    def serve(self, background):
-        """Serves the slow page; returns its URL."""
-        server = http.server.ThreadingHTTPServer(('127.0.0.1', 0), SlowPage)
-        server.parts = SLOW_BEGINNING, SLOW_END % background
-        thread = threading.Thread(target=server.serve_forever)
-        thread.start()
-        self.addCleanup(thread.join)
-        self.addCleanup(server.server_close)
-        self.addCleanup(server.shutdown)
-        return f'http://127.0.0.1:{server.server_port}/'
+    def open_slowly_over_channel(self, background):
+        """The same for a page with that background, whose body comes late."""
+        with running_server((FIRST_PAGE % background).encode()) as server:
+            return self.open_over_channel(f'{server.url}/slow')
 
     def test_the_channel_stays_under_a_transparent_page(self):
-        frames, _ = self.open_over_channel(self.serve('transparent'))
+        frames, _ = self.open_slowly_over_channel('transparent')
         self.assertEqual([(index, columns(frame)) for index, frame in enumerate(frames) if not shows_channel(frame)], [])
         self.assertTrue(is_near(frames[-1](BADGE), GREEN))
 
@@ -143,13 +114,12 @@ class FirstPage(TelixTv):
         self.assertEqual(is_green[first:], [True] * (len(frames) - first))
 
     def test_the_channel_stays_until_an_opaque_page_is_there(self):
-        frames, _ = self.open_over_channel(self.serve('rgb(0, 128, 0)'))
+        frames, _ = self.open_slowly_over_channel(OPAQUE)
         self.assert_channel_then_green(frames)
 
     @unittest.skipIf(glob.glob('/dev/dri/renderD*'), 'the engine uses OpenGL from the start')
     def test_an_opaque_page_needs_no_opengl(self):
-        page = self.write(SLOW_BEGINNING + SLOW_END % 'rgb(0, 128, 0)', 'opaque.html')
-        frames, uses_opengl = self.open_over_channel(page)
+        frames, uses_opengl = self.open_over_channel(self.write(FIRST_PAGE % OPAQUE))
         self.assert_channel_then_green(frames)
         self.assertFalse(uses_opengl)
 

@@ -223,7 +223,7 @@ class VideoInPage(VideoPlanePages):
 
     @unittest.skipIf(glob.glob('/dev/dri/renderD*'), 'the engine uses OpenGL from the start')
     def test_opengl_begins_with_the_first_transparent_page(self):
-        page = self.on_grey(script="""onkeydown = function () { document.body.style.background = 'transparent'; }""")
+        page = self.on_grey(script="onkeydown = function () { document.body.style.background = 'transparent' }")
         with self.running(page) as process:
             self.wait_for_colours({**self.quadrants(), **self.around(GREY)})
             self.assertFalse(has_opengl(process))
