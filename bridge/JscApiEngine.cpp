@@ -67,6 +67,20 @@ JSValueRef errorOf(JSContextRef context, std::string_view text) {
     return JSObjectMakeError(context, 1, &message, nullptr);
 }
 
+// Whether script has thrown in a function of the API that takes no exception. It would stay with the engine
+// and end whatever script runs next.
+bool takeException(JSContextRef context) {
+    JSValueRef exception = nullptr;
+    JSValueToNumber(context, JSValueMakeNumber(context, 0), &exception);
+    return exception != nullptr;
+}
+
+// With the traps of a proxy.
+bool hasName(JSContextRef context, JSObjectRef object, JSStringRef name) {
+    const bool isThere = JSObjectHasProperty(context, object, name);
+    return !takeException(context) && isThere;
+}
+
 JSObjectRef objectOf(ScriptHandle handle) {
     return reinterpret_cast<JSObjectRef>(handle);
 }
@@ -433,7 +447,11 @@ bool JscApiEngine::evaluate(ScriptHandle scope, const std::string& source, const
 }
 
 bool JscApiEngine::hasProperty(ScriptHandle object, NPIdentifier name) {
-    return m_context && JSObjectHasProperty(m_context, objectOf(object), nameOf(name));
+    if (!m_context) {
+        return false;
+    }
+    const KeptContext kept(m_context);
+    return hasName(kept.get(), objectOf(object), nameOf(name));
 }
 
 bool JscApiEngine::hasMethod(ScriptHandle object, NPIdentifier name) {
@@ -471,20 +489,25 @@ bool JscApiEngine::setProperty(ScriptHandle object, NPIdentifier name, const NPV
 }
 
 bool JscApiEngine::removeProperty(ScriptHandle object, NPIdentifier name) {
-    return m_context && JSObjectHasProperty(m_context, objectOf(object), nameOf(name)) &&
-           JSObjectDeleteProperty(m_context, objectOf(object), nameOf(name), nullptr);
+    if (!m_context) {
+        return false;
+    }
+    const KeptContext kept(m_context);
+    return hasName(kept.get(), objectOf(object), nameOf(name)) &&
+           JSObjectDeleteProperty(kept.get(), objectOf(object), nameOf(name), nullptr);
 }
 
 bool JscApiEngine::enumerate(ScriptHandle object, std::vector<NPIdentifier>& names) {
     if (!m_context) {
         return false;
     }
-    const JSPropertyNameArrayRef found = JSObjectCopyPropertyNames(m_context, objectOf(object));
+    const KeptContext kept(m_context);
+    const JSPropertyNameArrayRef found = JSObjectCopyPropertyNames(kept.get(), objectOf(object));
     for (size_t i = 0; i < JSPropertyNameArrayGetCount(found); i++) {
         names.push_back(identifierOfName(JSPropertyNameArrayGetNameAtIndex(found, i)));
     }
     JSPropertyNameArrayRelease(found);
-    return true;
+    return !takeException(kept.get());
 }
 
 // Calls of script into plug-in objects.

@@ -55,6 +55,7 @@ AREAS = {
     'bridge': Area(re.compile(r'bridge/.*\.cpp'), 'tests/bridge/bridge_tests',
                    ('bridge/webkitgtk/libtelix-webkit-bridge.so',),
                    re.compile(r'webkit(-gobject)?\.(page\.(bridge.*|plugin)|bridgestreams)'),
+                   apart=True,  # the engines make their classes once in a process
                    memory=resource.RLIM_INFINITY),  # the engine reserves more than there is
 }
 

@@ -49,6 +49,7 @@ TEST_P(BrowserFunctions, IdentifiersGiveTheirTextAndNumber) {
     EXPECT_TRUE(browser.identifierisstring(id("name")));
     EXPECT_FALSE(browser.identifierisstring(browser.getintidentifier(7)));
     EXPECT_EQ(browser.intfromidentifier(browser.getintidentifier(-7)), -7);
+    EXPECT_EQ(browser.intfromidentifier(id("name")), 0);
     char* const text = browser.utf8fromidentifier(id("name"));
     EXPECT_STREQ(text, "name");
     std::free(text); // plug-ins do
@@ -76,6 +77,7 @@ TEST_P(BrowserFunctions, MemoryIsThatOfMalloc) {
 
 TEST_P(BrowserFunctions, VariantsAreReleasedOnce) {
     NPVariant text = stringVariant("text");
+    EXPECT_STREQ(text.value.stringValue.UTF8Characters, "text");
     browser.releasevariantvalue(&text);
     EXPECT_EQ(text.type, NPVariantType_Void);
     browser.releasevariantvalue(&text);
@@ -131,6 +133,7 @@ TEST_P(BrowserFunctions, WhatMakesNoSenseReturnsAnErrorAndDoesNothing) {
     NPStream* stream = reinterpret_cast<NPStream*>(1);
     EXPECT_NE(browser.newstream(self, nullptr, nullptr, &stream), NPERR_NO_ERROR);
     EXPECT_EQ(stream, nullptr);
+    EXPECT_NE(browser.newstream(self, nullptr, nullptr, nullptr), NPERR_NO_ERROR);
     EXPECT_LT(browser.write(self, nullptr, 0, nullptr), 0);
     EXPECT_NE(browser.requestread(nullptr, nullptr), NPERR_NO_ERROR);
     EXPECT_NE(browser.destroystream(self, nullptr, NPRES_DONE), NPERR_NO_ERROR);
@@ -177,6 +180,9 @@ TEST_P(BrowserFunctions, NullsAreErrors) {
     EXPECT_FALSE(browser.hasproperty(self, nullptr, id("a")));
     EXPECT_FALSE(browser.hasmethod(self, nullptr, id("a")));
     EXPECT_FALSE(browser.enumerate(self, nullptr, &names, &count));
+    const OwnedVariant object = evaluated("({})");
+    EXPECT_FALSE(browser.enumerate(self, objectOf(object.get()), nullptr, &count));
+    EXPECT_FALSE(browser.enumerate(self, objectOf(object.get()), &names, nullptr));
     EXPECT_EQ(browser.createobject(nullptr, nullptr), nullptr);
     EXPECT_EQ(browser.createobject(self, nullptr), nullptr);
     EXPECT_EQ(browser.retainobject(nullptr), nullptr);
@@ -188,12 +194,31 @@ TEST_P(BrowserFunctions, NullsAreErrors) {
     browser.unscheduletimer(self, 12345);
     browser.pluginthreadasynccall(self, nullptr, nullptr);
     browser.status(nullptr, nullptr);
-    EXPECT_STRNE(browser.uagent(nullptr), nullptr);
+    EXPECT_NE(browser.destroystream(nullptr, nullptr, NPRES_DONE), NPERR_NO_ERROR);
+    ASSERT_STRNE(browser.uagent(nullptr), nullptr);
+    EXPECT_STRNE(browser.uagent(nullptr), "");
+}
+
+TEST_P(BrowserFunctions, TheStatusIsThatOfTheWindow) {
+    browser.status(self, "text");
+    EXPECT_EQ(script("status"), "text");
+    browser.status(self, nullptr);
+    EXPECT_EQ(script("status"), "");
+}
+
+TEST_P(BrowserFunctions, TheUserAgentIsThatOfTheFirstPageThatHasOne) {
+    script("navigator = { userAgent: 'Television/1' }; 0");
+    const char* const first = browser.uagent(self);
+    EXPECT_STREQ(first, "Television/1");
+    script("navigator.userAgent = 'Another/2'; 0");
+    EXPECT_EQ(browser.uagent(self), first);
+    EXPECT_STREQ(first, "Television/1");
 }
 
 TEST_P(BrowserFunctions, AnInstanceThatHasEndedIsNoInstance) {
     const auto kept = page->instance(instance);
     page->endInstance(instance);
+    EXPECT_EQ(kept->scriptableObject(), nullptr);
     NPObject* object = nullptr;
     EXPECT_NE(browser.getvalue(self, NPNVWindowNPObject, &object), NPERR_NO_ERROR);
     EXPECT_NE(browser.geturl(self, "x", nullptr), NPERR_NO_ERROR);
@@ -287,6 +312,22 @@ TEST(BridgePlugin, APluginThatRefusesIsAnError) {
     EXPECT_EQ(Plugin::initialize(entries, error), nullptr);
     EXPECT_NE(error.find("error 8"), std::string::npos) << error;
     EXPECT_EQ(s_shutdowns, 0);
+}
+
+TEST(BridgePlugin, ItIsShutDownOnce) {
+    std::string error;
+    static int s_shutdowns = 0;
+    const PluginEntries entries = {
+        [](NPNetscapeFuncs*, NPPluginFuncs* calls) -> NPError {
+            calls->newp = [](NPMIMEType, NPP, uint16_t, int16_t, char*[], char*[], NPSavedData*) -> NPError {
+                return NPERR_GENERIC_ERROR;
+            };
+            calls->destroy = [](NPP, NPSavedData**) -> NPError { return NPERR_NO_ERROR; };
+            return NPERR_NO_ERROR;
+        },
+        []() -> NPError { return ++s_shutdowns, NPERR_NO_ERROR; }, [] { return ""; }, nullptr};
+    ASSERT_NE(Plugin::initialize(entries, error), nullptr) << error;
+    EXPECT_EQ(s_shutdowns, 1);
 }
 
 } // namespace

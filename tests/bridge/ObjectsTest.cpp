@@ -48,9 +48,14 @@ TEST_P(BridgeObjects, NamesPropertiesAndMethods) {
     EXPECT_EQ(script("[plugin[0], plugin['2'], plugin[3], plugin.length]"), "item 0,item 2,,3");
     EXPECT_EQ(script("plugin.readOnly = 1; plugin.readOnly"), "42");
     EXPECT_EQ(script("plugin.mine = 1; plugin.mine"), "1");
+    EXPECT_EQ(script("plugin.echo = 1; typeof plugin.echo"), "function");
     EXPECT_EQ(script("var names = []; for (var name in plugin) { names.push(name); } names.sort()"),
               "length,mine,value");
     EXPECT_EQ(script("Object.create(plugin).echo(8)"), "8");
+    EXPECT_EQ(
+        script(
+            "var last = plugin; for (var i = 0; i < 31; i++) { last = Object.create(last); } last.echo(9)"),
+        "9");
 }
 
 TEST_P(BridgeObjects, ArgumentsArePaddedWithVoid) {
@@ -67,6 +72,24 @@ TEST_P(BridgeObjects, FailuresAreExceptions) {
     EXPECT_EQ(script("plugin.title = 1"), "threw no title");
     EXPECT_EQ(script("plugin.echo(1)"), "1");
     EXPECT_EQ(script("plugin.function()('called')"), "called");
+}
+
+TEST_P(BridgeObjects, ACallThatIsRefusedIsReportedWithTheTypesOfItsArguments) {
+    const OwnedVariant functions = evaluated(
+        "var warnings = []; ({ warn: function () { warnings.push([].slice.call(arguments).join(' ')); } })");
+    page->attachScript(objectOf(functions.get()));
+    script("plugin.fail(1, 'a', {}, null, true, undefined)");
+    script("plugin.throwText('its text')");
+    EXPECT_EQ(script("plugin.echo(1)"), "1");
+    EXPECT_EQ(script("warnings"), "refused-call fail(number, string, object, null, boolean, undefined)");
+}
+
+TEST_P(BridgeObjects, ObjectsOfAnotherFrameAreTheSame) {
+    EXPECT_EQ(scriptOfAnotherFrame("plugin.echo(5)"), "5");
+    EXPECT_EQ(
+        scriptOfAnotherFrame("var o = { a: 1 }; plugin.keep(o); plugin.kept() === o && plugin.isKept(o)"),
+        "true");
+    EXPECT_EQ(script("plugin.kept().a"), "1");
 }
 
 TEST_P(BridgeObjects, ScriptObjectsAreTheSameWhileThePluginHoldsThem) {
@@ -100,6 +123,13 @@ TEST_P(BridgeObjects, ReferencesOfThePluginKeepScriptObjects) {
     EXPECT_EQ(script("plugin.kept().name"), "kept");
 }
 
+TEST_P(BridgeObjects, ScriptObjectsThatThePluginReleasesAreCollected) {
+    script("var known = []; for (var i = 0; i < 50; i++) { (function (object) {"
+           " known.push(new WeakRef(object)); plugin.keep(object); }({})); } plugin.keep(null); 0");
+    const char* const alive = "known.filter(function (each) { return each.deref(); }).length";
+    EXPECT_TRUE(collectUntil([&] { return std::stoi(script(alive)) < 25; })) << script(alive);
+}
+
 TEST_P(BridgeObjects, ThePluginUsesScriptObjects) {
     const OwnedVariant object = evaluated("({ a: 1, f: function (x) { return this.a + x; } })");
     NPObject* const target = objectOf(object.get());
@@ -124,6 +154,40 @@ TEST_P(BridgeObjects, ThePluginUsesScriptObjects) {
     EXPECT_EQ(count, 2U);
     EXPECT_EQ(names[0], id("a"));
     browser.memfree(names);
+}
+
+TEST_P(BridgeObjects, AnOperationThatScriptRefusesByAnExceptionFailsAlone) {
+    const OwnedVariant throwing =
+        evaluated("var refuse = function () { throw 'none'; }; new Proxy(function () {}, { has: refuse,"
+                  " get: refuse, set: refuse, deleteProperty: refuse, ownKeys: refuse, apply: refuse,"
+                  " construct: refuse, getPrototypeOf: refuse, getOwnPropertyDescriptor: refuse })");
+    const OwnedVariant good = evaluated("({ a: 1 })");
+    NPObject* const target = objectOf(throwing.get());
+    NPVariant result = voidVariant();
+    NPIdentifier* names = nullptr;
+    uint32_t count = 0;
+    const std::function<bool()> operations[] = {
+        [&] { return browser.hasproperty(self, target, id("a")); },
+        [&] { return browser.hasmethod(self, target, id("a")); },
+        [&] { return browser.getproperty(self, target, id("a"), &result); },
+        [&] { return browser.setproperty(self, target, id("a"), &good.get()); },
+        [&] { return browser.removeproperty(self, target, id("a")); },
+        [&] { return browser.invoke(self, target, id("a"), nullptr, 0, &result); },
+        [&] { return browser.invokeDefault(self, target, nullptr, 0, &result); },
+        [&] { return browser.construct(self, target, nullptr, 0, &result); },
+        [&] {
+            const bool isDone = browser.enumerate(self, target, &names, &count);
+            browser.memfree(names);
+            return isDone;
+        },
+    };
+    for (const auto& operation : operations) {
+        EXPECT_FALSE(operation()) << &operation - operations;
+        ASSERT_TRUE(browser.enumerate(self, objectOf(good.get()), &names, &count));
+        EXPECT_EQ(count, 1U) << &operation - operations;
+        browser.memfree(names);
+        EXPECT_EQ(script("1 + 1"), "2") << &operation - operations;
+    }
 }
 
 TEST_P(BridgeObjects, ThePluginCallsConstructsAndEvaluates) {
@@ -181,7 +245,10 @@ TEST_P(BridgeObjects, AfterThePageThePluginMayKeepAndReleaseItsObjects) {
         own = browser.retainobject(objectOf(object.get()));
     }
     const auto kept = page->instance(instance);
+    const auto ended = page;
     endPage();
+    EXPECT_EQ(ended->createInstance(nullptr, "application/x-telix-test", {}), 0U);
+    EXPECT_EQ(ended->engine().globalObject(), nullptr);
     OwnedVariant result;
     EXPECT_FALSE(browser.getproperty(self, own, id("a"), &result));
     EXPECT_FALSE(browser.invokeDefault(self, own, nullptr, 0, &result));

@@ -32,6 +32,13 @@ std::string quoted(const std::string& text) {
     return literal + '`';
 }
 
+// A program whose value is that of the source as text.
+std::string programOf(const std::string& source) {
+    return "(function () { try { return String((0, eval)(" + quoted(source) +
+           ")); } catch (error) { return 'threw ' + (error.message === undefined ? "
+           "error : error.message); } }())";
+}
+
 } // namespace
 
 std::string nameOf(const testing::TestParamInfo<EngineKind>& kind) {
@@ -40,19 +47,66 @@ std::string nameOf(const testing::TestParamInfo<EngineKind>& kind) {
 
 // One of the two is null.
 struct ScriptHost::Context {
+    explicit Context(EngineKind kind)
+        : cApi(kind == EngineKind::CApi ? JSGlobalContextCreate(nullptr) : nullptr),
+          gobject(kind == EngineKind::GObject ? jsc_context_new() : nullptr) {}
+    // That of another frame of the page.
+    explicit Context(const Context* frame) {
+        if (frame->cApi) {
+            cApi = JSGlobalContextCreateInGroup(JSContextGetGroup(frame->cApi), nullptr);
+        } else {
+            gobject = jsc_context_new_with_virtual_machine(jsc_context_get_virtual_machine(frame->gobject));
+        }
+    }
+    Context(const Context&) = delete;
+    Context& operator=(const Context&) = delete;
+    ~Context() {
+        if (cApi) {
+            JSGlobalContextRelease(cApi);
+        }
+        g_clear_object(&gobject);
+    }
+
+    // The value of a program, which is a string.
+    std::string run(const std::string& program) const {
+        if (gobject) {
+            g_autoptr(JSCValue) value = jsc_context_evaluate(gobject, program.c_str(), -1);
+            g_autofree gchar* text = jsc_value_to_string(value);
+            return text;
+        }
+        const JSStringRef source = JSStringCreateWithUTF8CString(program.c_str());
+        const JSStringRef text =
+            JSValueToStringCopy(cApi, JSEvaluateScript(cApi, source, nullptr, nullptr, 1, nullptr), nullptr);
+        JSStringRelease(source);
+        std::string result(JSStringGetMaximumUTF8CStringSize(text), '\0');
+        result.resize(JSStringGetUTF8CString(text, result.data(), result.size()) - 1);
+        JSStringRelease(text);
+        return result;
+    }
+
+    // Takes over a global variable of another frame.
+    void take(const char* name, const Context& frame) const {
+        if (gobject) {
+            g_autoptr(JSCValue) value = jsc_context_get_value(frame.gobject, name);
+            jsc_context_set_value(gobject, name, value);
+            return;
+        }
+        const JSStringRef property = JSStringCreateWithUTF8CString(name);
+        const JSValueRef value =
+            JSObjectGetProperty(frame.cApi, JSContextGetGlobalObject(frame.cApi), property, nullptr);
+        JSObjectSetProperty(cApi, JSContextGetGlobalObject(cApi), property, value, kJSPropertyAttributeNone,
+                            nullptr);
+        JSStringRelease(property);
+    }
+
     JSGlobalContextRef cApi = nullptr;
     JSCContext* gobject = nullptr;
 };
 
-ScriptHost::ScriptHost() : m_context(std::make_unique<Context>()) {
+ScriptHost::ScriptHost() : m_context(std::make_unique<Context>(GetParam())) {
     std::string error;
     plugin =
         bridge::Plugin::initialize({NP_Initialize, NP_Shutdown, NP_GetMIMEDescription, NP_GetValue}, error);
-    if (GetParam() == EngineKind::CApi) {
-        m_context->cApi = JSGlobalContextCreate(nullptr);
-    } else {
-        m_context->gobject = jsc_context_new();
-    }
     page = bridge::Page::create(
         *plugin, "", [this](bridge::ScriptEngine::Client& client) -> std::unique_ptr<bridge::ScriptEngine> {
             if (m_context->cApi) {
@@ -68,11 +122,6 @@ ScriptHost::~ScriptHost() {
     }
     runMainLoop();
     plugin = nullptr;
-    if (m_context->cApi) {
-        JSGlobalContextRelease(m_context->cApi);
-    } else {
-        g_object_unref(m_context->gobject);
-    }
 }
 
 void ScriptHost::endPage() {
@@ -100,12 +149,17 @@ bool ScriptHost::runUntil(const std::function<bool()>& condition) {
 }
 
 std::string ScriptHost::script(const std::string& source) {
-    const std::string program = "(function () { try { return String((0, eval)(" + quoted(source) +
-                                ")); } catch (error) { return 'threw ' + (error.message === undefined ? "
-                                "error : error.message); } }())";
     bridge::OwnedVariant result;
-    page->engine().evaluate(page->engine().globalObject(), program, "test", &result);
+    page->engine().evaluate(page->engine().globalObject(), programOf(source), "test", &result);
     return std::string(bridge::textOf(result.get()));
+}
+
+std::string ScriptHost::scriptOfAnotherFrame(const std::string& source) {
+    if (!m_otherFrame) {
+        m_otherFrame = std::make_unique<Context>(m_context.get());
+        m_otherFrame->take("plugin", *m_context);
+    }
+    return m_otherFrame->run(programOf(source));
 }
 
 uint32_t ScriptHost::addInstance(const std::string& variable,

@@ -36,6 +36,8 @@ protected:
 
     // The value of a program as text; `threw TEXT` when it throws.
     std::string script(const std::string& source);
+    // The same in the window of another frame of the page, where `plugin` is the variable of this one.
+    std::string scriptOfAnotherFrame(const std::string& source);
     // A new instance whose object is that global variable of script; its number.
     uint32_t addInstance(const std::string& variable,
                          const std::vector<bridge::Instance::Parameter>& parameters = {});
@@ -52,6 +54,7 @@ protected:
 private:
     struct Context;
     std::unique_ptr<Context> m_context;
+    std::unique_ptr<Context> m_otherFrame;
 };
 
 #endif

@@ -1,5 +1,6 @@
 // Streams, with a script in place of the page's that makes no requests.
 #include <glib.h>
+#include <glib/gstdio.h>
 
 #include "bridge/Streams.h"
 #include "tests/bridge/ScriptHost.h"
@@ -51,6 +52,23 @@ TEST_P(BridgeStreams, PostedDataIsBytesAndMayHaveHeaders) {
     EXPECT_EQ(script("calls[3][4] + '|' + calls[3][5]"), "|body alone");
 }
 
+TEST_P(BridgeStreams, AFileIsPostedWithItsHeaders) {
+    gchar* name = nullptr;
+    g_close(g_file_open_tmp("telix-post-XXXXXX", &name, nullptr), nullptr);
+    ASSERT_TRUE(g_file_set_contents(name, "A: 1\n\nbody", -1, nullptr));
+    const std::string file(name);
+    const auto length = static_cast<uint32_t>(file.size());
+    const NPError posted =
+        browser.posturl(npp(instance), "u", nullptr, length, (file + "more").c_str(), true);
+    g_unlink(name);
+    g_free(name);
+    EXPECT_EQ(posted, NPERR_NO_ERROR);
+    EXPECT_EQ(calls(), "1,u,,POST,A: 1,body");
+    EXPECT_EQ(browser.posturl(npp(instance), "u", nullptr, length, file.c_str(), true), NPERR_FILE_NOT_FOUND);
+    EXPECT_EQ(browser.posturl(npp(instance), "u", nullptr, length, nullptr, true), NPERR_FILE_NOT_FOUND);
+    EXPECT_EQ(calls(), "");
+}
+
 TEST_P(BridgeStreams, DataComesAPieceAtATime) {
     script("plugin.getNotify('u', '')");
     respond(5);
@@ -70,6 +88,35 @@ TEST_P(BridgeStreams, APluginThatTakesNothingIsAskedAgain) {
     page->streams().onEnd(1, NPRES_DONE);
     EXPECT_EQ(journal().find("end"), std::string::npos);
     EXPECT_TRUE(runUntil([this] { return journal().find("end 0 3") != std::string::npos; }));
+    EXPECT_EQ(journal(), "stream http://x/y a/b 0;end 0 3;");
+}
+
+TEST_P(BridgeStreams, WhatAWriteDoesNotTakeIsWrittenAgain) {
+    script("plugin.writeResults(2, 0, 1); plugin.get('u', '')");
+    respond();
+    page->streams().onData(1, "abcde");
+    EXPECT_EQ(script("plugin.content"), "ab");
+    EXPECT_TRUE(runUntil([this] { return script("plugin.content") == "abcde"; }));
+    page->streams().onEnd(1, NPRES_DONE);
+    EXPECT_EQ(journal(), "stream http://x/y a/b 0;end 0 5;");
+}
+
+TEST_P(BridgeStreams, APluginGetsAsMuchAsItIsReadyFor) {
+    script("plugin.readyResults(1, 2, -1); plugin.get('u', '')");
+    respond();
+    page->streams().onData(1, "abcde");
+    EXPECT_EQ(script("plugin.content"), "abc");
+    EXPECT_TRUE(runUntil([this] { return script("plugin.content") == "abcde"; }));
+    page->streams().onEnd(1, NPRES_DONE);
+    EXPECT_EQ(journal(), "stream http://x/y a/b 0;end 0 5;");
+}
+
+TEST_P(BridgeStreams, AWriteThatFailsEndsTheStream) {
+    script("plugin.writeResults(-1); plugin.getNotify('u', '')");
+    respond();
+    page->streams().onData(1, "abc");
+    EXPECT_EQ(journal(), "stream http://x/y a/b 0;end 1 0;notify u 1;");
+    EXPECT_EQ(calls(), "1,u,,GET,,;next 1;cancel 1");
 }
 
 TEST_P(BridgeStreams, AnErrorBeforeTheHeadIsNoStream) {
@@ -102,6 +149,7 @@ TEST_P(BridgeStreams, FilesAreThereDuringTheCall) {
     page->streams().onData(1, "abc");
     page->streams().onEnd(1, NPRES_DONE);
     EXPECT_EQ(journal(), "stream http://x/y a/b 0;file given;end 0 3;notify u 0;");
+    EXPECT_FALSE(g_file_test(script("plugin.file").c_str(), G_FILE_TEST_EXISTS));
 }
 
 TEST_P(BridgeStreams, AStreamThatFailsGivesNoFile) {

@@ -4,8 +4,10 @@
 // Its type is application/x-telix-test. The object of an instance has the properties and methods of the
 // tables at the end; `journal` has a line for each call of the browser in the process, over all pages, until
 // clear().
+#include <algorithm>
 #include <cstdlib>
 #include <cstring>
+#include <deque>
 #include <functional>
 #include <set>
 #include <string>
@@ -113,6 +115,9 @@ struct Embedded {
     bool refusesStreams = false;
     int writesToRefuse = 0;
     int32_t dropAfter = -1; // bytes of a stream
+    std::deque<int32_t> readyResults;
+    std::deque<int32_t> writeResults;
+    std::string file; // of the last stream that was given as a file
     std::string headers;
     std::string content;
     std::set<NPObject*> callbacks; // of timers
@@ -176,6 +181,22 @@ void onTimer(NPP npp, uint32_t timer) {
         s_browser->invokeDefault(npp, function, nullptr, 0, &result);
         s_browser->releasevariantvalue(&result);
     }
+}
+
+bool addTo(std::deque<int32_t>& results, const Call& call) {
+    for (uint32_t i = 0; i < call.count; i++) {
+        results.push_back(static_cast<int32_t>(numberOf(call.args[i])));
+    }
+    return true;
+}
+
+int32_t nextOf(std::deque<int32_t>& results, int32_t otherwise) {
+    if (results.empty()) {
+        return otherwise;
+    }
+    const int32_t result = results.front();
+    results.pop_front();
+    return result;
 }
 
 struct MethodRow {
@@ -394,6 +415,12 @@ const MethodRow kMethods[] = {
              call.args[3].type == NPVariantType_Void ? -1 : static_cast<int32_t>(numberOf(call.args[3]));
          return true;
      }},
+    // readyResults(number...), writeResults(number...): what the next calls return that offer data of a
+    // stream, instead of taking everything.
+    {"readyResults",
+     [](const Call& call, NPVariant&) { return addTo(embedded(call.object)->readyResults, call); }},
+    {"writeResults",
+     [](const Call& call, NPVariant&) { return addTo(embedded(call.object)->writeResults, call); }},
     {"clear",
      [](const Call&, NPVariant&) {
          s_journal.clear();
@@ -428,6 +455,7 @@ const PropertyRow kProperties[] = {
     {"objects", [](NPObject*) { return number(s_liveObjects); }},
     {"headers", [](NPObject* object) { return text(embedded(object)->headers); }},
     {"content", [](NPObject* object) { return text(embedded(object)->content); }},
+    {"file", [](NPObject* object) { return text(embedded(object)->file); }},
     {"kind", [](NPObject* object) { return text(kindOf(self(object).value)); }},
     {"value", [](NPObject* object) { return copy(self(object).value); }},
     {"readOnly", [](NPObject*) { return number(42); }},
@@ -660,7 +688,8 @@ NPError newStream(NPP npp, NPMIMEType type, NPStream* stream, NPBool, uint16_t* 
 
 int32_t writeReady(NPP npp, NPStream*) {
     Embedded& instance = instanceOf(npp);
-    return instance.writesToRefuse > 0 && instance.writesToRefuse-- > 0 ? 0 : 1000;
+    return instance.writesToRefuse > 0 && instance.writesToRefuse-- > 0 ? 0
+                                                                        : nextOf(instance.readyResults, 1000);
 }
 
 int32_t writeStream(NPP npp, NPStream* stream, int32_t offset, int32_t length, void* buffer) {
@@ -669,11 +698,15 @@ int32_t writeStream(NPP npp, NPStream* stream, int32_t offset, int32_t length, v
         static_cast<char*>(buffer)[length] != '\0') {
         note("misplaced data");
     }
-    instance.content.append(static_cast<char*>(buffer), static_cast<size_t>(length));
+    if (length <= 0) {
+        note("no data");
+    }
+    const int32_t taken = nextOf(instance.writeResults, length);
+    instance.content.append(static_cast<char*>(buffer), static_cast<size_t>(std::max(taken, 0)));
     if (instance.dropAfter >= 0 && offset + length > instance.dropAfter) {
         s_browser->destroystream(npp, stream, NPRES_USER_BREAK);
     }
-    return length;
+    return taken;
 }
 
 NPError destroyStream(NPP npp, NPStream*, NPReason reason) {
@@ -681,8 +714,9 @@ NPError destroyStream(NPP npp, NPStream*, NPReason reason) {
     return NPERR_NO_ERROR;
 }
 
-void streamAsFile(NPP, NPStream*, const char* name) {
+void streamAsFile(NPP npp, NPStream*, const char* name) {
     note(std::string("file ") + (name && *name == '/' ? "given" : "missing"));
+    instanceOf(npp).file = name ? name : "";
 }
 
 void urlNotify(NPP npp, const char* url, NPReason reason, void* data) {
