@@ -6,12 +6,11 @@ import json
 import os
 import shutil
 import signal
-import struct
 import subprocess
+import sys
 import tempfile
 import threading
 import time
-import zlib
 
 # Timeouts in seconds. They only bound a hang, so they are long enough for a busy machine: for a condition, for
 # telix-tv's automation, for a run of telix-tv, and for a test program. CTest's own timeout is longer than the last,
@@ -22,7 +21,8 @@ RUN_TIMEOUT = 300
 PROGRAM_TIMEOUT = 840
 POLL_INTERVAL = 0.05
 
-# For the mouse pointer, the keyboard and the contents of the screen. The libraries are installed with Qt and GTK.
+# For the mouse pointer, the keyboard, the contents of the screen and screenshots. The libraries are installed with Qt and
+# GTK.
 X11 = ctypes.CDLL('libX11.so.6')
 XTEST = ctypes.CDLL('libXtst.so.6')
 X11.XOpenDisplay.restype = ctypes.c_void_p
@@ -40,6 +40,13 @@ X11.XKeysymToKeycode.restype = ctypes.c_ubyte
 X11.XKeysymToKeycode.argtypes = [ctypes.c_void_p, ctypes.c_ulong]
 XTEST.XTestFakeKeyEvent.argtypes = [ctypes.c_void_p, ctypes.c_uint, ctypes.c_int, ctypes.c_ulong]
 ZPIXMAP = 2
+CAIRO = ctypes.CDLL('libcairo.so.2')
+CAIRO.cairo_image_surface_create_from_png.restype = ctypes.c_void_p
+CAIRO.cairo_image_surface_get_data.restype = ctypes.c_void_p
+CAIRO.cairo_status_to_string.restype = ctypes.c_char_p
+for function in ('cairo_surface_status', 'cairo_surface_destroy', 'cairo_image_surface_get_data',
+                 'cairo_image_surface_get_width', 'cairo_image_surface_get_height', 'cairo_image_surface_get_stride'):
+    getattr(CAIRO, function).argtypes = [ctypes.c_void_p]
 
 
 class XImage(ctypes.Structure):  # pylint: disable=too-few-public-methods
@@ -50,22 +57,50 @@ class XImage(ctypes.Structure):  # pylint: disable=too-few-public-methods
                                                     'depth', 'bytes_per_line', 'bits_per_pixel'))]
 
 
-class Screen:
-    """The contents of a part of a display at one moment, with the interface of PngImage."""
+class Picture:
+    """Pixels of 32 bits, as X servers and cairo have them: blue, green, red, and what is no part of the colour."""
+
+    def __init__(self, width, height, row_length, data):
+        self.width, self.height = width, height
+        self._row_length, self._data = row_length, data
+
+    def colour(self, x, y):
+        start = y * self._row_length + 4 * x
+        blue, green, red = self._data[start:start + 3]
+        return red, green, blue
+
+    def colours(self):
+        """The colours of all pixels, each as three bytes."""
+        pixels = set()
+        for start in range(0, self.height * self._row_length, self._row_length):
+            pixels.update(memoryview(self._data)[start:start + 4 * self.width].cast('I'))
+        return {pixel.to_bytes(4, sys.byteorder)[2::-1] for pixel in pixels}
+
+
+class Screen(Picture):
+    """The contents of a part of a display at one moment."""
 
     def __init__(self, display, width, height, left=0, top=0):
         pointer = X11.XGetImage(display, X11.XDefaultRootWindow(display), left, top, width, height, ctypes.c_ulong(-1),
                                 ZPIXMAP)
         image = XImage.from_address(pointer)
-        self.width, self.height, self._length = width, height, image.bytes_per_line
-        self._step = image.bits_per_pixel // 8
-        self._data = ctypes.string_at(image.data, image.bytes_per_line * height)
+        super().__init__(width, height, image.bytes_per_line,
+                         ctypes.string_at(image.data, image.bytes_per_line * height))
         X11.XDestroyImage(pointer)
 
-    def colour(self, x, y):
-        start = y * self._length + x * self._step
-        blue, green, red = self._data[start:start + 3]
-        return red, green, blue
+
+class PngImage(Picture):
+    """A PNG file without transparency."""
+
+    def __init__(self, file_name):
+        surface = CAIRO.cairo_image_surface_create_from_png(os.fsencode(file_name))
+        status = CAIRO.cairo_surface_status(surface)
+        if status != 0:
+            raise ValueError(f'{file_name}: {CAIRO.cairo_status_to_string(status).decode()}')
+        height, row_length = CAIRO.cairo_image_surface_get_height(surface), CAIRO.cairo_image_surface_get_stride(surface)
+        super().__init__(CAIRO.cairo_image_surface_get_width(surface), height, row_length,
+                         ctypes.string_at(CAIRO.cairo_image_surface_get_data(surface), row_length * height))
+        CAIRO.cairo_surface_destroy(surface)
 
 
 def on_program_timeout(*_):
@@ -262,61 +297,6 @@ class Run:
     def __str__(self):
         cause = f'signal {signal.Signals(-self.status).name}' if self.status < 0 else f'status {self.status}'
         return f'telix-tv exited with {cause}\n--- standard output\n{self.output}--- standard error\n{self.errors}'
-
-
-class PngImage:
-    """A PNG file as telix-tv writes it: eight bits per channel, RGB or RGBA, not interlaced."""
-
-    def __init__(self, file_name):
-        with open(file_name, 'rb') as file:
-            content = file.read()
-        data = b''
-        position = 8
-        while position < len(content):
-            length, kind = struct.unpack_from('>I4s', content, position)
-            chunk = content[position + 8:position + 8 + length]
-            position += 12 + length
-            if kind == b'IHDR':
-                self.width, self.height, depth, colour_type, _, _, interlaced = struct.unpack('>IIBBBBB', chunk)
-                if depth != 8 or colour_type not in (2, 6) or interlaced:
-                    raise ValueError(f'{file_name} has an unexpected format')
-                self._channels = 3 if colour_type == 2 else 4
-            elif kind == b'IDAT':
-                data += chunk
-        self._rows = self._unfilter(zlib.decompress(data))
-
-    def _unfilter(self, data):
-        step, length = self._channels, self._channels * self.width
-        rows, above = [], bytearray(length)
-        for start in range(0, len(data), length + 1):
-            kind, row = data[start], bytearray(data[start + 1:start + 1 + length])
-            if kind:
-                for i in range(length):
-                    left = row[i - step] if i >= step else 0
-                    corner = above[i - step] if i >= step else 0
-                    row[i] = (row[i] + self._prediction(kind, left, above[i], corner)) & 255
-            rows.append(row)
-            above = row
-        return rows
-
-    @staticmethod
-    def _prediction(kind, left, up, corner):
-        if kind == 1:
-            return left
-        if kind == 2:
-            return up
-        if kind == 3:
-            return (left + up) // 2
-        estimate = left + up - corner
-        return min((left, up, corner), key=lambda value: abs(estimate - value))
-
-    def colour(self, x, y):
-        start = x * self._channels
-        return tuple(self._rows[y][start:start + 3])
-
-    def colours(self):
-        step = self._channels
-        return {bytes(row[i:i + 3]) for row in self._rows for i in range(0, len(row), step)}
 
 
 @contextlib.contextmanager
