@@ -226,6 +226,7 @@ TEST_F(BroadcastTest, ListsItsChannelsWithIdsNamesAndDescriptor) {
         TELIX_JS_CM_HANDLE found = 0;
         EXPECT_EQ(TELIX_JS_CM_GetChannelByTriplet(onid, kAnyTransportStream, sid, &found), 0);
         EXPECT_EQ(found, m_channels[index]);
+        found = 0;
         const Bytes& bytes = testDeliveryDescriptor();
         EXPECT_EQ(TELIX_JS_VB_CreateChannelObjectByDsd(m_object, 10, bytes.data(),
                                                        static_cast<uint32_t>(bytes.size()), sid, &found),

@@ -196,7 +196,9 @@ TEST_F(ConfigurationTest, TakesTheFolderOfTheApplicationsFromTheEnvironmentToo) 
     setenv("TELIX_APPLICATIONS", "file:///apps/", 1);
     EXPECT_EQ(Configuration::loadOrDefault().applicationsUrl, "file:///apps/");
     setenv("TELIX_APPLICATIONS", "apps", 1);
+    testing::internal::CaptureStderr();
     EXPECT_EQ(Configuration::loadOrDefault().applicationsUrl, "http://127.0.0.1/apps/"); // that of the file
+    EXPECT_EQ(testing::internal::GetCapturedStderr().substr(0, 29), "libtelix: TELIX_APPLICATIONS:");
     unsetenv("TELIX_APPLICATIONS");
 }
 

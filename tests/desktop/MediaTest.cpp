@@ -330,7 +330,9 @@ TEST_F(MediaTest, PlacesThePictureWhereThePageWantsIt) {
     play(file("clip.mp4"));
     EXPECT_TRUE(waitUntil([] { return takeShot().isVisible; }));
     EXPECT_EQ(takeShot().areaX, 100);
+    EXPECT_EQ(takeShot().areaY, 50);
     EXPECT_EQ(takeShot().areaWidth, 640U);
+    EXPECT_EQ(takeShot().areaHeight, 360U);
     area.x = 200;
     ASSERT_EQ(TELIX_JS_AV_SetDisplayArea(m_player, &area), 0);
     EXPECT_EQ(takeShot().areaX, 200);

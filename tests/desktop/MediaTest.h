@@ -196,7 +196,9 @@ struct Shot {
     bool isVisible = false;
     std::vector<uint8_t> pixels; // of the line in the middle
     int32_t areaX = 0;
+    int32_t areaY = 0;
     uint32_t areaWidth = 0;
+    uint32_t areaHeight = 0;
     bool isFullScreen = false;
     uint64_t presenter = 0;
 };
@@ -204,8 +206,9 @@ struct Shot {
 inline Shot takeShot() {
     telix_desktop_frame frame{};
     telix_desktop_acquire_frame(&frame);
-    Shot shot{frame.serial,          frame.visible != 0, {}, frame.areaX, frame.areaWidth,
-              frame.fullScreen != 0, frame.presenter};
+    Shot shot{frame.serial,     frame.visible != 0,    {},
+              frame.areaX,      frame.areaY,           frame.areaWidth,
+              frame.areaHeight, frame.fullScreen != 0, frame.presenter};
     if (frame.pixels) {
         const uint8_t* line = frame.pixels + size_t{frame.height} / 2 * frame.stride;
         shot.pixels.assign(line, line + size_t{frame.width} * 4);

@@ -95,6 +95,12 @@ TEST(RandomAccessTest, IsSeenByItsFlagAndByTheBeginningOfAPicture) {
     Bytes scrambled = makeStart(0x40, {});
     scrambled[3] |= 0x80;
     EXPECT_FALSE(isRandomAccessPoint(scrambled.data(), mpeg2));
+    Bytes erroneous = makeStart(0x40, {});
+    erroneous[1] |= kTransportErrorIndicator;
+    EXPECT_FALSE(isRandomAccessPoint(erroneous.data(), mpeg2));
+    Bytes unaligned = makeStart(0x40, {});
+    unaligned[0] = 0;
+    EXPECT_FALSE(isRandomAccessPoint(unaligned.data(), mpeg2));
     for (int length = 0; length < 256; ++length) { // also beyond the packet
         Bytes damaged = makeStart(0, {});
         damaged[4] = static_cast<uint8_t>(length);

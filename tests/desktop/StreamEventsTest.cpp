@@ -42,11 +42,12 @@ TEST_F(StreamEventsTest, DispatchesEachVersionOnceHoweverOftenItIsRepeated) {
 
 TEST_F(StreamEventsTest, DispatchesToTheObjectComponentAndIdThatWereSubscribed) {
     m_events.subscribe(kObject, onEvent, "0x0A", "1f", "hexadecimal");
+    m_events.subscribe(kObject, onEvent, "0X0a", "1F", "capital");
     m_events.subscribe(kObject, onEvent, "11", "1f", "another id");
     m_events.subscribe(kObject, onEvent, "10", "20", "another component");
     m_events.subscribe(kOtherObject, onEvent, "10", "1f", "another object");
     m_events.dispatch(kObject, kComponentTag, {10, 0, {}});
-    EXPECT_EQ(g_calls, std::vector<std::string>{"1 hexadecimal  trigger"});
+    EXPECT_EQ(g_calls, (std::vector<std::string>{"1 hexadecimal  trigger", "1 capital  trigger"}));
 }
 
 TEST_F(StreamEventsTest, EndsOneOfTwoEqualSubscriptionsAtATime) {

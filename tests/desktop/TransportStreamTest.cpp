@@ -71,6 +71,7 @@ TEST(TablesTest, NameTheServicesAfterPackingAndReading) {
     nit.deliveryDescriptor = {kTagSatelliteDeliverySystem, 2, 0x11, 0x22};
     const auto readNit = parseNit(pack(nit));
     ASSERT_TRUE(readNit);
+    EXPECT_EQ(readNit->networkId, kFirstPrivateNetworkId);
     EXPECT_EQ(readNit->name, "Network");
     EXPECT_EQ(readNit->deliveryDescriptor, nit.deliveryDescriptor);
 }
@@ -110,6 +111,8 @@ TEST(TablesTest, KeepProgrammesTimesRatingsAndEvents) {
     EXPECT_EQ(read->events[0].ratings[1].value, 13);
 
     EXPECT_EQ(parseTime(packTdt(1795253723)), 1795253723);
+    EXPECT_FALSE(parseTime({kTableIdTdt, 0x70, 0, 0}));
+    EXPECT_FALSE(parseTime(pack(eit)));
 
     StreamEvent event{77, 5, {1, 0, 255}};
     const auto events = parseStreamEvents(pack(event));
@@ -126,11 +129,34 @@ TEST(TablesTest, HaveTheBytesOfTheStandards) {
     EXPECT_EQ(section, (Bytes{0x3D, 0xB0, 0x16, 0x01, 0x23, 0xCB, 0x00, 0x00,             // header
                               0x1A, 0x0B, 0x01, 0x23, 0xFF, 0xFF, 0xFF, 0xFE, 0, 0, 0, 0, // event id, no NPT
                               0xAB}));
+    Eit eit = makeEit();
+    constexpr size_t kStatus =
+        24; // running_status in its upper three bits, the length of the descriptors in the lower 12
+    const Bytes following = pack(eit);
+    EXPECT_EQ(following[kStatus] & 0xF0, 0x20);
+    EXPECT_EQ((following[kStatus] & 0x0F) << 8 | following[kStatus + 1],
+              static_cast<int>(following.size() - kStatus - 2 - kCrcSize));
+    eit.sectionNumber = kEitSectionPresent;
+    EXPECT_EQ(pack(eit)[kStatus] & 0xF0, 0x80);
     EXPECT_EQ(packTdt(0), (Bytes{0x70, 0x70, 0x05, 0x9E, 0x8B, 0, 0, 0}));
     EXPECT_EQ(subtitlingDescriptor("deu", kSubtitlingTypeHardOfHearing),
               (Bytes{0x59, 0x08, 'd', 'e', 'u', 0x20, 0, 1, 0, 1}));
     EXPECT_EQ(iso639LanguageDescriptor("eng", kAudioTypeVisualImpairedCommentary),
               (Bytes{0x0A, 0x04, 'e', 'n', 'g', 0x03}));
+}
+
+TEST(TablesTest, CutLongNamesBeforeACharacter) {
+    Sdt sdt;
+    sdt.services = {{101, kServiceTypeDigitalTelevision, std::string(200, 'x'), "x"}};
+    for (int i = 0; i < 100; ++i) {
+        sdt.services[0].name += "ö";
+    }
+    const auto read = parseSdt(pack(sdt));
+    ASSERT_TRUE(read);
+    EXPECT_EQ(read->services[0].provider, std::string(99, 'x')); // with the byte of the character table 100
+    EXPECT_EQ(read->services[0].name, sdt.services[0].name.substr(0, 99));
+    sdt.services[0].name.insert(0, "x");
+    EXPECT_EQ(parseSdt(pack(sdt))->services[0].name, sdt.services[0].name.substr(0, 98));
 }
 
 TEST(TablesTest, DecodeTextsOfOlderCharacterSets) {
@@ -169,6 +195,40 @@ TEST(SectionFilterTest, DropsASectionWithALostPacketAndTakesTheNext) {
     packets.erase(packets.begin() + kPacketSize, packets.begin() + 2 * kPacketSize);
     const Bytes again = packetsOf(section, kPidSdt, continuity);
     packets.insert(packets.end(), again.begin(), again.end());
+    EXPECT_EQ(filtered(packets), std::vector<Bytes>{section});
+}
+
+TEST(SectionFilterTest, TakesEachPacketOnceThatIsSentTwice) {
+    const Bytes section = pack(makeEit());
+    uint8_t continuity = 3;
+    const Bytes packets = packetsOf(section, kPidEit, continuity);
+    Bytes doubled;
+    for (size_t at = 0; at < packets.size(); at += kPacketSize) {
+        for (int i = 0; i < 2; ++i) {
+            doubled.insert(doubled.end(), packets.data() + at, packets.data() + at + kPacketSize);
+        }
+    }
+    EXPECT_EQ(filtered(doubled), std::vector<Bytes>{section});
+}
+
+TEST(SectionFilterTest, PassesAPacketThatAnAdaptationFieldFills) {
+    Sdt sdt;
+    for (uint16_t service = 1; service <= 10; ++service) {
+        sdt.services.push_back({service, kServiceTypeDigitalTelevision, "Provider", "Service"});
+    }
+    const Bytes section = pack(sdt);
+    uint8_t continuity = 0;
+    Bytes packets = packetsOf(section, kPidSdt, continuity);
+    ASSERT_GT(packets.size(), kPacketSize);
+    for (size_t at = kPacketSize; at < packets.size(); at += kPacketSize) {
+        packets[at + 3] = static_cast<uint8_t>((packets[at + 3] & ~kContinuityCounterMask) |
+                                               ((packets[at + 3] + 1) & kContinuityCounterMask));
+    }
+    Bytes full(packets.begin(), packets.begin() + kPacketSize);
+    full[3] = static_cast<uint8_t>(kAdaptationFieldFlag | kPayloadFlag |
+                                   ((packets[3] + 1) & kContinuityCounterMask));
+    full[4] = kPacketSize - kPacketHeaderSize - 1;
+    packets.insert(packets.begin() + kPacketSize, full.begin(), full.end());
     EXPECT_EQ(filtered(packets), std::vector<Bytes>{section});
 }
 
@@ -301,6 +361,46 @@ TEST(RestamperTest, LetsClockStampsAndCountersRunOnAcrossTheSeam) {
         }
         restamper.repeat(kFrames * kFrame * kSystemClockTicksPerBaseTick);
     }
+}
+
+TEST(RestamperTest, ShiftsEachBitOfATimestamp) {
+    constexpr int64_t kFirst = 0x0F0F0F0F0;
+    constexpr int64_t kShift = 0x0A5A5A5A5;
+    Restamper restamper;
+    restamper.repeat(kShift * kSystemClockTicksPerBaseTick);
+    Bytes packet = makeFramePacket(0, kFirst * kSystemClockTicksPerBaseTick, kFirst + 3, kFirst);
+    Bytes expected = makeFramePacket(0, (kFirst + kShift) * kSystemClockTicksPerBaseTick, kFirst + kShift + 3,
+                                     kFirst + kShift);
+    restamper.restamp(packet.data());
+    EXPECT_EQ(packet, expected);
+}
+
+TEST(RestamperTest, FindsTimestampsInAPacketWithoutAnAdaptationField) {
+    const auto withoutField = [](Bytes packet) {
+        packet[3] &= static_cast<uint8_t>(~kAdaptationFieldFlag);
+        packet.erase(packet.begin() + kPacketHeaderSize,
+                     packet.begin() + kPacketHeaderSize + 1 + kAdaptationFieldWithPcrLength);
+        packet.resize(kPacketSize, kStuffingByte);
+        return packet;
+    };
+    Restamper restamper;
+    restamper.repeat(90000 * kSystemClockTicksPerBaseTick);
+    Bytes packet = withoutField(makeFramePacket(0, 0, 5000, 4000));
+    restamper.restamp(packet.data());
+    EXPECT_EQ(packet, withoutField(makeFramePacket(0, 0, 95000, 94000)));
+}
+
+TEST(RestamperTest, LeavesAGapInTheCountersAfterTheSeam) {
+    Restamper restamper;
+    const auto restamped = [&restamper](uint8_t continuity) {
+        Bytes packet = makeFramePacket(continuity, 0, 0, 0);
+        restamper.restamp(packet.data());
+        return packet[3] & kContinuityCounterMask;
+    };
+    EXPECT_EQ(restamped(5), 5);
+    restamper.repeat(0);
+    EXPECT_EQ(restamped(5), 6);
+    EXPECT_EQ(restamped(8), 9); // two packets are lost
 }
 
 TEST(RestamperTest, WrapsAsTheStreamsClockDoes) {
