@@ -4,6 +4,7 @@
 
 #include <atomic>
 
+#include "desktop/platform/ApplicationSignalling.h"
 #include "desktop/platform/Broadcast.h"
 #include "desktop/platform/telix_applications.h"
 #include "tests/desktop/Received.h"
@@ -212,6 +213,41 @@ TEST(ApplicationExportsTest, HandOutWhatIsSignalledOfAnApplication) {
     ASSERT_EQ(record.boundaryCount, 1U);
     EXPECT_STREQ(record.boundaries[0], "http://b.example/");
     telix_desktop_release_applications(&applications);
+}
+
+TEST(SignallingStateTest, AddsAnInjectedApplicationToWhatTheBroadcastSignals) {
+    ApplicationSignalling signalling;
+    ApplicationList list;
+    list.applications.emplace_back();
+    const auto count = [&signalling] { return signalling.snapshot().list.applications.size(); };
+    EXPECT_FALSE(signalling.signal(1, "page.html", 1, true));
+    ASSERT_TRUE(signalling.signal(1, "http://a.example/", 1, true));
+    signalling.onServiceSelected(1);
+    EXPECT_EQ(count(), 0U); // nothing is known before the broadcast has signalled
+    signalling.onApplications(1, list);
+    EXPECT_EQ(count(), 2U);
+    signalling.onServiceLost();
+    EXPECT_EQ(count(), 0U);
+    signalling.onServiceSelected(2);
+    signalling.onApplications(2, list);
+    EXPECT_EQ(count(), 1U);
+}
+
+TEST(SignallingStateTest, IgnoresWhatAnEarlierServiceSignals) {
+    ApplicationSignalling signalling;
+    const auto state = [&signalling] { return signalling.snapshot().state; };
+    signalling.onApplications(1, {});
+    EXPECT_EQ(state(), ApplicationSignalling::State::NoService);
+    signalling.onServiceSelected(1);
+    signalling.onServiceSelected(2);
+    signalling.onApplications(1, {});
+    EXPECT_EQ(state(), ApplicationSignalling::State::Awaited);
+    signalling.onServiceLost();
+    signalling.onApplications(2, {});
+    EXPECT_EQ(state(), ApplicationSignalling::State::NoService);
+    const uint64_t serial = signalling.snapshot().serial;
+    signalling.onServiceLost();
+    EXPECT_EQ(signalling.snapshot().serial, serial);
 }
 
 } // namespace
