@@ -271,6 +271,7 @@ TEST_F(ControlTest, TellsWhatIsPresented) {
     TELIX_JS_AVCOMPHANDLE* components = nullptr;
     ASSERT_EQ(TELIX_JS_VB_GetComponents(m_object, TELIX_JS_AVCOMPTYPE_SUBTITLE, &components, &count), 0);
     ASSERT_EQ(count, 2U);
+    EXPECT_EQ(find(client.send(kState), "$.activeSubtitlePid"), "null");
     TELIX_JS_VB_SelectComponent(m_object, components[1], TELIX_JS_AVCOMPTYPE_SUBTITLE);
     ASSERT_EQ(TELIX_JS_VB_GetComponents(m_object, TELIX_JS_AVCOMPTYPE_AUDIO, &components, &count), 0);
     ASSERT_EQ(count, 2U);

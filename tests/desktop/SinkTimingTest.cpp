@@ -14,12 +14,12 @@ namespace {
 
 constexpr GstClockTime kStep = 20 * GST_MSECOND;
 constexpr GstClockTime kAge = GST_SECOND; // running time at the start
-constexpr unsigned int kBuffers = 100;    // two seconds
+constexpr unsigned int kBuffers = 120;    // 2.4 seconds
 
-// A pipeline whose running time begins at kAge, and the time of the first buffer that its sink presents.
+// A pipeline whose running time begins at `age`, and the time of the first buffer that its sink presents.
 class LatePipeline {
 public:
-    explicit LatePipeline(SinkTiming::LateStart lateStart) : m_timing(lateStart) {
+    explicit LatePipeline(SinkTiming::LateStart lateStart, GstClockTime age = kAge) : m_timing(lateStart) {
         Platform::instance(); // initialises GStreamer
         m_pipeline =
             gst_parse_launch("appsrc name=source is-live=true format=time caps=audio/x-raw ! fakesink "
@@ -36,7 +36,7 @@ public:
         g_signal_connect(sink, "handoff", G_CALLBACK(onHandoff), this);
         gst_object_unref(sink);
         gst_element_set_state(m_pipeline, GST_STATE_PAUSED);
-        gst_element_set_start_time(m_pipeline, kAge);
+        gst_element_set_start_time(m_pipeline, age);
         gst_element_set_state(m_pipeline, GST_STATE_PLAYING);
         GstElement* source = gst_bin_get_by_name(GST_BIN(m_pipeline), "source");
         for (unsigned int index = 0; index < kBuffers; ++index) {
@@ -71,6 +71,12 @@ TEST(SinkTimingTest, LeavesOutTheSoundThatIsTooLate) {
     ASSERT_TRUE(pipeline.waitForLast());
     EXPECT_GE(pipeline.first(), kAge - 2 * kStep); // later if the machine is slow
     ASSERT_TRUE(pipeline.timing().lateness());
+}
+
+TEST(SinkTimingTest, PresentsSoundThatNeverCatchesUp) {
+    LatePipeline pipeline(SinkTiming::LateStart::Drop, 3600 * GST_SECOND);
+    ASSERT_TRUE(pipeline.waitForLast());
+    EXPECT_EQ(pipeline.first(), 2 * GST_SECOND);
 }
 
 TEST(SinkTimingTest, PresentsLatePicturesAtOnce) {
