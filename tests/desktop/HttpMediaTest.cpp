@@ -360,4 +360,80 @@ TEST_F(HttpMediaTest, SurvivesStopsAtRandomTimes) {
     EXPECT_TRUE(waitUntil([] { return showsSecondClip(takeShot()); }));
 }
 
+// A pipeline that reads a URL into memory.
+class MediaReader {
+public:
+    explicit MediaReader(const std::string& url) {
+        Platform::instance(); // initialises GStreamer
+        m_pipeline = gst_pipeline_new(nullptr);
+        m_source = gst_element_make_from_uri(GST_URI_SRC, url.c_str(), nullptr, nullptr);
+        GstElement* sink = gst_element_factory_make("fakesink", nullptr);
+        g_object_set(sink, "signal-handoffs", TRUE, nullptr);
+        const auto onHandoff = +[](GstElement*, GstBuffer* buffer, GstPad*, gpointer self) {
+            static_cast<MediaReader*>(self)->add(buffer);
+        };
+        g_signal_connect(sink, "handoff", G_CALLBACK(onHandoff), this);
+        gst_bin_add_many(GST_BIN(m_pipeline), m_source, sink, nullptr);
+        gst_element_link(m_source, sink);
+        gst_element_set_state(m_pipeline, GST_STATE_PAUSED);
+        gst_element_get_state(m_pipeline, nullptr, nullptr, GST_CLOCK_TIME_NONE); // has the first buffer
+    }
+    ~MediaReader() {
+        gst_element_set_state(m_pipeline, GST_STATE_NULL);
+        gst_object_unref(m_pipeline);
+    }
+    MediaReader(const MediaReader&) = delete;
+    MediaReader& operator=(const MediaReader&) = delete;
+
+    // What is read from now on.
+    std::string readToTheEnd() {
+        m_bytes.clear();
+        gst_element_set_state(m_pipeline, GST_STATE_PLAYING);
+        GstBus* bus = gst_element_get_bus(m_pipeline);
+        constexpr auto kEnds = static_cast<GstMessageType>(GST_MESSAGE_EOS | GST_MESSAGE_ERROR);
+        GstMessage* message = gst_bus_timed_pop_filtered(bus, 60 * GST_SECOND, kEnds);
+        EXPECT_TRUE(message && GST_MESSAGE_TYPE(message) == GST_MESSAGE_EOS);
+        gst_clear_message(&message);
+        gst_object_unref(bus);
+        return m_bytes;
+    }
+    bool seek(int64_t start, int64_t stop) {
+        return gst_element_seek(m_pipeline, 1, GST_FORMAT_BYTES, GST_SEEK_FLAG_FLUSH, GST_SEEK_TYPE_SET,
+                                start, GST_SEEK_TYPE_SET, stop) != FALSE;
+    }
+    int64_t size() const {
+        gint64 size = -1;
+        gst_element_query_duration(m_source, GST_FORMAT_BYTES, &size);
+        return size;
+    }
+
+private:
+    void add(GstBuffer* buffer) {
+        GstMapInfo map;
+        if (gst_buffer_map(buffer, &map, GST_MAP_READ)) {
+            m_bytes.append(reinterpret_cast<const char*>(map.data), map.size);
+            gst_buffer_unmap(buffer, &map);
+        }
+    }
+
+    GstElement* m_pipeline = nullptr;
+    GstElement* m_source = nullptr;
+    std::string m_bytes; // by the streaming thread, between the beginning of playback and its end
+};
+
+TEST(HttpMediaSourceTest, ReadsRangesInOrder) {
+    Server server;
+    gchar* content = nullptr;
+    gsize length = 0;
+    ASSERT_TRUE(g_file_get_contents((folderOfClips() + "/clip.mp4").c_str(), &content, &length, nullptr));
+    const std::string clip(content, length);
+    g_free(content);
+    MediaReader reader(server("clip.mp4"));
+    EXPECT_EQ(reader.size(), static_cast<int64_t>(clip.size()));
+    ASSERT_TRUE(reader.seek(1000, 50000));
+    EXPECT_EQ(reader.readToTheEnd(), clip.substr(1000, 49000));
+    ASSERT_TRUE(reader.seek(0, -1));
+    EXPECT_EQ(reader.readToTheEnd(), clip);
+}
+
 } // namespace
