@@ -514,7 +514,7 @@ void GObjectEngine::onCollected(GPtrArray* values, gpointer) {
 GObjectEngine::Target GObjectEngine::targetOf(GPtrArray* values) {
     const double number = values->len > kNumberIndex ? jsc_value_to_double(valueAt(values, kNumberIndex)) : 0;
     const auto wrapper = number > 0 ? wrappers().find(static_cast<uint64_t>(number)) : wrappers().end();
-    if (wrapper == wrappers().end()) {
+    if (wrapper == wrappers().end() || !wrapper->second->engine().m_context) {
         throwError(number == kNoObject ? PluginObject::kNoObjectText : PluginObject::kEndedText);
         return {};
     }
@@ -533,8 +533,8 @@ JSCValue* GObjectEngine::onRead(GPtrArray* values, gpointer) {
     if (outcome == PluginObject::Read::Failed) {
         return throwError(PluginObject::takeError());
     }
-    if (!engine.m_context) { // undefined
-        return nullptr;
+    if (!engine.m_context) {
+        return jsc_value_new_undefined(jsc_context_get_current());
     }
     switch (outcome) {
     case PluginObject::Read::Value:
@@ -605,7 +605,8 @@ JSCValue* GObjectEngine::callPlugin(GPtrArray* values, unsigned first, Call call
     if (!call(*target.object, arguments, &result)) {
         return throwError(PluginObject::takeError());
     }
-    return engine.m_context ? engine.toValue(result.get()).release() : nullptr;
+    return engine.m_context ? engine.toValue(result.get()).release()
+                            : jsc_value_new_undefined(jsc_context_get_current());
 }
 
 JSCValue* GObjectEngine::onCall(GPtrArray* values, gpointer) {

@@ -100,6 +100,21 @@ TEST_P(BridgeClasses, OlderClassesHaveFewerEntries) {
     }
 }
 
+TEST_P(BridgeClasses, AMethodMayNotBeCalledAndMayThrow) {
+    const OwnedVariant functions = evaluated("var warnings = 0; ({ warn: function () { warnings++; } })");
+    page->attachScript(objectOf(functions.get()));
+    s_class.hasMethod = isThere;
+    give("object");
+    EXPECT_EQ(script("object.there()"), "threw Error calling method on NPObject.");
+    EXPECT_EQ(script("warnings"), "1");
+    s_class.invoke = [](NPObject* object, NPIdentifier, const NPVariant*, uint32_t, NPVariant*) {
+        browserFunctions()->setexception(object, "its text");
+        return false;
+    };
+    EXPECT_EQ(script("object.there()"), "threw its text");
+    EXPECT_EQ(script("warnings"), "1"); // the exception says which call it was
+}
+
 TEST_P(BridgeClasses, OnlyNamesOfTheObjectAreRemovedFromIt) {
     s_class.hasProperty = isThere;
     s_class.removeProperty = [](NPObject*, NPIdentifier) { return ++s_calls > 0; };
@@ -124,8 +139,8 @@ TEST_P(BridgeClasses, ACallMayEndItsInstanceAndFail) {
 TEST_P(BridgeClasses, ReadingAPropertyMayCloseThePagesEngine) {
     s_class.hasProperty = isThere;
     s_class.getProperty = closeEngine;
-    NPObject* const object = give("closing");
-    EXPECT_EQ(script("closing.there"), "");
+    NPObject* const object = give("plugin");
+    EXPECT_EQ(scriptOfAnotherFrame("typeof plugin.there"), "undefined");
     EXPECT_EQ(s_calls, 1);
     EXPECT_EQ(PluginObject::of(object).engine(), &page->engine());
     EXPECT_EQ(page->engine().globalObject(), nullptr);
@@ -140,8 +155,15 @@ TEST_P(BridgeClasses, ScriptThatThePluginCallsMayCloseThePagesEngine) {
     OwnedVariant result(boolVariant(true));
     EXPECT_FALSE(browser.invoke(self, objectOf(object.get()), id("method"), nullptr, 0, &result));
     EXPECT_EQ(result.get().type, NPVariantType_Void);
-    // The GObject API reads and calls in one step of script.
-    EXPECT_EQ(s_calls, GetParam() == EngineKind::CApi ? 1 : 2);
+    EXPECT_EQ(s_calls, 1);
+}
+
+TEST_P(BridgeClasses, AMethodOfAClosedEngineDoesNothing) {
+    EXPECT_EQ(scriptOfAnotherFrame("var echo = plugin.echo; echo.call(plugin, 4)"), "4");
+    page->engine().close();
+    const std::string ended = std::string("threw ") + PluginObject::kEndedText;
+    EXPECT_EQ(scriptOfAnotherFrame("echo.call(plugin, 4)"), ended);
+    EXPECT_EQ(scriptOfAnotherFrame("echo.call(plugin, {})"), ended);
 }
 
 TEST_P(BridgeClasses, AClosedEngineDoesNothing) {
@@ -198,7 +220,7 @@ TEST_P(BridgeClasses, PlacesThatDoNotFitAreLimited) {
     script(place + "-1e12, 1e12, NaN, -5, -1, 1e12, 7, 8)");
     EXPECT_EQ(script("plugin.place"), "-1073741824 1073741823 0 0");
     EXPECT_EQ(script("plugin.clip"), "0 65535 7 8");
-    script(place + "1)");
+    script(place + "1, 'two', true)");
     EXPECT_EQ(script("plugin.place"), "1 0 0 0");
 }
 

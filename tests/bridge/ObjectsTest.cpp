@@ -246,6 +246,8 @@ TEST_P(BridgeObjects, AfterThePageThePluginMayKeepAndReleaseItsObjects) {
     }
     const auto kept = page->instance(instance);
     const auto ended = page;
+    page->end();
+    EXPECT_EQ(page->window(), nullptr);
     endPage();
     EXPECT_EQ(ended->createInstance(nullptr, "application/x-telix-test", {}), 0U);
     EXPECT_EQ(ended->engine().globalObject(), nullptr);

@@ -101,6 +101,15 @@ TEST_P(BridgeStreams, WhatAWriteDoesNotTakeIsWrittenAgain) {
     EXPECT_EQ(journal(), "stream http://x/y a/b 0;end 0 5;");
 }
 
+TEST_P(BridgeStreams, APluginThatIsNotReadyIsNotAskedForEachPieceOfData) {
+    script("plugin.readyResults(0); plugin.get('u', '')");
+    respond();
+    page->streams().onData(1, "abc");
+    page->streams().onData(1, "de");
+    EXPECT_EQ(script("plugin.content"), "");
+    EXPECT_TRUE(runUntil([this] { return script("plugin.content") == "abcde"; }));
+}
+
 TEST_P(BridgeStreams, APluginGetsAsMuchAsItIsReadyFor) {
     script("plugin.readyResults(1, 2, -1); plugin.get('u', '')");
     respond();
@@ -149,6 +158,7 @@ TEST_P(BridgeStreams, FilesAreThereDuringTheCall) {
     page->streams().onData(1, "abc");
     page->streams().onEnd(1, NPRES_DONE);
     EXPECT_EQ(journal(), "stream http://x/y a/b 0;file given;end 0 3;notify u 0;");
+    EXPECT_EQ(script("plugin.fileContent"), "abc");
     EXPECT_FALSE(g_file_test(script("plugin.file").c_str(), G_FILE_TEST_EXISTS));
 }
 

@@ -8,6 +8,7 @@
 #include <cstdlib>
 #include <cstring>
 #include <deque>
+#include <fstream>
 #include <functional>
 #include <set>
 #include <string>
@@ -117,7 +118,8 @@ struct Embedded {
     int32_t dropAfter = -1; // bytes of a stream
     std::deque<int32_t> readyResults;
     std::deque<int32_t> writeResults;
-    std::string file; // of the last stream that was given as a file
+    std::string file; // that the last stream was given as, and what was in it
+    std::string fileContent;
     std::string headers;
     std::string content;
     std::set<NPObject*> callbacks; // of timers
@@ -456,6 +458,7 @@ const PropertyRow kProperties[] = {
     {"headers", [](NPObject* object) { return text(embedded(object)->headers); }},
     {"content", [](NPObject* object) { return text(embedded(object)->content); }},
     {"file", [](NPObject* object) { return text(embedded(object)->file); }},
+    {"fileContent", [](NPObject* object) { return text(embedded(object)->fileContent); }},
     {"kind", [](NPObject* object) { return text(kindOf(self(object).value)); }},
     {"value", [](NPObject* object) { return copy(self(object).value); }},
     {"readOnly", [](NPObject*) { return number(42); }},
@@ -716,7 +719,10 @@ NPError destroyStream(NPP npp, NPStream*, NPReason reason) {
 
 void streamAsFile(NPP npp, NPStream*, const char* name) {
     note(std::string("file ") + (name && *name == '/' ? "given" : "missing"));
-    instanceOf(npp).file = name ? name : "";
+    Embedded& instance = instanceOf(npp);
+    instance.file = name ? name : "";
+    std::ifstream file(instance.file);
+    instance.fileContent.assign(std::istreambuf_iterator<char>(file), {});
 }
 
 void urlNotify(NPP npp, const char* url, NPReason reason, void* data) {
