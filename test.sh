@@ -27,8 +27,8 @@ test_this_machine() {
     cmake --build --preset asan -- -k 0
 
     # More jobs than cores, because many tests wait for video and audio.
-    ctest --preset asan -j $((2 * cores)) --output-on-failure
-    ctest --preset release -j $((2 * cores)) --output-on-failure
+    ctest --preset asan -j $((3 * cores)) --output-on-failure
+    ctest --preset release -j $((3 * cores)) --output-on-failure
 }
 
 case "$*" in

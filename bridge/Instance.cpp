@@ -176,7 +176,7 @@ int Instance::onTimer(void* data) {
     }
     const CallDepth depth;
     timer.function(instance->npp(), timer.id);
-    return timer.repeats ? G_SOURCE_CONTINUE : G_SOURCE_REMOVE; // one that has been stopped is not run again
+    return timer.repeats ? G_SOURCE_CONTINUE : G_SOURCE_REMOVE; // GLib runs no source that has been removed
 }
 
 } // namespace bridge

@@ -75,7 +75,7 @@ bool takeException(JSContextRef context) {
     return exception != nullptr;
 }
 
-// With the traps of a proxy.
+// Whether the object has the name; not if script throws when it is asked, as the traps of a proxy may.
 bool hasName(JSContextRef context, JSObjectRef object, JSStringRef name) {
     const bool isThere = JSObjectHasProperty(context, object, name);
     return !takeException(context) && isThere;

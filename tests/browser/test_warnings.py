@@ -108,6 +108,8 @@ class Objects(Warned):
             for data in ('say "hello"', 'say "it"', 'plain'):
                 self.television.telixctl('stream-event', '--name', 'offer', '--data', data)
             self.assertTrue(messages.wait_for('event plain'))
+            # The window's lines and those of the page come from two processes.
+            self.assertTrue(messages.wait_for('so the event is lost'))
             self.assertEqual(self.parse(messages.lines), [
                 (own, 'the script that dispatches StreamEvent offer has failed, so the event is lost')])
         with self.running(own) as messages:
