@@ -62,7 +62,7 @@ TEST_P(BrowserFunctions, NamesOfScriptThatAreIndexesAreNumbers) {
     EXPECT_EQ(identifierOfScriptName("12"), browser.getintidentifier(12));
     EXPECT_EQ(identifierOfScriptName("0"), browser.getintidentifier(0));
     EXPECT_EQ(identifierOfScriptName("2147483647"), browser.getintidentifier(INT32_MAX));
-    for (const char* const name : {"", "-1", "01", "1x", "2147483648", "99999999999", "1.5"}) {
+    for (const char* const name : {"", "-1", "01", "1x", "1:", "1/", "2147483648", "99999999999", "1.5"}) {
         EXPECT_EQ(identifierOfScriptName(name), id(name)) << name;
     }
 }

@@ -170,20 +170,17 @@ TEST_P(BridgeClasses, AClosedEngineDoesNothing) {
     const OwnedVariant function = evaluated("(function () { return 1; })");
     const OwnedVariant object = evaluated("({ a: 1, f: function () { return 1; } })");
     NPObject* const target = objectOf(object.get());
+    NPObject* const called = objectOf(function.get());
     page->engine().close();
     NPString program = {"1", 1};
     NPIdentifier* names = nullptr;
     uint32_t count = 1;
     const std::function<bool(NPVariant*)> operations[] = {
-        [&](NPVariant* result) { return browser.invoke(self, target, id("f"), nullptr, 0, result); },
-        [&](NPVariant* result) {
-            return browser.invokeDefault(self, objectOf(function.get()), nullptr, 0, result);
-        },
-        [&](NPVariant* result) {
-            return browser.construct(self, objectOf(function.get()), nullptr, 0, result);
-        },
+        [&](NPVariant* result) { return target->_class->invoke(target, id("f"), nullptr, 0, result); },
+        [&](NPVariant* result) { return called->_class->invokeDefault(called, nullptr, 0, result); },
+        [&](NPVariant* result) { return called->_class->construct(called, nullptr, 0, result); },
         [&](NPVariant* result) { return browser.evaluate(self, target, &program, result); },
-        [&](NPVariant* result) { return browser.getproperty(self, target, id("a"), result); },
+        [&](NPVariant* result) { return target->_class->getProperty(target, id("a"), result); },
     };
     for (const auto& operation : operations) {
         NPVariant result = boolVariant(true);
@@ -204,13 +201,15 @@ TEST_P(BridgeClasses, OnlyTheCurrentScriptObjectIsReportedAsCollected) {
     NPObject* const object = browser.retainobject(give("object"));
     const uint32_t references = object->referenceCount;
     const uint64_t serial = PluginObject::of(object).wrapper()->serial();
-    PluginObject::scriptObjectCollected(object, serial - 1);
-    runMainLoop();
-    EXPECT_EQ(object->referenceCount, references);
     PluginObject::scriptObjectCollected(object, serial);
     EXPECT_EQ(object->referenceCount, references);
     runMainLoop();
     EXPECT_EQ(object->referenceCount, references - 1);
+    give("object", browser.retainobject(object)); // has another script object now
+    EXPECT_EQ(object->referenceCount, references);
+    PluginObject::scriptObjectCollected(object, serial);
+    runMainLoop();
+    EXPECT_EQ(object->referenceCount, references);
     browser.releaseobject(object);
 }
 
