@@ -395,6 +395,7 @@ public:
         EXPECT_TRUE(message && GST_MESSAGE_TYPE(message) == GST_MESSAGE_EOS);
         gst_clear_message(&message);
         gst_object_unref(bus);
+        gst_element_set_state(m_pipeline, GST_STATE_PAUSED); // what is read next waits for the next call
         return m_bytes;
     }
     bool seek(int64_t start, int64_t stop) {
