@@ -7,6 +7,7 @@
 #include <atomic>
 #include <chrono>
 #include <condition_variable>
+#include <future>
 #include <memory>
 #include <mutex>
 #include <string>
@@ -170,6 +171,28 @@ TEST_F(FramePublisherTest, FramesOfAnObjectThatIsLeftOutDoNotArrive) {
     m_publisher->leaveOut(0);
     m_reader->refresh();
     EXPECT_EQ(m_reader->frame().pixels[0], 23) << "the newest frame is there at once";
+    m_publisher.reset(); // before what the callback uses
+}
+
+TEST_F(FramePublisherTest, TheNewestFrameIsThereWhenAskedForWhileTheThreadIsBusy) {
+    std::promise<void> entered;
+    std::promise<void> left;
+    m_publisher->setOnChange([&] {
+        entered.set_value();
+        left.get_future().wait();
+    });
+    loadLibrary();
+    ASSERT_TRUE(m_publisher->start());
+    m_setPresenter(7, false);
+    m_show(64, 36, 1);
+    takeRing();
+    waitFor(1);
+    entered.get_future().wait();
+    m_show(64, 36, 2);
+    m_publisher->publishNewest();
+    m_reader->refresh();
+    EXPECT_EQ(m_reader->frame().pixels[0], 2);
+    left.set_value();
     m_publisher.reset(); // before what the callback uses
 }
 

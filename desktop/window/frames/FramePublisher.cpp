@@ -101,7 +101,13 @@ void FramePublisher::leaveOut(uint64_t presenter) {
         const std::lock_guard<std::mutex> lock(m_ringMutex);
         m_leftOut = presenter;
     }
-    if (presenter == 0 && m_thread.joinable() && publish() && m_onChange) {
+    if (presenter == 0) {
+        publishNewest();
+    }
+}
+
+void FramePublisher::publishNewest() {
+    if (m_thread.joinable() && publish() && m_onChange) {
         m_onChange();
     }
 }

@@ -39,6 +39,10 @@ public:
     // leaves out none: the newest frame is in the ring when the call returns.
     void leaveOut(uint64_t presenter);
 
+    // Does not wait for the publisher's thread: what there is to be seen is in the ring when the call
+    // returns, and `onChange` has run if it is due.
+    void publishNewest();
+
     // Searches the loaded libraries and starts once the platform library is among them. Returns whether it
     // is; cheap while no library has been loaded since the last call.
     bool start();

@@ -280,27 +280,29 @@ void Application::sendKeyEvent(GdkEventType type, const RemoteKey& key) {
     gdk_event_free(event);
 }
 
-void Application::readKeySet(std::function<void(Application*, uint32_t)> done) {
-    using Done = std::function<void(uint32_t)>;
-    const auto call = m_onGone.insert(m_onGone.end(), [done] { done(nullptr, 0); });
-    auto* onReply = new Done([this, call, done = std::move(done)](uint32_t keySet) {
-        m_onGone.erase(call);
-        done(this, keySet);
-    });
+void Application::askPage(const char* name, GVariant* parameters, std::function<void(GVariant*)> done) {
+    using Done = std::function<void(GVariant*)>;
     webkit_web_view_send_message_to_page(
-        m_view, webkit_user_message_new(kKeySetMessage, nullptr), m_calls,
+        m_view, webkit_user_message_new(name, parameters), m_calls,
         [](GObject* view, GAsyncResult* result, gpointer data) {
-            const std::unique_ptr<Done> onReply(static_cast<Done*>(data));
+            const std::unique_ptr<Done> done(static_cast<Done*>(data));
             g_autoptr(GError) error = nullptr;
             WebKitUserMessage* reply =
                 webkit_web_view_send_message_to_page_finish(WEBKIT_WEB_VIEW(view), result, &error);
-            GVariant* keySet = reply ? webkit_user_message_get_parameters(reply) : nullptr;
             if (!g_error_matches(error, G_IO_ERROR, G_IO_ERROR_CANCELLED)) {
-                (*onReply)(keySet ? g_variant_get_uint32(keySet) : kAllPageKeys);
+                (*done)(reply ? webkit_user_message_get_parameters(reply) : nullptr);
             }
             g_clear_object(&reply);
         },
-        onReply);
+        new Done(std::move(done)));
+}
+
+void Application::readKeySet(std::function<void(Application*, uint32_t)> done) {
+    const auto call = m_onGone.insert(m_onGone.end(), [done] { done(nullptr, 0); });
+    askPage(kKeySetMessage, nullptr, [this, call, done = std::move(done)](GVariant* keySet) {
+        m_onGone.erase(call);
+        done(this, keySet ? g_variant_get_uint32(keySet) : kAllPageKeys);
+    });
 }
 
 void Application::tune(uint32_t number, const Television::OnChannel& done) {
@@ -313,21 +315,14 @@ void Application::stepChannel(int positions, const Television::OnChannel& done) 
 
 void Application::changeChannel(const char* message, GVariant* parameters,
                                 const Television::OnChannel& done) {
-    webkit_web_view_send_message_to_page(
-        m_view, webkit_user_message_new(message, parameters), m_calls,
-        [](GObject* view, GAsyncResult* result, gpointer data) {
-            const std::unique_ptr<Television::OnChannel> done(static_cast<Television::OnChannel*>(data));
-            WebKitUserMessage* reply =
-                webkit_web_view_send_message_to_page_finish(WEBKIT_WEB_VIEW(view), result, nullptr);
-            if (GVariant* channel = reply ? webkit_user_message_get_parameters(reply) : nullptr) {
-                guint32 number = 0;
-                const char* name = nullptr;
-                g_variant_get(channel, "(u&s)", &number, &name);
-                (*done)(number, name);
-            }
-            g_clear_object(&reply);
-        },
-        new Television::OnChannel(done));
+    askPage(message, parameters, [done](GVariant* channel) {
+        if (channel) {
+            guint32 number = 0;
+            const char* name = nullptr;
+            g_variant_get(channel, "(u&s)", &number, &name);
+            done(number, name);
+        }
+    });
 }
 
 void Application::setVolume(uint32_t volume) {
@@ -374,7 +369,13 @@ void Application::evaluate(const std::string& expression,
                    });
 }
 
+// The page may have been told of a picture that has not been painted yet.
 void Application::takeSnapshot(std::function<void(cairo_surface_t*)> done) {
+    askPage(kNewestFrameMessage, nullptr,
+            [this, done = std::move(done)](GVariant*) { takePageSnapshot(done); });
+}
+
+void Application::takePageSnapshot(std::function<void(cairo_surface_t*)> done) {
     using Done = std::function<void(cairo_surface_t*)>;
     webkit_web_view_get_snapshot(
         m_view, WEBKIT_SNAPSHOT_REGION_VISIBLE, WEBKIT_SNAPSHOT_OPTIONS_TRANSPARENT_BACKGROUND, m_calls,

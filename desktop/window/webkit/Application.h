@@ -77,7 +77,8 @@ public:
     void waitForKeys(std::function<void()> done);
     // Done with an error if the application ends before.
     void evaluate(const std::string& expression, std::function<void(ScriptedWindow::Evaluation)> done);
-    // An image of the page, transparent where it is; null if there is none. The caller owns it.
+    // An image of the page, transparent where it is; null if there is none. The caller owns it. By then the
+    // newest frame of the video is in the image, or in the ring if the page does not paint it.
     void takeSnapshot(std::function<void(cairo_surface_t*)> done);
     // Ends the page, with its unload events. Done when its objects have ended, or after a time limit.
     void unload(std::function<void()> done);
@@ -95,11 +96,15 @@ private:
     bool onLoadFailed(const char* url, const GError& error);
     bool onScriptDialog(WebKitScriptDialog& dialog);
     void updateVisibility();
+    // Sends a message to the page. `done` gets the parameters of the reply, null if there are none, and is
+    // not called if the application ends before.
+    void askPage(const char* name, GVariant* parameters, std::function<void(GVariant* reply)> done);
     void changeChannel(const char* message, GVariant* parameters, const Television::OnChannel& done);
     void dispatchKeyEvent(const char* type, const RemoteKey& key, bool isRepeat);
     void sendKeyEvent(GdkEventType type, const RemoteKey& key);
     void onUnloaded();
     void passTurns(int count, std::function<void()> done);
+    void takePageSnapshot(std::function<void(cairo_surface_t*)> done);
 
     Listener& m_listener;
     GtkWidget* m_bin;

@@ -23,6 +23,10 @@ constexpr char kControlMessage[] = "telix-control";
 // which the video plane leaves out, or 0. The reply, without parameters, comes when the plane has changed.
 constexpr char kPagePresenterMessage[] = "telix-page-presenter";
 
+// To a page, without parameters: the window is about to take a screenshot. The reply, without parameters,
+// comes when the newest frame is in the ring and in the page, if the page paints the frames.
+constexpr char kNewestFrameMessage[] = "telix-newest-frame";
+
 // To the window's context: a request of media, with its URL (ay). The reply has what it carries: user agent,
 // Referer and cookies, and whether it accepts any certificate (ayayayb).
 constexpr char kMediaRequestMessage[] = "telix-media-request";

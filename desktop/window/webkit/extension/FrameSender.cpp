@@ -7,6 +7,7 @@
 #include "desktop/window/frames/FramePublisher.h"
 #include "desktop/window/frames/FrameRing.h"
 #include "desktop/window/shared/LibrarySearch.h"
+#include "desktop/window/webkit/Messages.h"
 #include "desktop/window/webkit/extension/VideoPlacement.h"
 
 namespace desktop {
@@ -43,13 +44,34 @@ void sendRing(WebKitWebExtension* extension, int memory, int wakeup) {
     g_object_unref(descriptors);
 }
 
+struct Frames {
+    FramePublisher& publisher;
+    VideoPlacement& placement;
+};
+
+gboolean onMessage(WebKitWebPage*, WebKitUserMessage* message, gpointer data) {
+    if (!g_str_equal(webkit_user_message_get_name(message), kNewestFrameMessage)) {
+        return FALSE;
+    }
+    auto* frames = static_cast<Frames*>(data);
+    frames->publisher.publishNewest();
+    frames->placement.update();
+    webkit_user_message_send_reply(message, webkit_user_message_new(kNewestFrameMessage, nullptr));
+    return TRUE;
+}
+
+void onPageCreated(WebKitWebExtension*, WebKitWebPage* page, gpointer frames) {
+    g_signal_connect(page, "user-message-received", G_CALLBACK(onMessage), frames);
+}
+
 } // namespace
 
 void sendFrames(WebKitWebExtension* extension) {
     // For the life of the process, as the platform library is.
     auto* publisher =
         new FramePublisher([extension](int memory, int wakeup) { sendRing(extension, memory, wakeup); });
-    new VideoPlacement(extension, *publisher);
+    auto* frames = new Frames{*publisher, *new VideoPlacement(extension, *publisher)};
+    g_signal_connect(extension, "page-created", G_CALLBACK(onPageCreated), frames);
     [[maybe_unused]] static auto* search = new LibrarySearch([publisher] { return publisher->start(); });
 }
 

@@ -27,10 +27,12 @@ public:
     // What the publisher reports. Any thread.
     void onChange();
 
+    // Follows the newest frame at once: to where it belongs, and into the page if that paints it.
+    void update();
+
 private:
     struct Request;
 
-    void update();
     void start(uint64_t presenter, bool isFullScreen);
     void stop();
     void paint();
