@@ -26,9 +26,9 @@ test_this_machine() {
     cmake --preset asan -DTELIX_TEST_OBJECTS="$PWD/build" >/dev/null
     cmake --build --preset asan -- -k 0
 
-    # More jobs than cores, because many tests wait for video and audio; fewer where they look at the screen.
+    # More jobs than cores, because many tests wait for video and audio.
     ctest --preset asan -j $((3 * cores)) --output-on-failure
-    ctest --preset release -j $((2 * cores)) --output-on-failure
+    ctest --preset release -j $((3 * cores)) --output-on-failure
 }
 
 case "$*" in
