@@ -9,6 +9,7 @@ Exit status: 0 every mutant is noticed or listed as equivalent; 1 some are not; 
 import argparse
 import concurrent.futures
 import dataclasses
+import fnmatch
 import json
 import os
 import pickle
@@ -164,6 +165,11 @@ def environment_of(test):
     return dict(each.split('=', 1) for each in properties_of(test).get('ENVIRONMENT', []))
 
 
+def patterns_of(test):
+    """Of the tests of GoogleTest that a test of ctest runs."""
+    return [argument.partition('=')[2] for argument in test['command'] if argument.startswith('--gtest_filter=')]
+
+
 class Mutated:
     """The programs of a build with mutants in them."""
 
@@ -263,6 +269,8 @@ class GoogleTests:
             fail(mutated.area.program, 'no tests in the build folder')
         build.prepare(listed)
         command = listed[0]['command']
+        self._setups = {pattern for test in listed if properties_of(test).get('FIXTURES_SETUP')
+                        for pattern in patterns_of(test)}
         self._command = [*command[:command.index(original)], mutated.path_of(mutated.area.program)]
         self._environment = environment_of(listed[0])
         self._folder = os.path.dirname(original)
@@ -271,8 +279,7 @@ class GoogleTests:
         self.failing = 0
         filters = ['*']
         if self._apart:
-            filters = [argument.partition('=')[2] for test in listed for argument in test['command']
-                       if argument.startswith('--gtest_filter=')]
+            filters = [pattern for test in listed for pattern in patterns_of(test)]
         with concurrent.futures.ThreadPoolExecutor(mutated.jobs) as pool:
             maps = [os.path.join(mutated.work, 'maps', str(index)) for index in range(len(filters))]
             for path, output in zip(maps, pool.map(self._make_map, maps, filters)):
@@ -280,8 +287,7 @@ class GoogleTests:
 
     def _make_map(self, path, pattern):
         write_if_changed(path, '')
-        status, output = run_bounded([*self._command, f'--gtest_filter={pattern}'],
-                                     {**self._environment, 'TELIX_MUTANTS_MAP': path}, self._folder, 3600, self._memory)
+        status, output = self._run_program([pattern], [f'--gtest_filter={pattern}'], {'TELIX_MUTANTS_MAP': path}, 3600)
         write_if_changed(f'{path}.log', output)
         if status not in (0, 1) and not self._apart:
             fail(self._command[-1], f'ends with {status} without a mutant, see {path}.log')
@@ -316,8 +322,17 @@ class GoogleTests:
             flags.write(f'--gtest_filter={":".join(tests)}\n')
             flags.flush()
             seconds = self._timeout + 10 * sum(self._durations[test] for test in tests)
-            return run_bounded([*self._command, f'--gtest_flagfile={flags.name}', '--gtest_fail_fast'],
-                               {**self._environment, **environment}, self._folder, seconds, self._memory)
+            return self._run_program(tests, [f'--gtest_flagfile={flags.name}', '--gtest_fail_fast'], environment, seconds)
+
+    def _run_program(self, tests, arguments, environment, seconds):
+        """What sets up a fixture for other tests does it again, in a cache of its own."""
+        is_setup = any(fnmatch.fnmatchcase(test, setup) or fnmatch.fnmatchcase(setup, test)
+                       for test in tests for setup in self._setups)
+        with tempfile.TemporaryDirectory() as cache:
+            *wrapper, program = self._command
+            replaced = ['env', f'XDG_CACHE_HOME={cache}'] if is_setup else []
+            return run_bounded([*wrapper, *replaced, program, *arguments], {**self._environment, **environment},
+                               self._folder, seconds, self._memory)
 
     def verdict(self, number):
         """What the tests that reach a mutant say. A test counts if it fails with the mutant when it runs alone, as ctest

@@ -405,8 +405,12 @@ TEST_F(BroadcastTest, NamesItsChannelsForTheViewer) {
     EXPECT_STREQ(name, "Telix Two");
     EXPECT_EQ(telix_desktop_channel_name(2, name, 4), 9U);
     EXPECT_STREQ(name, "Tel");
-    EXPECT_EQ(telix_desktop_channel_name(9, name, sizeof(name)), 0U);
-    EXPECT_STREQ(name, "");
+    EXPECT_EQ(telix_desktop_channel_name(1, name, sizeof(name)), 9U);
+    EXPECT_STREQ(name, "Telix One");
+    for (const uint32_t unknown : {0U, 4U, 9U}) {
+        EXPECT_EQ(telix_desktop_channel_name(unknown, name, sizeof(name)), 0U);
+        EXPECT_STREQ(name, "");
+    }
 }
 
 TEST(OutputVolumeTest, MultipliesTheVolumeOfEachElement) {

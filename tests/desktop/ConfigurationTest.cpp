@@ -1,4 +1,5 @@
 // The configuration file: settings, their defaults, and error messages.
+#include <cerrno>
 #include <fstream>
 #include <glib.h>
 #include <gmock/gmock.h>
@@ -8,6 +9,7 @@
 #include <unistd.h>
 
 #include "desktop/platform/Configuration.h"
+#include "desktop/platform/RegularFile.h"
 #include "desktop/platform/Settings.h"
 
 using namespace desktop;
@@ -153,6 +155,21 @@ TEST_F(ConfigurationTest, ReadsRegularFilesOfABoundedSizeOnly) {
     ASSERT_TRUE(tooLarge);
     EXPECT_EQ(tooLarge->message(), m_file + ": Larger than 1048576 bytes");
     EXPECT_EQ(m_configuration.country, "DEU");
+}
+
+TEST_F(ConfigurationTest, ReadsAFileWhateverItsDescriptorAndTheErrorBefore) {
+    ASSERT_FALSE(load("[viewer]\ncountry=DEU\n"));
+    const int standardInput = dup(STDIN_FILENO);
+    close(STDIN_FILENO);
+    std::string error;
+    auto opened = RegularFile::open(m_file, error); // takes the lowest free number, which is 0
+    ASSERT_TRUE(opened) << error;
+    char contents[64];
+    errno = EINTR;
+    EXPECT_EQ(opened->read(contents, sizeof(contents), 0), opened->size());
+    opened.reset();
+    dup2(standardInput, STDIN_FILENO);
+    close(standardInput);
 }
 
 TEST_F(ConfigurationTest, FindsTheLineOfASyntaxErrorInALargeFile) {

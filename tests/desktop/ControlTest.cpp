@@ -316,6 +316,30 @@ TEST_F(ControlTest, TellsWhatIsPresented) {
     EXPECT_TRUE(waitUntil([&] { return find(client.send(kState), "$.picture.serial") != serial; }));
 }
 
+TEST_F(ControlTest, NamesAStateThatPagesMakeUp) {
+    Client client(m_path);
+    ASSERT_EQ(TELIX_JS_VB_SetPlayBackState(m_object, 77), 0);
+    const std::string state = client.send(kState);
+    EXPECT_EQ(find(state, "$.objects[0].playState"), "\"other\"");
+    EXPECT_EQ(find(state, "$.objects[0].playStateNumber"), "77");
+}
+
+TEST_F(ControlTest, TellsWhatPlayersDo) {
+    Client client(m_path);
+    EXPECT_EQ(find(client.send(kState), "$.players"), "[]");
+    TELIX_JS_AV_HANDLE player = 0;
+    ASSERT_EQ(TELIX_JS_AV_CreatePlayer(&player, 0, 0, 0), 0);
+    ASSERT_EQ(TELIX_JS_AV_SetVolume(player, 30), 0);
+    EXPECT_EQ(find(client.send(kState), "$.players"),
+              R"([{"handle":)" + std::to_string(player) +
+                  R"(,"url":"","state":"stopped","position":0,"duration":0,"bufferedEnd":0,)"
+                  R"("buffered":4294967295,"speed":1.0,"volume":30}])");
+    ASSERT_EQ(TELIX_JS_AV_Play(player, "file:///absent", 1, 6, 512, 0, 0, 0), 0);
+    EXPECT_TRUE(waitUntil([&] { return find(client.send(kState), "$.players[0].state") == "\"error\""; }));
+    EXPECT_EQ(find(client.send(kState), "$.players[0].url"), "\"file:///absent\"");
+    TELIX_JS_AV_DestroyPlayer(player);
+}
+
 TEST_F(ControlTest, ProvokesWhatBroadcastAndTheViewerMayDo) {
     Client client(m_path);
     TELIX_JS_VB_RegisterOnChannelChangeError(onError);
@@ -811,17 +835,26 @@ TEST_F(ControlTest, FindsRunningTelevisionsAndForgetsDeadOnes) {
         other.insert(0, m_folder + '/');
         close(open(other.c_str(), O_CREAT | O_CLOEXEC, 0600));
     }
+    const std::string nameless = controlSocketPath(m_folder, 0); // a number that no process has
+    const auto namelessAddress = socketAddress(nameless);
+    const int listening = ::socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0);
+    ASSERT_EQ(bind(listening, reinterpret_cast<const sockaddr*>(&*namelessAddress), sizeof(*namelessAddress)),
+              0);
+    ASSERT_EQ(listen(listening, 1), 0);
     const auto running = runningTelevisions(m_folder);
     EXPECT_EQ(std::count_if(running.begin(), running.end(),
                             [&](const ControlSocket& each) { return each.path == m_path; }),
               1);
-    EXPECT_TRUE(std::all_of(running.begin(), running.end(),
-                            [&](const ControlSocket& each) { return each.pid != dead; }));
+    EXPECT_TRUE(std::all_of(running.begin(), running.end(), [&](const ControlSocket& each) {
+        return each.pid != dead && each.path != nameless;
+    }));
     EXPECT_NE(access(stale.c_str(), F_OK), 0);
     for (const std::string& other : others) {
         EXPECT_EQ(access(other.c_str(), F_OK), 0) << other; // not a control socket
         unlink(other.c_str());
     }
+    close(listening);
+    unlink(nameless.c_str());
 }
 
 TEST(ControlFolderTest, IsNeverAPlaceThatOthersMadeReady) {

@@ -48,4 +48,26 @@ TEST(PictureTest, ShowsTheFirstFrameOfALivePipelineBeforeItsTime) {
     picture.release(token);
 }
 
+TEST(PictureTest, TellsTheWindowWhenSomethingElseIsToBeSeen) {
+    Picture& picture = Platform::instance().picture();
+    std::atomic<int> wakeups{0};
+    picture.setWakeup([](void* count) { ++*static_cast<std::atomic<int>*>(count); }, &wakeups);
+    const Picture::Token token = picture.acquire({}, nullptr, nullptr);
+    EXPECT_EQ(wakeups, 1);
+    Picture::View view;
+    view.width = 640;
+    picture.setView(token, view);
+    EXPECT_EQ(wakeups, 2);
+    picture.setHidden(token, true);
+    EXPECT_EQ(wakeups, 3);
+    picture.setHidden(token, true); // as it was
+    EXPECT_EQ(wakeups, 3);
+    EXPECT_TRUE(picture.release(token));
+    EXPECT_EQ(wakeups, 4);
+    EXPECT_FALSE(picture.release(token)); // of nothing
+    picture.setView(token, view);
+    EXPECT_EQ(wakeups, 4);
+    picture.setWakeup(nullptr, nullptr);
+}
+
 } // namespace

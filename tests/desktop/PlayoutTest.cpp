@@ -165,6 +165,16 @@ TEST_F(PlayoutTest, HasBegunBeforeItIsReceived) {
     EXPECT_EQ(m_ages, (std::vector<int64_t>{400, 360, 320, 280, 240, 200, 160, 120, 80, 40, 0, 0, 0}));
 }
 
+TEST_F(PlayoutTest, SendsThePacketsOfTenMillisecondsTogether) {
+    const StreamFile file(makeStream(500, milliseconds(1)));
+    std::string error;
+    ASSERT_TRUE(m_playout.play(file.name(), nullptr, error)) << error;
+    ASSERT_TRUE(m_clock.settle());
+    EXPECT_EQ(sentPcrs().size(), 401U);
+    std::lock_guard<std::mutex> lock(m_mutex);
+    EXPECT_EQ(m_ages.size(), 41U);
+}
+
 TEST_F(PlayoutTest, StartsAgainAtTheEndWithPcrsThatRunOn) {
     const StreamFile file(makeStream(10, milliseconds(40)));
     std::string error;

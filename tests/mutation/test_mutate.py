@@ -169,7 +169,11 @@ enable_testing()
 add_executable(telix_unit_tests src/sum.cpp tests.cpp)
 set_target_properties(telix_unit_tests PROPERTIES RUNTIME_OUTPUT_DIRECTORY tests/unit)
 target_link_libraries(telix_unit_tests PRIVATE GTest::gtest_main)
-gtest_discover_tests(telix_unit_tests PROPERTIES ENVIRONMENT SMALL=1)
+set(cache ${CMAKE_COMMAND} -E env XDG_CACHE_HOME=${CMAKE_CURRENT_BINARY_DIR}/cache)
+set_target_properties(telix_unit_tests PROPERTIES CROSSCOMPILING_EMULATOR "${cache}")
+gtest_discover_tests(telix_unit_tests TEST_FILTER -Made.* PROPERTIES ENVIRONMENT SMALL=1)
+add_test(NAME made COMMAND telix_unit_tests --gtest_filter=Made.*)
+set_tests_properties(made PROPERTIES FIXTURES_SETUP made)
 '''
 SUM = '''constexpr int kSize = 3;
 int list[kSize] = {};
@@ -193,18 +197,29 @@ int same(int a) {
 bool isBig(int a) {
     return a > 10;
 }
+int make() {
+    return 7;
+}
 '''
 TESTS = '''#include <gtest/gtest.h>
+#include <fstream>
 int sum(int a, int b);
 void count(int& a);
 int same(int a);
 bool isBig(int a);
+int make();
 TEST(Sum, isThatOfBoth) { EXPECT_EQ(3, sum(1, 2)); }
 TEST(Sum, hasTheEnvironmentOfTheTests) { EXPECT_STREQ("1", getenv("SMALL")); }
 TEST(Sum, failsAlways) { EXPECT_EQ(0, sum(1, 2)); }
 TEST(Count, ends) { int a = 4; count(a); EXPECT_EQ(5, a); }
 TEST(Same, isTheNumber) { EXPECT_EQ(1, same(1)); EXPECT_EQ(2, same(2)); }
 TEST(Big, isMoreThanTen) { EXPECT_TRUE(isBig(20)); EXPECT_FALSE(isBig(3)); }
+TEST(Made, once) {
+    const std::string path = std::string(getenv("XDG_CACHE_HOME")) + "/made";
+    int made = 0;
+    if (!(std::ifstream(path) >> made)) { made = make(); std::ofstream(path) << made; }
+    EXPECT_EQ(7, made);
+}
 '''
 EQUIVALENT = '''
 [[mutant]]
@@ -233,6 +248,9 @@ class Run(unittest.TestCase):
             with open(os.path.join(cls.tree, name), 'w', encoding='utf-8') as file:
                 file.write(text)
         subprocess.run(['cmake', '-S', cls.tree, '-B', cls.build, '-G', 'Ninja'], check=True, stdout=subprocess.DEVNULL)
+        os.mkdir(os.path.join(cls.build, 'cache'))
+        with open(os.path.join(cls.build, 'cache', 'made'), 'w', encoding='utf-8') as file:
+            file.write('7')
         cls.result = cls.run_all()
 
     @classmethod
@@ -247,6 +265,9 @@ class Run(unittest.TestCase):
 
     def test_a_mutant_that_a_test_notices(self):
         self.assertEqual(self.verdict('4: + becomes -'), 'caught')
+
+    def test_a_mutant_in_what_has_been_made_before(self):
+        self.assertEqual(self.verdict('24: add 1'), 'caught')
 
     def test_a_mutant_without_end(self):
         self.assertEqual(self.verdict('8: drop statement'), 'timed out')
@@ -266,7 +287,7 @@ class Run(unittest.TestCase):
         self.assertIn('1 did not compile', self.result.stdout)
 
     def test_a_test_that_always_fails_does_not_count(self):
-        self.assertIn('5 tests; 1 more fail without a mutant', self.result.stdout)
+        self.assertIn('6 tests; 1 more fail without a mutant', self.result.stdout)
 
     def test_the_tree_is_as_it_was(self):
         found = {os.path.relpath(os.path.join(folder, name), self.tree)
