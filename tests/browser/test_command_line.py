@@ -36,12 +36,21 @@ class CommandLine(TelixTv):
     def test_an_unknown_engine_is_refused(self):
         self.assert_refused(self.run_tv('--engine', 'paper', shipped('first.html')), 'engine', '"paper"')
 
-    def test_an_engine_that_is_not_built_is_refused(self):
+    def launch(self, **environment):
+        """Starts the engine webkit, of which there is the program that the test has written."""
         # The programs of the engines are beside the one that starts them.
         launcher = shutil.copy(os.path.join(os.path.dirname(DEFAULT_PLUGIN), 'telix-tv'), self.folder)
-        run = subprocess.run([launcher, '--engine', 'webkit', shipped('first.html')], capture_output=True, text=True,
-                             timeout=RUN_TIMEOUT, check=False)
+        return subprocess.run([launcher, '--engine', 'webkit', shipped('first.html')], capture_output=True, text=True,
+                              timeout=RUN_TIMEOUT, check=False, env={**os.environ, **environment})
+
+    def test_an_engine_that_is_not_built_is_refused(self):
+        run = self.launch()
         self.assertEqual((run.returncode, run.stderr), (2, 'telix-tv: --engine: the engine "webkit" is not built\n'))
+
+    def test_large_blocks_of_memory_are_always_returned_unless_the_user_wants_otherwise(self):
+        os.chmod(self.write('#!/bin/sh\necho "$MALLOC_MMAP_THRESHOLD_"', 'telix-tv-webkit'), 0o755)
+        self.assertEqual(self.launch().stdout, '131072\n')
+        self.assertEqual(self.launch(MALLOC_MMAP_THRESHOLD_='65536').stdout, '65536\n')
 
     @unittest.skipUnless(IS_NPAPI, 'of the other engine')
     def test_webdriver_and_profiles_are_refused(self):

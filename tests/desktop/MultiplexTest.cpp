@@ -48,13 +48,21 @@ std::vector<unsigned int> regionWidthsOf(const Bytes& pes) {
     return widths;
 }
 
-} // namespace
+class MultiplexTest : public testing::Test {
+protected:
+    static void SetUpTestSuite() {
+        Platform::instance(); // initialises GStreamer
+        std::string error;
+        file = makeTestMultiplex(error);
+        ASSERT_NE(file, "") << error;
+    }
 
-TEST(MultiplexTest, CarriesEveryStreamOfEveryService) {
-    Platform::instance();
-    std::string error;
-    const std::string file = makeTestMultiplex(error);
-    ASSERT_NE(file, "") << error;
+    static std::string file;
+};
+
+std::string MultiplexTest::file;
+
+TEST_F(MultiplexTest, CarriesEveryStreamOfEveryService) {
     std::ifstream stream(file, std::ios::binary);
     std::set<uint16_t> pids;
     uint8_t packet[kPacketSize];
@@ -71,11 +79,7 @@ TEST(MultiplexTest, CarriesEveryStreamOfEveryService) {
     }
 }
 
-TEST(MultiplexTest, HasSubtitlesAsWideAsTheirTextInBothLanguages) {
-    Platform::instance();
-    std::string error;
-    const std::string file = makeTestMultiplex(error);
-    ASSERT_NE(file, "") << error;
+TEST_F(MultiplexTest, HasSubtitlesAsWideAsTheirTextInBothLanguages) {
     size_t streams = 0;
     for (const ElementaryStream& each : testServices().front().streams) {
         if (each.type != kStreamTypePrivatePes) {
@@ -96,3 +100,5 @@ TEST(MultiplexTest, HasSubtitlesAsWideAsTheirTextInBothLanguages) {
     }
     EXPECT_EQ(streams, 2U);
 }
+
+} // namespace

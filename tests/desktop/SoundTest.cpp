@@ -8,9 +8,12 @@
 #include <vector>
 
 #include "desktop/platform/Platform.h"
+#include "desktop/platform/SoundTap.h"
 #include "desktop/platform/telix_sound.h"
 #include "telix/telix_platform.h"
 #include "tests/desktop/Received.h"
+
+using namespace desktop;
 
 namespace {
 
@@ -113,6 +116,77 @@ TEST_F(SoundTest, EndsWithTheBroadcast) {
         return last == frames();
     }));
     TELIX_JS_VB_GetHandle(&m_object);
+}
+
+// A sink that gets what the test pushes, as from the element before it.
+class TappedSink {
+public:
+    // GStreamer must be initialised.
+    TappedSink() {
+        gst_object_ref_sink(m_sink);
+        g_object_set(m_sink, "async", FALSE, nullptr);
+        GstClock* clock = gst_system_clock_obtain();
+        gst_element_set_clock(m_sink, clock);
+        gst_object_unref(clock);
+        tapSound(m_sink);
+        GstPad* sinkPad = gst_element_get_static_pad(m_sink, "sink");
+        gst_pad_link(m_source, sinkPad);
+        gst_object_unref(sinkPad);
+        gst_pad_set_active(m_source, TRUE);
+        gst_element_set_state(m_sink, GST_STATE_PLAYING);
+        push(gst_event_new_stream_start("test"));
+        GstCaps* caps = gst_caps_from_string(
+            "audio/x-raw,format=S16LE,rate=48000,channels=2,layout=interleaved,channel-mask=(bitmask)3");
+        push(gst_event_new_caps(caps));
+        gst_caps_unref(caps);
+        pushSegment();
+    }
+    ~TappedSink() {
+        gst_element_set_state(m_sink, GST_STATE_NULL);
+        gst_object_unref(m_sink);
+        gst_object_unref(m_source);
+    }
+    TappedSink(const TappedSink&) = delete;
+    TappedSink& operator=(const TappedSink&) = delete;
+
+    void push(GstEvent* event) { EXPECT_TRUE(gst_pad_push_event(m_source, event)); }
+    void pushSegment() {
+        GstSegment segment;
+        gst_segment_init(&segment, GST_FORMAT_TIME);
+        push(gst_event_new_segment(&segment));
+    }
+    void pushSound(size_t frames) {
+        GstBuffer* buffer = gst_buffer_new_allocate(nullptr, frames * 2 * sizeof(int16_t), nullptr);
+        gst_buffer_memset(buffer, 0, 0, frames * 2 * sizeof(int16_t));
+        GST_BUFFER_PTS(buffer) = 0;
+        EXPECT_EQ(gst_pad_push(m_source, buffer), GST_FLOW_OK);
+    }
+
+private:
+    GstPad* m_source = gst_pad_new("src", GST_PAD_SRC);
+    GstElement* m_sink = gst_element_factory_make("fakesink", nullptr);
+};
+
+TEST(SoundTapTest, LeavesOutWhatASeekHasDropped) {
+    Platform::instance(); // initialises GStreamer
+    TappedSink sink;
+    std::vector<uint32_t> heard; // frames
+    telix_desktop_set_sound_listener(
+        [](const telix_desktop_sound* sound, void* data) {
+            static_cast<std::vector<uint32_t>*>(data)->push_back(sound->frames);
+        },
+        &heard);
+    sink.pushSound(10);
+    EXPECT_EQ(heard, std::vector<uint32_t>{}); // before the next piece comes
+    sink.pushSound(20);
+    EXPECT_EQ(heard, std::vector<uint32_t>{10});
+    sink.push(gst_event_new_flush_start());
+    sink.push(gst_event_new_flush_stop(TRUE));
+    sink.pushSegment();
+    sink.pushSound(30);
+    sink.push(gst_event_new_eos());
+    EXPECT_EQ(heard, (std::vector<uint32_t>{10, 30}));
+    telix_desktop_set_sound_listener(nullptr, nullptr);
 }
 
 } // namespace

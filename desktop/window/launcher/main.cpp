@@ -3,6 +3,7 @@
 
 #include <cerrno>
 #include <clocale>
+#include <cstdlib>
 #include <cstring>
 
 #include "desktop/window/shared/CommandLine.h"
@@ -42,6 +43,14 @@ std::string selectEngine(const std::string& wanted) {
     return {};
 }
 
+// The C library takes large blocks from the machine one by one, until the first one is freed; from then on it
+// takes them from its heaps, which keep what is freed. With the frames of one clip after the other the heaps
+// of the process of the pages would grow and grow. So the limit stays what it is at the start, 128 KiB.
+void returnLargeBlocks() {
+    constexpr int kReplace = 0; // not what the user has set
+    setenv("MALLOC_MMAP_THRESHOLD_", "131072", kReplace);
+}
+
 } // namespace
 
 } // namespace desktop
@@ -53,6 +62,7 @@ int main(int argc, char* argv[]) {
     if (engine.empty()) {
         return desktop::kExitBadInput;
     }
+    desktop::returnLargeBlocks();
     const std::string program = desktop::programOf(engine);
     execv(program.c_str(), argv);
     desktop::printError("cannot start " + program + ": " + std::strerror(errno));
