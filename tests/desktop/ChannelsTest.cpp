@@ -9,6 +9,7 @@
 
 #include "desktop/platform/Channels.h"
 #include "desktop/platform/Sections.h"
+#include "tests/support/TemporaryFolder.h"
 
 using namespace desktop;
 
@@ -21,18 +22,7 @@ constexpr uint8_t kServiceTypeDataBroadcast = 0x0C;
 // A file of tables alone, and null packets around them.
 class ChannelsTest : public testing::Test {
 protected:
-    void SetUp() override {
-        gchar* folder = g_dir_make_tmp("telix-channels-XXXXXX", nullptr);
-        ASSERT_TRUE(folder);
-        m_folder = folder;
-        g_free(folder);
-    }
-    void TearDown() override {
-        unlink(file().c_str());
-        rmdir(m_folder.c_str());
-    }
-
-    std::string file() const { return m_folder + "/some.name.ts"; }
+    std::string file() const { return m_folder.file("some.name.ts"); }
     Channels channels(std::optional<uint16_t> service = std::nullopt) const {
         return Channels({{file(), service}});
     }
@@ -87,7 +77,7 @@ protected:
         return pack(nit);
     }
 
-    std::string m_folder;
+    TemporaryFolder m_folder;
 };
 
 TEST_F(ChannelsTest, AreReadFromTablesInAnyOrder) {

@@ -13,6 +13,7 @@
 #include "desktop/platform/Multiplex.h"
 #include "telix/telix_platform.h"
 #include "tests/desktop/LineUpTest.h"
+#include "tests/support/TemporaryFolder.h"
 
 using namespace desktop;
 
@@ -31,27 +32,13 @@ protected:
 // Transport streams of another multiplexer, with other encodings.
 class FormatsTest : public LineUpTest {
 protected:
-    void SetUp() override {
-        char* folder = g_dir_make_tmp("telix-formats-XXXXXX", nullptr);
-        ASSERT_TRUE(folder);
-        m_folder = folder;
-        g_free(folder);
-    }
-    void TearDown() override {
-        LineUpTest::TearDown();
-        for (const std::string& file : m_files) {
-            unlink(file.c_str());
-        }
-        rmdir(m_folder.c_str());
-    }
-
     // Has ffmpeg make a transport stream of 3 seconds.
-    std::string make(const std::string& name, const std::string& arguments) {
-        m_files.push_back(m_folder + "/" + name);
+    std::string make(const std::string& name, const std::string& arguments) const {
+        const std::string file = m_folder.file(name);
         const std::string command =
-            "ffmpeg -hide_banner -loglevel error -nostdin " + arguments + " -t 3 -f mpegts " + m_files.back();
+            "ffmpeg -hide_banner -loglevel error -nostdin " + arguments + " -t 3 -f mpegts " + file;
         EXPECT_EQ(std::system(command.c_str()), 0) << command;
-        return m_files.back();
+        return file;
     }
 
     static std::vector<std::string> encodings(TELIX_JS_VB_HANDLE object, TELIX_JS_AVCOMPTYPE type) {
@@ -67,8 +54,7 @@ protected:
         return found;
     }
 
-    std::string m_folder;
-    std::vector<std::string> m_files;
+    TemporaryFolder m_folder;
 };
 
 uint64_t newestSerial() {

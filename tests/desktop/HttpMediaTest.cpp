@@ -7,6 +7,7 @@
 
 #include "desktop/platform/telix_http.h"
 #include "tests/desktop/MediaTest.h"
+#include "tests/support/TemporaryFolder.h"
 
 using namespace desktop;
 
@@ -313,17 +314,13 @@ TEST_F(HttpMediaTest, TakesNoResponseWithAnotherRangeThanItsOwn) {
 }
 
 TEST_F(HttpMediaTest, TellsOfMissingSegmentsAsOfAMissingFile) {
-    std::string folder = testing::TempDir() + "telix-playlist-XXXXXX";
-    ASSERT_NE(mkdtemp(folder.data()), nullptr);
-    const std::string playlist = folder + "/index.m3u8";
-    std::ofstream(playlist)
+    const TemporaryFolder folder;
+    std::ofstream(folder.file("index.m3u8"))
         << "#EXTM3U\n#EXT-X-TARGETDURATION:2\n#EXTINF:2,\ngone0.ts\n#EXTINF:2,\ngone1.ts\n"
            "#EXT-X-ENDLIST\n";
-    Server server({"made=" + folder});
+    Server server({"made=" + folder.path()});
     ASSERT_EQ(start(m_player, server("made/index.m3u8")), 0);
     EXPECT_TRUE(waitUntil([] { return !received().empty(); }));
-    std::remove(playlist.c_str());
-    rmdir(folder.c_str());
     ASSERT_FALSE(received().empty());
     EXPECT_TRUE(received().back() == TELIX_AV_CB_MSG_ERR_NET_CANNOT_CONNECT ||
                 received().back() == TELIX_AV_CB_MSG_ERR_NET_DISCONNECTED) // both are error 1 of the page

@@ -20,6 +20,7 @@
 #include "tests/desktop/ManualClock.h"
 #include "tests/desktop/PlatformThread.h"
 #include "tests/desktop/Received.h"
+#include "tests/support/TemporaryFolder.h"
 
 using namespace desktop;
 using std::chrono::milliseconds;
@@ -382,15 +383,15 @@ std::optional<size_t> countEntries(const std::string& folder) {
 
 TEST(TuneWhileTheTestMultiplexIsMadeTest, GoesOnWhenItIsThere) {
     const StreamFile file(makeStreamWithoutPictures());
-    char* cache = g_dir_make_tmp("telix-cache-XXXXXX", nullptr);
-    setenv("XDG_CACHE_HOME", cache, 1); // has no test multiplex
-    setenv("PATH", "", 1);              // nor is there ffmpeg: it ends soon
+    const TemporaryFolder cache;
+    setenv("XDG_CACHE_HOME", cache.path().c_str(), 1); // has no test multiplex
+    setenv("PATH", "", 1);                             // nor is there ffmpeg: it ends soon
     setenv("TELIX_CHANNELS", (file.name() + ";test").c_str(), 1);
     TELIX_JS_VB_HANDLE object = 0;
     ASSERT_EQ(TELIX_JS_VB_GetHandle(&object), 0);
     TELIX_JS_VB_RegisterOnChannelChangeError(onError);
     ASSERT_EQ(TELIX_JS_VB_BindToCurrChannel(object), 0);
-    const std::string folder = std::string(cache) + "/telix";
+    const std::string folder = cache.file("telix");
     EXPECT_TRUE(waitUntil([&] { return countEntries(folder) > size_t{0}; }));
     EXPECT_TRUE(waitUntil([&] { return countEntries(folder) == size_t{0}; }));
     // The tune waits for a picture still, and the channels of the test multiplex have no signal.
@@ -404,9 +405,6 @@ TEST(TuneWhileTheTestMultiplexIsMadeTest, GoesOnWhenItIsThere) {
     EXPECT_EQ(errors.all(), (std::vector<TELIX_ERR_STATE_ENUM_T>{kErrorInterrupted, kErrorNoSignal}));
     TELIX_JS_VB_Release(object);
     TELIX_JS_VB_UnRegisterOnChannelChangeError(onError);
-    rmdir(folder.c_str());
-    rmdir(cache);
-    g_free(cache);
 }
 
 } // namespace

@@ -9,6 +9,7 @@
 #include "desktop/platform/Broadcast.h"
 #include "tests/desktop/LineUpTest.h"
 #include "tests/desktop/ManualClock.h"
+#include "tests/support/TemporaryFolder.h"
 
 using namespace desktop;
 using testing::ElementsAre;
@@ -35,25 +36,13 @@ class TunersTest : public LineUpTest {
 protected:
     void SetUp() override {
         Broadcast::useClock(testClock());
-        char* folder = g_dir_make_tmp("telix-tuners-XXXXXX", nullptr);
-        ASSERT_TRUE(folder);
-        m_folder = folder;
-        g_free(folder);
         const std::string multiplex = std::string(g_get_user_cache_dir()) + "/telix/test-multiplex-1.ts";
         for (const char* name : {"a", "b", "c"}) {
             ASSERT_EQ(symlink(multiplex.c_str(), file(name).c_str()), 0);
         }
     }
 
-    void TearDown() override {
-        LineUpTest::TearDown();
-        for (const char* name : {"a", "b", "c", "tv.conf"}) {
-            unlink(file(name).c_str());
-        }
-        rmdir(m_folder.c_str());
-    }
-
-    std::string file(const std::string& name) const { return m_folder + "/" + name; }
+    std::string file(const std::string& name) const { return m_folder.file(name); }
 
     void startWithTuners(uint32_t tuners, const std::string& lineUp, uint32_t channels) {
         std::ofstream(file("tv.conf")) << "[set]\nsignal-timeout=3600\ntuners=" << tuners << "\n";
@@ -95,7 +84,7 @@ protected:
         advance();
     }
 
-    std::string m_folder;
+    TemporaryFolder m_folder;
 };
 
 TEST_F(TunersTest, ReceiveTheFollowingChannelWhenOneHasBeenOnForAMoment) {

@@ -6,6 +6,7 @@
 #include <string>
 
 #include "desktop/window/shared/ApplicationTarget.h"
+#include "tests/support/TemporaryFolder.h"
 
 using namespace desktop;
 
@@ -13,21 +14,9 @@ namespace {
 
 class ApplicationTargetTest : public testing::Test {
 protected:
-    ApplicationTargetTest() {
-        g_autofree char* folder = g_dir_make_tmp("telix-XXXXXX", nullptr);
-        m_folder = folder;
-    }
-    ~ApplicationTargetTest() override {
-        for (const std::string& file : m_files) {
-            g_unlink(file.c_str());
-        }
-        g_rmdir(m_folder.c_str());
-    }
-
-    std::string write(const std::string& name, const std::string& content) {
-        m_files.push_back(m_folder + "/" + name);
-        g_file_set_contents(m_files.back().c_str(), content.c_str(), -1, nullptr);
-        return "file://" + m_files.back();
+    std::string write(const std::string& name, const std::string& content) const {
+        g_file_set_contents(m_folder.file(name).c_str(), content.c_str(), -1, nullptr);
+        return "file://" + m_folder.file(name);
     }
 
     static SignalledApplication signalled(uint32_t organisation, uint16_t application, const std::string& url,
@@ -67,14 +56,13 @@ protected:
                     "<versionMinor>1</versionMinor><versionMicro>1</versionMicro></mhpVersion>"
                     "</applicationDescriptor><applicationTransport "
                     "xsi:type=\"HTTPTransportType\"><URLBase>file://" +
-                    m_folder + "/</URLBase></applicationTransport><applicationLocation>" + entry.page +
+                    m_folder.path() + "/</URLBase></applicationTransport><applicationLocation>" + entry.page +
                     "</applicationLocation></Application>";
         }
         return text + "</ApplicationList></ApplicationDiscovery></ServiceDiscovery>";
     }
 
-    std::string m_folder;
-    std::vector<std::string> m_files;
+    TemporaryFolder m_folder;
 };
 
 TEST_F(ApplicationTargetTest, APageIsItsOwnTarget) {
@@ -83,7 +71,7 @@ TEST_F(ApplicationTargetTest, APageIsItsOwnTarget) {
     EXPECT_EQ(target.url, page);
     EXPECT_EQ(target.error, "");
     EXPECT_FALSE(target.signalled);
-    EXPECT_EQ(findApplication("file://" + m_folder + "/none.html", {"agent"}, {}).error, "No such file");
+    EXPECT_EQ(findApplication("file://" + m_folder.file("none.html"), {"agent"}, {}).error, "No such file");
 }
 
 TEST_F(ApplicationTargetTest, ASignalledApplicationIsFoundByItsHexadecimalIds) {
@@ -147,7 +135,7 @@ TEST_F(ApplicationTargetTest, AnXmlAitLeadsToItsApplicationWithTheHighestPriorit
                                                             {"KILL", 99, "low.html"}}));
     const ApplicationTarget target = findApplication(document, {"agent"}, {});
     EXPECT_EQ(target.error, "");
-    EXPECT_EQ(target.url, "file://" + m_folder + "/high.html");
+    EXPECT_EQ(target.url, "file://" + m_folder.file("high.html"));
     EXPECT_FALSE(target.signalled);
 }
 
@@ -156,7 +144,7 @@ TEST_F(ApplicationTargetTest, AnXmlAitWithoutAnApplicationToStartSaysWhy) {
     EXPECT_EQ(findApplication(document, {"agent"}, {}).error, "the XML AIT has no application to start");
     const std::string missing = write("missing.aitx", xmlAit({{"AUTOSTART", 1, "none.html"}}));
     EXPECT_EQ(findApplication(missing, {"agent"}, {}).error,
-              "file://" + m_folder + "/none.html: No such file");
+              "file://" + m_folder.file("none.html") + ": No such file");
     EXPECT_NE(findApplication(write("bad.aitx", "<html></html>"), {"agent"}, {}).error, "");
 }
 
@@ -164,7 +152,7 @@ TEST_F(ApplicationTargetTest, OnlyTheOptionTakesADocumentOfAnotherNameAsXmlAit) 
     write("low.html", "x");
     const std::string document = write("list.xml", xmlAit({{"AUTOSTART", 1, "low.html"}}));
     EXPECT_EQ(findApplication(document, {"agent"}, {}).url, document);
-    EXPECT_EQ(findApplicationOfXmlAit(document, {"agent"}).url, "file://" + m_folder + "/low.html");
+    EXPECT_EQ(findApplicationOfXmlAit(document, {"agent"}).url, "file://" + m_folder.file("low.html"));
     EXPECT_NE(findApplicationOfXmlAit(write("page.html", "x"), {"agent"}).error, "");
     EXPECT_EQ(findApplicationOfXmlAit("data:text/html,x", {"agent"}).error, "not an XML AIT");
 }
