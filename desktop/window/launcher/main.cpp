@@ -1,9 +1,9 @@
 // telix-tv: starts the window of the desktop television on the engine that --engine selects.
+#include <glib.h>
 #include <unistd.h>
 
 #include <cerrno>
 #include <clocale>
-#include <cstdlib>
 #include <cstring>
 
 #include "desktop/window/shared/CommandLine.h"
@@ -45,10 +45,10 @@ std::string selectEngine(const std::string& wanted) {
 
 // The C library takes large blocks from the machine one by one, until the first one is freed; from then on it
 // takes them from its heaps, which keep what is freed. With the frames of one clip after the other the heaps
-// of the process of the pages would grow and grow. So the limit stays what it is at the start, 128 KiB.
+// of the process of the pages would grow and grow. So the limit stays what it is at the start, 128 KiB,
+// unless the user has set another one.
 void returnLargeBlocks() {
-    constexpr int kReplace = 0; // not what the user has set
-    setenv("MALLOC_MMAP_THRESHOLD_", "131072", kReplace);
+    g_setenv("MALLOC_MMAP_THRESHOLD_", "131072", FALSE);
 }
 
 } // namespace

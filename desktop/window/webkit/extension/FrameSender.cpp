@@ -44,6 +44,7 @@ void sendRing(WebKitWebExtension* extension, int memory, int wakeup) {
     g_object_unref(descriptors);
 }
 
+// Where frames go: what the message for a screenshot brings up to date.
 struct Frames {
     FramePublisher& publisher;
     VideoPlacement& placement;
