@@ -1,5 +1,5 @@
-"""telix-tv on WebKitGTK: the end of the web process, the keys that its platform library lets pages have, and the server of
-the inspector."""
+"""telix-tv on WebKitGTK: the end of the web process and its memory, the keys that its platform library lets pages have, and
+the server of the inspector."""
 
 import contextlib
 import ctypes
@@ -40,6 +40,25 @@ PLAYER = '''<object id="player" type="video/mp4" data="%s" style="width: 640px; 
         player.onPlayStateChange = function () { if (player.playState === 1) { console.log("playing"); } };
         onload = function () { player.play(1); };
     </script>'''
+# Elements that are used and removed, each with a mebibyte that goes with it; then garbage, so that the engine collects.
+REMOVED_ELEMENTS = """<script>
+        function use(number) {
+            var element = document.createElement("object");
+            element.type = "video/broadcast";
+            element.setAttribute("data-ballast", new Array(1 << 20).join("x") + number);
+            document.body.appendChild(element);
+            element.playState;
+            document.body.removeChild(element);
+        }
+        onload = function () { console.log("ready"); };
+        onkeydown = function () {
+            for (var i = 0; i < 300; i++) { setTimeout(use, 0, i); }
+            setTimeout(function () {
+                console.log("removed");
+                setInterval(function () { for (var i = 0; i < 64; i++) { new Uint8Array(1 << 18)[0] = 1; } }, 50);
+            }, 0);
+        };
+    </script>"""
 NUMERIC = 0x100
 # The threads that push data through a pipeline are named after an element and its pad.
 STREAMING_THREAD = re.compile(r'[a-z0-9]+:(src|sink)')
@@ -138,6 +157,28 @@ class Crash(TelixTv):
             _, errors = process.communicate(timeout=RUN_TIMEOUT)
         self.assertEqual(process.returncode, 128 + signal.SIGTERM)
         self.assertIn('telix-tv: the web process has ended, starting it again', errors)
+
+
+class Memory(TelixTv):
+    @staticmethod
+    def megabytes(web_process):
+        status = pathlib.Path(f'/proc/{web_process}/status').read_text(encoding='ascii')
+        return int(re.search(r'^RssAnon:\s+(\d+) kB', status, re.MULTILINE)[1]) / 1024
+
+    def test_an_element_goes_when_it_has_been_removed(self):
+        page = self.write(REMOVED_ELEMENTS)
+        # Garbage that has survived one collection would stay.
+        with self.television.start('--plugin', DESKTOP_PLUGIN, page, environment={'JSC_useGenerationalGC': '0'}) as process:
+            messages = Lines(process.stderr)
+            self.assertTrue(messages.wait_for('ready'))
+            web_process, = web_processes(process)
+            before = self.megabytes(web_process)
+            self.television.telixctl('key', 'ok')
+            self.assertTrue(messages.wait_for('removed'), messages.lines)
+            wait_for(lambda: self.megabytes(web_process) < before + 150,
+                     lambda: f'{before} MB before, {self.megabytes(web_process)} MB after 300 elements of 1 MB each')
+            process.terminate()
+            process.communicate(timeout=RUN_TIMEOUT)
 
 
 class KeySet(TelixTv):

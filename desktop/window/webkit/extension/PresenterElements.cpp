@@ -13,13 +13,16 @@ constexpr char kObserver[] = "telixBridgeObserver";
 
 // The element as a value of another world; null if it is not one of the frame's.
 JSCValue* valueInWorld(WebKitFrame* frame, JSCValue* element, WebKitScriptWorld* world) {
-    // Deprecated without a replacement.
+    // Deprecated without a replacement. The engine keeps the node for the life of the page unless the
+    // reference is given back, although it is not the caller's.
     G_GNUC_BEGIN_IGNORE_DEPRECATIONS
     WebKitDOMNode* node = webkit_dom_node_for_js_value(element);
-    return node ? webkit_frame_get_js_value_for_dom_object_in_script_world(frame, WEBKIT_DOM_OBJECT(node),
-                                                                           world)
-                : nullptr;
+    JSCValue* value =
+        node ? webkit_frame_get_js_value_for_dom_object_in_script_world(frame, WEBKIT_DOM_OBJECT(node), world)
+             : nullptr;
     G_GNUC_END_IGNORE_DEPRECATIONS
+    g_clear_object(&node);
+    return value;
 }
 
 } // namespace
