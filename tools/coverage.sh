@@ -23,8 +23,8 @@ fi
 build=build-coverage
 jobs=${CMAKE_BUILD_PARALLEL_LEVEL:-$(nproc)}
 tools/install-packages.sh run test
-[ -f build/CMakeCache.txt ] || cmake --preset release >/dev/null
-ninja -C build -j "$jobs" telix_unit_test_objects telix_desktop_test_objects
+cmake --preset release -DTELIX_BUILD_BRIDGE=ON >/dev/null
+ninja -C build -j "$jobs" telix_unit_test_objects telix_desktop_test_objects telix_bridge_test_objects
 # Counters that threads share are counted as one; assertions stay on, as everywhere.
 cmake -S . -B $build -G Ninja -DCMAKE_BUILD_TYPE=Debug -DCMAKE_CXX_FLAGS="--coverage -fprofile-update=atomic" \
     -DTELIX_TEST_OBJECTS="$PWD/build" -DTELIX_BUILD_BRIDGE=ON -DTELIX_BUILD_BROWSER=OFF -DTELIX_BUILD_BENCH=OFF >/dev/null
