@@ -68,6 +68,16 @@ protected:
         }
     }
 
+    // The first frame, of value 1, presented by that object.
+    void startWithAFrameOf(uint64_t presenter) {
+        loadLibrary();
+        ASSERT_TRUE(m_publisher->start());
+        m_setPresenter(presenter, false);
+        m_show(64, 36, 1);
+        takeRing();
+        waitFor(1);
+    }
+
     std::mutex m_mutex; // guards the next three
     std::condition_variable m_changed;
     std::unique_ptr<FrameReader> m_next;
@@ -140,12 +150,7 @@ TEST_F(FramePublisherTest, FramesOfAnObjectThatIsLeftOutDoNotArrive) {
         }
         return changes.load();
     };
-    loadLibrary();
-    ASSERT_TRUE(m_publisher->start());
-    m_setPresenter(7, false);
-    m_show(64, 36, 1);
-    takeRing();
-    waitFor(1);
+    startWithAFrameOf(7);
     EXPECT_EQ(waitForChange(1), 1) << "another object presents";
     m_publisher->watch(7);
     m_publisher->leaveOut(7);
@@ -181,12 +186,7 @@ TEST_F(FramePublisherTest, TheNewestFrameIsThereWhenAskedForWhileTheThreadIsBusy
         entered.set_value();
         left.get_future().wait();
     });
-    loadLibrary();
-    ASSERT_TRUE(m_publisher->start());
-    m_setPresenter(7, false);
-    m_show(64, 36, 1);
-    takeRing();
-    waitFor(1);
+    startWithAFrameOf(7);
     entered.get_future().wait();
     m_show(64, 36, 2);
     m_publisher->publishNewest();
