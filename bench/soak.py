@@ -16,7 +16,7 @@ import time
 TOP = os.path.dirname(os.path.dirname(os.path.abspath(__file__)))
 sys.path[:0] = [os.path.join(TOP, 'tests', 'browser'), os.path.join(TOP, 'tools')]
 from media_server import MediaServer  # noqa: E402
-from television import Television, signal  # noqa: E402
+from television import Television, anonymous_kilobytes, signal  # noqa: E402
 
 WORKS = 'none', 'untouched', 'used', 'play'
 COLLECTIONS = 50  # of the garbage of script, in a run
@@ -38,12 +38,6 @@ def stat(pid):
             return name, int(rest.split()[1])
     except OSError:
         return None, None
-
-
-def anonymous_kilobytes(pid):
-    """The memory of a process that is not that of files."""
-    with open(f'/proc/{pid}/status', encoding='ascii') as file:
-        return next(int(line.split()[1]) for line in file if line.startswith('RssAnon:'))
 
 
 class Memory:

@@ -273,6 +273,12 @@ def web_processes(process):
     return [int(line.split()[0]) for line in children.splitlines() if 'WebKitWeb' in line]
 
 
+def anonymous_kilobytes(pid):
+    """The memory of a process that is not that of files."""
+    with open(f'/proc/{pid}/status', encoding='ascii') as file:
+        return next(int(line.split()[1]) for line in file if line.startswith('RssAnon:'))
+
+
 def has_opengl(process):
     """Whether a web process of a telix-tv has loaded OpenGL."""
     def maps(pid):

@@ -13,7 +13,7 @@ import unittest
 import urllib.request
 
 from telix_tv import PLUGIN, TelixTv
-from television import RUN_TIMEOUT, Lines, wait_for, web_processes
+from television import RUN_TIMEOUT, Lines, anonymous_kilobytes, wait_for, web_processes
 from patterns import has_bars, is_striped
 
 DESKTOP_PLUGIN = os.environ['TELIX_DESKTOP_PLUGIN']
@@ -162,8 +162,7 @@ class Crash(TelixTv):
 class Memory(TelixTv):
     @staticmethod
     def megabytes(web_process):
-        status = pathlib.Path(f'/proc/{web_process}/status').read_text(encoding='ascii')
-        return int(re.search(r'^RssAnon:\s+(\d+) kB', status, re.MULTILINE)[1]) / 1024
+        return anonymous_kilobytes(web_process) // 1024
 
     def test_an_element_goes_when_it_has_been_removed(self):
         page = self.write(REMOVED_ELEMENTS)

@@ -1,10 +1,6 @@
 // The channel list that is made of the tables of files, and channels that pages make.
 #include <gtest/gtest.h>
 
-#include <unistd.h>
-
-#include <cstdio>
-
 #include <glib.h>
 
 #include "desktop/platform/Channels.h"

@@ -1,7 +1,5 @@
 // Channels from transport stream files. A process reads its channel list once, so each of these tests needs a
 // process of its own.
-#include <unistd.h>
-
 #include <algorithm>
 #include <chrono>
 #include <cstdlib>

@@ -1,7 +1,7 @@
 // What URLs lead to that start applications. Servers are in the tests of the window.
 #include <gtest/gtest.h>
 
-#include <glib/gstdio.h>
+#include <glib.h>
 
 #include <string>
 
