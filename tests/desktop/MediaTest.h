@@ -11,6 +11,7 @@
 #include <chrono>
 #include <csignal>
 #include <cstdlib>
+#include <cstring>
 #include <future>
 
 #include <gtest/gtest.h>
@@ -230,9 +231,17 @@ inline std::optional<desktop::MediaPipeline::Output> output() {
     return runOnPlatformThread([] { return desktop::PlayerRegistry::instance().output(); });
 }
 
+// Whether a failed check of GLib ends the test, where G_DEBUG asks for it. GStreamer's downloadbuffer, which
+// measures its rates with timers, lets a timer run twice if it is flushed while a demuxer waits for bytes.
+// Nothing follows from that.
+inline gboolean endsTheTest(const gchar*, GLogLevelFlags, const gchar* message, gpointer) {
+    return std::strstr(message, "g_timer_continue: assertion 'timer->active == FALSE' failed") == nullptr;
+}
+
 class MediaTest : public testing::Test {
 protected:
     void SetUp() override {
+        g_test_log_set_fatal_handler(endsTheTest, nullptr);
         messages.clear();
         m_player = newPlayer();
     }
