@@ -1,6 +1,5 @@
 #!/usr/bin/env bash
-# Runs pages with random steps on the WebKit engine, each seed with and without sanitizers, for some minutes. Not on the NPAPI
-# engine, which after so many steps ends the plug-in before the last of its objects.
+# Runs pages with random steps on each engine, each seed with and without sanitizers, for some minutes.
 # Usage: tools/random-pages.sh MINUTES [FIRST-SEED]
 # A round is one seed of 10,000 steps in each test of random pages; the round that runs at the end of the time is finished.
 # Exit status: 0 no fault found; 1 a seed failed, its output precedes; 2 bad arguments.
@@ -33,7 +32,7 @@ rounds=0
 failures=0
 while [ $SECONDS -lt $end ]; do
     for preset in asan release; do
-        if ! output=$(TELIX_RANDOM_FIRST=$seed ctest --preset $preset -R random -E npapi --output-on-failure); then
+        if ! output=$(TELIX_RANDOM_FIRST=$seed ctest --preset $preset -R random --output-on-failure); then
             echo "$output"
             echo "seed $seed: fault in the build $preset" >&2
             failures=$((failures + 1))

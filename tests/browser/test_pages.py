@@ -170,6 +170,17 @@ class Pages(TelixTv):
         self.value(shipped('first.html'), '--eval', '1')
         self.assertEqual(self.television.leftovers(), [])
 
+    def test_listeners_of_a_page_that_ends_may_remove_its_frames(self):
+        for listener in ('window', 'frames[0]', 'frames[1]'):
+            page = self.write('<iframe></iframe><iframe></iframe><iframe></iframe><script>onload = function () {'
+                              f'{listener}.addEventListener("unload", function () {{'
+                              'while (frames.length > 0) { frames[0].frameElement.remove(); }'
+                              'console.log("removed"); }); };</script>')
+            run = self.run_tv(page, '--eval', 'frames.length')
+            self.assertEqual(run.status, 0, run)
+            self.assertEqual(run.value, 3)
+            self.assertIn('removed', run.errors)
+
 
 class Documents(TelixTv):
     """HbbTV documents."""

@@ -47,7 +47,7 @@ class Objects(RandomSteps):
         names = names_of_objects()
         self.assertIn('setChannelByTriplet', names)
         self.run_steps('randomobjects.html', names=','.join(names),
-                       **({'fixed': 1} if os.environ['TELIX_ENGINE'] == 'npapi' else {}))
+                       **({'frames': 0} if os.environ['TELIX_ENGINE'] == 'npapi' else {}))
 
 
 if __name__ == '__main__':

@@ -10,13 +10,15 @@
 #include <QPaintEvent>
 #include <QPainter>
 #include <QPalette>
+#include <QPointer>
+#include <QWebElement>
 #include <QWebFrame>
 #include <QWheelEvent>
 
 #include "desktop/window/npapi/ApplicationPage.h"
 #include "desktop/window/npapi/PageGeometry.h"
-#include "desktop/window/npapi/PageScript.h"
 #include "desktop/window/npapi/StyleSheet.h"
+#include "desktop/window/shared/PageScript.h"
 #include "desktop/window/shared/RemoteControl.h"
 
 namespace desktop {
@@ -48,11 +50,15 @@ QKeyEvent keyboardEvent(QEvent::Type type, const RemoteKey& key) {
                      key.keyboardKeys.front(), 0, QString::fromStdString(textOf(key)));
 }
 
-// Dispatches the unload events to the documents of the frame and of its descendants.
-void dispatchUnload(QWebFrame& frame) {
-    callPageScript(frame, "unload", {});
-    for (QWebFrame* child : frame.childFrames()) {
-        dispatchUnload(*child);
+// Dispatches the unload events to the documents of the frame and of its descendants. Their listeners may
+// remove frames, also their own: the frame itself must not evaluate the script then.
+void dispatchUnload(const QPointer<QWebFrame>& frame) {
+    frame->documentElement().evaluateJavaScript(QString::fromStdString(pageScriptCall("unload", {})));
+    const auto children = [&frame] { return frame ? frame->childFrames() : QList<QWebFrame*>(); };
+    for (QWebFrame* child : children()) {
+        if (children().contains(child)) {
+            dispatchUnload(child);
+        }
     }
 }
 
@@ -85,13 +91,11 @@ ApplicationView::ApplicationView(const QString& userAgent, std::function<uint32_
 }
 
 ApplicationView::~ApplicationView() {
-    // During the teardown of a page the engine resizes the plug-ins' windows, and the plug-ins ask the page
-    // for their position. The engine would then lay out a half-destroyed document and either crash or lose
-    // plug-in instances, which are then never destroyed. An unload listener that forces a layout would
-    // crash the same way. So the unload events are dispatched here, before the teardown, and then all
-    // plug-in instances are destroyed: an element without a layout box has no instance once the layout of
-    // all frames is up to date, which painting the page ensures.
-    dispatchUnload(*m_page->mainFrame());
+    // In the teardown of a page the engine loses plug-in instances, which are then never destroyed. So the
+    // unload events are dispatched here, before the teardown, and then all plug-in instances are destroyed:
+    // an element without a layout box has no instance once the layout of all frames is up to date, which
+    // painting the page ensures.
+    dispatchUnload(m_page->mainFrame());
     QWebSettings* settings = m_page->settings();
     settings->setAttribute(QWebSettings::JavascriptEnabled, false);
     settings->setUserStyleSheetUrl(

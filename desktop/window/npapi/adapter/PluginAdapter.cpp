@@ -1,5 +1,5 @@
-// A plug-in in front of the television's plug-in. Each call goes on to that one, with three additions, of
-// which a strict adapter has the last one only.
+// A plug-in in front of the television's plug-in. Each call goes on to that one, with five additions, of
+// which a strict adapter has the last three only.
 //
 // An element without an id gets one before its instance is made, because the plug-in finds elements by their
 // ids.
@@ -9,6 +9,12 @@
 // plug-in knows its objects by them.
 //
 // A script of the plug-in that fails, and a method that refuses its arguments, are reported.
+//
+// NPP_SetWindow goes on in a task of its own, because the engine calls it while it lays out the page. The
+// plug-in asks script for the place of the element, for which the engine would lay out again, and crash.
+//
+// NP_Shutdown does not go on while there are instances. The engine counts its views of plug-ins, and counts
+// one down that it has never counted up if the view goes before it has an instance.
 //
 // Main thread. The library is never unloaded, because objects of the plug-in may outlive it in the engine.
 #include "desktop/window/npapi/adapter/PluginAdapter.h"
@@ -43,8 +49,8 @@ struct EntryPoints {
 
 EntryPoints plugin;
 PluginAdapterSettings settings;
-NPP_NewProcPtr newInstanceOfPlugin;
-NPP_DestroyProcPtr destroyInstanceOfPlugin;
+NPPluginFuncs functionsOfPlugin;
+bool isInitialized;        // between NP_Initialize and NP_Shutdown of the plug-in
 NPNetscapeFuncs browser;   // what the engine has
 NPNetscapeFuncs ofAdapter; // what the plug-in gets
 bool hasException;         // whether the plug-in has told script why the last method failed
@@ -61,10 +67,17 @@ std::map<NPObject*, NPP>& owners() {
     return objects;
 }
 
-// The function of scripts/list.js in the window of each instance, with a reference; null until it is needed.
+// The function of scripts/list.js in the window of each instance that has not ended, with a reference; null
+// until it is needed.
 std::map<NPP, NPObject*>& listFunctions() {
     static std::map<NPP, NPObject*> instances;
     return instances;
+}
+
+// The window of each instance that the plug-in has not been told of yet.
+std::map<NPP, NPWindow>& heldWindows() {
+    static std::map<NPP, NPWindow> windows;
+    return windows;
 }
 
 NPVariant variantOf(NPObject* object) {
@@ -296,6 +309,7 @@ void forget(NPP instance) {
         }
         listFunctions().erase(found);
     }
+    heldWindows().erase(instance);
 }
 
 NPError newInstance(NPMIMEType type, NPP instance, uint16_t mode, int16_t argc, char* argn[], char* argv[],
@@ -313,8 +327,8 @@ NPError newInstance(NPMIMEType type, NPP instance, uint16_t mode, int16_t argc, 
         names.insert(names.begin(), idName);
         values.insert(values.begin(), id.data());
     }
-    const NPError error = newInstanceOfPlugin(type, instance, mode, static_cast<int16_t>(names.size()),
-                                              names.data(), values.data(), saved);
+    const NPError error = functionsOfPlugin.newp(type, instance, mode, static_cast<int16_t>(names.size()),
+                                                 names.data(), values.data(), saved);
     if (error != NPERR_NO_ERROR) {
         forget(instance);
     }
@@ -323,7 +337,25 @@ NPError newInstance(NPMIMEType type, NPP instance, uint16_t mode, int16_t argc, 
 
 NPError destroyInstance(NPP instance, NPSavedData** saved) {
     forget(instance);
-    return destroyInstanceOfPlugin(instance, saved);
+    return functionsOfPlugin.destroy(instance, saved);
+}
+
+// Does nothing if the plug-in has been told already, or the instance has ended.
+void giveHeldWindow(void* data) {
+    auto* instance = static_cast<NPP>(data);
+    auto held = heldWindows().extract(instance);
+    if (!held.empty()) {
+        functionsOfPlugin.setwindow(instance, &held.mapped());
+    }
+}
+
+NPError setWindow(NPP instance, NPWindow* window) {
+    if (!window) {
+        return functionsOfPlugin.setwindow(instance, window);
+    }
+    heldWindows()[instance] = *window;
+    browser.pluginthreadasynccall(instance, giveHeldWindow, instance);
+    return NPERR_NO_ERROR;
 }
 
 template <class Function>
@@ -349,22 +381,32 @@ EXPORT bool telix_adapt_plugin(const PluginAdapterSettings& given) {
 // NOLINTBEGIN(readability-identifier-naming): the names are those of NPAPI.
 
 EXPORT NPError NP_Initialize(NPNetscapeFuncs* browserFuncs, NPPluginFuncs* pluginFuncs) {
-    std::memcpy(&browser, browserFuncs, std::min<std::size_t>(sizeof(browser), browserFuncs->size));
-    ofAdapter = browser;
-    ofAdapter.createobject = createObject;
-    ofAdapter.evaluate = evaluateOfPlugin;
-    ofAdapter.setexception = setException;
-    const NPError error = plugin.initialize(&ofAdapter, pluginFuncs);
-    if (error == NPERR_NO_ERROR) {
-        newInstanceOfPlugin = pluginFuncs->newp;
-        destroyInstanceOfPlugin = pluginFuncs->destroy;
-        pluginFuncs->newp = newInstance;
-        pluginFuncs->destroy = destroyInstance;
+    if (!isInitialized) {
+        std::memcpy(&browser, browserFuncs, std::min<std::size_t>(sizeof(browser), browserFuncs->size));
+        ofAdapter = browser;
+        ofAdapter.createobject = createObject;
+        ofAdapter.evaluate = evaluateOfPlugin;
+        ofAdapter.setexception = setException;
+        functionsOfPlugin.size = sizeof(functionsOfPlugin);
+        const NPError error = plugin.initialize(&ofAdapter, &functionsOfPlugin);
+        if (error != NPERR_NO_ERROR) {
+            return error;
+        }
+        isInitialized = true;
     }
-    return error;
+    std::memcpy(pluginFuncs, &functionsOfPlugin,
+                std::min<std::size_t>(sizeof(functionsOfPlugin), pluginFuncs->size));
+    pluginFuncs->newp = newInstance;
+    pluginFuncs->destroy = destroyInstance;
+    pluginFuncs->setwindow = setWindow;
+    return NPERR_NO_ERROR;
 }
 
 EXPORT NPError NP_Shutdown() {
+    if (!listFunctions().empty()) {
+        return NPERR_NO_ERROR;
+    }
+    isInitialized = false;
     return plugin.shutdown();
 }
 

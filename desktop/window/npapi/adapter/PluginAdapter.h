@@ -1,5 +1,6 @@
-// A plug-in in front of the television's plug-in, for an engine that reads no elements of its lists by index,
-// for pages that give their elements no id, and for what neither engine nor plug-in tells anybody.
+// A plug-in in front of the television's plug-in, for an engine that reads no elements of its lists by index
+// and calls functions at the wrong time, for pages that give their elements no id, and for what neither
+// engine nor plug-in tells anybody.
 #ifndef TELIX_DESKTOP_WINDOW_NPAPI_ADAPTER_PLUGINADAPTER_H
 #define TELIX_DESKTOP_WINDOW_NPAPI_ADAPTER_PLUGINADAPTER_H
 
