@@ -385,6 +385,16 @@ bool construct(NPP, NPObject* object, const NPVariant* args, uint32_t count, NPV
     return callForResult(result, object ? object->_class->construct : nullptr, object, args, count);
 }
 
+// An object of which the result has the only reference ends with the instance.
+void noteResult(NPP npp, const NPVariant& value) {
+    ScriptObject* const object =
+        value.type == NPVariantType_Object ? ScriptObject::from(value.value.objectValue) : nullptr;
+    const auto instance = Instance::find(npp);
+    if (object && object->engine && object->referenceCount == 1 && instance && instance->page()) {
+        object->setEvaluatedFor(instance.get());
+    }
+}
+
 bool evaluate(NPP npp, NPObject* object, NPString* script, NPVariant* result) {
     if (result) {
         *result = voidVariant();
@@ -401,6 +411,7 @@ bool evaluate(NPP npp, NPObject* object, NPString* script, NPVariant* result) {
         page->warn("failed-script", source);
     }
     if (result) {
+        noteResult(npp, value);
         *result = value;
     } else {
         releaseVariant(value);

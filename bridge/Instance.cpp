@@ -132,7 +132,19 @@ void Instance::end() {
             std::free(saved);
         }
     }
+    dropResults();
     releaseObject(std::exchange(m_element, nullptr));
+}
+
+void Instance::dropResults() {
+    while (!m_results.empty()) {
+        ScriptObject& result = **m_results.begin();
+        if (result.referenceCount == 1) {
+            result.cutOff();
+        } else {
+            result.setEvaluatedFor(nullptr);
+        }
+    }
 }
 
 NPError Instance::setValue(NPPVariable variable) {

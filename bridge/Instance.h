@@ -19,6 +19,7 @@ namespace bridge {
 class Page;
 class PluginObject;
 class ScriptEngine;
+struct ScriptObject;
 
 // The place of an element in the window, in CSS pixels, and what of it is visible.
 struct Place {
@@ -77,12 +78,16 @@ public:
     // For PluginObject.
     void add(PluginObject& object) { m_objects.insert(&object); }
     void remove(PluginObject& object) { m_objects.erase(&object); }
+    // For ScriptObject.
+    void addResult(ScriptObject& object) { m_results.insert(&object); }
+    void removeResult(ScriptObject& object) { m_results.erase(&object); }
 
 private:
     struct Timer;
     enum class State { New, Running, Refused, Ended };
 
     static int onTimer(void* data);
+    void dropResults();
 
     NPP_t m_npp = {};
     const NPPluginFuncs& m_calls;
@@ -91,7 +96,8 @@ private:
     State m_state = State::New;
     NPWindow m_window = {}; // the plug-in may keep the address
     std::unordered_set<PluginObject*> m_objects;
-    std::set<uint32_t> m_timers; // sources of the main loop
+    std::unordered_set<ScriptObject*> m_results; // of scripts, which nobody else has
+    std::set<uint32_t> m_timers;                 // sources of the main loop
 };
 
 } // namespace bridge

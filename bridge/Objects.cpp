@@ -77,7 +77,7 @@ void deleteObject(NPObject* object) {
     }
 }
 
-// Calls of a ScriptObject's class: the engine's operation on the script object, unless its page has ended.
+// Calls of a ScriptObject's class: the engine's operation on the script object, unless it has been cut off.
 template <typename Result, typename... Parameters, typename... Values>
 Result inScript(NPObject* object, Result (ScriptEngine::*operation)(ScriptHandle, Parameters...),
                 Values&&... values) {
@@ -89,10 +89,7 @@ Result inScript(NPObject* object, Result (ScriptEngine::*operation)(ScriptHandle
 
 void deallocateScriptObject(NPObject* object) {
     auto* const scriptObject = static_cast<ScriptObject*>(object);
-    if (scriptObject->engine) {
-        scriptObject->table->remove(scriptObject->handle);
-        scriptObject->engine->unprotect(scriptObject->handle);
-    }
+    scriptObject->cutOff();
     delete scriptObject;
 }
 
@@ -453,6 +450,7 @@ void PluginObject::scriptObjectCollected(NPObject* object, uint64_t wrapperSeria
 NPObject* ScriptObjects::retained(ScriptHandle handle) {
     auto& object = m_objects[handle];
     if (object) {
+        object->setEvaluatedFor(nullptr);
         object->referenceCount++;
         return object;
     }
@@ -462,21 +460,37 @@ NPObject* ScriptObjects::retained(ScriptHandle handle) {
     object->engine = &m_engine;
     object->handle = handle;
     object->table = this;
+    object->evaluatedFor = nullptr;
     m_engine.protect(handle);
     return object;
 }
 
 void ScriptObjects::end() {
-    for (const auto& [handle, object] : std::exchange(m_objects, {})) {
-        m_engine.unprotect(handle);
-        object->engine = nullptr;
-        object->handle = nullptr;
-        object->table = nullptr;
+    while (!m_objects.empty()) {
+        m_objects.begin()->second->cutOff();
     }
 }
 
 ScriptObject* ScriptObject::from(NPObject* object) {
     return object->_class == &kScriptObjectClass ? static_cast<ScriptObject*>(object) : nullptr;
+}
+
+void ScriptObject::setEvaluatedFor(Instance* instance) {
+    if (evaluatedFor) {
+        evaluatedFor->removeResult(*this);
+    }
+    evaluatedFor = instance;
+    if (instance) {
+        instance->addResult(*this);
+    }
+}
+
+void ScriptObject::cutOff() {
+    setEvaluatedFor(nullptr);
+    if (ScriptEngine* const scriptEngine = std::exchange(engine, nullptr)) {
+        table->remove(handle);
+        scriptEngine->unprotect(std::exchange(handle, nullptr));
+    }
 }
 
 } // namespace bridge

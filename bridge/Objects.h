@@ -113,12 +113,19 @@ void setPendingException(const char* text);
 
 // A script object of a page as the plug-in has it. The class's functions are NPN_Invoke and the like on it.
 struct ScriptObject : NPObject {
-    ScriptEngine* engine; // null when the page has ended
-    ScriptHandle handle;
+    ScriptEngine* engine; // null when it has been cut off
+    ScriptHandle handle;  // the same
     class ScriptObjects* table;
+    Instance* evaluatedFor; // which alone has it, as the result of a script; else null
 
     // Null for an object of the plug-in.
     static ScriptObject* from(NPObject* object);
+
+    // From now on, or no longer with null, the object ends with the instance unless the plug-in has retained
+    // it: plug-ins forget to release results.
+    void setEvaluatedFor(Instance* instance);
+    // Cuts it off from the page; the plug-in may keep and release it.
+    void cutOff();
 };
 
 // The ScriptObjects of a page, each once.

@@ -1,5 +1,9 @@
 // Objects on both sides: values, identity, references, the ends of instances and pages.
 #include "bridge/Objects.h"
+
+#include <algorithm>
+#include <vector>
+
 #include "bridge/CallDepth.h"
 #include "tests/bridge/ScriptHost.h"
 
@@ -14,6 +18,16 @@ protected:
 
     NPIdentifier id(const char* name) { return browser.getstringidentifier(name); }
     int liveObjects() { return std::stoi(script("plugin.objects")); }
+    // The object that the plug-in gets as the result of a script, with a reference.
+    NPObject* resultOf(const std::string& text) {
+        NPObject* window = nullptr;
+        EXPECT_EQ(browser.getvalue(self, NPNVWindowNPObject, &window), NPERR_NO_ERROR);
+        NPString program = {text.c_str(), static_cast<uint32_t>(text.size())};
+        NPVariant result{};
+        EXPECT_TRUE(browser.evaluate(self, window, &program, &result));
+        browser.releaseobject(window);
+        return objectOf(result);
+    }
 };
 
 INSTANTIATE_TEST_SUITE_P(Engines, BridgeObjects, testing::Values(EngineKind::CApi, EngineKind::GObject),
@@ -218,6 +232,50 @@ TEST_P(BridgeObjects, ObjectsOfAnEndedInstanceAreInvalidatedAndReleased) {
     page->endInstance(instance);
     EXPECT_EQ(std::stoi(script("other.objects")), before - 1);
     EXPECT_EQ(script("other.journal.match(/invalidate/g).length"), "100");
+}
+
+TEST_P(BridgeObjects, ResultsOfScriptsEndWithTheirInstance) {
+    addInstance("other");
+    NPObject* const forgotten = resultOf("({ a: 1 })");
+    NPObject* const retained = browser.retainobject(resultOf("({ a: 1 })"));
+    NPObject* const again = resultOf("shared = { a: 1 }");
+    ASSERT_EQ(resultOf("shared"), again);
+    NPObject* const elsewhere = resultOf("elsewhere = { a: 1 }");
+    script("other.keep(elsewhere); 0");
+    browser.releaseobject(resultOf("({ a: 1 })"));
+    page->endInstance(instance);
+    const auto isThere = [&](NPObject* object) {
+        OwnedVariant value;
+        return browser.getproperty(self, object, id("a"), &value);
+    };
+    EXPECT_FALSE(isThere(forgotten));
+    EXPECT_TRUE(isThere(retained));
+    EXPECT_TRUE(isThere(again));
+    EXPECT_TRUE(isThere(elsewhere));
+    EXPECT_EQ(script("other.kept().a"), "1");
+    NPVariant cutOff{};
+    cutOff.type = NPVariantType_Object;
+    cutOff.value.objectValue = forgotten;
+    EXPECT_TRUE(browser.setproperty(self, retained, id("given"), &cutOff));
+    OwnedVariant given;
+    EXPECT_TRUE(browser.getproperty(self, retained, id("given"), &given));
+    EXPECT_EQ(given.get().type, NPVariantType_Null);
+    for (NPObject* object : {forgotten, retained, retained, again, again, elsewhere}) {
+        browser.releaseobject(object);
+    }
+}
+
+TEST_P(BridgeObjects, ForgottenResultsOfScriptsAreCollectedAfterTheirInstance) {
+    script("var known = []; var last; 0");
+    std::vector<NPObject*> results;
+    for (int i = 0; i < 50; i++) {
+        results.push_back(resultOf("known.push(new WeakRef(last = {})); last"));
+    }
+    script("last = null; 0");
+    page->endInstance(instance);
+    const char* const alive = "known.filter(function (each) { return each.deref(); }).length";
+    EXPECT_TRUE(collectUntil([&] { return std::stoi(script(alive)) < 25; })) << script(alive);
+    std::for_each(results.begin(), results.end(), browser.releaseobject);
 }
 
 TEST_P(BridgeObjects, AnInstanceThatIsEndedInItsOwnCallEndsAfterIt) {
